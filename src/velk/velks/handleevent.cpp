@@ -1,0 +1,146 @@
+#include "handleevent.h"
+
+#include <QDBusConnection>
+#include <QDBusMessage>
+#include <QDBusReply>
+#include <QDebug>
+#include <QJsonDocument>
+#include <QJsonObject>
+#include <QTimer>
+#include <QVariantMap>
+
+#include "constants.h"
+#include "httpclientapi.h"
+
+namespace {
+
+constexpr int kPasswordNoticeDelay = 60000; // ms
+
+const QString kOpenAction = QStringLiteral("_open");
+
+/// Calls the desktop's notification service and waits for the notification's id. The title is also the
+/// application name.
+QDBusReply<uint> notify(const QString& title, const QString& body, const QStringList& actions,
+                        const QVariantMap& hints, int timeout)
+{
+    const QString service = QStringLiteral("com.norix.kpx.Notification");
+    auto call = QDBusMessage::createMethodCall(service, QStringLiteral("/com/norix/kpx/Notification"),
+                                               service, QStringLiteral("Notify"));
+    constexpr uint replacesNothing = 0;
+    call.setArguments(
+        {title, replacesNothing, QStringLiteral("velkw"), title, body, actions, hints, timeout});
+    return QDBusConnection::sessionBus().call(call);
+}
+
+void notifyPlainly(const QString& title, const QString& body, int timeout)
+{
+    const QDBusReply<uint> reply = notify(title, body, {}, {}, timeout);
+    if (!reply.isValid()) {
+        qWarning() << "--@@@@--" << reply.error();
+    }
+}
+
+bool isPasswordExpiring(int status, const QJsonObject& reply)
+{
+    return status == 200 && reply.value(QLatin1String("code")).toInt(-1) == 0
+        && reply.value(QLatin1String("data")).toObject().value(QLatin1String("result")).toBool(false);
+}
+
+} // namespace
+
+HandleEvent* HandleEvent::GetInstance()
+{
+    static HandleEvent instance;
+    return &instance;
+}
+
+void HandleEvent::initHttpApi()
+{
+    if (m_http != nullptr) {
+        return;
+    }
+    m_http = new HttpClientApi(nullptr, false);
+    m_http->setSSLConfig(velk::kServerCertPath, velk::kPublicKeyPath, velk::kPrivateKeyPath);
+}
+
+void HandleEvent::getPlatformMsg(const QString& url)
+{
+    requestPlatform("getPlatformMsg", url, QString());
+}
+
+HandleEvent::PlatformReply HandleEvent::requestPlatform(const char* operation, const QString& url,
+                                                        const QString& content)
+{
+    QString body;
+    const int status = m_http->getRequest(body, url, content, true);
+    const auto headers = m_http->getRawHeader();
+    qInfo() << operation << "----nCode:" << status << ":" << body << ":" << headers.size();
+    Q_EMIT recvPlatformMsg(status, body, headers);
+    return {status, body};
+}
+
+void HandleEvent::respondPlatformMsg(const QString& url, const QString& body)
+{
+    QString ignoredReply;
+    m_http->putRequest(ignoredReply, url, body, true);
+}
+
+void HandleEvent::getPasswdExpiredTime(const QString& url, const QString& userName)
+{
+    qInfo() << "url " << url;
+    const QJsonObject content{{QStringLiteral("username"), userName}};
+    const auto reply =
+        requestPlatform("getPasswdExpiredTime", url, QString::fromUtf8(QJsonDocument(content).toJson()));
+
+    QJsonParseError error{};
+    const auto document = QJsonDocument::fromJson(reply.body.toUtf8(), &error);
+    if (error.error != QJsonParseError::NoError) {
+        return;
+    }
+    // Logged for every reply that can be parsed, expiring or not, and once more at the end: log readers
+    // count on it.
+    qInfo() << "用户密码快过期了！！";
+    if (isPasswordExpiring(reply.status, document.object())) {
+        remindOfPassword(document.object());
+    }
+    qInfo() << "用户密码快过期了！！";
+}
+
+void HandleEvent::remindOfPassword(const QJsonObject& reply)
+{
+    QTimer::singleShot(kPasswordNoticeDelay, this, [this, reply] {
+        qInfo() << "用户密码快过期了！！";
+        const QString notice =
+            reply.value(QLatin1String("data")).toObject().value(QLatin1String("msg")).toString();
+        sendMessage(kReminderTitle, notice, -1);
+    });
+}
+
+void HandleEvent::sendMessage(const QString& title, const QString& body, int timeout)
+{
+    notifyPlainly(title, body, timeout);
+}
+
+void HandleEvent::sendMessage(const QString& type, const QString& title, const QString& body,
+                              const QString& sender, const QString& time, uint timeout)
+{
+    qInfo() << "----HandleEvent::sendMessage----" << type << title;
+    const bool isReboot = type == QLatin1String("reboot");
+    // The values are joined as they are, commas inside them included: the notification service hands the
+    // text on as it stands.
+    const QString action =
+        isReboot ? type : QStringList{type, title, body, sender, time}.join(QLatin1Char(','));
+    const QString label = isReboot ? QStringLiteral("重启") : QStringLiteral("查看");
+
+    // On the wire the timeout is signed: the unsigned -1 goes out as -1.
+    const QDBusReply<uint> reply =
+        notify(title, body, {kOpenAction, label}, {{QStringLiteral("x-norix-action-_open"), action}},
+               static_cast<int>(timeout));
+    qInfo() << "----HandleEvent::sendMessage----" << reply.value() << action;
+    qInfo() << "--@@@@--" << reply.error();
+}
+
+void HandleEvent::sendChangePasswdMessage()
+{
+    notifyPlainly(kReminderTitle, QStringLiteral("管理员调整密码规则，避免影响登录，请及时修改密码"), 0);
+}

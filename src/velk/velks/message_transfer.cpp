@@ -1,0 +1,296 @@
+#include "message_transfer.h"
+
+#include <QDBusConnection>
+#include <QDebug>
+#include <QProcess>
+#include <QSettings>
+#include <QTimer>
+
+#include <unistd.h>
+
+#include <cstdlib>
+
+#include "constants.h"
+#include "handleevent.h"
+#include "libvelkkpx.h"
+#include "prys_interface.h"
+#include "remote_object.h"
+#include "velkg_interface.h"
+
+namespace {
+
+constexpr int kActionDelay = 60000; // ms between a warning and its forced action
+constexpr int kStatePeriod = 300000; // ms between two reports of the session's state
+constexpr uid_t kLastLocalUid = 10000;
+
+/// The status codes of SendUserStatus; they are not the values of Screen_State.
+enum UserStatus {
+    UserActive = 1,
+    UserLocked = 2,
+    UserBehindScreenSaver = 3,
+};
+
+RemoteObject loginUser()
+{
+    return {QDBusConnection::systemBus(), QStringLiteral("org.freedesktop.login1"),
+            QStringLiteral("/org/freedesktop/login1/user/self"),
+            QStringLiteral("org.freedesktop.login1.User")};
+}
+
+/// A domain login name may carry "@" anywhere; the daemon knows users without it.
+QString daemonUserName(const QVariant& loginName)
+{
+    return loginName.toString().remove(QLatin1Char('@'));
+}
+
+UserStatus statusOf(MessageTransfer::Screen_State state)
+{
+    switch (state) {
+    case MessageTransfer::ScreenSaverRunning:
+        return UserBehindScreenSaver;
+    case MessageTransfer::ScreenLocked:
+        return UserLocked;
+    case MessageTransfer::ScreenActive:
+        break;
+    }
+    return UserActive;
+}
+
+/// Runs a script and waits for its end, however long it takes. Its standard input is at its end from the
+/// start: a script that reads it goes on instead of waiting for ever, so the reboot after it is not lost.
+void runScript(const QString& path)
+{
+    QProcess bash;
+    bash.setProcessChannelMode(QProcess::ForwardedChannels);
+    bash.setStandardInputFile(QProcess::nullDevice());
+    bash.start(QStringLiteral("bash"), {path});
+    bash.waitForFinished(-1);
+}
+
+} // namespace
+
+MessageTransfer::MessageTransfer(QObject* parent)
+    : QObject(parent)
+    , m_actionTimer(new QTimer(this))
+    , m_stateTimer(new QTimer(this))
+{
+    m_velkgInterface =
+        new velkgInterface(QStringLiteral("com.norix.velk.velkg"), QStringLiteral("/com/norix/velk/velkg"),
+                           QDBusConnection::systemBus(), this);
+    m_prysInterface =
+        new prysInterface(QStringLiteral("com.norix.velk.prys"), QStringLiteral("/com/norix/velk/prys"),
+                          QDBusConnection::sessionBus(), this);
+    connectDaemon();
+
+    readLoginUser();
+    // Replies are never read, here and below: a daemon that is absent emits pushOnlineMsg when it comes.
+    m_velkgInterface->UpdateUserInfo(m_userName, m_uid);
+    startTimers();
+    m_velkgInterface->SendUserStatus(UserActive, m_userName);
+}
+
+void MessageTransfer::connectDaemon()
+{
+    connect(m_velkgInterface, &velkgInterface::pushPolicyMsg, this, &MessageTransfer::onPolicyMsg);
+    connect(m_velkgInterface, &velkgInterface::pushOnlineMsg, [this] { announceAgain(); });
+}
+
+void MessageTransfer::startTimers()
+{
+    connect(m_actionTimer, &QTimer::timeout, this, &MessageTransfer::onTimeout);
+    m_stateTimer->start(kStatePeriod);
+    connect(m_stateTimer, &QTimer::timeout, this, &MessageTransfer::getUserState);
+}
+
+void MessageTransfer::readLoginUser()
+{
+    const QVariantList values = loginUser().properties({QStringLiteral("Name"), QStringLiteral("UID")});
+    m_userName = daemonUserName(values.at(0));
+    m_uid = values.at(1).toInt();
+}
+
+void MessageTransfer::announceAgain()
+{
+    m_velkgInterface->UpdateUserInfo(m_userName, m_uid);
+    qDebug() << "velkg restart sendonline  " << m_userName << m_uid;
+    getUserState();
+}
+
+void MessageTransfer::onPolicyMsg(const QString& /*appID*/, const QString& payload)
+{
+    qInfo() << "onPolicyMsg"
+            << "---------payload:" << payload;
+    std::optional<QJsonObject> message = parsePolicyMessage(payload);
+    if (!message) {
+        return;
+    }
+    const int code = message->value(QLatin1String("type")).toInt(0);
+    const SessionPolicy policy = sessionPolicy(code);
+    if (!isMeantForThisSession(policy.audience, *message)) {
+        return;
+    }
+
+    switch (policy.action) {
+    case SessionPolicy::Action::Forward:
+        m_prysInterface->onPolicyMsg(payload);
+        break;
+    case SessionPolicy::Action::LeaveDomain:
+        leaveDomain(policy.text, code);
+        break;
+    case SessionPolicy::Action::WarnThenLogOut:
+        startTime(policy.text, code);
+        break;
+    case SessionPolicy::Action::Notify:
+        notifySend(policy.text, 0);
+        break;
+    case SessionPolicy::Action::RequestPasswordChange:
+        HandleEvent::GetInstance()->sendChangePasswdMessage();
+        break;
+    }
+}
+
+bool MessageTransfer::isMeantForThisSession(SessionPolicy::Audience audience, QJsonObject& message)
+{
+    switch (audience) {
+    case SessionPolicy::Audience::EverySession:
+        return true;
+    case SessionPolicy::Audience::DomainUsers:
+        return isLdapUser();
+    case SessionPolicy::Audience::AddressedDomainUser:
+        return isLdapUser() && isExecPolicyByUID(message);
+    }
+    return false;
+}
+
+void MessageTransfer::leaveDomain(const QString& warning, int code)
+{
+    rebootTime(warning, code);
+
+    const QString strPath = velk::kScriptsPath + QStringLiteral("restore_config.bash");
+    qInfo() << "onPolicyMsg"
+            << "----strPath:" << strPath;
+    runScript(strPath);
+    restoreConfiguration();
+    m_velkgInterface->onDomainConfig(QStringLiteral("remove"));
+
+    const QString identityService = QStringLiteral("com.norix.velk.iam");
+    RemoteObject(QDBusConnection::systemBus(), identityService, QStringLiteral("/com/norix/velk/iam"),
+                 identityService)
+        .setProperty(QStringLiteral("Enable"), false);
+}
+
+void MessageTransfer::restoreConfiguration()
+{
+    QSettings backup(velk::kBackupConfigPath, QSettings::IniFormat);
+    Libvelkkpx desktop;
+
+    backup.beginGroup(QStringLiteral("config"));
+    // The second list holds one empty string, as the library expects it.
+    desktop.SetControlConfig(backup.value(QStringLiteral("ControlCenterList")).toStringList(), {QString()});
+    backup.endGroup();
+
+    desktop.SetHotspotEnable(1);
+    desktop.SetShortcutKeyEnable(true);
+    desktop.SetLauncherDisplayable(true);
+    desktop.SetTaskbarRightclickMenuEnable(true);
+    desktop.SetResidentTaskbarAppDisplayable(true);
+    desktop.SetRecycleBinDisplayable(true);
+    desktop.SetWebTrayIconClickable(true);
+    desktop.SetUsbTrayIconClickable(true);
+
+    // The exit status is not looked at: the reboot that follows stops what systemctl could not. The fixed
+    // command holds nothing that a shell could misread.
+    [[maybe_unused]] const int status = std::system("systemctl --global stop prys"); // NOLINT(cert-env33-c)
+}
+
+void MessageTransfer::onTimeout()
+{
+    m_actionTimer->stop();
+    Libvelkkpx desktop;
+    switch (sessionPolicy(m_pendingAction).action) {
+    case SessionPolicy::Action::LeaveDomain:
+        desktop.Reboot();
+        break;
+    case SessionPolicy::Action::WarnThenLogOut:
+        desktop.Logout();
+        break;
+    default:
+        break;
+    }
+}
+
+void MessageTransfer::getUserState()
+{
+    // The name is read afresh: the daemon is told who is there now, not who was at start-up.
+    const QString name = daemonUserName(loginUser().property(QStringLiteral("Name")));
+    m_velkgInterface->SendUserStatus(statusOf(getScreenState()), name);
+}
+
+MessageTransfer::Screen_State MessageTransfer::getScreenState()
+{
+    const RemoteObject screenSaver(QDBusConnection::sessionBus(), QStringLiteral("com.norix.ScreenSaver"),
+                                   QStringLiteral("/com/norix/ScreenSaver"),
+                                   QStringLiteral("com.norix.ScreenSaver"));
+    bool running = false;
+    if (screenSaver.isPresent()) {
+        running = screenSaver.property(QStringLiteral("isRunning")).toBool();
+        qDebug() << "get screenSaver state " << running;
+    }
+
+    const RemoteObject sessionManager(
+        QDBusConnection::sessionBus(), QStringLiteral("com.norix.SessionManager"),
+        QStringLiteral("/com/norix/SessionManager"), QStringLiteral("com.norix.SessionManager"));
+    bool locked = false;
+    if (sessionManager.isPresent()) {
+        locked = sessionManager.property(QStringLiteral("Locked")).toBool();
+        qDebug() << "get screenLocked state " << locked;
+    }
+
+    if (running) {
+        return ScreenSaverRunning;
+    }
+    return locked ? ScreenLocked : ScreenActive;
+}
+
+bool MessageTransfer::isLdapUser()
+{
+    return getuid() > kLastLocalUid;
+}
+
+bool MessageTransfer::isExecPolicyByUID(QJsonObject& obj)
+{
+    if (!obj.contains(QLatin1String("payload"))) {
+        return false;
+    }
+    const qint32 sendUid =
+        obj.value(QLatin1String("payload")).toObject().value(QLatin1String("uid")).toInt(0);
+    const auto localUid = static_cast<qint32>(getuid());
+    const bool flag = sendUid == localUid;
+    qDebug() << "sendUID :" << sendUid << ", localUID:" << localUid << ",flag :" << flag;
+    return flag;
+}
+
+void MessageTransfer::notifySend(const QString& msg, int timeout)
+{
+    HandleEvent::GetInstance()->sendMessage(kReminderTitle, msg, timeout);
+}
+
+void MessageTransfer::startTime(const QString& msg, int code)
+{
+    notifySend(msg, -1);
+    startCountdown(code);
+}
+
+void MessageTransfer::rebootTime(const QString& msg, int code)
+{
+    constexpr uint defaultTimeout = static_cast<uint>(-1);
+    HandleEvent::GetInstance()->sendMessage(QStringLiteral("reboot"), kReminderTitle, msg, QString(),
+                                            QString(), defaultTimeout);
+    startCountdown(code);
+}
+
+void MessageTransfer::startCountdown(int code)
+{
+    m_actionTimer->start(kActionDelay);
+    m_pendingAction = code;
+}

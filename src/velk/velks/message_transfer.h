@@ -1,0 +1,76 @@
+#pragma once
+
+#include <QJsonObject>
+#include <QObject>
+#include <QString>
+
+#include "session_policy.h"
+
+class QTimer;
+class prysInterface;
+class velkgInterface;
+
+/// The agent's centre: receives the daemon's signals, carries out the policies that concern this session,
+/// forwards the others to the session policy service, and tells the daemon about the user and the session.
+class MessageTransfer : public QObject
+{
+    Q_OBJECT
+
+public:
+    enum Screen_State {
+        ScreenSaverRunning,
+        ScreenLocked,
+        ScreenActive,
+    };
+
+    /// Announces the user and an active session to the daemon. Waits only for the login manager, at most
+    /// the D-Bus time limit; no service needs to be there.
+    explicit MessageTransfer(QObject* parent = nullptr);
+
+    /// Asks the desktop's screen saver and session manager now; a service that is absent or does not
+    /// answer counts as "no". A screen saver over a locked screen gives ScreenSaverRunning.
+    Screen_State getScreenState();
+
+    /// Shows a notification; timeout in milliseconds, -1 the desktop's default, 0 never.
+    void notifySend(const QString& msg, int timeout);
+
+    /// Warns and starts the minute before the forced action of a policy code. A countdown that already
+    /// runs starts again with the new code.
+    void startTime(const QString& msg, int code);
+
+    /// As startTime, but the warning offers the reboot at once.
+    void rebootTime(const QString& msg, int code);
+
+    /// Whether the session's user is a domain user; local accounts have uids up to 10000.
+    bool isLdapUser();
+
+    /// Whether an account policy message names this session's user.
+    bool isExecPolicyByUID(QJsonObject& obj);
+
+    /// Gives the desktop back its unrestricted state and stops the session policy service. Blocks until
+    /// systemctl ends; failures are not looked at, so that each step is tried.
+    void restoreConfiguration();
+
+public Q_SLOTS:
+    void onPolicyMsg(const QString& appID, const QString& payload);
+    void onTimeout();
+    void getUserState();
+
+private:
+    void connectDaemon();
+    void startTimers();
+    void readLoginUser();
+    void announceAgain();
+    bool isMeantForThisSession(SessionPolicy::Audience audience, QJsonObject& message);
+    void leaveDomain(const QString& warning, int code);
+    void startCountdown(int code);
+
+    velkgInterface* m_velkgInterface = nullptr;
+    prysInterface* m_prysInterface = nullptr;
+    // Slots use these from the first signal on, and the daemon may emit one while the constructor waits.
+    QTimer* m_actionTimer;
+    QTimer* m_stateTimer;
+    QString m_userName;
+    qint32 m_uid = 0;
+    qint32 m_pendingAction = 0; ///< the policy code of the countdown's forced action
+};

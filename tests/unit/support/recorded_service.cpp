@@ -1,0 +1,70 @@
+#include "recorded_service.h"
+
+#include <QDebug>
+#include <QUuid>
+
+class RecordedService::Object : public QDBusVirtualObject
+{
+public:
+    explicit Object(Answer answer)
+        : m_answer(std::move(answer))
+    {
+    }
+
+    QString introspect(const QString& /*path*/) const override { return QString(); }
+
+    bool handleMessage(const QDBusMessage& message, const QDBusConnection& connection) override
+    {
+        {
+            const QMutexLocker locker(&m_mutex);
+            m_calls.append(message);
+        }
+        const QDBusMessage reply = m_answer(message);
+        if (reply.type() != QDBusMessage::InvalidMessage) {
+            connection.send(reply);
+        }
+        return true;
+    }
+
+    QList<QDBusMessage> calls() const
+    {
+        const QMutexLocker locker(&m_mutex);
+        return m_calls;
+    }
+
+private:
+    Answer m_answer;
+    mutable QMutex m_mutex;
+    QList<QDBusMessage> m_calls;
+};
+
+RecordedService::RecordedService(QDBusConnection::BusType bus, const QString& name, Answer answer)
+    : m_connectionName(QUuid::createUuid().toString())
+    , m_object(std::make_unique<Object>(std::move(answer)))
+{
+    m_object->moveToThread(&m_thread);
+    m_thread.start();
+    auto connection = QDBusConnection::connectToBus(bus, m_connectionName);
+    connection.registerVirtualObject(QStringLiteral("/"), m_object.get(), QDBusConnection::SubPath);
+    if (!connection.registerService(name)) {
+        qFatal("the bus gives no name %s: %s", qUtf8Printable(name),
+               qUtf8Printable(connection.lastError().message()));
+    }
+}
+
+RecordedService::~RecordedService()
+{
+    QDBusConnection::disconnectFromBus(m_connectionName);
+    m_thread.quit();
+    m_thread.wait();
+}
+
+QList<QDBusMessage> RecordedService::calls() const
+{
+    return m_object->calls();
+}
+
+QDBusMessage answerNothing(const QDBusMessage& call)
+{
+    return call.createReply();
+}

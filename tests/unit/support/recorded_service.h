@@ -1,0 +1,37 @@
+#pragma once
+
+#include <QDBusConnection>
+#include <QDBusMessage>
+#include <QDBusVirtualObject>
+#include <QMutex>
+#include <QThread>
+
+#include <functional>
+#include <memory>
+
+/// A service on a bus that records each call it is sent and answers it with a given function. It has a
+/// connection and a thread of its own, so that the code under test may block on it.
+class RecordedService
+{
+public:
+    using Answer = std::function<QDBusMessage(const QDBusMessage& call)>;
+
+    /// Owns the name when the constructor returns. An answer of type InvalidMessage sends no reply: the
+    /// service hangs.
+    RecordedService(QDBusConnection::BusType bus, const QString& name, Answer answer);
+    ~RecordedService();
+    RecordedService(const RecordedService&) = delete;
+    RecordedService& operator=(const RecordedService&) = delete;
+
+    QList<QDBusMessage> calls() const;
+
+private:
+    class Object;
+
+    QString m_connectionName;
+    QThread m_thread;
+    std::unique_ptr<Object> m_object;
+};
+
+/// Answers every call without values.
+QDBusMessage answerNothing(const QDBusMessage& call);
