@@ -8,8 +8,7 @@ class RecordedService::Object : public QDBusVirtualObject
 public:
     explicit Object(Answer answer)
         : m_answer(std::move(answer))
-    {
-    }
+    { }
 
     QString introspect(const QString& /*path*/) const override { return QString(); }
 
@@ -42,10 +41,10 @@ RecordedService::RecordedService(QDBusConnection::BusType bus, const QString& na
     : m_connectionName(QUuid::createUuid().toString())
     , m_object(std::make_unique<Object>(std::move(answer)))
 {
-    m_object->moveToThread(&m_thread);
-    m_thread.start();
     auto connection = QDBusConnection::connectToBus(bus, m_connectionName);
     connection.registerVirtualObject(QStringLiteral("/"), m_object.get(), QDBusConnection::SubPath);
+    m_object->moveToThread(&m_thread);
+    m_thread.start();
     if (!connection.registerService(name)) {
         qFatal("the bus gives no name %s: %s", qUtf8Printable(name),
                qUtf8Printable(connection.lastError().message()));
@@ -54,6 +53,8 @@ RecordedService::RecordedService(QDBusConnection::BusType bus, const QString& na
 
 RecordedService::~RecordedService()
 {
+    // The connection is closed later, in a thread of its own, and must not find the object then.
+    QDBusConnection(m_connectionName).unregisterObject(QStringLiteral("/"), QDBusConnection::UnregisterTree);
     QDBusConnection::disconnectFromBus(m_connectionName);
     m_thread.quit();
     m_thread.wait();

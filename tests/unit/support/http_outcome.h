@@ -1,0 +1,34 @@
+#pragma once
+
+#include "httpclientapi.h"
+#include "warning_recorder.h"
+
+/// What a caller of HttpClientApi sees of one request.
+struct HttpOutcome
+{
+    int status = 0;
+    QString reply = QStringLiteral("left over from before");
+    QList<QPair<QByteArray, QByteArray>> headers;
+    QStringList warnings;
+};
+
+inline HttpOutcome get(HttpClientApi& client, const QString& url, const QString& body = {},
+                       bool isJson = true)
+{
+    const WarningRecorder recorder;
+    HttpOutcome outcome;
+    outcome.status = client.getRequest(outcome.reply, url, body, isJson);
+    outcome.headers = client.getRawHeader();
+    outcome.warnings = recorder.texts();
+    return outcome;
+}
+
+inline HttpOutcome put(HttpClientApi& client, const QString& url, const QString& body, bool isJson = true)
+{
+    const WarningRecorder recorder;
+    HttpOutcome outcome;
+    outcome.status = client.putRequest(outcome.reply, url, body, isJson);
+    outcome.headers = client.getRawHeader();
+    outcome.warnings = recorder.texts();
+    return outcome;
+}
