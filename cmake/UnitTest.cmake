@@ -11,7 +11,7 @@ function(velk_add_unit_test name)
     endif()
 
     add_executable(${name} ${name}.cpp)
-    target_link_libraries(${name} PRIVATE Qt5::Test ${arg_LIBRARIES} velk_compile_options)
+    target_link_libraries(${name} PRIVATE ${arg_LIBRARIES} velk_test_support Qt5::Test velk_compile_options)
     target_compile_definitions(${name} PRIVATE VELK_SOURCE_DIR="${PROJECT_SOURCE_DIR}")
     add_test(NAME ${name}
         COMMAND "${PROJECT_SOURCE_DIR}/sandbox/in-box" --user ${arg_USER} -- $<TARGET_FILE:${name}>)

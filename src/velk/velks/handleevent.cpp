@@ -1,8 +1,8 @@
 #include "handleevent.h"
 
 #include <QDBusConnection>
+#include <QDBusError>
 #include <QDBusMessage>
-#include <QDBusReply>
 #include <QDebug>
 #include <QJsonDocument>
 #include <QJsonObject>
@@ -18,10 +18,10 @@ constexpr int kPasswordNoticeDelay = 60000; // ms
 
 const QString kOpenAction = QStringLiteral("_open");
 
-/// Calls the desktop's notification service and waits for the notification's id. The title is also the
-/// application name.
-QDBusReply<uint> notify(const QString& title, const QString& body, const QStringList& actions,
-                        const QVariantMap& hints, int timeout)
+/// Calls the desktop's notification service and waits for its answer, which holds the notification's id.
+/// The title is also the application name.
+QDBusMessage notify(const QString& title, const QString& body, const QStringList& actions,
+                    const QVariantMap& hints, int timeout)
 {
     const QString service = QStringLiteral("com.norix.kpx.Notification");
     auto call = QDBusMessage::createMethodCall(service, QStringLiteral("/com/norix/kpx/Notification"),
@@ -34,9 +34,9 @@ QDBusReply<uint> notify(const QString& title, const QString& body, const QString
 
 void notifyPlainly(const QString& title, const QString& body, int timeout)
 {
-    const QDBusReply<uint> reply = notify(title, body, {}, {}, timeout);
-    if (!reply.isValid()) {
-        qWarning() << "--@@@@--" << reply.error();
+    const QDBusError error(notify(title, body, {}, {}, timeout));
+    if (error.isValid()) {
+        qWarning() << "--@@@@--" << error;
     }
 }
 
@@ -133,11 +133,11 @@ void HandleEvent::sendMessage(const QString& type, const QString& title, const Q
     const QString label = isReboot ? QStringLiteral("重启") : QStringLiteral("查看");
 
     // On the wire the timeout is signed: the unsigned -1 goes out as -1.
-    const QDBusReply<uint> reply =
+    const QDBusMessage reply =
         notify(title, body, {kOpenAction, label}, {{QStringLiteral("x-norix-action-_open"), action}},
                static_cast<int>(timeout));
-    qInfo() << "----HandleEvent::sendMessage----" << reply.value() << action;
-    qInfo() << "--@@@@--" << reply.error();
+    qInfo() << "----HandleEvent::sendMessage----" << reply.arguments().value(0).toUInt() << action;
+    qInfo() << "--@@@@--" << QDBusError(reply);
 }
 
 void HandleEvent::sendChangePasswdMessage()

@@ -97,6 +97,8 @@ void MessageTransfer::connectDaemon()
 
 void MessageTransfer::startTimers()
 {
+    // A coarse timer may fire half a second early; the user was promised a minute.
+    m_actionTimer->setTimerType(Qt::PreciseTimer);
     connect(m_actionTimer, &QTimer::timeout, this, &MessageTransfer::onTimeout);
     m_stateTimer->start(kStatePeriod);
     connect(m_stateTimer, &QTimer::timeout, this, &MessageTransfer::getUserState);

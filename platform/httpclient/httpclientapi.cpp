@@ -1,0 +1,275 @@
+#include "httpclientapi.h"
+
+#include <QFile>
+#include <QtDebug>
+
+#include <curl/curl.h>
+#include <sys/socket.h>
+
+#include <array>
+
+namespace {
+
+constexpr long kConnectLimitMs = 10'000;
+constexpr long kTotalLimitMs = 30'000;
+constexpr int kBodyCap = 8 * 1024 * 1024;
+constexpr int kHeaderCap = 256 * 1024;
+
+using RawHeaders = QList<QPair<QByteArray, QByteArray>>;
+
+/// What has arrived of a reply. Refuses what exceeds a cap, and then says why.
+class Reception
+{
+public:
+    [[nodiscard]] const QByteArray& body() const { return m_body; }
+    [[nodiscard]] const RawHeaders& headers() const { return m_headers; }
+    [[nodiscard]] const char* refusal() const { return m_refusal; }
+
+    bool addBody(const QByteArray& part)
+    {
+        if (m_body.size() + part.size() > kBodyCap) {
+            m_refusal = "the body exceeds 8 MiB";
+            return false;
+        }
+        m_body += part;
+        return true;
+    }
+
+    bool addHeaderLine(const QByteArray& line)
+    {
+        m_headerBytes += line.size();
+        if (m_headerBytes > kHeaderCap) {
+            m_refusal = "the headers exceed 256 KiB";
+            return false;
+        }
+        if (m_inHeaders) {
+            addHeader(line);
+        } else if (line.startsWith("HTTP/")) {
+            beginHeaders();
+        }
+        // Any other line outside of a header block is a trailer.
+        return true;
+    }
+
+private:
+    // An interim response has a header block of its own: the last block is the response's.
+    void beginHeaders()
+    {
+        m_headers.clear();
+        m_inHeaders = true;
+    }
+
+    // Own parsing: libcurl's header iteration takes quadratic time, 20 s for the headers that the cap allows.
+    void addHeader(const QByteArray& line)
+    {
+        const QByteArray content = line.trimmed();
+        const bool folded = line.startsWith(' ') || line.startsWith('\t');
+        if (folded && !m_headers.isEmpty()) {
+            m_headers.last().second += ' ' + content;
+        } else if (content.isEmpty()) {
+            m_inHeaders = false;
+        } else {
+            const int colon = content.indexOf(':');
+            m_headers.append({content.left(colon), content.mid(colon + 1).trimmed()});
+        }
+    }
+
+    QByteArray m_body;
+    RawHeaders m_headers;
+    int m_headerBytes = 0;
+    bool m_inHeaders = false;
+    const char* m_refusal = nullptr;
+};
+
+template <bool (Reception::*add)(const QByteArray&)>
+size_t receive(char* data, size_t, size_t size, void* reception)
+{
+    const QByteArray part = QByteArray::fromRawData(data, static_cast<int>(size));
+    return (static_cast<Reception*>(reception)->*add)(part) ? size : CURL_WRITEFUNC_ERROR;
+}
+
+// libcurl's own sockets would be inherited by every child process of the program.
+curl_socket_t openSocket(void*, curlsocktype, curl_sockaddr* address)
+{
+    return socket(address->family, address->socktype | SOCK_CLOEXEC, address->protocol);
+}
+
+/// Percent-encodes, as UTF-8, the characters that a request line cannot carry. QUrl would also alter others.
+QByteArray encodedUrl(const QString& url)
+{
+    QByteArray encoded;
+    for (const char byte : url.toUtf8()) {
+        const auto code = static_cast<unsigned char>(byte);
+        if (code > 0x20 && code < 0x7f) {
+            encoded += byte;
+        } else {
+            encoded += '%' + QByteArray(1, byte).toHex().toUpper();
+        }
+    }
+    return encoded;
+}
+
+/// One request on a handle. libcurl keeps pointers into it, which the handle forgets when it ends.
+class Exchange
+{
+public:
+    explicit Exchange(CURL* curl)
+        : m_curl(curl)
+    { }
+    ~Exchange() { curl_easy_reset(m_curl); }
+    Q_DISABLE_COPY_MOVE(Exchange)
+
+    void setTransport()
+    {
+        set(CURLOPT_PROTOCOLS_STR, "https");
+        // HTTP/2 would lower-case the header names, which callers compare with their case.
+        set(CURLOPT_HTTP_VERSION, static_cast<long>(CURL_HTTP_VERSION_1_1));
+        set(CURLOPT_FOLLOWLOCATION, 0L);
+        set(CURLOPT_PROXY, ""); // not even one from the environment
+        set(CURLOPT_CONNECTTIMEOUT_MS, kConnectLimitMs);
+        set(CURLOPT_TIMEOUT_MS, kTotalLimitMs);
+        set(CURLOPT_NOSIGNAL, 1L);
+        set(CURLOPT_QUICK_EXIT, 1L); // a hanging name lookup is left behind at the time limit
+        set(CURLOPT_OPENSOCKETFUNCTION, openSocket);
+    }
+
+    void setTls(const QByteArray& caCert, const QByteArray& clientCert, const QByteArray& clientKey)
+    {
+        set(CURLOPT_SSLVERSION, static_cast<long>(CURL_SSLVERSION_TLSv1_2));
+        set(CURLOPT_SSL_VERIFYPEER, 1L);
+        set(CURLOPT_SSL_VERIFYHOST, 2L);
+        set(CURLOPT_CAINFO, caCert.constData());
+        set(CURLOPT_CAPATH, nullptr); // by default the folder of authorities that the system trusts
+        set(CURLOPT_CA_CACHE_TIMEOUT, 0L); // the file may be replaced at any time
+        if (!clientCert.isEmpty()) {
+            set(CURLOPT_SSLCERT, clientCert.constData());
+        }
+        if (!clientKey.isEmpty()) {
+            set(CURLOPT_SSLKEY, clientKey.constData());
+        }
+        set(CURLOPT_KEYPASSWD, ""); // an encrypted key must fail, not ask on the terminal
+    }
+
+    void setRequest(const char* method, const QString& url)
+    {
+        set(CURLOPT_CUSTOMREQUEST, method);
+        set(CURLOPT_URL, encodedUrl(url).constData());
+        set(CURLOPT_PATH_AS_IS, 1L);
+    }
+
+    void setContent(const QByteArray& content, bool isJson)
+    {
+        addHeaderLine("Expect:"); // no round trip before a large body
+        addHeaderLine(isJson && !content.isEmpty() ? "Content-Type: application/json" : "Content-Type:");
+        set(CURLOPT_HTTPHEADER, m_headerLines.get());
+        set(CURLOPT_POSTFIELDSIZE_LARGE, static_cast<curl_off_t>(content.size()));
+        set(CURLOPT_COPYPOSTFIELDS, content.constData());
+    }
+
+    /// The status of the response; 0 when there is none.
+    int run()
+    {
+        set(CURLOPT_ERRORBUFFER, m_error.data());
+        set(CURLOPT_WRITEFUNCTION, receive<&Reception::addBody>);
+        set(CURLOPT_WRITEDATA, &m_reception);
+        set(CURLOPT_HEADERFUNCTION, receive<&Reception::addHeaderLine>);
+        set(CURLOPT_HEADERDATA, &m_reception);
+        if (m_result == CURLE_OK) {
+            m_result = curl_easy_perform(m_curl);
+        }
+        long status = 0;
+        if (m_result == CURLE_OK) {
+            curl_easy_getinfo(m_curl, CURLINFO_RESPONSE_CODE, &status);
+        }
+        return static_cast<int>(status);
+    }
+
+    [[nodiscard]] const Reception& reception() const { return m_reception; }
+
+    [[nodiscard]] const char* failure() const
+    {
+        if (m_reception.refusal() != nullptr) {
+            return m_reception.refusal();
+        }
+        return m_error.front() != '\0' ? m_error.data() : curl_easy_strerror(m_result);
+    }
+
+private:
+    // Nothing is sent once libcurl has rejected a setting.
+    template <typename Value> void set(CURLoption option, Value value)
+    {
+        if (m_result == CURLE_OK) {
+            m_result = curl_easy_setopt(m_curl, option, value);
+        }
+    }
+
+    void addHeaderLine(const char* line)
+    {
+        m_headerLines.reset(curl_slist_append(m_headerLines.release(), line));
+    }
+
+    CURL* m_curl;
+    CURLcode m_result = CURLE_OK;
+    std::array<char, CURL_ERROR_SIZE> m_error{};
+    std::unique_ptr<curl_slist, decltype(&curl_slist_free_all)> m_headerLines{nullptr, curl_slist_free_all};
+    Reception m_reception;
+};
+
+} // namespace
+
+HttpClientApi::HttpClientApi(QObject* parent, bool)
+    : QObject(parent)
+    , m_curl(curl_easy_init())
+{
+    Q_CHECK_PTR(m_curl);
+}
+
+HttpClientApi::~HttpClientApi() = default;
+
+void HttpClientApi::setSSLConfig(const QString& caCert, const QString& clientCert, const QString& clientKey)
+{
+    m_caCert = QFile::encodeName(caCert);
+    m_clientCert = QFile::encodeName(clientCert);
+    m_clientKey = QFile::encodeName(clientKey);
+}
+
+int HttpClientApi::getRequest(QString& reply, const QString& url, const QString& body, bool isJson)
+{
+    return request("GET", reply, url, body, isJson);
+}
+
+int HttpClientApi::putRequest(QString& reply, const QString& url, const QString& body, bool isJson)
+{
+    return request("PUT", reply, url, body, isJson);
+}
+
+QList<QPair<QByteArray, QByteArray>> HttpClientApi::getRawHeader() const
+{
+    return m_rawHeaders;
+}
+
+void HttpClientApi::CloseHandle::operator()(void* curl) const
+{
+    curl_easy_cleanup(curl);
+}
+
+int HttpClientApi::request(const char* method, QString& reply, const QString& url, const QString& body,
+                           bool isJson)
+{
+    Exchange exchange(m_curl.get());
+    exchange.setTransport();
+    exchange.setTls(m_caCert, m_clientCert, m_clientKey);
+    exchange.setRequest(method, url);
+    // A GET without a body has no content at all; a PUT then has content of length 0.
+    if (!body.isEmpty() || qstrcmp(method, "GET") != 0) {
+        exchange.setContent(body.toUtf8(), isJson);
+    }
+
+    const int status = exchange.run();
+    if (status == 0) {
+        qWarning("HTTP %s without a response: %s", method, exchange.failure());
+    }
+    m_rawHeaders = status == 0 ? RawHeaders() : exchange.reception().headers();
+    reply = status == 0 ? QString() : QString::fromUtf8(exchange.reception().body());
+    return status;
+}

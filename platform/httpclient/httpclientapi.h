@@ -1,0 +1,60 @@
+#pragma once
+
+#include <QByteArray>
+#include <QList>
+#include <QObject>
+#include <QPair>
+#include <QString>
+
+#include <memory>
+
+/// Blocking HTTPS client (HTTP/1.1, TLS 1.2 or newer) with a client certificate.
+///
+/// A request returns when the whole reply is in; no event loop runs meanwhile. Connections and TLS sessions
+/// are kept for the life of the object and reused. Redirects are not followed and no proxy is used.
+///
+/// A request without a response (refused, TLS failure, time limit, truncated or oversized reply) returns 0,
+/// empties the reply and the raw headers, and logs one warning. Limits: 10 s to connect, 30 s in all; 8 MiB
+/// of body, 256 KiB of headers, of which libcurl takes at most 100 KiB in one line.
+/// A body that comes without a length ends where the connection ends.
+class HttpClientApi : public QObject
+{
+    Q_OBJECT
+
+public:
+    /// This implementation has one mode only: the bool is part of the interface and has no effect.
+    HttpClientApi(QObject* parent, bool);
+    ~HttpClientApi() override;
+    Q_DISABLE_COPY_MOVE(HttpClientApi)
+
+    /// Paths of PEM files, read anew for each connection. The server's certificate and host name are verified
+    /// against `caCert` and nothing else: without it, every request fails. An empty `clientCert` means that
+    /// no client certificate is offered; an empty `clientKey`, that the key is in the certificate's file. An
+    /// encrypted key counts as unreadable.
+    void setSSLConfig(const QString& caCert, const QString& clientCert, const QString& clientKey);
+
+    /// Requests `url`, with `body` as content unless it is empty, and returns the status (0: no response).
+    /// `reply` receives the body of the response, read as UTF-8. `isJson`: the content is declared as JSON,
+    /// otherwise no content type is sent. Characters of `url` that a request line cannot carry (control
+    /// characters, blanks, those outside ASCII) go out percent-encoded as UTF-8; all else is sent as it is.
+    int getRequest(QString& reply, const QString& url, const QString& body, bool isJson);
+    int putRequest(QString& reply, const QString& url, const QString& body, bool isJson);
+
+    /// Headers of the last response, names and values as the server sent them, in their order. Interim
+    /// responses and trailers do not count.
+    [[nodiscard]] QList<QPair<QByteArray, QByteArray>> getRawHeader() const;
+
+private:
+    struct CloseHandle
+    {
+        void operator()(void* curl) const;
+    };
+
+    int request(const char* method, QString& reply, const QString& url, const QString& body, bool isJson);
+
+    std::unique_ptr<void, CloseHandle> m_curl;
+    QByteArray m_caCert;
+    QByteArray m_clientCert;
+    QByteArray m_clientKey;
+    QList<QPair<QByteArray, QByteArray>> m_rawHeaders;
+};

@@ -1,0 +1,109 @@
+#include "httpclientapi.h"
+#include "tls_peer.h"
+#include "warning_recorder.h"
+
+#include <QFile>
+#include <QRegularExpression>
+#include <QtTest>
+
+#include <chrono>
+#include <future>
+#include <map>
+#include <sys/stat.h>
+#include <thread>
+
+namespace {
+
+/// Far more than any limit of the client: only a request without limit is still waiting then.
+constexpr std::chrono::seconds kPatience(90);
+
+struct Outcome
+{
+    int status = -1;
+    QString reply = QStringLiteral("left over from before");
+    bool hasHeaders = true;
+};
+
+} // namespace
+
+/// Peers that keep the client waiting, in real time. All requests run at once, so that the test takes as long
+/// as the longest of them.
+class HttpClientApiLimitsTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void initTestCase();
+    void gives_up_data();
+    void gives_up();
+    void each_request_given_up_is_one_warning();
+    void cleanupTestCase() { m_warnings.reset(); }
+
+private:
+    void start(const char* row, const QString& url);
+
+    TlsPeer m_peer;
+    std::unique_ptr<WarningRecorder> m_warnings;
+    std::map<QString, std::shared_future<Outcome>> m_requests;
+};
+
+void HttpClientApiLimitsTest::initTestCase()
+{
+    // A name lookup reads this file first, and waits for ever for somebody to write into a pipe.
+    QVERIFY(qEnvironmentVariableIsSet("VELK_BOX_USER")); // it is the machine's own file elsewhere
+    QVERIFY(QFile::remove(QStringLiteral("/etc/hosts")));
+    QCOMPARE(mkfifo("/etc/hosts", 0600), 0);
+
+    m_warnings = std::make_unique<WarningRecorder>();
+    start("name lookup hangs", QStringLiteral("https://platform.invalid/"));
+    start("TLS handshake hangs", m_peer.url("silent", "/plain"));
+    start("no header comes", m_peer.url("proper", "/stalled-header"));
+    start("body stops", m_peer.url("proper", "/stalled-body"));
+    start("body drips without end", m_peer.url("proper", "/dripping-body"));
+}
+
+void HttpClientApiLimitsTest::start(const char* row, const QString& url)
+{
+    std::packaged_task<Outcome()> request([url, authority = m_peer.file("ca")] {
+        HttpClientApi client(nullptr, false);
+        client.setSSLConfig(authority, {}, {});
+        Outcome outcome;
+        outcome.status = client.getRequest(outcome.reply, url, {}, true);
+        outcome.hasHeaders = !client.getRawHeader().isEmpty();
+        return outcome;
+    });
+    m_requests[QString::fromUtf8(row)] = request.get_future().share();
+    std::thread(std::move(request)).detach(); // one without limit must not keep the test from ending
+}
+
+void HttpClientApiLimitsTest::gives_up_data()
+{
+    QTest::addColumn<QString>("request");
+    for (const auto& request : m_requests) {
+        QTest::newRow(qUtf8Printable(request.first)) << request.first;
+    }
+}
+
+void HttpClientApiLimitsTest::gives_up()
+{
+    QFETCH(QString, request);
+
+    const auto result = m_requests.at(request);
+    QCOMPARE(result.wait_for(kPatience), std::future_status::ready);
+    QCOMPARE(result.get().status, 0);
+    QCOMPARE(result.get().reply, QString());
+    QVERIFY(!result.get().hasHeaders);
+}
+
+void HttpClientApiLimitsTest::each_request_given_up_is_one_warning()
+{
+    for (const auto& request : m_requests) {
+        QCOMPARE(request.second.wait_for(kPatience), std::future_status::ready);
+    }
+    const QStringList warnings = m_warnings->texts();
+    QCOMPARE(warnings.size(), 5);
+    QCOMPARE(warnings.filter(QRegularExpression(QStringLiteral("timed out|timeout"))).size(), 5);
+}
+
+QTEST_GUILESS_MAIN(HttpClientApiLimitsTest)
+#include "httpclientapi_limits_test.moc"

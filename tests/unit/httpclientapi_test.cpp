@@ -1,0 +1,256 @@
+#include "http_outcome.h"
+#include "tls_peer.h"
+
+#include <QtTest>
+
+using Headers = QList<QPair<QByteArray, QByteArray>>;
+
+/// What a request sends, and what its caller gets of the response.
+class HttpClientApiTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void init();
+
+    void get_without_body_has_no_content();
+    void get_carries_its_body();
+    void put_carries_its_body();
+    void put_without_body_declares_empty_content();
+    void content_that_is_not_json_has_no_content_type();
+    void large_content_is_sent_without_asking_first();
+    void url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry_data();
+    void url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry();
+
+    void status_and_body_are_returned_data();
+    void status_and_body_are_returned();
+    void body_of_8_mib_is_accepted();
+    void headers_keep_their_order_case_and_duplicates();
+    void folded_header_is_one_header();
+    void interim_responses_have_no_part_in_the_headers();
+    void trailers_have_no_part_in_the_headers();
+    void headers_of_250_kib_are_accepted();
+    void headers_are_those_of_the_last_request();
+
+    void without_a_whole_response_there_is_none_and_one_warning_data();
+    void without_a_whole_response_there_is_none_and_one_warning();
+
+private:
+    TlsPeer m_peer;
+    std::unique_ptr<HttpClientApi> m_client;
+};
+
+void HttpClientApiTest::init()
+{
+    m_peer.forgetRequests();
+    m_client = std::make_unique<HttpClientApi>(nullptr, false);
+    m_client->setSSLConfig(m_peer.file("ca"), {}, {});
+}
+
+void HttpClientApiTest::get_without_body_has_no_content()
+{
+    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
+
+    const QJsonObject request = m_peer.nextRequest();
+    QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
+    QVERIFY(headerOf(request, "Content-Length").isNull());
+    QVERIFY(headerOf(request, "Content-Type").isNull());
+}
+
+void HttpClientApiTest::get_carries_its_body()
+{
+    const QString body = QStringLiteral("{\"username\": \"张伟\"}");
+    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain"), body).status, 200);
+
+    const QJsonObject request = m_peer.nextRequest();
+    QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
+    QCOMPARE(request[QStringLiteral("body")].toString(), body);
+    QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
+}
+
+void HttpClientApiTest::put_carries_its_body()
+{
+    const QString body = QStringLiteral("{\"uuid\":\"一\"}");
+    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), body).status, 200);
+
+    const QJsonObject request = m_peer.nextRequest();
+    QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("PUT /plain HTTP/1.1"));
+    QCOMPARE(request[QStringLiteral("body")].toString(), body);
+    QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
+}
+
+void HttpClientApiTest::put_without_body_declares_empty_content()
+{
+    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), {}).status, 200);
+
+    const QJsonObject request = m_peer.nextRequest();
+    QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("PUT /plain HTTP/1.1"));
+    QCOMPARE(headerOf(request, "Content-Length"), QStringLiteral("0"));
+    QVERIFY(headerOf(request, "Content-Type").isNull());
+}
+
+void HttpClientApiTest::content_that_is_not_json_has_no_content_type()
+{
+    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), QStringLiteral("text"), false).status, 200);
+
+    const QJsonObject request = m_peer.nextRequest();
+    QCOMPARE(request[QStringLiteral("body")].toString(), QStringLiteral("text"));
+    QVERIFY(headerOf(request, "Content-Type").isNull());
+}
+
+void HttpClientApiTest::large_content_is_sent_without_asking_first()
+{
+    const QString body(2 * 1024 * 1024, QLatin1Char('x'));
+    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), body).status, 200);
+
+    const QJsonObject request = m_peer.nextRequest();
+    QVERIFY(headerOf(request, "Expect").isNull());
+    QCOMPARE(headerOf(request, "Content-Length"), QString::number(body.size()));
+}
+
+void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry_data()
+{
+    QTest::addColumn<QString>("path");
+    QTest::addColumn<QString>("sent");
+
+    const auto row = [](const char* name, const char* path, const char* sent) {
+        QTest::newRow(name) << QString::fromUtf8(path) << QString::fromUtf8(sent);
+    };
+    row("query", "/list?uid=a&limit=1", "/list?uid=a&limit=1");
+    row("blank", "/list?uid=a b", "/list?uid=a%20b");
+    row("tabulator and line feed", "/a\tb\nc", "/a%09b%0Ac");
+    row("delete character", "/a\x7f", "/a%7F");
+    row("last plain character", "/a~", "/a~");
+    row("two-byte character", "/ü", "/%C3%BC");
+    row("Chinese", "/张?uid=伟", "/%E5%BC%A0?uid=%E4%BC%9F");
+    row("beyond the basic plane", "/😀", "/%F0%9F%98%80");
+    row("stray per cents", "/100%?a=%zz%", "/100%?a=%zz%");
+    row("escapes in lower case", "/%c3%bc?a=%2f", "/%c3%bc?a=%2f");
+    row("dot segments", "/a/../b/./c", "/a/../b/./c");
+    row("punctuation", "/a\"<>[]\\^`{|}!$'()*,;:@", "/a\"<>[]\\^`{|}!$'()*,;:@");
+    row("signs in the query", "/?a=b+c@d?e/f=", "/?a=b+c@d?e/f=");
+}
+
+void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry()
+{
+    QFETCH(QString, path);
+    QFETCH(QString, sent);
+
+    QCOMPARE(get(*m_client, m_peer.url("proper", qUtf8Printable(path))).status, 200);
+    QCOMPARE(m_peer.nextRequest()[QStringLiteral("line")].toString(),
+             QStringLiteral("GET %1 HTTP/1.1").arg(sent));
+}
+
+void HttpClientApiTest::status_and_body_are_returned_data()
+{
+    QTest::addColumn<int>("status");
+    QTest::addColumn<QString>("reply");
+
+    QTest::newRow("/text") << 200 << QStringLiteral("用户 ü {}");
+    QTest::newRow("/empty") << 200 << QString();
+    QTest::newRow("/no-content") << 204 << QString();
+    QTest::newRow("/redirect") << 302 << QStringLiteral("elsewhere");
+    QTest::newRow("/not-found") << 404 << QStringLiteral("no such thing");
+    QTest::newRow("/broken") << 500 << QStringLiteral("out of order");
+    QTest::newRow("/until-close") << 200 << QStringLiteral("all of it");
+    QTest::newRow("/until-break") << 200 << QStringLiteral("all of it");
+}
+
+void HttpClientApiTest::status_and_body_are_returned()
+{
+    QFETCH(int, status);
+    QFETCH(QString, reply);
+
+    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", QTest::currentDataTag()));
+    QCOMPARE(outcome.status, status);
+    QCOMPARE(outcome.reply, reply);
+    QCOMPARE(outcome.warnings, QStringList());
+}
+
+void HttpClientApiTest::body_of_8_mib_is_accepted()
+{
+    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/body-at-cap"));
+    QCOMPARE(outcome.status, 200);
+    QCOMPARE(outcome.reply.size(), 8 * 1024 * 1024);
+}
+
+void HttpClientApiTest::headers_keep_their_order_case_and_duplicates()
+{
+    const Headers sent = {{"X-Total-Count", "5"}, {"x-lower", "a"},       {"X-UPPER", "b \t c"},
+                          {"x-twice", "1"},       {"X-Twice", "2"},       {"x-twice", "1"},
+                          {"X-Empty", ""},        {"Content-Length", "2"}};
+    QCOMPARE(get(*m_client, m_peer.url("proper", "/headers")).headers, sent);
+}
+
+void HttpClientApiTest::folded_header_is_one_header()
+{
+    const Headers joined = {{"X-Folded", "one two"}, {"Content-Length", "2"}};
+    QCOMPARE(get(*m_client, m_peer.url("proper", "/folded")).headers, joined);
+}
+
+void HttpClientApiTest::interim_responses_have_no_part_in_the_headers()
+{
+    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/interim"));
+    QCOMPARE(outcome.status, 200);
+    QCOMPARE(outcome.headers, Headers({{"X-Final", "yes"}, {"Content-Length", "5"}}));
+}
+
+void HttpClientApiTest::trailers_have_no_part_in_the_headers()
+{
+    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/trailers"));
+    QCOMPARE(outcome.reply, QStringLiteral("first second"));
+    QCOMPARE(outcome.headers, Headers({{"Transfer-Encoding", "chunked"}}));
+}
+
+void HttpClientApiTest::headers_of_250_kib_are_accepted()
+{
+    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/headers-within-cap"));
+    QCOMPARE(outcome.status, 200);
+    QCOMPARE(outcome.headers.size(), 251);
+}
+
+void HttpClientApiTest::headers_are_those_of_the_last_request()
+{
+    QCOMPARE(get(*m_client, m_peer.url("proper", "/headers")).headers.size(), 8);
+    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).headers, Headers({{"Content-Length", "2"}}));
+    QCOMPARE(get(*m_client, m_peer.url("refusing", "/plain")).headers, Headers());
+}
+
+void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning_data()
+{
+    QTest::addColumn<QString>("url");
+    QTest::addColumn<QString>("cause");
+
+    const auto row = [](const char* name, const QString& url, const char* cause) {
+        QTest::newRow(name) << url << QString::fromUtf8(cause);
+    };
+    const auto path = [this](const char* name) { return m_peer.url("proper", name); };
+    const QString withoutTls = path("/plain").replace(QStringLiteral("https:"), QStringLiteral("http:"));
+
+    row("connection refused", m_peer.url("refusing", "/plain"), "onnect");
+    row("body shorter than its length", path("/cut-length"), "97 bytes remaining");
+    row("last chunk cut", path("/cut-chunk"), "outstanding read data remaining");
+    row("connection broken off in the body", path("/cut-connection"), "97 bytes remaining");
+    row("body over 8 MiB", path("/body-over-cap"), "8 MiB");
+    row("body over 8 MiB, length unknown", path("/chunks-over-cap"), "8 MiB");
+    row("headers over 256 KiB", path("/headers-over-cap"), "256 KiB");
+    row("address without TLS", withoutTls, "\"http\"");
+    row("local file", QStringLiteral("file:///etc/passwd"), "\"file\"");
+    row("empty address", QString(), "URL");
+}
+
+void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning()
+{
+    QFETCH(QString, url);
+    QFETCH(QString, cause);
+
+    const HttpOutcome outcome = get(*m_client, url);
+    QCOMPARE(outcome.status, 0);
+    QCOMPARE(outcome.reply, QString());
+    QCOMPARE(outcome.headers, Headers());
+    QCOMPARE(outcome.warnings.size(), 1);
+    QVERIFY2(outcome.warnings[0].contains(cause), qUtf8Printable(outcome.warnings[0]));
+}
+
+QTEST_GUILESS_MAIN(HttpClientApiTest)
+#include "httpclientapi_test.moc"

@@ -1,0 +1,172 @@
+#include "http_outcome.h"
+#include "tls_peer.h"
+
+#include <QDir>
+#include <QProcess>
+#include <QtTest>
+
+/// Whom the client trusts, and as whom it presents itself.
+class HttpClientApiTrustTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void initTestCase();
+    void init();
+
+    void refuses_data();
+    void refuses();
+    void refuses_an_authority_that_only_the_system_trusts();
+    void refuses_without_configuration();
+    void trusts_the_given_authority();
+    void reads_a_replaced_authority_file();
+    void presents_its_certificate();
+    void finds_the_key_in_the_file_of_the_certificate();
+    void presents_the_certificate_of_its_latest_configuration();
+
+private:
+    HttpOutcome plainGet(const char* door) { return get(*m_client, m_peer.url(door, "/plain")); }
+    QString clientOfNextRequest() { return m_peer.nextRequest()[QStringLiteral("client")].toString(); }
+
+    TlsPeer m_peer;
+    QTemporaryDir m_folder;
+    std::unique_ptr<HttpClientApi> m_client;
+};
+
+static QByteArray contentOf(const QString& path)
+{
+    QFile file(path);
+    file.open(QIODevice::ReadOnly);
+    return file.readAll();
+}
+
+static void replace(const QString& path, const QByteArray& content)
+{
+    QFile file(path);
+    QVERIFY(file.open(QIODevice::WriteOnly));
+    QCOMPARE(file.write(content), content.size());
+}
+
+// OpenSSL's own default rules out what is older than TLS 1.2. Here it allows it, so that it is the client
+// that refuses.
+void HttpClientApiTrustTest::initTestCase()
+{
+    const QString config = m_folder.filePath(QStringLiteral("openssl.cnf"));
+    replace(config,
+            "openssl_conf = all\n[all]\nssl_conf = modules\n[modules]\nsystem_default = tls\n"
+            "[tls]\nMinProtocol = TLSv1\nCipherString = ALL:@SECLEVEL=0\n");
+    qputenv("OPENSSL_CONF", QFile::encodeName(config));
+}
+
+void HttpClientApiTrustTest::init()
+{
+    m_peer.forgetRequests();
+    m_client = std::make_unique<HttpClientApi>(nullptr, false);
+}
+
+void HttpClientApiTrustTest::refuses_data()
+{
+    QTest::addColumn<QString>("door");
+    QTest::addColumn<QString>("authority");
+    QTest::addColumn<QString>("key");
+    QTest::addColumn<QString>("cause");
+
+    const QString ca = m_peer.file("ca");
+    const QString key = m_peer.file("client-key");
+    const QString none = m_folder.filePath(QStringLiteral("none"));
+    const auto row = [](const char* name, const char* door, const QString& authority, const QString& keyFile,
+                        const char* cause) {
+        QTest::newRow(name) << QString::fromUtf8(door) << authority << keyFile << QString::fromUtf8(cause);
+    };
+    row("server of another authority", "stranger", ca, key, "unable to get local issuer certificate");
+    row("server of another name", "misnamed", ca, key, "no alternative certificate subject name matches");
+    row("server whose certificate has expired", "expired", ca, key, "certificate has expired");
+    row("server of TLS 1.1", "outdated", ca, key, "protocol version");
+    // Whether its alert or the end of the connection comes first is a matter of timing: any cause will do.
+    row("server that demands a certificate", "demanding", ca, {}, "");
+    row("missing authority file", "proper", none, key, "certificate file");
+    row("authority file without certificate", "proper", key, key, "certificate file");
+    row("missing key file", "demanding", ca, none, "private key");
+    row("encrypted key", "demanding", ca, m_peer.file("encrypted-key"), "private key");
+}
+
+void HttpClientApiTrustTest::refuses()
+{
+    QFETCH(QString, door);
+    QFETCH(QString, authority);
+    QFETCH(QString, key);
+    QFETCH(QString, cause);
+
+    m_client->setSSLConfig(authority, key.isEmpty() ? QString() : m_peer.file("client"), key);
+    const HttpOutcome outcome = plainGet(qUtf8Printable(door));
+    QCOMPARE(outcome.status, 0);
+    QCOMPARE(outcome.reply, QString());
+    QCOMPARE(outcome.headers.size(), 0);
+    QCOMPARE(outcome.warnings.size(), 1);
+    QVERIFY2(outcome.warnings[0].contains(cause), qUtf8Printable(outcome.warnings[0]));
+}
+
+void HttpClientApiTrustTest::refuses_an_authority_that_only_the_system_trusts()
+{
+    // Outside of the simulated terminal this would be the machine's own trust.
+    QVERIFY(qEnvironmentVariableIsSet("VELK_BOX_USER"));
+    const QDir trusted(QStringLiteral("/etc/ssl/certs"));
+    QVERIFY(trusted.mkpath(QStringLiteral(".")));
+    const QByteArray stranger = contentOf(m_peer.file("stranger-ca"));
+    replace(trusted.filePath(QStringLiteral("stranger.pem")), stranger);
+    QCOMPARE(
+        QProcess::execute(QStringLiteral("/usr/bin/openssl"), {QStringLiteral("rehash"), trusted.path()}), 0);
+
+    m_client->setSSLConfig(m_peer.file("ca"), {}, {});
+    QCOMPARE(plainGet("stranger").status, 0);
+}
+
+void HttpClientApiTrustTest::refuses_without_configuration()
+{
+    QCOMPARE(plainGet("proper").status, 0);
+}
+
+void HttpClientApiTrustTest::trusts_the_given_authority()
+{
+    m_client->setSSLConfig(m_peer.file("stranger-ca"), {}, {});
+    QCOMPARE(plainGet("stranger").status, 200);
+}
+
+void HttpClientApiTrustTest::reads_a_replaced_authority_file()
+{
+    const QString authority = m_folder.filePath(QStringLiteral("authority.pem"));
+    m_client->setSSLConfig(authority, {}, {});
+    replace(authority, contentOf(m_peer.file("stranger-ca")));
+    QCOMPARE(plainGet("proper").status, 0);
+    replace(authority, contentOf(m_peer.file("ca")));
+    QCOMPARE(plainGet("proper").status, 200);
+}
+
+void HttpClientApiTrustTest::presents_its_certificate()
+{
+    m_client->setSSLConfig(m_peer.file("ca"), m_peer.file("client"), m_peer.file("client-key"));
+    QCOMPARE(plainGet("demanding").status, 200);
+    QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
+}
+
+void HttpClientApiTrustTest::finds_the_key_in_the_file_of_the_certificate()
+{
+    const QString both = m_folder.filePath(QStringLiteral("both.pem"));
+    replace(both, contentOf(m_peer.file("client")) + contentOf(m_peer.file("client-key")));
+    m_client->setSSLConfig(m_peer.file("ca"), both, {});
+    QCOMPARE(plainGet("demanding").status, 200);
+}
+
+void HttpClientApiTrustTest::presents_the_certificate_of_its_latest_configuration()
+{
+    m_client->setSSLConfig(m_peer.file("ca"), {}, {});
+    QCOMPARE(plainGet("proper").status, 200);
+    QCOMPARE(clientOfNextRequest(), QString());
+
+    m_client->setSSLConfig(m_peer.file("ca"), m_peer.file("client"), m_peer.file("client-key"));
+    QCOMPARE(plainGet("proper").status, 200);
+    QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
+}
+
+QTEST_GUILESS_MAIN(HttpClientApiTrustTest)
+#include "httpclientapi_trust_test.moc"

@@ -1,0 +1,240 @@
+#include "libvelkkpx.h"
+#include "recorded_service.h"
+#include "warning_recorder.h"
+
+#include <QDir>
+#include <QSettings>
+#include <QTemporaryDir>
+#include <QtTest>
+
+namespace {
+
+using SwitchSetter = QString (Libvelkkpx::*)(bool);
+
+const QString kLoginManager = QStringLiteral("org.freedesktop.login1");
+const QString kFile = QStringLiteral("norix/desktop-control.ini");
+
+QVariant stored(const QString& path, const QString& key)
+{
+    return QSettings(path, QSettings::IniFormat).value(QStringLiteral("restrictions/") + key);
+}
+
+QByteArray contentOf(const QString& path)
+{
+    QFile file(path);
+    file.open(QIODevice::ReadOnly);
+    return file.readAll();
+}
+
+} // namespace
+
+Q_DECLARE_METATYPE(SwitchSetter)
+
+class LibvelkkpxTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void init();
+
+    void switch_is_kept_under_its_name_data();
+    void switch_is_kept_under_its_name();
+    void hotspot_is_kept_as_number();
+    void control_center_lists_are_kept();
+    void list_of_one_empty_string_stays_one();
+    void file_is_in_the_home_folder_without_configuration_folder_data();
+    void file_is_in_the_home_folder_without_configuration_folder();
+    void other_content_of_the_file_is_kept();
+    void switch_that_cannot_be_kept_returns_the_error();
+    void lists_and_hotspot_that_cannot_be_kept_are_one_warning_each();
+
+    void reboot_asks_the_login_manager();
+    void logout_ends_the_own_session();
+    void call_that_fails_is_one_warning_data();
+    void call_that_fails_is_one_warning();
+    void absent_login_manager_is_one_warning();
+
+private:
+    std::unique_ptr<QTemporaryDir> m_folder;
+    QString m_file;
+    Libvelkkpx m_control;
+};
+
+void LibvelkkpxTest::init()
+{
+    m_folder = std::make_unique<QTemporaryDir>();
+    m_file = m_folder->filePath(kFile);
+    qputenv("XDG_CONFIG_HOME", QFile::encodeName(m_folder->path()));
+}
+
+void LibvelkkpxTest::switch_is_kept_under_its_name_data()
+{
+    QTest::addColumn<SwitchSetter>("set");
+    QTest::newRow("ShortcutKeyEnable") << &Libvelkkpx::SetShortcutKeyEnable;
+    QTest::newRow("LauncherDisplayable") << &Libvelkkpx::SetLauncherDisplayable;
+    QTest::newRow("TaskbarRightclickMenuEnable") << &Libvelkkpx::SetTaskbarRightclickMenuEnable;
+    QTest::newRow("ResidentTaskbarAppDisplayable") << &Libvelkkpx::SetResidentTaskbarAppDisplayable;
+    QTest::newRow("RecycleBinDisplayable") << &Libvelkkpx::SetRecycleBinDisplayable;
+    QTest::newRow("WebTrayIconClickable") << &Libvelkkpx::SetWebTrayIconClickable;
+    QTest::newRow("UsbTrayIconClickable") << &Libvelkkpx::SetUsbTrayIconClickable;
+}
+
+void LibvelkkpxTest::switch_is_kept_under_its_name()
+{
+    QFETCH(SwitchSetter, set);
+    const QByteArray key = QTest::currentDataTag();
+
+    QCOMPARE((m_control.*set)(true), QString());
+    QCOMPARE(contentOf(m_file), "[restrictions]\n" + key + "=true\n");
+    QCOMPARE((m_control.*set)(false), QString());
+    QCOMPARE(contentOf(m_file), "[restrictions]\n" + key + "=false\n");
+}
+
+void LibvelkkpxTest::hotspot_is_kept_as_number()
+{
+    m_control.SetHotspotEnable(1);
+    QCOMPARE(contentOf(m_file), QByteArray("[restrictions]\nHotspotEnable=1\n"));
+    m_control.SetHotspotEnable(0);
+    QCOMPARE(contentOf(m_file), QByteArray("[restrictions]\nHotspotEnable=0\n"));
+}
+
+void LibvelkkpxTest::control_center_lists_are_kept()
+{
+    const QStringList modules = {QStringLiteral("network"), QStringLiteral("账户, all")};
+    const QStringList extra = {QStringLiteral("a"), QString(), QStringLiteral("b")};
+    m_control.SetControlConfig(modules, extra);
+    QCOMPARE(stored(m_file, QStringLiteral("ControlCenterList")).toStringList(), modules);
+    QCOMPARE(stored(m_file, QStringLiteral("ControlCenterExtra")).toStringList(), extra);
+}
+
+void LibvelkkpxTest::list_of_one_empty_string_stays_one()
+{
+    m_control.SetControlConfig({}, {QString()});
+    QCOMPARE(stored(m_file, QStringLiteral("ControlCenterList")).toStringList(), QStringList());
+    QCOMPARE(stored(m_file, QStringLiteral("ControlCenterExtra")).toStringList(), QStringList(QString()));
+}
+
+void LibvelkkpxTest::file_is_in_the_home_folder_without_configuration_folder_data()
+{
+    QTest::addColumn<bool>("set");
+    QTest::newRow("variable not set") << false;
+    QTest::newRow("variable empty") << true;
+}
+
+void LibvelkkpxTest::file_is_in_the_home_folder_without_configuration_folder()
+{
+    QFETCH(bool, set);
+    const QByteArray home = qgetenv("HOME");
+    qputenv("HOME", QFile::encodeName(m_folder->path()));
+    set ? qputenv("XDG_CONFIG_HOME", "") : qunsetenv("XDG_CONFIG_HOME");
+
+    QCOMPARE(m_control.SetLauncherDisplayable(true), QString());
+    qputenv("HOME", home);
+    QCOMPARE(
+        stored(m_folder->filePath(QStringLiteral(".config/") + kFile), QStringLiteral("LauncherDisplayable")),
+        QVariant(QStringLiteral("true")));
+}
+
+void LibvelkkpxTest::other_content_of_the_file_is_kept()
+{
+    QVERIFY(QDir(m_folder->path()).mkdir(QStringLiteral("norix")));
+    QFile file(m_file);
+    QVERIFY(file.open(QIODevice::WriteOnly));
+    file.write("[look]\ntheme=dark\n\n[restrictions]\nHotspotEnable=0\nLauncherDisplayable=false\nOther=x\n");
+    file.close();
+
+    QCOMPARE(m_control.SetLauncherDisplayable(true), QString());
+    QCOMPARE(contentOf(m_file),
+             QByteArray("[look]\ntheme=dark\n\n[restrictions]\nHotspotEnable=0\n"
+                        "LauncherDisplayable=true\nOther=x\n"));
+}
+
+static void makeUnwritable(const QTemporaryDir& folder)
+{
+    // A file where the folder should be stops every user, root included.
+    QFile obstacle(folder.filePath(QStringLiteral("norix")));
+    QVERIFY(obstacle.open(QIODevice::WriteOnly));
+}
+
+void LibvelkkpxTest::switch_that_cannot_be_kept_returns_the_error()
+{
+    makeUnwritable(*m_folder);
+    const WarningRecorder recorder;
+    QCOMPARE(m_control.SetLauncherDisplayable(true), QStringLiteral("cannot write ") + m_file);
+    QCOMPARE(recorder.texts(), QStringList());
+}
+
+void LibvelkkpxTest::lists_and_hotspot_that_cannot_be_kept_are_one_warning_each()
+{
+    makeUnwritable(*m_folder);
+    const QString warning = QStringLiteral("cannot write ") + m_file;
+    const WarningRecorder recorder;
+    m_control.SetHotspotEnable(1);
+    QCOMPARE(recorder.texts(), QStringList(warning));
+    m_control.SetControlConfig({}, {});
+    QCOMPARE(recorder.texts(), QStringList({warning, warning}));
+}
+
+void LibvelkkpxTest::reboot_asks_the_login_manager()
+{
+    const RecordedService logind(QDBusConnection::SystemBus, kLoginManager, answerNothing);
+    const WarningRecorder recorder;
+    m_control.Reboot();
+
+    QCOMPARE(logind.calls().size(), 1);
+    const QDBusMessage call = logind.calls().first();
+    QCOMPARE(call.path(), QStringLiteral("/org/freedesktop/login1"));
+    QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.login1.Manager"));
+    QCOMPARE(call.member(), QStringLiteral("Reboot"));
+    QCOMPARE(call.arguments(), QVariantList({false}));
+    QCOMPARE(recorder.texts(), QStringList());
+}
+
+void LibvelkkpxTest::logout_ends_the_own_session()
+{
+    const RecordedService logind(QDBusConnection::SystemBus, kLoginManager, answerNothing);
+    const WarningRecorder recorder;
+    m_control.Logout();
+
+    QCOMPARE(logind.calls().size(), 1);
+    const QDBusMessage call = logind.calls().first();
+    QCOMPARE(call.path(), QStringLiteral("/org/freedesktop/login1/session/auto"));
+    QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.login1.Session"));
+    QCOMPARE(call.member(), QStringLiteral("Terminate"));
+    QCOMPARE(call.arguments(), QVariantList());
+    QCOMPARE(recorder.texts(), QStringList());
+}
+
+using Action = void (Libvelkkpx::*)();
+Q_DECLARE_METATYPE(Action)
+
+void LibvelkkpxTest::call_that_fails_is_one_warning_data()
+{
+    QTest::addColumn<Action>("act");
+    QTest::newRow("Reboot") << &Libvelkkpx::Reboot;
+    QTest::newRow("Terminate") << &Libvelkkpx::Logout;
+}
+
+void LibvelkkpxTest::call_that_fails_is_one_warning()
+{
+    QFETCH(Action, act);
+    const RecordedService logind(QDBusConnection::SystemBus, kLoginManager, [](const QDBusMessage& call) {
+        return call.createErrorReply(QDBusError::AccessDenied, QStringLiteral("not allowed now"));
+    });
+    const WarningRecorder recorder;
+    (m_control.*act)();
+    QCOMPARE(recorder.texts(),
+             QStringList(QStringLiteral("cannot call %1: not allowed now")
+                             .arg(QString::fromUtf8(QTest::currentDataTag()))));
+}
+
+void LibvelkkpxTest::absent_login_manager_is_one_warning()
+{
+    const WarningRecorder recorder;
+    m_control.Reboot();
+    QCOMPARE(recorder.texts().size(), 1);
+    QVERIFY2(recorder.texts().first().contains(kLoginManager), qUtf8Printable(recorder.texts().first()));
+}
+
+QTEST_GUILESS_MAIN(LibvelkkpxTest)
+#include "libvelkkpx_test.moc"

@@ -1,0 +1,220 @@
+#include <QtTest>
+
+#include <unistd.h>
+
+#include <algorithm>
+#include <optional>
+
+#include "message_transfer.h"
+#include "recorded_service.h"
+
+/// Runs as a domain user with a login manager and a notification service that only record.
+class MessageTransferTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void init();
+    void cleanup();
+
+    void slotsStandInTheirOrder();
+    void userAboveTheLocalRangeIsDomainUser();
+    void accountPolicyNamesUserByUid_data();
+    void accountPolicyNamesUserByUid();
+    void accountPolicyCheckIsLogged();
+    void countdownTakesAMinute();
+    void expiredCountdownStops_data();
+    void expiredCountdownStops();
+    void expiredCountdownForcesActionOfItsCode_data();
+    void expiredCountdownForcesActionOfItsCode();
+    void expiredCountdownWithoutForcedActionDoesNothing_data();
+    void expiredCountdownWithoutForcedActionDoesNothing();
+    void laterCodeReplacesPendingOne();
+    void stateIsReportedEveryFiveMinutes();
+
+private:
+    std::optional<RecordedService> m_logind;
+    std::optional<RecordedService> m_notifications;
+};
+
+namespace {
+
+QStringList forcedActions(const RecordedService& service)
+{
+    QStringList actions;
+    const auto calls = service.calls();
+    for (const QDBusMessage& call : calls) {
+        if (call.interface() != QLatin1String("org.freedesktop.DBus.Properties")) {
+            actions.append(call.path() + QLatin1Char(' ') + call.interface() + QLatin1Char('.')
+                           + call.member());
+        }
+    }
+    return actions;
+}
+
+QTimer* timerOf(const MessageTransfer& transfer, bool (*wanted)(const QTimer*))
+{
+    const auto timers = transfer.findChildren<QTimer*>();
+    const auto found = std::find_if(timers.begin(), timers.end(), wanted);
+    return found == timers.end() ? nullptr : *found;
+}
+
+bool isCountdown(const QTimer* timer)
+{
+    return timer->isActive() && timer->interval() == 60000;
+}
+
+} // namespace
+
+void MessageTransferTest::init()
+{
+    m_logind.emplace(QDBusConnection::SystemBus, QStringLiteral("org.freedesktop.login1"), answerNothing);
+    m_notifications.emplace(QDBusConnection::SessionBus, QStringLiteral("com.norix.kpx.Notification"),
+                            answerNothing);
+}
+
+void MessageTransferTest::cleanup()
+{
+    m_notifications.reset();
+    m_logind.reset();
+}
+
+void MessageTransferTest::slotsStandInTheirOrder()
+{
+    QStringList names;
+    const QMetaObject& meta = MessageTransfer::staticMetaObject;
+    for (int i = meta.methodOffset(); i < meta.methodCount(); ++i) {
+        names.append(QString::fromLatin1(meta.method(i).methodSignature()));
+    }
+    const QStringList expected{QStringLiteral("onPolicyMsg(QString,QString)"), QStringLiteral("onTimeout()"),
+                               QStringLiteral("getUserState()")};
+    QCOMPARE(names, expected);
+}
+
+void MessageTransferTest::userAboveTheLocalRangeIsDomainUser()
+{
+    QVERIFY(getuid() > 10000);
+    QVERIFY(MessageTransfer().isLdapUser());
+}
+
+void MessageTransferTest::accountPolicyNamesUserByUid_data()
+{
+    QTest::addColumn<QJsonObject>("message");
+    QTest::addColumn<bool>("named");
+
+    const QString payload = QStringLiteral("payload");
+    const QString uid = QStringLiteral("uid");
+    const auto own = static_cast<qint32>(getuid());
+    QTest::newRow("own uid") << QJsonObject{{payload, QJsonObject{{uid, own}}}} << true;
+    QTest::newRow("another uid") << QJsonObject{{payload, QJsonObject{{uid, own + 1}}}} << false;
+    QTest::newRow("uid as text") << QJsonObject{{payload, QJsonObject{{uid, QString::number(own)}}}} << false;
+    QTest::newRow("fraction") << QJsonObject{{payload, QJsonObject{{uid, own + 0.5}}}} << false;
+    QTest::newRow("no uid") << QJsonObject{{payload, QJsonObject()}} << false;
+    QTest::newRow("payload is no object") << QJsonObject{{payload, own}} << false;
+    QTest::newRow("no payload") << QJsonObject{{uid, own}} << false;
+}
+
+void MessageTransferTest::accountPolicyNamesUserByUid()
+{
+    QFETCH(QJsonObject, message);
+    QTEST(MessageTransfer().isExecPolicyByUID(message), "named");
+}
+
+void MessageTransferTest::accountPolicyCheckIsLogged()
+{
+    const auto own = static_cast<qint32>(getuid());
+    QJsonObject message{{QStringLiteral("payload"), QJsonObject{{QStringLiteral("uid"), 7}}}};
+    const QString line = QStringLiteral("sendUID : 7 , localUID: %1 ,flag : false").arg(own);
+    QTest::ignoreMessage(QtDebugMsg, qUtf8Printable(line));
+    MessageTransfer().isExecPolicyByUID(message);
+}
+
+void MessageTransferTest::countdownTakesAMinute()
+{
+    MessageTransfer transfer;
+    QVERIFY(timerOf(transfer, isCountdown) == nullptr);
+    transfer.startTime(QString(), 1201);
+    QVERIFY(timerOf(transfer, isCountdown) != nullptr);
+}
+
+void MessageTransferTest::expiredCountdownStops_data()
+{
+    QTest::addColumn<int>("code");
+    for (const int code : {1200, 1201, 1204, 0}) {
+        QTest::addRow("%d", code) << code;
+    }
+}
+
+void MessageTransferTest::expiredCountdownStops()
+{
+    QFETCH(int, code);
+    MessageTransfer transfer;
+    transfer.startTime(QString(), code);
+    transfer.onTimeout();
+    QVERIFY(timerOf(transfer, isCountdown) == nullptr);
+}
+
+void MessageTransferTest::expiredCountdownForcesActionOfItsCode_data()
+{
+    QTest::addColumn<int>("code");
+    QTest::addColumn<QString>("action");
+
+    const QString terminate =
+        QStringLiteral("/org/freedesktop/login1/session/auto org.freedesktop.login1.Session.Terminate");
+    QTest::newRow("domain exit") << 1200
+                                 << QStringLiteral(
+                                        "/org/freedesktop/login1 org.freedesktop.login1.Manager.Reboot");
+    QTest::newRow("terminal disabled") << 1201 << terminate;
+    QTest::newRow("account deleted") << 1202 << terminate;
+    QTest::newRow("account disabled") << 1203 << terminate;
+}
+
+void MessageTransferTest::expiredCountdownForcesActionOfItsCode()
+{
+    QFETCH(int, code);
+    QFETCH(QString, action);
+    MessageTransfer transfer;
+    transfer.startTime(QString(), code);
+    transfer.onTimeout();
+    QCOMPARE(forcedActions(*m_logind), QStringList{action});
+}
+
+void MessageTransferTest::expiredCountdownWithoutForcedActionDoesNothing_data()
+{
+    QTest::addColumn<int>("code");
+    for (const int code : {0, 1199, 1204, 1300, 1301, 1304}) {
+        QTest::addRow("%d", code) << code;
+    }
+}
+
+void MessageTransferTest::expiredCountdownWithoutForcedActionDoesNothing()
+{
+    QFETCH(int, code);
+    MessageTransfer transfer;
+    transfer.startTime(QString(), code);
+    transfer.onTimeout();
+    QCOMPARE(forcedActions(*m_logind), QStringList());
+}
+
+void MessageTransferTest::laterCodeReplacesPendingOne()
+{
+    MessageTransfer transfer;
+    transfer.rebootTime(QString(), 1200);
+    transfer.startTime(QString(), 1201);
+    transfer.onTimeout();
+    QCOMPARE(forcedActions(*m_logind).size(), 1);
+    QVERIFY(forcedActions(*m_logind).constFirst().endsWith(QLatin1String("Session.Terminate")));
+}
+
+void MessageTransferTest::stateIsReportedEveryFiveMinutes()
+{
+    const MessageTransfer transfer;
+    QVERIFY(timerOf(transfer,
+                    [](const QTimer* timer) {
+                        return timer->isActive() && timer->interval() == 300000 && !timer->isSingleShot();
+                    })
+            != nullptr);
+}
+
+QTEST_GUILESS_MAIN(MessageTransferTest)
+#include "message_transfer_test.moc"
