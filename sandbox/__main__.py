@@ -1,0 +1,73 @@
+"""`run` enters a box, `inside` is its first process; `demo` and `box` are for people."""
+
+from __future__ import annotations
+
+import argparse
+import os
+import signal
+import sys
+
+from sandbox import box
+from sandbox.users import USERS, User
+
+_NO_BOX = 125
+_INTERRUPTED = 130
+
+
+def _parser() -> argparse.ArgumentParser:
+    parser = argparse.ArgumentParser(prog="in-box", description="Run a command in a simulated terminal.")
+    parser.add_argument(
+        "--user", choices=sorted(USERS), default="domain", help="kind of user (default: domain)"
+    )
+    parser.add_argument("--name", help="login name instead of the kind's own")
+    parser.add_argument("--uid", type=int, help="user id instead of the kind's own")
+    parser.add_argument("--env", action="append", default=[], metavar="NAME", help="pass this variable on")
+    parser.add_argument("command", nargs="+", metavar="COMMAND")
+    return parser
+
+
+def _enter(arguments: list[str]) -> None:
+    options = _parser().parse_args(arguments)
+    default = USERS[options.user]
+    user = User(options.name or default.name, default.uid if options.uid is None else options.uid)
+    env = {name: os.environ[name] for name in options.env if name in os.environ}
+    try:
+        box.require()
+    except box.BoxUnavailable as error:
+        print(f"in-box: {error}", file=sys.stderr)
+        sys.exit(_NO_BOX)
+    argv = box.command(user, options.command, env)
+    os.execvp(argv[0], argv)
+
+
+def _run_for_people(verb: str, arguments: list[str]) -> int:
+    from sandbox import outside
+    from sandbox.demo import main as demo
+    from sandbox.prompt import main as prompt
+
+    # A box is deaf to Ctrl+C (see outside.enter), and so are at first the programs in it.
+    signal.signal(signal.SIGINT, signal.default_int_handler)
+    try:
+        return demo.run(arguments) if verb == "demo" else prompt.run(arguments)
+    except outside.Trouble as trouble:
+        print(f"{verb}: {trouble}", file=sys.stderr)
+        return 1
+    except KeyboardInterrupt:
+        return _INTERRUPTED
+
+
+def main() -> int:
+    """Entry point."""
+    verb, *arguments = sys.argv[1:] or ["run"]
+    if verb == "inside":
+        from sandbox import inside  # needs D-Bus, which only the box must have
+
+        return inside.run(arguments[1:])
+    if verb in ("demo", "box"):
+        return _run_for_people(verb, arguments)
+    _enter(arguments)
+    return 0
+
+
+if __name__ == "__main__":
+    sys.exit(main())

@@ -1,0 +1,142 @@
+"""The session agent: the real binary, started and watched."""
+
+from __future__ import annotations
+
+import contextlib
+import os
+import re
+import signal
+import subprocess
+from pathlib import Path
+from typing import Callable, Mapping, Sequence
+
+from sandbox import layout
+from sandbox.buses import Bus
+from sandbox.clock import Clock, RealTime
+from sandbox.events import Events
+from sandbox.logreader import PATTERN, LogReader
+from sandbox.senders import Senders
+
+_STOP_SECONDS = 20.0
+_NEVER_STARTED = "the agent was never started"
+
+
+def default_binary() -> Path:
+    """The binary under test: $VELK_AGENT, else that of $VELK_BUILD_DIR, else that of the release build."""
+    if "VELK_AGENT" in os.environ:
+        return Path(os.environ["VELK_AGENT"])
+    build = Path(os.environ.get("VELK_BUILD_DIR", layout.REPOSITORY / "build" / "release"))
+    return build / "src" / "velks"
+
+
+class Agent:
+    """One agent process at a time; it may be started again after it has ended."""
+
+    def __init__(self, events: Events, senders: Senders, binary: Path | None = None) -> None:
+        self.binary = binary or default_binary()
+        self._events = events
+        self._senders = senders
+        self._process: subprocess.Popen[bytes] | None = None
+        self._log: LogReader | None = None
+        self._ending_wanted = False
+
+    def start(
+        self,
+        clock: Clock | None = None,
+        extra_env: Mapping[str, str] | None = None,
+        extra_argv: Sequence[str] = (),
+    ) -> None:
+        """Start the process; returns at once."""
+        assert not self.alive, "the agent runs already"
+        env = {**os.environ, "QT_MESSAGE_PATTERN": PATTERN, **(clock or RealTime()).environment()}
+        if "LD_PRELOAD" in env:
+            env["LD_PRELOAD"] = " ".join((*_sanitizer_runtime(self.binary), env["LD_PRELOAD"]))
+        self._ending_wanted = False
+        with self._senders.lock:
+            self._process = subprocess.Popen(
+                [self.binary, *extra_argv],
+                env={**env, **(extra_env or {})},
+                stdin=subprocess.DEVNULL,
+                stdout=subprocess.DEVNULL,
+                stderr=subprocess.PIPE,
+                start_new_session=True,
+            )
+            self._senders.register(self._process.pid, "velks")
+        assert self._process.stderr
+        self._log = LogReader("velks", self._process.stderr, self._events)
+        self._events.record("box", "velks", "life", "starts", (self._process.pid,))
+
+    @property
+    def alive(self) -> bool:
+        """Whether the process runs."""
+        return self._process is not None and self._process.poll() is None
+
+    @property
+    def pid(self) -> int:
+        """Process id of the agent that was started last."""
+        assert self._process, _NEVER_STARTED
+        return self._process.pid
+
+    @property
+    def log(self) -> str:
+        """Everything that the agent wrote to its standard error, as a person reads it."""
+        return self._log.text if self._log else ""
+
+    @property
+    def died_unexpectedly(self) -> bool:
+        """Whether it ended without being told to."""
+        return self._process is not None and not self.alive and not self._ending_wanted
+
+    @property
+    def exit_status(self) -> int | None:
+        """How it ended: its status, minus the number of the signal, None while it runs."""
+        return self._process.poll() if self._process else None
+
+    def stop(self) -> None:
+        """End the agent as the end of the session does, and wait until it has gone and its log is read."""
+        self._end(lambda process: process.terminate())
+
+    def kill(self) -> None:
+        """End the agent at once."""
+        self._end(lambda process: process.kill())
+
+    def wait(self, timeout: float = _STOP_SECONDS) -> int:
+        """Wait for the agent to end by itself, which is then no surprise; the result is its exit status."""
+        assert self._process and self._log, _NEVER_STARTED
+        self._ending_wanted = True
+        status = self._process.wait(timeout)
+        self._end_children()
+        self._log.finish()
+        return status
+
+    def resident_bytes(self) -> int:
+        """Memory that the process holds."""
+        pages = int(Path(f"/proc/{self.pid}/statm").read_text().split()[1])
+        return pages * os.sysconf("SC_PAGE_SIZE")
+
+    def bus_names(self, bus: Bus) -> list[str]:
+        """Unique names of the agent's connections on a bus."""
+        return bus.names_of(self.pid)
+
+    def _end_children(self) -> None:
+        """End what the agent's scripts have left behind, as the end of a session does."""
+        with contextlib.suppress(ProcessLookupError):
+            os.killpg(self.pid, signal.SIGKILL)
+
+    def _end(self, how: Callable[[subprocess.Popen[bytes]], None]) -> None:
+        if self._process is None or not self.alive:
+            return
+        self._ending_wanted = True
+        how(self._process)
+        try:
+            self.wait()
+        except subprocess.TimeoutExpired:
+            self._process.kill()
+            self.wait()
+            raise AssertionError("the agent did not end on SIGTERM") from None
+
+
+def _sanitizer_runtime(binary: Path) -> list[str]:
+    """The sanitizer's library of an instrumented binary, which must be preloaded before any other."""
+    linked = subprocess.run(["ldd", binary], capture_output=True, text=True).stdout
+    return re.findall(r"libasan\.so\S* => (\S+)", linked)

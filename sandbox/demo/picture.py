@@ -1,0 +1,35 @@
+"""The tour as a picture that needs nothing but itself: no fonts from elsewhere."""
+
+from __future__ import annotations
+
+import re
+from pathlib import Path
+from typing import IO
+
+from rich.console import Console
+
+_WEB_FONT = re.compile(r"\s*@font-face \{.*?\}", re.DOTALL)
+_FONTS = '"DejaVu Sans Mono", Menlo, Consolas, "Noto Sans Mono CJK SC", monospace'
+
+
+def svg(recorded: Console) -> str:
+    """What the console has recorded, as SVG."""
+    drawn = recorded.export_svg(title="./dev demo", unique_id="demo")
+    return _WEB_FONT.sub("", drawn).replace("Fira Code, monospace", _FONTS)
+
+
+class PictureFile:
+    """Receives the picture from the box; the file changes only when the picture is complete."""
+
+    def __init__(self, path: Path) -> None:
+        self._path = path
+        self._content = b""
+
+    def receive(self, stream: IO[bytes]) -> None:
+        """Read the picture."""
+        self._content = stream.read()
+
+    def keep(self) -> None:
+        """Put it into the file."""
+        if self._content:
+            self._path.write_bytes(self._content)

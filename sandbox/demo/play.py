@@ -1,0 +1,65 @@
+"""The tour inside the box, from the opening of the terminal to the table at the end."""
+
+from __future__ import annotations
+
+from argparse import Namespace
+from typing import Sequence
+
+from rich.console import Console
+from rich.text import Text
+
+from sandbox import outside
+from sandbox.demo import picture, result
+from sandbox.demo.scene import Scene
+from sandbox.demo.scenes import SCENES
+from sandbox.demo.tour import Outcome, Tour
+from sandbox.outside import Trouble
+from sandbox.terminal import Terminal
+from sandbox.timeline.agenttime import AgentTime
+from sandbox.timeline.timeline import Timeline, console_for_people, console_for_picture
+from sandbox.workplace import clock, require_agent
+
+
+def play(options: Namespace) -> int:
+    """Play the scenes that the options ask for; the result is the exit status."""
+    scenes = _chosen(options.only)
+    require_agent()
+    result_stream = outside.result_stream()
+    person = console_for_people()
+    recorder = console_for_picture() if options.svg else None
+    consoles = [person, recorder] if recorder else [person]
+    outcomes, problems = _tour(options, scenes, consoles)
+    if recorder:
+        drawn = picture.svg(recorder).encode()
+        if result_stream:
+            result_stream.write(drawn)
+        else:
+            options.svg.write_bytes(drawn)
+    return int(bool(problems) or any(outcome.verdict != "as expected" for outcome in outcomes))
+
+
+def _chosen(numbers: set[int] | None) -> dict[int, Scene]:
+    """The scenes by number; the first one, which starts the agent, is always among them."""
+    known = dict(enumerate(SCENES, 1))
+    unknown = (numbers or set()) - known.keys()
+    if unknown:
+        raise Trouble(f"there is no scene {min(unknown)}; there are {len(known)}")
+    return {number: scene for number, scene in known.items() if not numbers or number in {1, *numbers}}
+
+
+def _tour(
+    options: Namespace, scenes: dict[int, Scene], consoles: Sequence[Console]
+) -> tuple[list[Outcome], list[str]]:
+    time = AgentTime(options.speed)
+    terminal = Terminal(clock=clock(options.speed))
+    timeline = Timeline(terminal.events, time, consoles, options.log)
+    try:
+        outcomes = Tour(terminal, timeline, options.patience).play(scenes)
+    finally:
+        timeline.end()
+        problems = terminal.shut_down()
+    consoles[0].print(result.table(outcomes, time))
+    for problem in problems:
+        consoles[0].print(Text(problem, "bold red"))
+    consoles[0].print(result.summary(outcomes))
+    return outcomes, problems

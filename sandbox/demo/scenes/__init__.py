@@ -1,0 +1,20 @@
+"""The scenes of the tour. A further scene is one more entry of SCENES."""
+
+from __future__ import annotations
+
+from sandbox.demo.scene import Scene
+from sandbox.demo.scenes import domain_exit, policies, session
+
+# The first one starts the agent; any of the others can be left out.
+SCENES: tuple[Scene, ...] = (
+    session.BEGIN,
+    session.STATES,
+    policies.FORWARDED,
+    policies.NOTICES,
+    policies.PASSWORD,
+    policies.ACCOUNT_DISABLED,
+    policies.TERMINAL_DISABLED,
+    session.DAEMON_RESTART,
+    policies.STRANGER,
+    domain_exit.DOMAIN_EXIT,
+)

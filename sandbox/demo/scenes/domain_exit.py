@@ -1,0 +1,52 @@
+"""What the agent does when the terminal leaves the domain."""
+
+from __future__ import annotations
+
+from sandbox.demo.scene import NO_LOGOUT, NOT_REALLY, REBOOT, Expectation, Scene, Step, from_agent, notice
+from sandbox.demo.switches import FILE, look_at_switches
+from sandbox.terminal import Terminal
+
+# It tries to read: what waits for an input that never ends would keep the agent from the reboot.
+_RESTORE_SCRIPT = """#!/bin/bash
+read -r line && exec restore_config "read: $line"
+exec restore_config "(standard input is at its end)"
+"""
+
+
+def _remove_from_domain(terminal: Terminal) -> None:
+    terminal.files.write_restore_script(_RESTORE_SCRIPT)
+    terminal.daemon.push_policy({"type": 1200})
+
+
+def _switch(name: str, value: str) -> Expectation:
+    return from_agent(f"switch {name} is {value}", "switches", name, value)
+
+
+_UNDONE = (
+    notice("当前终端已被管理员退域，1分钟后强制重启", "_open", "重启"),
+    from_agent(
+        "the restore script runs, with nothing to read",
+        "restore_config",
+        "restore_config",
+        "(standard input is at its end)",
+    ),
+    from_agent("the policy service is stopped", "systemctl", "systemctl", "--global", "stop", "prys"),
+    from_agent("the daemon is told", "daemon", "onDomainConfig", "remove"),
+    from_agent("the identity service is off", "identity", "Set", ..., "Enable", False),
+    REBOOT,
+    NO_LOGOUT,
+)
+
+_SWITCHES = (
+    _switch("ControlCenterList", "network, display, sound"),
+    _switch("LauncherDisplayable", "true"),
+    _switch("ShortcutKeyEnable", "true"),
+    _switch("HotspotEnable", "1"),
+)
+
+DOMAIN_EXIT = Scene(
+    "The terminal leaves the domain",
+    "A warning; then everything that the domain had changed is undone; after the minute, the reboot.",
+    (Step(_remove_from_domain, _UNDONE), Step(look_at_switches, _SWITCHES)),
+    f"The desktop's switches stand in the user's file ~/{FILE}. {NOT_REALLY}",
+)

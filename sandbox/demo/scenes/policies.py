@@ -1,0 +1,90 @@
+"""What becomes of the policies that the daemon pushes."""
+
+from __future__ import annotations
+
+from typing import Any, Mapping
+
+from sandbox.demo.scene import (
+    LOGOUT,
+    NO_REBOOT,
+    NOT_REALLY,
+    NOTHING_FORWARDED,
+    NOTHING_SHOWN,
+    Expectation,
+    Scene,
+    Step,
+    from_agent,
+    notice,
+)
+from sandbox.peers import daemon
+from sandbox.spoofer import Stranger
+from sandbox.terminal import Terminal
+from sandbox.users import DOMAIN_USER as USER
+
+_SOMEBODY_ELSE = USER.uid + 1
+_POLICY = '{"type":2101,"payload":{"wallpaper":"/usr/share/backgrounds/校园.jpg"}}'
+
+
+def _push(policy: Mapping[str, Any] | str, *then: Expectation) -> Step:
+    return Step(lambda terminal: terminal.daemon.push_policy(policy), then)
+
+
+def _stranger_pushes(terminal: Terminal) -> None:
+    args = ("stranger", '{"type":1201}')
+    stranger = Stranger(terminal.system_bus)
+    terminal.events.record("stranger", "*", "signal", "pushPolicyMsg", args)
+    stranger.emit("/com/norix/velk/velkg", daemon.INTERFACE, "pushPolicyMsg", *args, signature="ss")
+    # The bus answers once it has passed on what came before.
+    stranger.call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", "GetId")
+    stranger.close()
+
+
+FORWARDED = Scene(
+    "A policy for the policy service",
+    "Policies that do not concern the session itself are passed on, letter for letter.",
+    (_push(_POLICY, from_agent("the same text", "policy_service", "onPolicyMsg", _POLICY), NOTHING_SHOWN),),
+)
+
+NOTICES = Scene(
+    "Shutdown and reboot notices",
+    "The user is told; shutting down is somebody else's work.",
+    (
+        _push({"type": 1300}, notice("该终端1分钟后进行关机"), NOTHING_FORWARDED),
+        _push({"type": 1301}, notice("该终端1分钟后进行重启"), NOTHING_FORWARDED),
+    ),
+)
+
+PASSWORD = Scene(
+    "New password rules",
+    "The user, who belongs to the domain, is asked to change the password.",
+    (_push({"type": 1304}, notice("管理员调整密码规则，避免影响登录，请及时修改密码"), NOTHING_FORWARDED),),
+)
+
+ACCOUNT_DISABLED = Scene(
+    "An account is disabled",
+    f"First another user's (uid {_SOMEBODY_ELSE}), which is no concern of this session; then this user's.",
+    (
+        _push({"type": 1203, "payload": {"uid": _SOMEBODY_ELSE}}, NOTHING_SHOWN, NOTHING_FORWARDED),
+        _push(
+            {"type": 1203, "payload": {"uid": USER.uid}},
+            notice("您的帐号已被管理员停用，1分钟后强制注销"),
+            LOGOUT,
+            NOTHING_FORWARDED,
+            NO_REBOOT,
+        ),
+    ),
+    NOT_REALLY,
+)
+
+TERMINAL_DISABLED = Scene(
+    "The terminal is disabled",
+    "A warning, a minute to save one's work, then the forced log-out.",
+    (_push({"type": 1201}, notice("当前终端已被管理员停用，1分钟后强制注销"), LOGOUT, NO_REBOOT),),
+    NOT_REALLY,
+)
+
+STRANGER = Scene(
+    "A stranger gives orders",
+    "Only the daemon is listened to: the same signal from any other program does nothing.",
+    (Step(_stranger_pushes, (NOTHING_SHOWN, NOTHING_FORWARDED)),),
+)

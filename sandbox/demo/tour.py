@@ -1,0 +1,117 @@
+"""Plays scenes and compares what is expected with what is seen."""
+
+from __future__ import annotations
+
+import time
+from dataclasses import dataclass
+from typing import Literal, Mapping
+
+from rich.rule import Rule
+from rich.text import Text
+
+from sandbox.demo.scene import Expectation, Scene, Step
+from sandbox.events import Event
+from sandbox.terminal import Terminal
+from sandbox.timeline.timeline import Timeline
+
+Verdict = Literal["as expected", "missing", "forbidden", "not played"]
+
+
+@dataclass(frozen=True)
+class Outcome:
+    """What became of an expectation of a scene: its verdict, the event that was seen, and how many seconds of
+    the agent's time after the cue."""
+
+    scene: str
+    expectation: Expectation
+    verdict: Verdict
+    seen: Event | None = None
+    delay: float = 0.0
+
+
+_STILL_THERE = Expectation("the agent handles what comes", "velks", "log", "info")
+
+
+class Tour:
+    """Plays scenes until one step does not go as expected; what comes after it is then not played.
+
+    `patience` is the real time in seconds that an event may take beyond its due time.
+    """
+
+    def __init__(self, terminal: Terminal, timeline: Timeline, patience: float) -> None:
+        self._terminal = terminal
+        self._timeline = timeline
+        self._patience = patience
+        self._outcomes: list[Outcome] = []
+
+    def play(self, scenes: Mapping[int, Scene]) -> list[Outcome]:
+        """Play the scenes, which are given by number; one outcome for each expectation of each scene."""
+        for number, scene in scenes.items():
+            self._play_scene(f"{number}. {scene.title}", scene)
+        return self._outcomes
+
+    @property
+    def _goes_well(self) -> bool:
+        return all(outcome.verdict == "as expected" for outcome in self._outcomes)
+
+    def _play_scene(self, title: str, scene: Scene) -> None:
+        if self._goes_well:
+            self._timeline.print()
+            self._timeline.print(Rule(Text(title, "bold"), align="left", style="dim"))
+            self._timeline.print(Text(scene.sentence))
+        for step in scene.steps:
+            if self._goes_well:
+                self._outcomes += self._play_step(title, step)
+            else:
+                self._outcomes += [Outcome(title, expected, "not played") for expected in step.then]
+        if self._goes_well and scene.remark:
+            self._timeline.print(Text(scene.remark, "dim"))
+
+    def _play_step(self, title: str, step: Step) -> list[Outcome]:
+        mark = self._terminal.events.mark()
+        cue = time.monotonic()
+        step.cue(self._terminal)
+        wanted = [expectation for expectation in step.then if not expectation.forbidden]
+        came = all(self._comes(expectation, mark, cue) for expectation in wanted)
+        is_silent = came and not self._settles()
+        outcomes = [self._judge(title, expectation, mark, cue) for expectation in step.then]
+        if is_silent:
+            outcomes.append(Outcome(title, _STILL_THERE, "missing"))
+        elif not wanted and all(outcome.verdict == "as expected" for outcome in outcomes):
+            self._tell_of_silence(step)
+        return outcomes
+
+    def _comes(self, expectation: Expectation, mark: int, cue: float) -> bool:
+        due = cue + expectation.within / self._timeline.time.speed + self._patience
+        timeout = max(0.0, due - time.monotonic())
+        with self._timeline.waiting(expectation.words):
+            try:
+                self._terminal.events.wait_for(expectation.matches, after=mark, timeout=timeout)
+            except AssertionError:
+                return False
+        return True
+
+    def _settles(self) -> bool:
+        """Whether the agent has handled everything, so that what has not come by now will not come."""
+        try:
+            self._terminal.sync()
+        except AssertionError:
+            return False
+        return True
+
+    def _tell_of_silence(self, step: Step) -> None:
+        """Say what the timeline cannot show."""
+        words = "; ".join(expectation.words for expectation in step.then)
+        self._timeline.print(Text(f"{'':7}Nothing follows: {words}.", "italic"))
+
+    def _judge(self, title: str, expectation: Expectation, mark: int, cue: float) -> Outcome:
+        event = self._first(expectation, mark)
+        if (event is None) == expectation.forbidden:
+            verdict: Verdict = "as expected"
+        else:
+            verdict = "forbidden" if expectation.forbidden else "missing"
+        delay = (event.time - cue) * self._timeline.time.speed if event else 0.0
+        return Outcome(title, expectation, verdict, event, delay)
+
+    def _first(self, expectation: Expectation, mark: int) -> Event | None:
+        return next(iter(self._terminal.events.all(expectation.matches, after=mark)), None)

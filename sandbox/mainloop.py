@@ -1,0 +1,64 @@
+"""The one event loop on which all fakes of a box live."""
+
+from __future__ import annotations
+
+import threading
+from concurrent.futures import Future
+from typing import Any, Callable, TypeVar
+
+import dbus.mainloop.glib
+from gi.repository import GLib
+
+T = TypeVar("T")
+
+_CALL_SECONDS = 60.0
+
+
+class MainLoop:
+    """A GLib loop in a background thread of its own, started on first use.
+
+    All D-Bus objects are made and used on that thread; `call` carries work over from any other.
+    """
+
+    _lock = threading.Lock()
+    _thread: threading.Thread | None = None
+    bus_loop: Any = None
+
+    @classmethod
+    def call(cls, function: Callable[..., T], *args: Any) -> T:
+        """Run `function` on the loop's thread and wait for its result; its exception is raised here."""
+        cls._start()
+        if threading.current_thread() is cls._thread:
+            return function(*args)
+        result: Future[T] = Future()
+        GLib.idle_add(_settle, result, function, args, priority=GLib.PRIORITY_DEFAULT)
+        return result.result(_CALL_SECONDS)
+
+    @classmethod
+    def later(cls, seconds: float, function: Callable[[], object]) -> None:
+        """Run `function` once on the loop's thread, after `seconds`."""
+        cls._start()
+
+        def once() -> bool:
+            function()
+            return bool(GLib.SOURCE_REMOVE)
+
+        GLib.timeout_add(int(seconds * 1000), once)
+
+    @classmethod
+    def _start(cls) -> None:
+        with cls._lock:
+            if cls._thread:
+                return
+            dbus.mainloop.glib.threads_init()
+            cls.bus_loop = dbus.mainloop.glib.DBusGMainLoop()
+            cls._thread = threading.Thread(target=GLib.MainLoop().run, name="box-loop", daemon=True)
+            cls._thread.start()
+
+
+def _settle(result: Future[T], function: Callable[..., T], args: tuple[Any, ...]) -> bool:
+    try:
+        result.set_result(function(*args))
+    except BaseException as error:  # carried over to the caller's thread, whatever it is
+        result.set_exception(error)
+    return bool(GLib.SOURCE_REMOVE)

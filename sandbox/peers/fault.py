@@ -1,0 +1,42 @@
+"""Ways in which a service may misbehave."""
+
+from __future__ import annotations
+
+from dataclasses import dataclass
+from typing import Literal
+
+Kind = Literal["none", "hang", "fail", "slow", "hold"]
+
+
+@dataclass(frozen=True)
+class Fault:
+    """What a service does with the calls that reach it."""
+
+    kind: Kind
+    error_name: str = ""
+    seconds: float = 0.0
+
+    @staticmethod
+    def none() -> Fault:
+        """Answer at once."""
+        return Fault("none")
+
+    @staticmethod
+    def hang() -> Fault:
+        """Never answer."""
+        return Fault("hang")
+
+    @staticmethod
+    def fail(error_name: str = "org.freedesktop.DBus.Error.Failed") -> Fault:
+        """Answer with an error and do nothing."""
+        return Fault("fail", error_name=error_name)
+
+    @staticmethod
+    def slow(seconds: float) -> Fault:
+        """Answer late, by real time."""
+        return Fault("slow", seconds=seconds)
+
+    @staticmethod
+    def hold() -> Fault:
+        """Keep the calls until `Peer.release`."""
+        return Fault("hold")

@@ -1,0 +1,214 @@
+"""The management platform's HTTPS interface."""
+
+from __future__ import annotations
+
+import socket
+import ssl
+import threading
+from dataclasses import dataclass, field
+from functools import cache
+from http.server import BaseHTTPRequestHandler, ThreadingHTTPServer
+from pathlib import Path
+from tempfile import mkdtemp
+from typing import Any, Literal, Mapping
+from urllib.parse import urlsplit
+
+from sandbox import layout
+from sandbox.certificates import Authority, Identity
+from sandbox.events import Events
+from sandbox.platform_store import Route, Store
+
+Request = Mapping[str, Any]
+
+
+@dataclass(frozen=True)
+class HttpFault:
+    """What the platform does with a request instead of serving it."""
+
+    kind: Literal["none", "reply", "hang", "close", "cut"]
+    status: int = 200
+    body: bytes = b""
+    headers: Mapping[str, str] = field(default_factory=dict)
+
+    @staticmethod
+    def none() -> HttpFault:
+        """Serve it."""
+        return HttpFault("none")
+
+    @staticmethod
+    def reply(status: int = 200, body: bytes = b"", headers: Mapping[str, str] | None = None) -> HttpFault:
+        """Answer with this, whatever was asked."""
+        return HttpFault("reply", status, body, headers or {})
+
+    @staticmethod
+    def hang() -> HttpFault:
+        """Send nothing until `Platform.release` or the end."""
+        return HttpFault("hang")
+
+    @staticmethod
+    def close() -> HttpFault:
+        """Close the connection without a reply."""
+        return HttpFault("close")
+
+    @staticmethod
+    def cut() -> HttpFault:
+        """Announce a body and close the connection half-way through it."""
+        return HttpFault("cut", body=b'[{"uuid":')
+
+
+@dataclass(frozen=True)
+class Trust:
+    """Certificates of one platform: its authority, its own and the terminal's."""
+
+    authority: Authority
+    server: Identity
+    terminal: Identity
+
+
+@cache
+def trust() -> Trust:
+    """Certificates of the box's platform, minted once in a process."""
+    authority = Authority(Path(mkdtemp(prefix="platform-")), "Box platform authority")
+    return Trust(authority, authority.issue_server(layout.PLATFORM_HOST), authority.issue_client("terminal"))
+
+
+class Platform:
+    """HTTPS server that demands a certificate of its own authority from the client.
+
+    Every request is an event of kind "http": member "list", "read", "tips" or "other"; args the request line
+    and the body; detail headers and the client's name. A failed handshake is an event with member "tls".
+    `fault` applies to all requests, `faults` to those of one route.
+    """
+
+    def __init__(
+        self, events: Events, port: int = layout.PLATFORM_PORT, server: Identity | None = None
+    ) -> None:
+        self.port = port
+        self.store = Store()
+        self.fault = HttpFault.none()
+        self.faults: dict[Route, HttpFault] = {}
+        self.events = events
+        self.released = threading.Event()
+        self._server = _Server((layout.PLATFORM_HOST, port), _Handler)
+        self._server.platform = self
+        self._server.socket = self._context(server or trust().server).wrap_socket(
+            self._server.socket, server_side=True, do_handshake_on_connect=False
+        )
+        threading.Thread(
+            target=self._server.serve_forever, args=(0.02,), name="platform", daemon=True
+        ).start()
+
+    def post_message(self, uid: str, title: str, content: str, sender: str = "admin") -> str:
+        """Leave a message for a user; the result is its uuid."""
+        return self.store.post(uid, title, content, sender)
+
+    def messages(self, uid: str | None = None) -> list[dict[str, str]]:
+        """The messages of a user, or all; those that were read have a `read_at`."""
+        return self.store.messages(uid)
+
+    def password_tip(self, user: str, message: str | None) -> None:
+        """Warn a user of the end of the password's life; None takes the warning back."""
+        self.store.set_tip(user, message)
+
+    def fault_for(self, route: Route) -> HttpFault:
+        """What happens to a request of this route now."""
+        return self.faults.get(route, self.fault)
+
+    def release(self) -> None:
+        """Let hanging requests go on, and serve later ones."""
+        self.fault = HttpFault.none()
+        self.faults.clear()
+        self.released.set()
+        self.released = threading.Event()
+
+    def close(self) -> None:
+        """Stop serving."""
+        self.released.set()
+        self._server.shutdown()
+        self._server.server_close()
+
+    def _context(self, identity: Identity) -> ssl.SSLContext:
+        context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
+        context.load_cert_chain(identity.certificate, identity.key)
+        context.load_verify_locations(trust().authority.certificate)
+        context.verify_mode = ssl.CERT_REQUIRED
+        return context
+
+
+class _Server(ThreadingHTTPServer):
+    daemon_threads = True
+    platform: Platform
+
+    def handle_error(self, request: Any, client_address: Any) -> None:
+        """A connection that broke is no failure of the box: the request's own events tell."""
+
+
+class _Handler(BaseHTTPRequestHandler):
+    raw_requestline: bytes
+    protocol_version = "HTTP/1.1"
+
+    def setup(self) -> None:
+        connection = self.request
+        assert isinstance(connection, ssl.SSLSocket)
+        try:
+            connection.do_handshake()
+        except (ssl.SSLError, OSError) as error:
+            self._platform.events.record("velks", "platform", "http", "tls", (str(error),))
+            raise
+        super().setup()
+
+    def do_GET(self) -> None:  # the name is the base class's
+        self._serve("GET")
+
+    def do_PUT(self) -> None:
+        self._serve("PUT")
+
+    def do_POST(self) -> None:
+        self._serve("POST")
+
+    def log_message(self, format: str, *args: Any) -> None:  # events tell more
+        pass
+
+    @property
+    def _platform(self) -> Platform:
+        assert isinstance(self.server, _Server)
+        return self.server.platform
+
+    def _serve(self, method: str) -> None:
+        body = self.rfile.read(int(self.headers.get("Content-Length", 0)))
+        url = urlsplit(self.path)
+        route = self._platform.store.route(method, url.path)
+        fault, released = self._platform.fault_for(route), self._platform.released
+        self._record(route, body)
+        if fault.kind == "hang":
+            released.wait()
+            fault = HttpFault.none()
+        if fault.kind == "none":
+            reply = self._platform.store.serve(route, url.query, body)
+            self._reply(reply.status, reply.headers, reply.body)
+        elif fault.kind == "close":
+            self._hang_up()
+        else:
+            self._reply(fault.status, fault.headers, fault.body, missing=1000 if fault.kind == "cut" else 0)
+
+    def _record(self, route: Route, body: bytes) -> None:
+        line = self.raw_requestline.decode("latin-1").rstrip("\r\n")
+        assert isinstance(self.connection, ssl.SSLSocket)
+        subject = (self.connection.getpeercert() or {}).get("subject", ())
+        detail = {"headers": list(self.headers.items()), "client": subject}
+        self._platform.events.record("velks", "platform", "http", route, (line, body.decode()), detail)
+
+    def _reply(self, status: int, headers: Mapping[str, str], body: bytes, missing: int = 0) -> None:
+        self.send_response(status)
+        for name, value in {"Content-Type": "application/json", **headers}.items():
+            self.send_header(name, value)
+        self.send_header("Content-Length", str(len(body) + missing))
+        self.end_headers()
+        self.wfile.write(body)
+        if missing:
+            self._hang_up()
+
+    def _hang_up(self) -> None:
+        self.close_connection = True
+        self.wfile.flush()
+        self.connection.shutdown(socket.SHUT_RDWR)

@@ -1,0 +1,117 @@
+"""What the platform knows and how its routes answer, without any network."""
+
+from __future__ import annotations
+
+import json
+import threading
+from dataclasses import dataclass, field
+from datetime import datetime
+from typing import Any, Literal, Mapping
+from urllib.parse import parse_qs
+from uuid import uuid4
+
+Route = Literal["list", "read", "tips", "other"]
+
+_ROUTES: dict[tuple[str, str], Route] = {
+    ("GET", "/notification/v2/list"): "list",
+    ("PUT", "/notification/v2/read"): "read",
+    ("GET", "/uim/v3/client/password/tips"): "tips",
+}
+
+
+@dataclass(frozen=True)
+class Reply:
+    """Answer to one request."""
+
+    status: int
+    body: bytes
+    headers: Mapping[str, str] = field(default_factory=dict)
+
+
+class Store:
+    """Messages of all users with their read state, and the password warnings; thread-safe."""
+
+    def __init__(self) -> None:
+        self._lock = threading.Lock()
+        self._messages: list[dict[str, str]] = []
+        self._tips: dict[str, str] = {}
+
+    @staticmethod
+    def route(method: str, path: str) -> Route:
+        """Which route a request is meant for."""
+        return _ROUTES.get((method, path), "other")
+
+    def post(self, uid: str, title: str, content: str, sender: str) -> str:
+        """Add an unread message; the result is its uuid."""
+        message = {
+            "uuid": str(uuid4()),
+            "uid": uid,
+            "send_uid": sender,
+            "title": title,
+            "content": content,
+            "created_at": _now(),
+            "read_at": "",
+        }
+        with self._lock:
+            self._messages.append(message)
+        return message["uuid"]
+
+    def messages(self, uid: str | None = None) -> list[dict[str, str]]:
+        """Copies of the messages, oldest first."""
+        with self._lock:
+            return [dict(message) for message in self._messages if uid in (None, message["uid"])]
+
+    def set_tip(self, user: str, message: str | None) -> None:
+        """Set or, with None, remove the warning of a user."""
+        with self._lock:
+            self._tips.pop(user, None)
+            if message is not None:
+                self._tips[user] = message
+
+    def serve(self, route: Route, query: str, body: bytes) -> Reply:
+        """Answer a request."""
+        if route == "list":
+            return self._list({key: values[0] for key, values in parse_qs(query).items()})
+        if route == "read":
+            return self._mark_read(_json_object(body).get("uuid"))
+        if route == "tips":
+            return self._tip(_json_object(body).get("username"))
+        return Reply(404, b"{}")
+
+    def _list(self, query: Mapping[str, str]) -> Reply:
+        limit, offset = int(query.get("limit", "10")), int(query.get("offset", "0"))
+        found = self.messages(query.get("uid", ""))
+        if query.get("is_not_read") == "1":
+            found = [message for message in found if not message["read_at"]]
+        headers = {"X-Total-Count": len(found), "X-Total-Offset": offset, "X-Total-Limit": limit}
+        page = found[offset : offset + limit]
+        return Reply(200, _json(page), {name: str(value) for name, value in headers.items()})
+
+    def _mark_read(self, uuid: Any) -> Reply:
+        with self._lock:
+            for message in self._messages:
+                if message["uuid"] == uuid:
+                    message["read_at"] = _now()
+                    return Reply(200, _json({"code": 0}))
+        return Reply(404, _json({"code": 1}))
+
+    def _tip(self, user: Any) -> Reply:
+        with self._lock:
+            message = self._tips.get(user)
+        return Reply(200, _json({"code": 0, "data": {"result": message is not None, "msg": message or ""}}))
+
+
+def _json(value: Any) -> bytes:
+    return json.dumps(value, ensure_ascii=False).encode()
+
+
+def _json_object(body: bytes) -> dict[str, Any]:
+    try:
+        value = json.loads(body)
+    except ValueError:
+        return {}
+    return value if isinstance(value, dict) else {}
+
+
+def _now() -> str:
+    return datetime.now().strftime("%Y-%m-%d %H:%M:%S")

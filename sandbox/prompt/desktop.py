@@ -1,0 +1,50 @@
+"""The notification service of the person's own desktop, outside the box."""
+
+from __future__ import annotations
+
+import html
+import json
+import sys
+from typing import IO, Any
+
+import dbus
+
+from sandbox.outside import Trouble
+
+_NAME = "org.freedesktop.Notifications"
+_PATH = "/org/freedesktop/Notifications"
+
+
+class Desktop:
+    """Shows what comes from the box; Trouble when this desktop has no notification service."""
+
+    def __init__(self) -> None:
+        try:
+            self._service = self._find(dbus.SessionBus())
+            self._reads_markup = "body-markup" in self._service.GetCapabilities()
+        except dbus.DBusException as error:
+            raise Trouble(f"cannot reach {_NAME} on your session bus: {error.get_dbus_message()}") from error
+
+    def relay(self, stream: IO[bytes]) -> None:
+        """Show the notifications until the stream ends."""
+        failed = False
+        for line in stream:
+            if failed:
+                continue  # the box must never wait for a reader
+            try:
+                self._show(**json.loads(line))
+            except dbus.DBusException as error:
+                failed = True
+                message = error.get_dbus_message()
+                print(f"box: your desktop shows no more notifications: {message}", file=sys.stderr)
+
+    def _show(self, app_name: str, summary: str, body: str, timeout: int) -> None:
+        text = html.escape(body, quote=False) if self._reads_markup else body
+        no_hints = dbus.Dictionary(signature="sv")
+        self._service.Notify(
+            app_name, dbus.UInt32(0), "", summary, text, dbus.Array(signature="s"), no_hints, timeout
+        )
+
+    @staticmethod
+    def _find(bus: Any) -> Any:
+        return dbus.Interface(bus.get_object(_NAME, _PATH), _NAME)

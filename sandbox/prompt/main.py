@@ -1,0 +1,47 @@
+"""Command line of the terminal with a prompt."""
+
+from __future__ import annotations
+
+import argparse
+import sys
+from typing import Sequence
+
+from sandbox import layout, outside
+from sandbox.outside import Consumer, Trouble
+from sandbox.users import DOMAIN_USER, LOCAL_USER
+
+
+def run(arguments: Sequence[str]) -> int:
+    """Open a terminal, in a box, and take commands for it; the result is the exit status."""
+    options = _parser().parse_args(arguments)
+    if layout.inside_box():
+        from sandbox.prompt import session  # needs D-Bus, which only the box must have
+
+        return session.run(options)
+    user = LOCAL_USER if options.local else DOMAIN_USER
+    return outside.enter(user, ["box", *arguments], _desktop_relay() if options.mirror else None)
+
+
+def _parser() -> argparse.ArgumentParser:
+    parser = argparse.ArgumentParser(
+        prog="./dev box", description="The simulated terminal with a prompt; commands may also be piped in."
+    )
+    parser.add_argument("--local", action="store_true", help="a local user instead of a domain user")
+    parser.add_argument(
+        "--speed", type=outside.positive, default=1, metavar="N", help="the agent's time runs N times as fast"
+    )
+    parser.add_argument("--log", action="store_true", help="show the agent's own log lines from the start")
+    parser.add_argument(
+        "--mirror", action="store_true", help="show each notification on your own desktop as well"
+    )
+    return parser
+
+
+def _desktop_relay() -> Consumer | None:
+    from sandbox.prompt.desktop import Desktop  # needs D-Bus, which only this option must have
+
+    try:
+        return Desktop().relay
+    except Trouble as trouble:
+        print(f"box: {trouble}; the box goes on without your desktop", file=sys.stderr)
+        return None

@@ -1,0 +1,24 @@
+"""The way of the agent's notifications from the box to the person's own desktop, as JSON lines."""
+
+from __future__ import annotations
+
+import json
+from typing import IO
+
+from sandbox.events import Event, Events
+
+
+class Mirror:
+    """Writes each notification that reaches the box's desktop."""
+
+    def __init__(self, events: Events, stream: IO[bytes]) -> None:
+        self._stream = stream
+        events.subscribe(self._take)
+
+    def _take(self, event: Event) -> None:
+        if (event.target, event.member) != ("notifications", "Notify"):
+            return
+        app_name, _, _, summary, body, _, _, timeout = event.args
+        # Its actions stay behind: nobody outside could carry them out.
+        shown = {"app_name": app_name, "summary": summary, "body": body, "timeout": timeout}
+        self._stream.write(json.dumps(shown).encode() + b"\n")

@@ -1,0 +1,78 @@
+"""The commands of the prompt by name, and how a typed line becomes a call of one."""
+
+from __future__ import annotations
+
+import inspect
+import shlex
+from dataclasses import dataclass
+from typing import Any, Callable, Iterable
+
+from sandbox.prompt.desk import Desk, Refused
+
+Choices = Callable[[Desk], Iterable[str]]
+
+
+@dataclass(frozen=True)
+class Command:
+    """One command: its name, the arguments it takes, what it does, and what may be offered for its first
+    argument. `run` gets the desk and the words after the name."""
+
+    name: str
+    arguments: str
+    help: str
+    choices: Choices
+    run: Callable[..., object]
+
+    @property
+    def usage(self) -> str:
+        """The command as it is typed."""
+        return f"{self.name} {self.arguments}".rstrip()
+
+
+COMMANDS: dict[str, Command] = {}
+
+
+def command(
+    name: str, arguments: str, help: str, choices: Choices = lambda desk: ()
+) -> Callable[[Callable[..., object]], Callable[..., object]]:
+    """Make a function of the desk and some words a command of the prompt."""
+
+    def register(run: Callable[..., object]) -> Callable[..., object]:
+        COMMANDS[name] = Command(name, arguments, help, choices, run)
+        return run
+
+    return register
+
+
+def run_line(desk: Desk, line: str) -> None:
+    """Carry out a typed line; raises Refused. An empty line and one that begins with "#" do nothing."""
+    name, _, rest = line.strip().partition(" ")
+    if not name or name.startswith("#"):
+        return
+    if name not in COMMANDS:
+        raise Refused(f"there is no command '{name}'; see: help")
+    known = COMMANDS[name]
+    words = _words(rest.strip())
+    try:
+        call = inspect.signature(known.run).bind(desk, *words)
+    except TypeError:
+        raise Refused(f"usage: {known.usage}") from None
+    known.run(*call.args)
+
+
+def number(text: str, kind: Callable[[str], Any]) -> Any:
+    """A word as a number of this kind."""
+    try:
+        return kind(text)
+    except ValueError:
+        raise Refused(f"'{text}' is not a number") from None
+
+
+def _words(rest: str) -> list[str]:
+    """The arguments; one that begins with "{" is taken as it stands."""
+    if rest.startswith("{"):
+        return [rest]
+    try:
+        return shlex.split(rest)
+    except ValueError as error:
+        raise Refused(f"cannot read the line: {error}") from None

@@ -1,0 +1,184 @@
+"""A whole terminal: buses, services, files, platform and agent of the box that this program runs in."""
+
+from __future__ import annotations
+
+from functools import cached_property
+from types import TracebackType
+from typing import Callable, Collection, Mapping
+from uuid import uuid4
+
+from sandbox import commands
+from sandbox.agent import Agent
+from sandbox.buses import Bus
+from sandbox.clock import Clock, ManualClock
+from sandbox.events import Events
+from sandbox.fileview import FileView
+from sandbox.peers.base import Peer
+from sandbox.peers.daemon import Daemon
+from sandbox.peers.identity import Identity
+from sandbox.peers.logind import Logind
+from sandbox.peers.notifications import Notifications
+from sandbox.peers.policy_service import PolicyService
+from sandbox.peers.screensaver import ScreenSaver
+from sandbox.peers.session_manager import SessionManager
+from sandbox.platform_server import Platform, trust
+from sandbox.senders import Senders
+from sandbox.users import User, current_user
+
+
+class Terminal:
+    """Fresh buses with every service on them but those named in `absent`, fresh files, an agent that is not
+    started yet. As a context manager it is closed at the end.
+
+    A Terminal must be made inside a box and by one program at a time.
+    """
+
+    def __init__(
+        self, user: User | None = None, clock: Clock | None = None, absent: Collection[str] = ()
+    ) -> None:
+        self.user = current_user()
+        assert user in (None, self.user), f"this box was entered as {self.user.name}"
+        self.events = Events()
+        self.clock: Clock = clock or ManualClock()
+        self.files = FileView(self.user)
+        self.files.reset()
+        self.system_bus = Bus("system", self.user)
+        self.session_bus = Bus("session", self.user)
+        for bus in (self.system_bus, self.session_bus):
+            bus.restart()
+        commands.install_defaults()
+        self.commands = commands.Commands(self.events)
+        self.senders = Senders()
+        self._add_peers()
+        self.agent = Agent(self.events, self.senders)
+        unknown = set(absent) - self.peers.keys()
+        assert not unknown, f"no such peers: {unknown}"
+        for name, peer in self.peers.items():
+            if name not in absent:
+                peer.appear()
+
+    def _add_peers(self) -> None:
+        on_system = (self.system_bus, self.events, self.senders)
+        on_session = (self.session_bus, self.events, self.senders)
+        self.daemon = Daemon(*on_system)
+        self.logind = Logind(*on_system)
+        self.identity = Identity(*on_system)
+        self.policy_service = PolicyService(*on_session)
+        self.notifications = Notifications(*on_session)
+        self.screensaver = ScreenSaver(*on_session)
+        self.session_manager = SessionManager(*on_session)
+        peers: tuple[Peer, ...] = (
+            self.daemon,
+            self.logind,
+            self.identity,
+            self.policy_service,
+            self.notifications,
+            self.screensaver,
+            self.session_manager,
+        )
+        self.peers = {peer.name: peer for peer in peers}
+
+    def __enter__(self) -> Terminal:
+        return self
+
+    def __exit__(
+        self, kind: type[BaseException] | None, error: BaseException | None, trace: TracebackType | None
+    ) -> None:
+        problems = self.shut_down()
+        if problems and error is None:
+            raise AssertionError(self._complaint(problems))
+
+    @cached_property
+    def platform(self) -> Platform:
+        """The platform, which starts serving when it is first looked at; the terminal then has its
+        certificates."""
+        known = trust()
+        self.files.write_certificates(
+            known.authority.certificate, known.terminal.certificate, known.terminal.key
+        )
+        return Platform(self.events)
+
+    def start_agent(
+        self, ready: Callable[[], object] | None = None, extra_env: Mapping[str, str] | None = None
+    ) -> None:
+        """Start the agent and wait until it has announced the session to the daemon and handles messages.
+
+        Without a daemon it is ready once it has logged the user's name; `ready` replaces all of that by a
+        wait of the caller's own.
+        """
+        mark = self.events.mark()
+        self.agent.start(self.clock, extra_env)
+        if ready:
+            ready()
+        elif self.daemon.present:
+            self.events.wait_for(source="velks", target="daemon", member="SendUserStatus", after=mark)
+            self.sync()
+        else:
+            self.events.wait_for(
+                lambda event: "---getusername:" in event.args[0], kind="log", count=2, after=mark
+            )
+
+    def sync(self) -> None:
+        """Return once the agent has handled everything that was sent to it so far, and what it sent to the
+        services because of that is recorded.
+
+        The daemon pushes a policy that is no JSON, which the agent logs and ignores.
+        """
+        token = f"sync {uuid4()}"
+        mark = self.events.mark()
+        self.daemon.push_policy(token)
+        self.events.wait_for(lambda event: token in event.args[0], kind="log", after=mark)
+        for peer in self.peers.values():
+            if peer.present:
+                peer.receive_all_from(self.agent.bus_names(peer.bus))
+
+    def advance(self, seconds: int) -> None:
+        """Move the agent's clock ahead and return once the timers that became due have fired.
+
+        Before, all that was sent to the agent is handled, so that its timers run from now. After the jump the
+        first message wakes the agent up, the second one is handled after the timers.
+        """
+        self.sync()
+        self.jump(seconds)
+        self.sync()
+        self.sync()
+
+    def jump(self, seconds: int) -> None:
+        """Move the agent's clock ahead and wake the agent up, but do not wait for it: it may be blocked."""
+        assert isinstance(self.clock, ManualClock), "only a ManualClock can be moved"
+        self.clock.jump(seconds)
+        self.daemon.push_policy("wake up")
+
+    def violations(self) -> list[str]:
+        """In what the agent broke an interface's contract so far."""
+        return [violation for peer in self.peers.values() for violation in peer.violations]
+
+    def report(self) -> str:
+        """The agent's log and all events, for a person who looks for the cause of a failure."""
+        return f"agent's log:\n{self.agent.log}\n\nevents:\n{self.events.report()}"
+
+    def close(self) -> None:
+        """End everything; an AssertionError tells when the agent broke a contract or died."""
+        problems = self.shut_down()
+        if problems:
+            raise AssertionError(self._complaint(problems))
+
+    def shut_down(self) -> list[str]:
+        """End everything; the result is what was wrong."""
+        problems = []
+        if self.agent.died_unexpectedly:
+            problems.append(f"the agent died: exit status {self.agent.exit_status}")
+        try:
+            self.agent.stop()
+        except AssertionError as error:
+            problems.append(str(error))
+        problems += self.violations()
+        for peer in self.peers.values():
+            peer.leave()
+        self.commands.close()
+        if "platform" in self.__dict__:
+            self.platform.close()
+        return problems
+
+    def _complaint(self, problems: list[str]) -> str:
+        return "\n".join([*problems, self.report()])

@@ -1,0 +1,1 @@
+"""The traffic of a terminal, shown to people line by line while it happens."""

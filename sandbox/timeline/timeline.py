@@ -1,0 +1,129 @@
+"""Prints the traffic as a table that grows while it happens."""
+
+from __future__ import annotations
+
+import io
+import sys
+from contextlib import contextmanager
+from typing import Iterator, Sequence
+
+from rich.console import Console, RenderableType
+from rich.table import Table
+from rich.text import Text
+
+from sandbox.events import Event, Events
+from sandbox.timeline import wording
+from sandbox.timeline.agenttime import AgentTime, minutes
+
+_PLAIN_WIDTH = 130
+_WIDE = 110
+_TIME, _ROUTE, _GAP = 5, 27, 2
+_REMARK = "dim italic"
+_LOG_KINDS = ("log", "output")
+
+
+def console_for_people() -> Console:
+    """Standard output: as wide as the terminal, or plain text of a readable width where there is none."""
+    return Console(width=None if sys.stdout.isatty() else _PLAIN_WIDTH, highlight=False, soft_wrap=False)
+
+
+def console_for_picture() -> Console:
+    """A console that only records, with colours."""
+    return Console(width=_PLAIN_WIDTH, highlight=False, record=True, file=io.StringIO(), force_terminal=True)
+
+
+class Timeline:
+    """Shows each event in a line: agent time, who to whom, what, and what it means."""
+
+    def __init__(
+        self, events: Events, time: AgentTime, consoles: Sequence[Console], show_log: bool = False
+    ) -> None:
+        self.time = time
+        self.show_log = show_log
+        self._consoles = consoles
+        self._is_open = True
+        events.subscribe(self._take)
+
+    def print(self, what: RenderableType = "") -> None:
+        """Print something between the lines."""
+        for console in self._consoles:
+            console.print(what)
+
+    def end(self) -> None:
+        """Show no more events."""
+        self._is_open = False
+
+    @contextmanager
+    def waiting(self, words: str) -> Iterator[None]:
+        """On a terminal, show under the last line what is waited for, and the running agent time."""
+        console = self._consoles[0]
+        if not console.is_terminal:
+            yield
+            return
+        with console.status(_Waiting(words, self.time), spinner="dots", refresh_per_second=8):
+            yield
+
+    def shows(self, event: Event) -> bool:
+        """Whether an event makes a line."""
+        if event.kind in _LOG_KINDS:
+            return self.show_log
+        return not _is_probe(event)
+
+    def _take(self, event: Event) -> None:
+        if event.kind == "life" and event.target == "velks":
+            self.time.started(event)
+        if self._is_open and self.shows(event):
+            for console in self._consoles:
+                console.print(self._line(event, console.width))
+
+    def _line(self, event: Event, width: int) -> Table:
+        line = Table.grid(padding=(0, _GAP, 0, 0), pad_edge=False)
+        line.add_column(width=_TIME)
+        line.add_column(width=_ROUTE)
+        rest = width - _TIME - _ROUTE - 2 * _GAP
+        cells = [Text(minutes(self.time.of(event)), "dim"), _route(event)]
+        if width < _WIDE or event.kind in _LOG_KINDS:
+            line.add_column(max_width=rest, overflow="fold")
+            cells.append(_stacked(event))
+        else:
+            half = rest * 11 // 20
+            line.add_column(width=half - _GAP, overflow="fold")
+            line.add_column(max_width=rest - half, overflow="fold")
+            cells += [Text(wording.what(event)), Text(wording.meaning(event), _REMARK)]
+        line.add_row(*cells)
+        return line
+
+
+def _stacked(event: Event) -> Text:
+    """What was said and, under it, what it means."""
+    style = "dim" if event.kind in _LOG_KINDS else ""
+    means = wording.meaning(event)
+    return Text.assemble((wording.what(event), style), ("\n" + means if means else "", _REMARK))
+
+
+class _Waiting:
+    """Rendered afresh with each refresh of the status line."""
+
+    def __init__(self, words: str, time: AgentTime) -> None:
+        self._words = words
+        self._time = time
+
+    def __rich__(self) -> Text:
+        return Text(f"agent time {minutes(self._time.now())}, waiting for: {self._words}", "dim")
+
+
+def _route(event: Event) -> Text:
+    if event.kind == "life":
+        return _participant(event.target if event.source == "box" else event.source)
+    if event.kind in _LOG_KINDS:
+        return Text("agent's log", "dim")
+    return Text.assemble(_participant(event.source), " ", ("→", "dim"), " ", _participant(event.target))
+
+
+def _participant(name: str) -> Text:
+    return Text(wording.who(name), {"velks": "bold cyan", "stranger": "bold red"}.get(name, "green"))
+
+
+def _is_probe(event: Event) -> bool:
+    """Whether this is the terminal's own question whether the agent has handled all that was sent so far."""
+    return event.member == "pushPolicyMsg" and event.args[1].startswith("sync ")

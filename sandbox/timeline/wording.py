@@ -1,0 +1,113 @@
+"""Puts an event into words: what was said and what it means."""
+
+from __future__ import annotations
+
+import json
+from typing import Any, Callable
+
+from sandbox.events import Event
+from sandbox.timeline import glosses
+
+_LONGEST = 160
+_NAMES = {
+    "velks": "agent",
+    "*": "everyone",
+    "policy_service": "policy service",
+    "identity": "identity service",
+    "session_manager": "session manager",
+    "screensaver": "screen saver",
+    "restore_config": "restore script",
+}
+
+
+def who(name: str) -> str:
+    """A participant's name for people."""
+    return _NAMES.get(name, name)
+
+
+def what(event: Event) -> str:
+    """What was said, in a line."""
+    known = _WHAT.get(event.member)
+    text = known(event) if known else _WHAT_OF_KIND.get(event.kind, _call)(event)
+    return text if len(text) <= _LONGEST else text[: _LONGEST - 1] + "…"
+
+
+def meaning(event: Event) -> str:
+    """What it means, empty when what was said speaks for itself."""
+    known = _MEANING.get(event.member)
+    return known(event.args) if known else ""
+
+
+def _call(event: Event) -> str:
+    return f"{event.member}({', '.join(_value(arg) for arg in event.args)})"
+
+
+def _value(value: Any) -> str:
+    return json.dumps(value, ensure_ascii=False, default=str)
+
+
+def _notify(event: Event) -> str:
+    actions = [f" [{label}]" for label in event.args[5][1::2]]
+    return f"Notify “{event.args[3]}” “{event.args[4]}”{''.join(actions)}"
+
+
+def _property_change(event: Event) -> str:
+    return ", ".join(f"{name} = {_value(value)}" for name, value in event.args[1].items())
+
+
+_WHAT: dict[str, Callable[[Event], str]] = {
+    "Notify": _notify,
+    "pushPolicyMsg": lambda event: f"pushPolicyMsg {event.args[1]}",
+    "onPolicyMsg": lambda event: f"onPolicyMsg {event.args[0]}",
+    "PropertiesChanged": _property_change,
+    "Get": lambda event: f"Get {event.args[1]}",
+    "Set": lambda event: f"Set {event.args[1]} = {_value(event.args[2])}",
+}
+_WHAT_OF_KIND: dict[str, Callable[[Event], str]] = {
+    "command": lambda event: " ".join((event.member, *event.args)),
+    "file": lambda event: f"{event.member} = {event.args[0]}",
+    "life": lambda event: event.member,
+    "log": lambda event: f"{event.member}: {event.args[0]}",
+    "output": lambda event: str(event.args[0]),
+    "http": lambda event: " ".join(event.args),
+}
+
+
+def _notice_meaning(args: tuple[Any, ...]) -> str:
+    gloss = glosses.NOTICES.get(args[4], "")
+    actions = [f"[{glosses.ACTIONS.get(label, label)}]" for label in args[5][1::2]]
+    return " ".join((gloss, *actions))
+
+
+def _policy_meaning(args: tuple[Any, ...]) -> str:
+    try:
+        policy = json.loads(args[1])
+        words = glosses.POLICIES.get(policy["type"], "a policy that the session agent passes on")
+        concerned = policy.get("payload", {}).get("uid")
+    except (ValueError, KeyError, TypeError, AttributeError):
+        return "no policy"
+    return words if concerned is None else f"{words}: uid {concerned}"
+
+
+def _change_meaning(args: tuple[Any, ...]) -> str:
+    return "; ".join(glosses.CHANGES.get(change, "") for change in args[1].items())
+
+
+_MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
+    "appears": lambda args: "on the bus",
+    "leaves": lambda args: "gone from the bus",
+    "UpdateUserInfo": lambda args: "whose session this is",
+    "SendUserStatus": lambda args: glosses.STATUSES.get(args[0], ""),
+    "pushPolicyMsg": _policy_meaning,
+    "pushOnlineMsg": lambda args: "sessions, announce yourselves",
+    "onPolicyMsg": lambda args: "passed on for the policy service to carry out",
+    "onDomainConfig": lambda args: "take the terminal out of the domain's configuration",
+    "Notify": _notice_meaning,
+    "PropertiesChanged": _change_meaning,
+    "Get": lambda args: glosses.PROPERTIES.get(args[1], ""),
+    "Set": lambda args: "switched off" if args[2] is False else "",
+    "Terminate": lambda args: "forced log-out",
+    "Reboot": lambda args: "forced reboot",
+    "systemctl": lambda args: "the policy service is stopped for all users" if "stop" in args else "",
+    "restore_config": lambda args: "what the daemon changed on the terminal is undone",
+}

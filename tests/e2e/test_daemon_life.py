@@ -1,0 +1,125 @@
+"""The daemon is absent, comes, restarts, hangs: what it is told of the user and when."""
+
+from __future__ import annotations
+
+from sandbox.events import Event
+from sandbox.peers.fault import Fault
+from sandbox.terminal import Terminal
+from wire import FIVE_MINUTES, log_lines, next_notification, next_status
+
+
+def announcements(terminal: Terminal, after: int) -> list[tuple[str, tuple[object, ...]]]:
+    """The agent's calls at the daemon since a mark."""
+    calls = terminal.events.all(source="velks", target="daemon", kind="call", after=after)
+    return [(call.member, call.args) for call in calls]
+
+
+def agent_listens(terminal: Terminal, after: int) -> Event:
+    """Wait until an agent that finds no daemon has come up."""
+    terminal.events.wait_for(
+        lambda event: "---getusername:" in event.args[0], kind="log", count=2, after=after
+    )
+    return terminal.events.all(kind="log", after=after)[-1]
+
+
+def test_daemon_that_comes_later_is_told_by_its_online_signal(terminal: Terminal) -> None:
+    terminal.daemon.leave()
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    agent_listens(terminal, mark)
+
+    terminal.session_manager.set("Locked", True)
+    terminal.daemon.appear(announce=True)
+    assert next_status(terminal, mark) == (2, "zhang.wei")
+    assert announcements(terminal, mark) == [
+        ("UpdateUserInfo", ("zhang.wei", 20001)),
+        ("SendUserStatus", (2, "zhang.wei")),
+    ]
+
+
+def test_daemon_that_appears_silently_is_told_nothing_until_the_next_report(terminal: Terminal) -> None:
+    terminal.daemon.leave()
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.appear()
+    terminal.sync()
+    assert announcements(terminal, mark) == []
+    terminal.advance(FIVE_MINUTES)
+    assert next_status(terminal, mark) == (1, "zhang.wei")
+
+
+def test_every_online_signal_is_answered(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.push_online()
+    terminal.daemon.push_online()
+    next_status(terminal, mark, count=2)
+    assert [member for member, _ in announcements(terminal, mark)] == ["UpdateUserInfo", "SendUserStatus"] * 2
+
+
+def test_online_signal_is_logged_with_name_and_uid(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.push_online()
+    next_status(terminal, mark)
+    assert 'velkg restart sendonline   "zhang.wei" 20001' in log_lines(terminal, mark)
+
+
+def test_restarted_daemon_is_announced_to_and_obeyed(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.leave()
+    terminal.daemon.appear(announce=True)
+    next_status(terminal, mark)
+    terminal.daemon.push_policy({"type": 1300})
+    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+
+
+def test_daemon_that_never_answers_is_still_told_and_obeyed(terminal: Terminal) -> None:
+    terminal.daemon.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    terminal.daemon.push_policy({"type": 1300})
+    next_notification(terminal, mark)
+    terminal.advance(FIVE_MINUTES)
+    next_status(terminal, mark, count=2)
+
+
+def test_daemon_that_refuses_every_call_changes_nothing(terminal: Terminal) -> None:
+    terminal.daemon.fault = Fault.fail()
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    terminal.advance(FIVE_MINUTES)
+    next_status(terminal, mark, count=2)
+    assert terminal.events.all(kind="log", member="warning", after=mark) == []
+
+
+def test_name_known_at_start_is_announced_even_if_it_changed_since(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.logind.rename("@later")
+    mark = terminal.events.mark()
+    terminal.daemon.push_online()
+    assert next_status(terminal, mark) == (1, "later")
+    assert announcements(terminal, mark)[0] == ("UpdateUserInfo", ("zhang.wei", 20001))
+
+
+def test_signals_during_a_slow_start_are_handled_after_it_in_their_order(terminal: Terminal) -> None:
+    terminal.logind.fault = Fault.hold()
+    mark = terminal.events.mark()
+
+    def signals_come_while_the_name_is_read() -> None:
+        terminal.events.wait_for(target="logind", member="Get", count=2, after=mark)
+        terminal.daemon.push_online()
+        terminal.daemon.push_policy({"type": 1201})
+        terminal.logind.release()
+
+    terminal.start_agent(ready=signals_come_while_the_name_is_read)
+    next_notification(terminal, mark)
+    assert announcements(terminal, mark) == [
+        ("UpdateUserInfo", ("zhang.wei", 20001)),
+        ("SendUserStatus", (1, "zhang.wei")),
+        ("UpdateUserInfo", ("zhang.wei", 20001)),
+        ("SendUserStatus", (1, "zhang.wei")),
+    ]
+    terminal.advance(60)
+    terminal.events.wait_for(target="logind", member="Terminate", after=mark)

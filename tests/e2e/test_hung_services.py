@@ -1,0 +1,97 @@
+"""Services that accept calls and never answer: each costs the D-Bus limit of 25 s and no more."""
+
+from __future__ import annotations
+
+import pytest
+
+from sandbox.peers.fault import Fault
+from sandbox.terminal import Terminal
+from wire import forced_actions, next_notification, next_status
+
+DBUS_LIMIT = 25
+
+
+def test_hung_login_manager_at_start_gives_an_empty_name(terminal: Terminal) -> None:
+    terminal.logind.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.start_agent(
+        ready=lambda: terminal.events.wait_for(target="logind", member="Get", count=2, after=mark)
+    )
+    terminal.jump(DBUS_LIMIT)
+    announced = terminal.events.wait_for(target="daemon", member="UpdateUserInfo", after=mark)
+    assert announced.args == ("", 0)
+    assert next_status(terminal, mark) == (1, "")
+
+
+@pytest.mark.parametrize(
+    ("hung", "status"), [("screensaver", 2), ("session_manager", 3), ("logind", 3)], ids=str
+)
+def test_hung_service_reads_as_no_and_the_report_comes(terminal: Terminal, hung: str, status: int) -> None:
+    terminal.screensaver.run()
+    terminal.session_manager.set("Locked", True)
+    terminal.start_agent()
+    terminal.peers[hung].fault = Fault.hang()
+    mark = terminal.events.mark()
+
+    terminal.daemon.push_online()
+    terminal.events.wait_for(target=hung, member="Get", after=mark)
+    terminal.jump(DBUS_LIMIT)
+    assert next_status(terminal, mark) == (status, "" if hung == "logind" else "zhang.wei")
+
+
+def test_hung_notifications_delay_a_policy_by_the_limit_and_the_log_out_still_comes(
+    terminal: Terminal,
+) -> None:
+    terminal.start_agent()
+    terminal.notifications.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1201})
+    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
+    terminal.daemon.push_policy({"type": 5})
+    terminal.jump(DBUS_LIMIT)
+    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+
+    # The minute begins when the warning has been tried.
+    terminal.advance(59)
+    assert forced_actions(terminal, mark) == []
+    terminal.advance(1)
+    assert forced_actions(terminal, mark) == ["Terminate"]
+
+
+def test_failed_warning_is_logged(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.notifications.fault = Fault.fail("com.norix.Error")
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1201})
+    terminal.sync()
+    warnings = terminal.events.all(kind="log", member="warning", after=mark)
+    assert [line.args[0] for line in warnings] == ['--@@@@-- QDBusError("com.norix.Error", "told to fail")']
+
+
+def test_hung_login_manager_at_the_forced_action_does_not_stop_later_policies(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1201})
+    next_notification(terminal, mark)
+    terminal.sync()
+    terminal.logind.fault = Fault.hang()
+    terminal.jump(60)
+    terminal.events.wait_for(target="logind", member="Terminate", after=mark)
+    terminal.daemon.push_policy({"type": 5})
+    terminal.jump(DBUS_LIMIT)
+    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+
+
+@pytest.mark.real_time
+def test_limit_holds_by_the_clock_on_the_wall(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.notifications.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1300})
+    terminal.daemon.push_policy({"type": 5})
+    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark, timeout=120)
+    assert [line.args[0] for line in terminal.events.all(kind="log", member="warning", after=mark)] == [
+        '--@@@@-- QDBusError("org.freedesktop.DBus.Error.NoReply", "Did not receive a reply. Possible causes '
+        "include: the remote application did not send a reply, the message bus security policy blocked the "
+        'reply, the reply timeout expired, or the network connection was broken.")'
+    ]

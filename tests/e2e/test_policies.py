@@ -1,0 +1,225 @@
+"""Policy messages: what each code does in the session of a domain user."""
+
+from __future__ import annotations
+
+import json
+
+import pytest
+
+from sandbox.terminal import Terminal
+from wire import Notification, forced_actions, log_lines, next_notification, settled
+
+REMINDER = "提醒"
+
+
+def plain(body: str, timeout: int) -> Notification:
+    """The agent's plain notification with its own title."""
+    return Notification(REMINDER, 0, "velkw", REMINDER, body, [], {}, timeout)
+
+
+@pytest.fixture
+def session(terminal: Terminal) -> Terminal:
+    """A terminal whose agent is ready."""
+    terminal.start_agent()
+    return terminal
+
+
+@pytest.mark.parametrize(
+    ("code", "warning"),
+    [
+        (1201, "当前终端已被管理员停用，1分钟后强制注销"),
+        (1202, "您的帐号已被管理员删除，1分钟后强制注销"),
+        (1203, "您的帐号已被管理员停用，1分钟后强制注销"),
+    ],
+)
+def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, code: int, warning: str) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": code, "payload": {"uid": session.user.uid}})
+
+    assert next_notification(session, mark) == plain(warning, timeout=-1)
+    session.advance(59)
+    assert forced_actions(session, mark) == []
+    session.advance(1)
+    assert forced_actions(session, mark) == ["Terminate"]
+    session.advance(120)
+    assert forced_actions(session, mark) == ["Terminate"]
+
+
+def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 1201})
+    next_notification(session, mark)
+    session.advance(60)
+
+    call = session.events.wait_for(target="logind", member="Terminate", after=mark)
+    assert call.detail["path"] == "/org/freedesktop/login1/session/auto"
+    assert call.detail["interface"] == "org.freedesktop.login1.Session"
+    assert call.args == ()
+
+
+@pytest.mark.parametrize("code", [1202, 1203])
+@pytest.mark.parametrize(
+    "payload",
+    [
+        {"payload": {"uid": 20002}},
+        {"payload": {"uid": "20001"}},
+        {"payload": {"uid": 20001.5}},
+        {"payload": {}},
+        {"payload": 20001},
+        {"uid": 20001},
+        {},
+    ],
+    ids=str,
+)
+def test_account_policy_for_anyone_else_does_nothing(
+    session: Terminal, code: int, payload: dict[str, object]
+) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": code, **payload})
+
+    assert settled(session, mark) == []
+    session.advance(60)
+    assert forced_actions(session, mark) == []
+
+
+def test_account_check_is_logged_with_both_uids(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 1202, "payload": {"uid": 7}})
+    session.sync()
+    assert "sendUID : 7 , localUID: 20001 ,flag : false" in log_lines(session, mark)
+
+
+@pytest.mark.parametrize(("code", "notice"), [(1300, "该终端1分钟后进行关机"), (1301, "该终端1分钟后进行重启")])
+def test_shutdown_and_reboot_notices_are_notices_only(session: Terminal, code: int, notice: str) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": code})
+
+    assert next_notification(session, mark) == plain(notice, timeout=0)
+    assert [event.member for event in settled(session, mark)] == ["Notify"]
+    session.advance(60)
+    assert forced_actions(session, mark) == []
+
+
+def test_password_change_is_asked_of_a_domain_user(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 1304})
+
+    notice = "管理员调整密码规则，避免影响登录，请及时修改密码"
+    assert next_notification(session, mark) == plain(notice, timeout=0)
+    assert [event.member for event in settled(session, mark)] == ["Notify"]
+
+
+@pytest.mark.parametrize(
+    "payload",
+    [
+        '{"type":5}',
+        '{"type":0}',
+        '{"type":-1}',
+        '{"type":1199}',
+        '{"type":1204}',
+        '{"type":1302}',
+        '{"type":1303}',
+        '{"type":1305}',
+        '{"type":"1201"}',
+        '{"type":1201.5}',
+        '{"type":99999999999}',
+        '{"type":null}',
+        '{"type":{"type":1201}}',
+        ' {"type" : 5,\n "text": "a \\"quoted\\" %1 text", "payload":{"uid":20001} }\n',
+        '{"type":5,"text":"终端😀"}',
+    ],
+)
+def test_any_other_code_is_forwarded_unchanged(session: Terminal, payload: str) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy(payload)
+
+    done = settled(session, mark)
+    assert [(event.target, event.member, event.args) for event in done] == [
+        ("policy_service", "onPolicyMsg", (payload,))
+    ]
+    assert done[0].detail["signature"] == "s"
+    assert done[0].detail["path"] == "/com/norix/velk/prys"
+
+
+@pytest.mark.parametrize(
+    "payload",
+    [
+        "",
+        "no JSON",
+        "null",
+        "5",
+        '[{"type":1201}]',
+        '{"Type":1201}',
+        '{"payload":{"type":1201}}',
+        '{"type":1201',
+        '{"type":1201} x',
+        '{"type":1201,"name":"é"}',
+        '{"type":1201，"name":"a"}',
+    ],
+)
+def test_text_that_is_no_policy_is_logged_and_ignored(session: Terminal, payload: str) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy(payload)
+
+    assert settled(session, mark) == []
+    quoted = json.dumps(payload, ensure_ascii=False)
+    assert f"onPolicyMsg ---------payload: {quoted}" in log_lines(session, mark)
+
+
+def test_characters_outside_latin1_do_not_hide_a_policy(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy('{"type":1300,"reason":"停用"}')
+    assert next_notification(session, mark).body == "该终端1分钟后进行关机"
+
+
+def test_second_policy_restarts_the_minute_and_its_kind_wins(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 1200})
+    next_notification(session, mark)
+    session.advance(30)
+    session.daemon.push_policy({"type": 1201})
+    next_notification(session, mark, count=2)
+
+    session.advance(59)
+    assert forced_actions(session, mark) == []
+    session.advance(1)
+    assert forced_actions(session, mark) == ["Terminate"]
+    session.advance(60)
+    assert forced_actions(session, mark) == ["Terminate"]
+
+
+@pytest.mark.parametrize("later", [{"type": 1300}, {"type": 1304}, {"type": 5}, "no JSON"], ids=str)
+def test_no_other_message_stops_the_countdown(session: Terminal, later: str | dict[str, object]) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 1201})
+    next_notification(session, mark)
+    session.advance(30)
+    session.daemon.push_policy(later)
+    session.advance(30)
+    assert forced_actions(session, mark) == ["Terminate"]
+
+
+def test_forced_action_that_fails_is_one_warning(session: Terminal) -> None:
+    session.logind.leave()
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 1201})
+    next_notification(session, mark)
+    session.advance(60)
+
+    warnings = session.events.all(kind="log", member="warning", after=mark)
+    assert len(warnings) == 1
+    assert "Terminate" in warnings[0].args[0]
+
+
+def test_forwarding_to_an_absent_policy_service_is_silent(session: Terminal) -> None:
+    session.policy_service.leave()
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 5, "lost": True})
+    session.sync()
+    assert session.events.all(kind="log", member="warning", after=mark) == []
+
+    session.policy_service.appear()
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 5, "lost": False})
+    arrived = session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+    assert json.loads(arrived.args[0])["lost"] is False

@@ -1,0 +1,95 @@
+"""The process itself: its log, its command line, its environment, its end."""
+
+from __future__ import annotations
+
+import pytest
+
+from sandbox.terminal import Terminal
+from sandbox.users import User
+from wire import FIVE_MINUTES, log_lines, next_status
+
+
+def test_log_calls_carry_file_line_and_function(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy("no JSON")
+    terminal.sync()
+    entry = terminal.events.all(kind="log", after=mark)[0]
+    assert entry.member == "info"
+    assert entry.detail["file"] == "src/velk/velks/message_transfer.cpp"
+    assert entry.detail["line"] > 0
+    assert "MessageTransfer::onPolicyMsg" in entry.detail["function"]
+
+
+def test_login_name_is_logged_as_it_is_and_without_its_first_at_sign(terminal: Terminal) -> None:
+    terminal.files.write_accounts(User("@@zhang@wei", terminal.user.uid))
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    names = [line for line in log_lines(terminal, mark) if "getusername:" in line]
+    assert names == [
+        'getCurrentLoginUser getusername: "@@zhang@wei"',
+        '---getusername: "@@zhang@wei"',
+        '---getusername: "@zhang@wei"',
+    ]
+
+
+def test_user_without_account_entry_has_an_empty_login_name(terminal: Terminal) -> None:
+    terminal.files.write_accounts()
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    assert [line for line in log_lines(terminal, mark) if "getusername:" in line] == [
+        '---getusername: ""',
+        '---getusername: ""',
+    ]
+    assert next_status(terminal, mark) == (1, "zhang.wei")
+
+
+def test_arguments_are_not_read(terminal: Terminal) -> None:
+    mark = terminal.events.mark()
+    terminal.agent.start(terminal.clock, extra_argv=["--help", "--version", "--test"])
+    assert next_status(terminal, mark) == (1, "zhang.wei")
+
+
+def test_binary_knows_no_variable_of_ours(terminal: Terminal) -> None:
+    assert b"VELK_" not in terminal.agent.binary.read_bytes()
+
+
+def test_no_services_at_all_do_not_keep_the_agent_from_running(terminal: Terminal) -> None:
+    for peer in terminal.peers.values():
+        peer.leave()
+    terminal.start_agent()
+    terminal.daemon.appear()
+    mark = terminal.events.mark()
+    terminal.advance(FIVE_MINUTES)
+    assert next_status(terminal, mark) == (1, "")
+
+
+@pytest.mark.parametrize("variable", ["DBUS_SESSION_BUS_ADDRESS", "DBUS_SYSTEM_BUS_ADDRESS"])
+def test_bus_that_is_not_there_does_not_crash_the_agent(terminal: Terminal, variable: str) -> None:
+    """The agent must come up to its event loop."""
+    mark = terminal.events.mark()
+    terminal.start_agent(
+        ready=lambda: terminal.events.wait_for(
+            lambda event: "---getusername:" in event.args[0], kind="log", count=2, after=mark
+        ),
+        extra_env={variable: "unix:path=/nowhere"},
+    )
+    assert terminal.agent.alive
+
+
+def test_memory_of_many_policies_is_given_back(terminal: Terminal) -> None:
+    terminal.start_agent()
+    payload = '{"type":5,"text":"' + "x" * 10000 + '"}'
+
+    def burst() -> int:
+        mark = terminal.events.mark()
+        for _ in range(500):
+            terminal.daemon.push_policy(payload)
+        terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark, count=500)
+        terminal.sync()
+        return terminal.agent.resident_bytes()
+
+    warm = max(burst() for _ in range(3))
+    last = [burst() for _ in range(8)][-1]
+    one_burst = 500 * len(payload)
+    assert last - warm < one_burst

@@ -1,0 +1,165 @@
+"""What the daemon is told of the session: active (1), locked (2), behind the screen saver (3)."""
+
+from __future__ import annotations
+
+from typing import Any
+
+import pytest
+
+from sandbox.peers.exported import Reply
+from sandbox.peers.fault import Fault
+from sandbox.terminal import Terminal
+from wire import FIVE_MINUTES, log_lines, next_status
+
+ACTIVE, LOCKED, SCREEN_SAVER = 1, 2, 3
+
+
+def five_minute_report(terminal: Terminal) -> tuple[Any, ...]:
+    """Let five minutes pass; the result is the status report that they bring."""
+    mark = terminal.events.mark()
+    terminal.advance(FIVE_MINUTES)
+    return next_status(terminal, mark)
+
+
+def show(terminal: Terminal, running: bool, locked: bool) -> None:
+    """Set what the desktop's two services answer."""
+    terminal.screensaver.set("isRunning", running)
+    terminal.session_manager.set("Locked", locked)
+
+
+@pytest.mark.parametrize(
+    ("running", "locked", "status"),
+    [
+        (False, False, ACTIVE),
+        (False, True, LOCKED),
+        (True, False, SCREEN_SAVER),
+        (True, True, SCREEN_SAVER),
+    ],
+)
+def test_screen_saver_goes_before_lock(terminal: Terminal, running: bool, locked: bool, status: int) -> None:
+    show(terminal, running, locked)
+    terminal.start_agent()
+    assert five_minute_report(terminal) == (status, "zhang.wei")
+
+
+@pytest.mark.parametrize(
+    ("absent", "status"),
+    [
+        (("screensaver",), LOCKED),
+        (("session_manager",), SCREEN_SAVER),
+        (("screensaver", "session_manager"), ACTIVE),
+    ],
+    ids=str,
+)
+def test_absent_service_counts_as_no(terminal: Terminal, absent: tuple[str, ...], status: int) -> None:
+    show(terminal, running=True, locked=True)
+    for name in absent:
+        terminal.peers[name].leave()
+    terminal.start_agent()
+    assert five_minute_report(terminal)[0] == status
+
+
+def test_each_present_service_is_logged(terminal: Terminal) -> None:
+    show(terminal, running=True, locked=False)
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    five_minute_report(terminal)
+    states = [line for line in log_lines(terminal, mark) if line.startswith("get screen")]
+    assert states == ["get screenSaver state  true", "get screenLocked state  false"]
+
+
+def test_absent_service_is_not_logged(terminal: Terminal) -> None:
+    terminal.screensaver.set("isRunning", True)
+    terminal.session_manager.leave()
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    five_minute_report(terminal)
+    assert [line for line in log_lines(terminal, mark) if line.startswith("get screen")] == [
+        "get screenSaver state  true"
+    ]
+    assert terminal.events.all(kind="log", member="warning", after=mark) == []
+
+
+def test_status_at_start_is_active_whatever_the_screen_shows(terminal: Terminal) -> None:
+    show(terminal, running=True, locked=True)
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    assert next_status(terminal, mark) == (ACTIVE, "zhang.wei")
+
+
+def test_report_comes_every_five_minutes_even_without_a_change(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.advance(299)
+    assert terminal.events.all(member="SendUserStatus", after=mark) == []
+    terminal.advance(2)
+    next_status(terminal, mark, count=1)
+    terminal.advance(FIVE_MINUTES)
+    next_status(terminal, mark, count=2)
+    assert len(terminal.events.all(member="SendUserStatus", after=mark)) == 2
+
+
+def test_change_between_two_reports_waits_for_the_next(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.session_manager.set("Locked", True)
+    terminal.advance(299)
+    assert terminal.events.all(member="SendUserStatus", after=mark) == []
+    terminal.advance(2)
+    assert next_status(terminal, mark)[0] == LOCKED
+
+
+def test_name_is_read_afresh_and_loses_every_at_sign(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.logind.rename("@new@name@")
+    assert five_minute_report(terminal) == (ACTIVE, "newname")
+
+
+def test_login_manager_without_user_object_gives_an_empty_name(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.logind.forget_user()
+    assert five_minute_report(terminal) == (ACTIVE, "")
+
+
+WRONG_VALUES = [("s", "true?"), ("as", ["a", "b"]), ("(ii)", (1, 2)), ("a{sv}", {}), ("i", 7)]
+
+
+@pytest.mark.parametrize(("signature", "value"), WRONG_VALUES, ids=str)
+def test_properties_of_another_type_do_not_keep_the_report_back(
+    terminal: Terminal, signature: str, value: Any
+) -> None:
+    terminal.screensaver.set("isRunning", value, signature)
+    terminal.session_manager.set("Locked", value, signature)
+    terminal.start_agent()
+    status, name = five_minute_report(terminal)
+    assert status in (ACTIVE, LOCKED, SCREEN_SAVER)
+    assert name == "zhang.wei"
+
+
+@pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
+@pytest.mark.parametrize("reply", [Reply("", ()), Reply("s", ("bare",))], ids=str)
+def test_replies_of_another_form_read_as_no(terminal: Terminal, service: str, reply: Reply) -> None:
+    show(terminal, running=True, locked=True)
+    terminal.start_agent()
+    terminal.peers[service].answers["Get"] = reply
+    expected = {
+        "logind": (SCREEN_SAVER, ""),
+        "screensaver": (LOCKED, "zhang.wei"),
+        "session_manager": (SCREEN_SAVER, "zhang.wei"),
+    }
+    assert five_minute_report(terminal) == expected[service]
+
+
+@pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
+def test_failing_service_reads_as_no(terminal: Terminal, service: str) -> None:
+    terminal.start_agent()
+    terminal.peers[service].fault = Fault.fail()
+    assert five_minute_report(terminal) == (ACTIVE, "" if service == "logind" else "zhang.wei")
+
+
+@pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
+def test_service_that_does_not_introspect_is_read_all_the_same(terminal: Terminal, service: str) -> None:
+    show(terminal, running=True, locked=True)
+    terminal.peers[service].faults["Introspect"] = Fault.hang()
+    terminal.start_agent()
+    assert five_minute_report(terminal) == (SCREEN_SAVER, "zhang.wei")

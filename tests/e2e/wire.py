@@ -1,0 +1,68 @@
+"""What the agent did, as those on the other side of a wire saw it."""
+
+from __future__ import annotations
+
+from dataclasses import dataclass
+from typing import Any
+from uuid import uuid4
+
+from sandbox.events import Event
+from sandbox.terminal import Terminal
+
+FORWARDED_CODE = 5
+# The agent's five-minute timer is coarse: half a second more or less.
+FIVE_MINUTES = 301
+
+
+@dataclass(frozen=True)
+class Notification:
+    """The arguments of one notification call."""
+
+    application: str
+    replaces: int
+    icon: str
+    summary: str
+    body: str
+    actions: list[str]
+    hints: dict[str, Any]
+    timeout: int
+
+
+def next_notification(terminal: Terminal, after: int, count: int = 1) -> Notification:
+    """The `count`th notification since a mark; waits for it."""
+    event = terminal.events.wait_for(target="notifications", member="Notify", after=after, count=count)
+    assert event.detail["signature"] == "susssasa{sv}i"
+    return Notification(*event.args)
+
+
+def next_status(terminal: Terminal, after: int, count: int = 1) -> tuple[Any, ...]:
+    """Arguments of the `count`th status report at the daemon since a mark; waits for it."""
+    return terminal.events.wait_for(
+        source="velks", target="daemon", member="SendUserStatus", after=after, count=count
+    ).args
+
+
+def forced_actions(terminal: Terminal, after: int) -> list[str]:
+    """Which forced actions the login manager was asked for since a mark."""
+    events = terminal.events.all(source="velks", target="logind", kind="call", after=after)
+    return [event.member for event in events if event.member in ("Reboot", "Terminate")]
+
+
+def settled(terminal: Terminal, after: int) -> list[Event]:
+    """All calls and commands of the agent since a mark, once it has handled all that it was sent.
+
+    A last policy is forwarded to the session policy service: when it arrives there, nothing that the agent
+    did before can still be on its way to a service of the session. That policy itself is left out.
+    """
+    marker = str(uuid4())
+    terminal.daemon.push_policy({"type": FORWARDED_CODE, "marker": marker})
+    terminal.events.wait_for(
+        lambda event: marker in event.args[0], target="policy_service", member="onPolicyMsg", after=after
+    )
+    actions = [event for event in terminal.events.all(source="velks", after=after) if event.kind != "log"]
+    return [event for event in actions if marker not in str(event.args)]
+
+
+def log_lines(terminal: Terminal, after: int) -> list[str]:
+    """What the agent has logged since a mark, the texts alone."""
+    return [event.args[0] for event in terminal.events.all(kind="log", after=after)]

@@ -1,0 +1,123 @@
+"""The services on the buses: what they record, how they fail, what they hold against a caller."""
+
+from __future__ import annotations
+
+from concurrent.futures import ThreadPoolExecutor
+from typing import Any, Iterator
+
+import dbus
+import pytest
+
+from sandbox.peers.fault import Fault
+from sandbox.spoofer import Stranger
+from sandbox.terminal import Terminal
+
+DAEMON = ("com.norix.velk.velkg", "/com/norix/velk/velkg", "com.norix.velk.velkg")
+SCREEN_SAVER = ("com.norix.ScreenSaver", "/com/norix/ScreenSaver", "org.freedesktop.DBus.Properties")
+
+
+@pytest.fixture
+def caller(terminal: Terminal) -> Iterator[Stranger]:
+    """A client of the system bus."""
+    stranger = Stranger(terminal.system_bus)
+    yield stranger
+    stranger.close()
+
+
+def screensaver_runs(terminal: Terminal) -> Any:
+    """The screen saver's property as any client reads it."""
+    stranger = Stranger(terminal.session_bus)
+    try:
+        return stranger.call(*SCREEN_SAVER, "Get", "com.norix.ScreenSaver", "isRunning", signature="ss")
+    finally:
+        stranger.close()
+
+
+def test_a_call_is_recorded_with_its_exact_signature(terminal: Terminal, caller: Stranger) -> None:
+    caller.call(*DAEMON, "SendUserStatus", 3, "zhang", signature="is")
+
+    call = terminal.events.wait_for(target="daemon", member="SendUserStatus")
+    assert (call.source, call.args, call.detail["signature"]) == ("box", (3, "zhang"), "is")
+
+
+@pytest.mark.parametrize(
+    "member, args, signature",
+    [
+        ("SendUserStatus", (3, "zhang"), "us"),
+        ("sendUserStatus", (3, "zhang"), "is"),
+        ("GetServerPort", (1,), "i"),
+    ],
+)
+def test_a_call_that_breaks_the_contract_fails_the_test(
+    member: str, args: tuple[Any, ...], signature: str
+) -> None:
+    terminal = Terminal()
+    caller = Stranger(terminal.system_bus)
+    with pytest.raises(dbus.DBusException):
+        caller.call(*DAEMON, member, *args, signature=signature)
+    caller.close()
+
+    with pytest.raises(AssertionError, match=member):
+        terminal.close()
+
+
+def test_a_failing_service_answers_with_its_error(terminal: Terminal, caller: Stranger) -> None:
+    terminal.daemon.fault = Fault.fail("com.norix.Error.Broken")
+
+    with pytest.raises(dbus.DBusException) as raised:
+        caller.call(*DAEMON, "GetMachineID")
+
+    assert raised.value.get_dbus_name() == "com.norix.Error.Broken"
+
+
+def test_a_fault_of_one_member_spares_the_others(terminal: Terminal, caller: Stranger) -> None:
+    terminal.daemon.faults["GetServerIP"] = Fault.fail()
+
+    assert caller.call(*DAEMON, "GetMachineID") == "box-machine-0001"
+
+
+def test_a_held_call_is_answered_on_release(terminal: Terminal, caller: Stranger) -> None:
+    terminal.daemon.fault = Fault.hold()
+    with ThreadPoolExecutor() as pool:
+        answer = pool.submit(caller.call, *DAEMON, "GetMachineID")
+        terminal.events.wait_for(target="daemon", member="GetMachineID")
+        held = not answer.done()
+        terminal.daemon.release()
+
+    assert (held, answer.result()) == (True, "box-machine-0001")
+
+
+def test_a_hanging_call_ends_with_the_service(terminal: Terminal, caller: Stranger) -> None:
+    terminal.daemon.fault = Fault.hang()
+    with ThreadPoolExecutor() as pool:
+        answer = pool.submit(caller.call, *DAEMON, "GetMachineID")
+        terminal.events.wait_for(target="daemon", member="GetMachineID")
+        terminal.daemon.leave()
+
+    assert "NoReply" in str(answer.exception())
+
+
+def test_a_restarted_service_has_a_new_unique_name(terminal: Terminal) -> None:
+    before = terminal.system_bus.owner("com.norix.velk.velkg")
+
+    terminal.daemon.restart()
+
+    assert terminal.system_bus.owner("com.norix.velk.velkg") not in (before, None)
+
+
+def test_a_restarted_bus_has_lost_its_services(terminal: Terminal) -> None:
+    terminal.session_bus.restart()
+
+    present = {name for name, peer in terminal.peers.items() if peer.present}
+    assert present == {"daemon", "logind", "identity"}
+
+
+def test_a_property_may_have_a_wrong_type(terminal: Terminal) -> None:
+    terminal.screensaver.set("isRunning", "yes", signature="s")
+
+    assert screensaver_runs(terminal) == "yes"
+
+
+def test_an_absent_service_has_no_owner() -> None:
+    with Terminal(absent=("screensaver",)) as terminal:
+        assert terminal.session_bus.owner("com.norix.ScreenSaver") is None
