@@ -6,8 +6,9 @@ import os
 import select
 import signal
 import subprocess
+from concurrent.futures import Future
 from pathlib import Path
-from typing import Any, Literal
+from typing import Any, Iterable, Literal
 from xml.etree import ElementTree
 
 import dbus
@@ -42,6 +43,7 @@ _CONFIG = """<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-Bus Bus Configura
 """
 _SERVICE = ("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus")
 _STOP_SECONDS = 10
+_PING_SECONDS = 20.0
 
 # Never freed: the binding breaks when a connection's end is dispatched after its Python object has gone.
 _every_connection: list[Any] = []
@@ -157,6 +159,11 @@ class Bus:
         """Unique names of the connections that a process has open."""
         return [name for name in self.names() if name.startswith(":") and self.process_of(name) == pid]
 
+    def receive_all_from(self, pid: int) -> None:
+        """Return once everything that a process has sent so far has reached the bus."""
+        names = self.names_of(pid)
+        await_pings(self._control, names)
+
     def ask(self, member: str, signature: str, *args: Any) -> Any:
         """Call a method of the bus itself."""
         return MainLoop.call(self._ask, member, signature, args)
@@ -171,6 +178,25 @@ class Bus:
         connection.set_exit_on_disconnect(False)
         _every_connection.append(connection)
         return connection
+
+
+def await_pings(connection: Any, unique_names: Iterable[str]) -> None:
+    """Return once `connection` has received what these connections have sent to it so far, and the bus what
+    they have sent to anybody.
+
+    Their answer to a ping goes the same road after it; D-Bus libraries give it even while their program is
+    busy.
+    """
+    pings = [MainLoop.call(_ping, connection, name) for name in unique_names]
+    for ping in pings:
+        ping.result(_PING_SECONDS)
+
+
+def _ping(connection: Any, unique_name: str) -> Future[None]:
+    answered: Future[None] = Future()
+    ping = (unique_name, "/", "org.freedesktop.DBus.Peer", "Ping", "", ())
+    connection.call_async(*ping, lambda: answered.set_result(None), answered.set_exception)
+    return answered
 
 
 def _end(pid: int) -> None:

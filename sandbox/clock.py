@@ -3,6 +3,7 @@
 from __future__ import annotations
 
 import os
+from datetime import datetime, timedelta
 from pathlib import Path
 from typing import Protocol
 
@@ -36,17 +37,18 @@ class Accelerated:
 
 
 class ManualClock:
-    """Time that runs as usual and jumps ahead when it is told to.
+    """Time that stands still until it is moved, so that a timer fires at its exact second or not at all.
 
-    A sleeping program does not see a jump before it wakes up: see Terminal.advance.
+    It begins at the host's time, which certificates are valid at. A sleeping program does not see a move
+    before it wakes up: see Terminal.advance.
     """
 
     def __init__(self) -> None:
-        self._ahead = 0
+        self._now = datetime.now().replace(microsecond=0)
         self._write()
 
     def environment(self) -> dict[str, str]:
-        """Preloads the clock, which looks up its offset each time that it is asked."""
+        """Preloads the clock, which looks up the time each time that it is asked."""
         return {
             "LD_PRELOAD": _library(),
             "FAKETIME_TIMESTAMP_FILE": str(layout.CLOCK),
@@ -55,12 +57,12 @@ class ManualClock:
 
     def jump(self, seconds: int) -> None:
         """Move the clock ahead."""
-        self._ahead += seconds
+        self._now += timedelta(seconds=seconds)
         self._write()
 
     def _write(self) -> None:
         fresh = layout.CLOCK.with_suffix(".new")
-        fresh.write_text(f"+{self._ahead}s\n")
+        fresh.write_text(f"{self._now:%Y-%m-%d %H:%M:%S}\n")
         os.replace(fresh, layout.CLOCK)
 
 

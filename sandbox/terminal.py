@@ -117,6 +117,7 @@ class Terminal:
             self.events.wait_for(
                 lambda event: "---getusername:" in event.args[0], kind="log", count=2, after=mark
             )
+            self.receive_all()
 
     def sync(self) -> None:
         """Return once the agent has handled everything that was sent to it so far, and what it sent to the
@@ -128,9 +129,16 @@ class Terminal:
         mark = self.events.mark()
         self.daemon.push_policy(token)
         self.events.wait_for(lambda event: token in event.args[0], kind="log", after=mark)
+        self.receive_all()
+
+    def receive_all(self) -> None:
+        """Return once all that the agent has sent so far, to services that are there or not, is through the
+        buses and recorded."""
+        for bus in (self.system_bus, self.session_bus):
+            bus.receive_all_from(self.agent.pid)
         for peer in self.peers.values():
             if peer.present:
-                peer.receive_all_from(self.agent.bus_names(peer.bus))
+                peer.receive_all_from(self.agent.pid)
 
     def advance(self, seconds: int) -> None:
         """Move the agent's clock ahead and return once the timers that became due have fired.

@@ -2,14 +2,13 @@
 
 from __future__ import annotations
 
-from concurrent.futures import Future
-from typing import Any, Iterable
+from typing import Any
 
 import dbus
 import dbus.bus
 import dbus.lowlevel
 
-from sandbox.buses import Bus
+from sandbox.buses import Bus, await_pings
 from sandbox.events import Events
 from sandbox.mainloop import MainLoop
 from sandbox.peers.exported import PROPERTIES, ExportedObject, Refused, Reply
@@ -20,7 +19,6 @@ from sandbox.senders import Senders
 _HANDLED = dbus.lowlevel.HANDLER_RESULT_HANDLED
 _NOT_HANDLED = dbus.lowlevel.HANDLER_RESULT_NOT_YET_HANDLED
 _CALL = dbus.lowlevel.MESSAGE_TYPE_METHOD_CALL
-_PING_SECONDS = 20.0
 _FAILED = "org.freedesktop.DBus.Error.Failed"
 
 
@@ -95,21 +93,9 @@ class Peer:
         signature = known.contracts[interface].signals[member]
         MainLoop.call(self._emit, known.path, interface, member, signature, args)
 
-    def receive_all_from(self, unique_names: Iterable[str]) -> None:
-        """Return once everything that these connections have sent to the service so far is recorded.
-
-        Their answer to a ping is sent after it on the same road; D-Bus libraries give it even while their
-        program is busy.
-        """
-        pings: list[Future[None]] = [MainLoop.call(self._ping, name) for name in unique_names]
-        for ping in pings:
-            ping.result(_PING_SECONDS)
-
-    def _ping(self, unique_name: str) -> Future[None]:
-        answered: Future[None] = Future()
-        ping = (unique_name, "/", "org.freedesktop.DBus.Peer", "Ping", "", ())
-        self._connection.call_async(*ping, lambda: answered.set_result(None), answered.set_exception)
-        return answered
+    def receive_all_from(self, pid: int) -> None:
+        """Return once everything that a process has sent to the service so far is recorded."""
+        await_pings(self._connection, self.bus.names_of(pid))
 
     def _object(self, path: str | None) -> ExportedObject:
         return self.objects[path] if path else next(iter(self.objects.values()))

@@ -20,7 +20,7 @@ class Desktop:
 
     def __init__(self) -> None:
         try:
-            self._service = self._find(dbus.SessionBus())
+            self._service = self._find(dbus.SessionBus(private=True))
             self._reads_markup = "body-markup" in self._service.GetCapabilities()
         except dbus.DBusException as error:
             raise Trouble(f"cannot reach {_NAME} on your session bus: {error.get_dbus_message()}") from error

@@ -19,7 +19,7 @@ def run(arguments: Sequence[str]) -> int:
 
         return session.run(options)
     user = LOCAL_USER if options.local else DOMAIN_USER
-    return outside.enter(user, ["box", *arguments], _desktop_relay() if options.mirror else None)
+    return outside.enter(user, ["box", *arguments], desktop_relay() if options.mirror else None)
 
 
 def _parser() -> argparse.ArgumentParser:
@@ -37,7 +37,8 @@ def _parser() -> argparse.ArgumentParser:
     return parser
 
 
-def _desktop_relay() -> Consumer | None:
+def desktop_relay() -> Consumer | None:
+    """What shows the notifications on the desktop outside; None, after a line that says why, where nothing can."""
     from sandbox.prompt.desktop import Desktop  # needs D-Bus, which only this option must have
 
     try:

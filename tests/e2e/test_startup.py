@@ -77,6 +77,6 @@ def test_reports_the_session_every_five_minutes(terminal: Terminal) -> None:
 
     terminal.advance(299)
     early = reports(terminal, after=at_start)
-    terminal.advance(2)
+    terminal.advance(1)
 
     assert (early, reports(terminal, after=at_start)) == ([], [("SendUserStatus", 1, DOMAIN_USER.plain_name)])

@@ -42,7 +42,7 @@ def _converse(raw: socket.socket, context: ssl.SSLContext) -> None:
             conversation = Conversation(tls, next(_handshakes))
             while request := conversation.read_request():
                 _print_json(conversation.describe(request))
-                answer(conversation, request.path)
+                answer(conversation, request)
     except (OSError, Over):
         pass  # refused certificates and clients that leave are what the scripts are for
 

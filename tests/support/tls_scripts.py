@@ -9,6 +9,7 @@ import time
 from dataclasses import dataclass, field
 from itertools import chain
 from typing import Any, BinaryIO, Callable
+from urllib.parse import SplitResult, parse_qsl, urlsplit
 
 _REPORTED_BODY = 16 * 1024  # bytes; the reader of the reports may be waiting for the answer just now
 _CLOSE_SECONDS = 5.0
@@ -30,7 +31,16 @@ class Request:
     @property
     def path(self) -> str:
         """Path without query."""
-        return self.line.split(" ")[1].split("?")[0]
+        return self._target.path
+
+    @property
+    def query(self) -> dict[str, str]:
+        """The query's values, decoded."""
+        return dict(parse_qsl(self._target.query))
+
+    @property
+    def _target(self) -> SplitResult:
+        return urlsplit(self.line.split(" ")[1])
 
 
 class Conversation:
@@ -168,11 +178,15 @@ _ENDINGS: dict[str, tuple[bytes, Callable[[Conversation], None]]] = {
 }
 
 
-def answer(conversation: Conversation, path: str) -> None:
-    """Answers a request for the path; raises `Over` when that ends the connection."""
-    if path in _ENDINGS:
-        data, end = _ENDINGS[path]
+def answer(conversation: Conversation, request: Request) -> None:
+    """Answers a request; raises `Over` when that ends the connection. To /said?status=STATUS&body=BODY it
+    says just that."""
+    if request.path in _ENDINGS:
+        data, end = _ENDINGS[request.path]
         conversation.send(data)
         end(conversation)
+    elif request.path == "/said":
+        body = request.query.get("body", "").encode()
+        conversation.send(_reply(body, b"X-Said: yes", status=int(request.query["status"])))
     else:
-        conversation.send(_REPLIES.get(path, _reply)())
+        conversation.send(_REPLIES.get(request.path, _reply)())

@@ -32,3 +32,15 @@ inline HttpOutcome put(HttpClientApi& client, const QString& url, const QString&
     outcome.warnings = recorder.texts();
     return outcome;
 }
+
+/// The outcome in a line, to be compared with kNoResponse.
+inline QString summary(const HttpOutcome& outcome)
+{
+    return QStringLiteral("status %1, reply \"%2\", %3 headers, %4 warnings")
+        .arg(outcome.status)
+        .arg(outcome.reply.left(80))
+        .arg(outcome.headers.size())
+        .arg(outcome.warnings.size());
+}
+
+inline const QString kNoResponse = QStringLiteral("status 0, reply \"\", 0 headers, 1 warnings");

@@ -1,0 +1,126 @@
+"""The tour tells what it saw, and its status whether that was as it should be."""
+
+from __future__ import annotations
+
+import io
+from pathlib import Path
+
+from people import idle_agent, run_program
+from rich.console import Console
+
+from sandbox.clock import RealTime
+from sandbox.demo.scene import NOTHING_SHOWN, Scene, Step, from_agent, never
+from sandbox.demo.scenes import SCENES
+from sandbox.demo.tour import Outcome, Tour
+from sandbox.terminal import Terminal
+from sandbox.timeline.agenttime import AgentTime
+from sandbox.timeline.timeline import Timeline
+
+_PATIENCE = 20.0
+_NO_PATIENCE = 0.01
+
+
+def _play(terminal: Terminal, patience: float, *steps: Step) -> list[Outcome]:
+    timeline = Timeline(terminal.events, AgentTime(1), [Console(file=io.StringIO())])
+    return Tour(terminal, timeline, patience).play({1: Scene("Title", "Sentence.", steps)})
+
+
+def _verdicts(outcomes: list[Outcome]) -> list[str]:
+    return [outcome.verdict for outcome in outcomes]
+
+
+def test_the_whole_tour_goes_as_expected() -> None:
+    ended = run_program("demo")
+
+    assert (ended.returncode, ended.stderr) == (0, ""), ended.stdout
+    assert all(f"{number}. {scene.title}" in ended.stdout for number, scene in enumerate(SCENES, 1))
+    assert "forced log-out" in ended.stdout and "forced reboot" in ended.stdout
+
+
+def test_an_agent_that_does_nothing_fails_the_tour(tmp_path: Path) -> None:
+    ended = run_program("demo", "--patience", "0.01", "--only", "1", agent=idle_agent(tmp_path))
+
+    assert ended.returncode == 1
+    assert "missing" in ended.stdout and "0 of 2 expectations" in ended.stdout
+
+
+def test_an_agent_that_ends_fails_the_tour() -> None:
+    ended = run_program("demo", "--patience", "0.01", "--only", "1", agent=Path("/usr/bin/true"))
+
+    assert ended.returncode == 1
+    assert "the agent died" in ended.stdout
+
+
+def test_chosen_scenes_are_played_after_the_first_one() -> None:
+    ended = run_program("demo", "--only", "5", "--log")
+
+    assert ended.returncode == 0, ended.stdout
+    assert [line[:2] for line in ended.stdout.splitlines() if line.endswith("─") and line[1] == "."] == [
+        "1.",
+        "5.",
+    ]
+    assert "---getusername:" in ended.stdout
+
+
+def test_a_scene_that_does_not_exist_is_one_line() -> None:
+    ended = run_program("demo", "--only", "1,99")
+
+    assert (ended.returncode, ended.stdout) == (1, "")
+    assert ended.stderr == f"demo: there is no scene 99; there are {len(SCENES)}\n"
+
+
+def test_a_missing_agent_is_one_line_that_says_how_to_build_it(tmp_path: Path) -> None:
+    ended = run_program("demo", agent=tmp_path / "velks")
+
+    assert (ended.returncode, ended.stdout) == (1, "")
+    assert ended.stderr == f"demo: there is no agent at {tmp_path}/velks; build it with: ./dev build\n"
+
+
+def test_the_picture_needs_nothing_from_elsewhere_and_tells_nothing_of_the_machine(tmp_path: Path) -> None:
+    picture = tmp_path / "demo.svg"
+
+    ended = run_program("demo", "--only", "4", "--svg", str(picture))
+
+    drawn = picture.read_text()
+    assert ended.returncode == 0, ended.stdout
+    assert "该终端1分钟后进行关机" in drawn
+    assert "@font-face" not in drawn and "url(http" not in drawn and 'url("http' not in drawn
+    assert str(Path.cwd()) not in drawn and str(tmp_path) not in drawn
+
+
+def test_what_is_forbidden_is_told_when_it_comes(terminal: Terminal) -> None:
+    announcement = never("no name", "daemon", "UpdateUserInfo")
+
+    outcomes = _play(
+        terminal, _PATIENCE, Step(lambda terminal: terminal.start_agent(), (announcement, NOTHING_SHOWN))
+    )
+
+    assert _verdicts(outcomes) == ["forbidden", "as expected"]
+
+
+def test_after_a_failure_nothing_more_is_played(terminal: Terminal) -> None:
+    notice = from_agent("a notice", "notifications", "Notify")
+    played: list[str] = []
+
+    outcomes = _play(
+        terminal,
+        _NO_PATIENCE,
+        Step(lambda terminal: None, (notice,)),
+        Step(lambda terminal: played.append("second step"), (notice, NOTHING_SHOWN)),
+    )
+
+    assert _verdicts(outcomes) == ["missing", "not played", "not played"]
+    assert not played
+
+
+def test_arguments_that_differ_are_not_what_was_expected(terminal: Terminal) -> None:
+    def play(name: str) -> list[str]:
+        wanted = from_agent("this name", "daemon", "UpdateUserInfo", name)
+        step = Step(lambda terminal: terminal.daemon.push_online(), (wanted,))
+        return _verdicts(_play(terminal, 0.5, step))
+
+    terminal.clock = RealTime()
+    terminal.start_agent()
+
+    assert play(terminal.user.plain_name) == ["as expected"]
+    assert play(terminal.user.name) == ["missing"]

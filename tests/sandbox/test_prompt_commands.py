@@ -1,0 +1,204 @@
+"""What the commands of the prompt do to the terminal, and how they are refused."""
+
+from __future__ import annotations
+
+import io
+import json
+
+import pytest
+from rich.console import Console
+
+from sandbox.prompt import commands
+from sandbox.prompt.desk import Desk, Refused
+from sandbox.prompt.registry import COMMANDS, run_line
+from sandbox.terminal import Terminal
+from sandbox.timeline.agenttime import AgentTime
+from sandbox.timeline.timeline import Timeline
+from sandbox.users import DOMAIN_USER
+
+assert commands, "importing the module makes its commands known"
+
+
+class Paper(Desk):
+    """A desk whose output can be read."""
+
+    def __init__(self, terminal: Terminal) -> None:
+        self.paper = io.StringIO()
+        console = Console(file=self.paper, width=130)
+        super().__init__(terminal, Timeline(terminal.events, AgentTime(1), [console]), console)
+
+    def lines_with(self, text: str) -> list[str]:
+        """The printed lines that hold a text."""
+        return [line for line in self.paper.getvalue().splitlines() if text in line]
+
+
+@pytest.fixture
+def desk(terminal: Terminal) -> Paper:
+    """A desk at a terminal whose agent is not started."""
+    return Paper(terminal)
+
+
+def _pushed(desk: Desk) -> list[str]:
+    events = desk.terminal.events.all(source="daemon", member="pushPolicyMsg")
+    return [event.args[1] for event in events]
+
+
+def test_a_policy_by_code_makes_the_agent_act(desk: Paper) -> None:
+    desk.terminal.start_agent()
+
+    run_line(desk, "policy 1300")
+
+    shown = desk.terminal.events.wait_for(source="velks", member="Notify")
+    assert shown.args[4] == "该终端1分钟后进行关机"
+    assert desk.lines_with("agent → notifications") and desk.lines_with("this terminal will shut down")
+
+
+def test_a_policy_by_code_and_uid_names_the_account(desk: Paper) -> None:
+    run_line(desk, "policy 1203 20001")
+
+    assert [json.loads(text) for text in _pushed(desk)] == [{"type": 1203, "payload": {"uid": 20001}}]
+
+
+def test_a_policy_in_braces_goes_out_as_it_stands(desk: Paper) -> None:
+    run_line(desk, """  policy {"type" :5,  "text":"it's 校园 }""")
+
+    assert _pushed(desk) == ["""{"type" :5,  "text":"it's 校园 }"""]
+
+
+@pytest.mark.parametrize(
+    ("before", "status"),
+    [
+        ([], 1),
+        (["lock"], 2),
+        (["lock", "saver on"], 3),
+        (["lock", "saver on", "saver off", "unlock"], 1),
+    ],
+)
+def test_the_screen_is_as_told_when_the_agent_announces_itself(
+    desk: Paper, before: list[str], status: int
+) -> None:
+    desk.terminal.start_agent()
+    for line in before:
+        run_line(desk, line)
+
+    run_line(desk, "online")
+
+    report = desk.terminal.events.wait_for(member="SendUserStatus", count=2)
+    assert report.args == (status, DOMAIN_USER.plain_name)
+
+
+def test_a_service_leaves_and_comes_back(desk: Paper) -> None:
+    run_line(desk, "leave notifications")
+    assert desk.terminal.session_bus.owner("com.norix.kpx.Notification") is None
+
+    run_line(desk, "appear notifications")
+    assert desk.terminal.session_bus.owner("com.norix.kpx.Notification")
+
+
+def test_a_restarted_service_is_another_connection(desk: Paper) -> None:
+    before = desk.terminal.system_bus.owner("org.freedesktop.login1")
+
+    run_line(desk, "restart logind")
+
+    assert desk.terminal.system_bus.owner("org.freedesktop.login1") not in (before, None)
+
+
+@pytest.mark.parametrize(
+    ("line", "manner"),
+    [
+        ("hang identity", "hang"),
+        ("slow identity 1.5", "slow (1.5 s)"),
+        ("fail identity", "fail"),
+    ],
+)
+def test_a_service_behaves_as_told_until_it_is_well(desk: Paper, line: str, manner: str) -> None:
+    run_line(desk, line)
+    run_line(desk, "state")
+    run_line(desk, "well identity")
+    run_line(desk, "state")
+
+    ill, well = desk.lines_with("com.norix.velk.iam")
+    assert manner in ill and "well" in well
+
+
+def test_the_state_tells_who_is_away(desk: Paper) -> None:
+    run_line(desk, "leave screensaver")
+
+    run_line(desk, "state")
+
+    (line,) = desk.lines_with("com.norix.ScreenSaver")
+    assert " no " in line
+
+
+def test_help_knows_every_command(desk: Paper) -> None:
+    run_line(desk, "help")
+
+    assert all(desk.lines_with(known.usage) for known in COMMANDS.values())
+
+
+def test_the_agents_log_is_shown_while_it_is_on(desk: Paper) -> None:
+    desk.terminal.start_agent()
+    for line in ("policy 1300", "log on", "policy 1301", "log off", "policy 1304"):
+        run_line(desk, line)
+        desk.terminal.sync()
+
+    assert [
+        code for code in ("1300", "1301", "1304") if desk.lines_with(f'payload: "{{\\"type\\": {code}')
+    ] == ["1301"]
+
+
+def test_each_wait_goes_on_where_the_one_before_ended(desk: Paper) -> None:
+    for _ in range(2):
+        run_line(desk, "online")
+
+    run_line(desk, "wait pushOnlineMsg")
+    run_line(desk, "wait pushOnlineMsg")
+    with pytest.raises(Refused, match="no pushOnlineMsg came within 0.01 s"):
+        run_line(desk, "wait pushOnlineMsg 0.01")
+
+
+def test_quit_ends_the_input(desk: Paper) -> None:
+    with pytest.raises(EOFError):
+        run_line(desk, "quit")
+
+
+@pytest.mark.parametrize("line", ["", "   ", "# policy 1200"])
+def test_empty_lines_and_remarks_do_nothing(desk: Paper, line: str) -> None:
+    run_line(desk, line)
+
+    assert not _pushed(desk)
+
+
+@pytest.mark.parametrize(
+    ("line", "reason"),
+    [
+        ("reboot", "there is no command 'reboot'"),
+        ("policy", "usage: policy CODE"),
+        ("policy 1203 20001 more", "usage: policy CODE"),
+        ("policy soon", "'soon' is not a number"),
+        ("policy 1203 zhang.wei", "'zhang.wei' is not a number"),
+        ('policy "1203', "No closing quotation"),
+        ("lock now", "usage: lock"),
+        ("saver maybe", "'maybe' is neither on nor off"),
+        ("hang printer", "there is no service 'printer'; there are: daemon, "),
+        ("slow daemon", "usage: slow SERVICE SECONDS"),
+        ("slow daemon long", "'long' is not a number"),
+        ("appear daemon", "daemon is on the bus already"),
+    ],
+)
+def test_what_cannot_be_done_is_refused_with_a_reason(desk: Paper, line: str, reason: str) -> None:
+    mark = desk.terminal.events.mark()
+
+    with pytest.raises(Refused) as refused:
+        run_line(desk, line)
+
+    assert reason in str(refused.value)
+    assert not desk.terminal.events.all(after=mark)
+
+
+@pytest.mark.parametrize("line", ["policy 1300", "online", "leave daemon", "restart daemon"])
+def test_a_daemon_that_is_away_cannot_be_used(desk: Paper, line: str) -> None:
+    run_line(desk, "leave daemon")
+
+    with pytest.raises(Refused, match="daemon is not on the bus; bring it back with: appear daemon"):
+        run_line(desk, line)
