@@ -52,13 +52,15 @@ def settled(terminal: Terminal, after: int) -> list[Event]:
     """All calls and commands of the agent since a mark, once it has handled all that it was sent.
 
     A last policy is forwarded to the session policy service: when it arrives there, nothing that the agent
-    did before can still be on its way to a service of the session. That policy itself is left out.
+    did before can still be on its way to a service of the session. That policy itself is left out. The log
+    is complete up to there, too.
     """
     marker = str(uuid4())
     terminal.daemon.push_policy({"type": FORWARDED_CODE, "marker": marker})
     terminal.events.wait_for(
         lambda event: marker in event.args[0], target="policy_service", member="onPolicyMsg", after=after
     )
+    terminal.sync()
     actions = [event for event in terminal.events.all(source="velks", after=after) if event.kind != "log"]
     return [event for event in actions if marker not in str(event.args)]
 

@@ -37,6 +37,7 @@ private Q_SLOTS:
     void gives_up_data();
     void gives_up();
     void each_request_given_up_is_one_warning();
+    void connecting_is_given_up_before_the_rest();
     void cleanupTestCase() { m_warnings.reset(); }
 
 private:
@@ -55,11 +56,11 @@ void HttpClientApiLimitsTest::initTestCase()
     QCOMPARE(mkfifo("/etc/hosts", 0600), 0);
 
     m_warnings = std::make_unique<WarningRecorder>();
-    start("name lookup hangs", QStringLiteral("https://platform.invalid/"));
-    start("TLS handshake hangs", m_peer.url("silent", "/plain"));
     start("no header comes", m_peer.url("proper", "/stalled-header"));
     start("body stops", m_peer.url("proper", "/stalled-body"));
     start("body drips without end", m_peer.url("proper", "/dripping-body"));
+    start("name lookup hangs", QStringLiteral("https://platform.invalid/"));
+    start("TLS handshake hangs", m_peer.url("silent", "/plain"));
 }
 
 void HttpClientApiLimitsTest::start(const char* row, const QString& url)
@@ -103,6 +104,13 @@ void HttpClientApiLimitsTest::each_request_given_up_is_one_warning()
     const QStringList warnings = m_warnings->texts();
     QCOMPARE(warnings.size(), 5);
     QCOMPARE(warnings.filter(QRegularExpression(QStringLiteral("timed out|timeout"))).size(), 5);
+}
+
+void HttpClientApiLimitsTest::connecting_is_given_up_before_the_rest()
+{
+    const QStringList warnings = m_warnings->texts();
+    const QRegularExpression connecting(QStringLiteral("Resolving|SSL connection"));
+    QCOMPARE(warnings.mid(0, 2).filter(connecting).size(), 2);
 }
 
 QTEST_GUILESS_MAIN(HttpClientApiLimitsTest)

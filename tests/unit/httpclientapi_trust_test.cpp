@@ -5,6 +5,8 @@
 #include <QProcess>
 #include <QtTest>
 
+#include <cstdio>
+
 /// Whom the client trusts, and as whom it presents itself.
 class HttpClientApiTrustTest : public QObject
 {
@@ -18,6 +20,7 @@ private Q_SLOTS:
     void refuses();
     void refuses_an_authority_that_only_the_system_trusts();
     void refuses_without_configuration();
+    void asks_nobody_for_the_password_of_a_key();
     void trusts_the_given_authority();
     void reads_a_replaced_authority_file();
     void presents_its_certificate();
@@ -87,7 +90,6 @@ void HttpClientApiTrustTest::refuses_data()
     row("missing authority file", "proper", none, key, "certificate file");
     row("authority file without certificate", "proper", key, key, "certificate file");
     row("missing key file", "demanding", ca, none, "private key");
-    row("encrypted key", "demanding", ca, m_peer.file("encrypted-key"), "private key");
 }
 
 void HttpClientApiTrustTest::refuses()
@@ -121,6 +123,16 @@ void HttpClientApiTrustTest::refuses_an_authority_that_only_the_system_trusts()
 void HttpClientApiTrustTest::refuses_without_configuration()
 {
     QCOMPARE(plainGet("proper").status, 0);
+}
+
+void HttpClientApiTrustTest::asks_nobody_for_the_password_of_a_key()
+{
+    const QString answer = m_folder.filePath(QStringLiteral("answer"));
+    replace(answer, "secret\n");
+    QVERIFY(std::freopen(qUtf8Printable(answer), "r", stdin) != nullptr);
+
+    m_client->setSSLConfig(m_peer.file("ca"), m_peer.file("client"), m_peer.file("encrypted-key"));
+    QCOMPARE(summary(plainGet("demanding")), kNoResponse);
 }
 
 void HttpClientApiTrustTest::trusts_the_given_authority()

@@ -46,6 +46,7 @@ private Q_SLOTS:
     void file_is_in_the_home_folder_without_configuration_folder();
     void other_content_of_the_file_is_kept();
     void switch_that_cannot_be_kept_returns_the_error();
+    void file_that_is_no_ini_file_is_an_error();
     void lists_and_hotspot_that_cannot_be_kept_are_one_warning_each();
 
     void reboot_asks_the_login_manager();
@@ -162,6 +163,18 @@ void LibvelkkpxTest::switch_that_cannot_be_kept_returns_the_error()
     const WarningRecorder recorder;
     QCOMPARE(m_control.SetLauncherDisplayable(true), QStringLiteral("cannot write ") + m_file);
     QCOMPARE(recorder.texts(), QStringList());
+}
+
+void LibvelkkpxTest::file_that_is_no_ini_file_is_an_error()
+{
+    QVERIFY(QDir(m_folder->path()).mkdir(QStringLiteral("norix")));
+    QFile file(m_file);
+    QVERIFY(file.open(QIODevice::WriteOnly));
+    file.write("not at all\n");
+    file.close();
+
+    QCOMPARE(m_control.SetLauncherDisplayable(true), m_file + QStringLiteral(" is not an INI file"));
+    QCOMPARE(contentOf(m_file), QByteArray("?"));
 }
 
 void LibvelkkpxTest::lists_and_hotspot_that_cannot_be_kept_are_one_warning_each()
