@@ -17,8 +17,16 @@ function(velk_add_unit_test name)
     set(clock)
     if(arg_MANUAL_CLOCK)
         find_library(VELK_FAKETIME libfaketimeMT.so.1 PATH_SUFFIXES faketime REQUIRED)
+        set(preload "${VELK_FAKETIME}")
+        if(CMAKE_CXX_FLAGS MATCHES "-fsanitize=address")
+            # AddressSanitizer must come before any other preloaded library.
+            execute_process(COMMAND "${CMAKE_CXX_COMPILER}" -print-file-name=libasan.so
+                OUTPUT_VARIABLE asan OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
+            file(REAL_PATH "${asan}" asan)
+            string(PREPEND preload "${asan} ")
+        endif()
         # QtTest's own time limit would count what the clock is moved ahead.
-        set(clock env "LD_PRELOAD=${VELK_FAKETIME}" FAKETIME_TIMESTAMP_FILE=/tmp/clock FAKETIME_NO_CACHE=1
+        set(clock env "LD_PRELOAD=${preload}" FAKETIME_TIMESTAMP_FILE=/tmp/clock FAKETIME_NO_CACHE=1
             QTEST_FUNCTION_TIMEOUT=86400000)
     endif()
     add_test(NAME ${name}

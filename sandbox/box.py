@@ -18,7 +18,7 @@ from sandbox.users import USERS, User
 # Parts of the host's /etc that programs need to run and that say nothing of the host.
 _HOST_ETC = ("alternatives", "ld.so.cache", "ssl/openssl.cnf")
 _WRITABLE = ("/etc", "/home", "/run", "/tmp", "/var", str(layout.SHARE))
-_PASSED_ON = ("TERM", "COLORTERM", "CI", "VELK_AGENT", "VELK_BUILD_DIR")
+_PASSED_ON = ("TERM", "COLORTERM", "CI", "ASAN_OPTIONS", "VELK_AGENT", "VELK_BUILD_DIR")
 _NAMESPACES = ("user", "pid", "net", "ipc", "uts")
 
 

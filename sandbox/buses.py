@@ -24,7 +24,6 @@ _CONFIG = """<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-Bus Bus Configura
   <type>{kind}</type>
   <keep_umask/>
   <listen>unix:path={socket}</listen>
-  <pidfile>{pid_file}</pidfile>
   <auth>EXTERNAL</auth>
   <policy context="default">
     <allow user="*"/>
@@ -85,11 +84,7 @@ class Bus:
         for folder in (self._socket.parent, self._pid_file.parent):
             folder.mkdir(parents=True, exist_ok=True)
         config = self._pid_file.with_suffix(".conf")
-        config.write_text(
-            _CONFIG.format(
-                kind=self.kind, socket=self._socket, pid_file=self._pid_file, limits=_limits(self.kind)
-            )
-        )
+        config.write_text(_CONFIG.format(kind=self.kind, socket=self._socket, limits=_limits(self.kind)))
         reading, writing = os.pipe()
         self._daemon = subprocess.Popen(
             [
@@ -105,6 +100,8 @@ class Bus:
             # Its own group: Ctrl+C at a prompt must not take the buses away from the fakes.
             start_new_session=True,
         )
+        # The daemon would write it only after it has said that it is ready.
+        self._pid_file.write_text(str(self._daemon.pid))
         os.close(writing)
         with open(reading) as printed:
             if not printed.readline():

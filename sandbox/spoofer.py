@@ -20,6 +20,7 @@ class Stranger:
 
     def __init__(self, bus: Bus) -> None:
         self._connection = bus.connect()
+        self._names: set[str] = set()
 
     @property
     def unique_name(self) -> str:
@@ -59,14 +60,18 @@ class Stranger:
         flags = 0 if queue else dbus.bus.NAME_FLAG_DO_NOT_QUEUE
         flags |= dbus.bus.NAME_FLAG_REPLACE_EXISTING if replace else 0
         flags |= dbus.bus.NAME_FLAG_ALLOW_REPLACEMENT if let_replace else 0
+        self._names.add(name)
         return int(MainLoop.call(self._connection.request_name, name, flags))
 
     def release(self, name: str) -> None:
         """Give a bus name back."""
+        self._names.discard(name)
         MainLoop.call(self._connection.release_name, name)
 
     def close(self) -> None:
-        """Leave the bus."""
+        """Leave the bus; the names are free on return."""
+        for name in list(self._names):
+            self.release(name)
         MainLoop.call(self._connection.close)
 
     def _send(self, message: Any) -> None:

@@ -25,8 +25,8 @@ from sandbox.terminal import Terminal
 def terminal(request: pytest.FixtureRequest) -> Iterator[Terminal]:
     """A fresh terminal with every service present, a clock that tests move, and no agent yet.
 
-    The marker `real_time` gives the agent the host's clock instead. The terminal's end fails the test when the
-    agent has died or broken the contract of an interface.
+    The marker `real_time` gives the agent the host's clock instead. The terminal's end fails the test when
+    the agent has died or broken the contract of an interface.
     """
     real_time = request.node.get_closest_marker("real_time") is not None
     opened = Terminal(clock=RealTime() if real_time else ManualClock())

@@ -36,15 +36,10 @@ QString store(const QMap<QString, QVariant>& switches)
     }
     file.sync();
 
-    switch (file.status()) {
-    case QSettings::NoError:
-        return {};
-    case QSettings::AccessError:
-        return QStringLiteral("cannot write ") + path;
-    case QSettings::FormatError:
-        return path + QStringLiteral(" is not an INI file");
+    if (file.status() == QSettings::FormatError) {
+        return QStringLiteral("lines that are not INI are lost from ") + path;
     }
-    Q_UNREACHABLE();
+    return file.status() == QSettings::NoError ? QString() : QStringLiteral("cannot write ") + path;
 }
 
 void warnOf(const QString& error)

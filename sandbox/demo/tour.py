@@ -6,6 +6,7 @@ import time
 from dataclasses import dataclass
 from typing import Literal, Mapping
 
+from rich.padding import Padding
 from rich.rule import Rule
 from rich.text import Text
 
@@ -29,6 +30,7 @@ class Outcome:
     delay: float = 0.0
 
 
+_INDENTED = (0, 0, 0, 7)
 _STILL_THERE = Expectation("the agent handles what comes", "velks", "log", "info")
 
 
@@ -102,7 +104,7 @@ class Tour:
     def _tell_of_silence(self, step: Step) -> None:
         """Say what the timeline cannot show."""
         words = "; ".join(expectation.words for expectation in step.then)
-        self._timeline.print(Text(f"{'':7}Nothing follows: {words}.", "italic"))
+        self._timeline.print(Padding(Text(f"Nothing follows: {words}.", "italic"), _INDENTED))
 
     def _judge(self, title: str, expectation: Expectation, mark: int, cue: float) -> Outcome:
         event = self._first(expectation, mark)

@@ -106,7 +106,8 @@ class Peer:
         connection.add_message_filter(self._on_message)
         self._connection = connection
         self._bus_run = self.bus.run
-        connection.request_name(self.bus_name, dbus.bus.NAME_FLAG_DO_NOT_QUEUE)
+        answer = connection.request_name(self.bus_name, dbus.bus.NAME_FLAG_DO_NOT_QUEUE)
+        assert answer == dbus.bus.REQUEST_NAME_REPLY_PRIMARY_OWNER, f"{self.bus_name} is taken"
         self._record("life", "appears", (str(connection.get_unique_name()),))
 
     def _leave(self) -> None:
@@ -114,6 +115,8 @@ class Peer:
             return
         connection, self._connection = self._connection, None
         self._held.clear()
+        # The bus notices a closed connection a moment later, but the name must be free at once.
+        connection.release_name(self.bus_name)
         connection.close()
         self._record("life", "leaves", ())
 

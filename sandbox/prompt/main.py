@@ -38,7 +38,7 @@ def _parser() -> argparse.ArgumentParser:
 
 
 def desktop_relay() -> Consumer | None:
-    """What shows the notifications on the desktop outside; None, after a line that says why, where nothing can."""
+    """What shows notifications on the desktop outside; None, after a line on why, where nothing can."""
     from sandbox.prompt.desktop import Desktop  # needs D-Bus, which only this option must have
 
     try:

@@ -4,6 +4,7 @@ from __future__ import annotations
 
 import io
 import sys
+import threading
 from contextlib import contextmanager
 from typing import Iterator, Sequence
 
@@ -15,7 +16,7 @@ from sandbox.events import Event, Events
 from sandbox.timeline import wording
 from sandbox.timeline.agenttime import AgentTime, minutes
 
-_PLAIN_WIDTH = 130
+_PLAIN_WIDTH = 136
 _WIDE = 110
 _TIME, _ROUTE, _GAP = 5, 27, 2
 _REMARK = "dim italic"
@@ -42,12 +43,15 @@ class Timeline:
         self.show_log = show_log
         self._consoles = consoles
         self._is_open = True
+        # Events come on several threads; one amid the start or end of the status line would tear it.
+        self._output = threading.Lock()
         events.subscribe(self._take)
 
     def print(self, what: RenderableType = "") -> None:
         """Print something between the lines."""
-        for console in self._consoles:
-            console.print(what)
+        with self._output:
+            for console in self._consoles:
+                console.print(what)
 
     def end(self) -> None:
         """Show no more events."""
@@ -60,8 +64,14 @@ class Timeline:
         if not console.is_terminal:
             yield
             return
-        with console.status(_Waiting(words, self.time), spinner="dots", refresh_per_second=8):
+        status = console.status(_Waiting(words, self.time), spinner="dots", refresh_per_second=8)
+        with self._output:
+            status.start()
+        try:
             yield
+        finally:
+            with self._output:
+                status.stop()
 
     def shows(self, event: Event) -> bool:
         """Whether an event makes a line."""
@@ -73,8 +83,9 @@ class Timeline:
         if event.kind == "life" and event.target == "velks":
             self.time.started(event)
         if self._is_open and self.shows(event):
-            for console in self._consoles:
-                console.print(self._line(event, console.width))
+            with self._output:
+                for console in self._consoles:
+                    console.print(self._line(event, console.width))
 
     def _line(self, event: Event, width: int) -> Table:
         line = Table.grid(padding=(0, _GAP, 0, 0), pad_edge=False)
@@ -86,7 +97,7 @@ class Timeline:
             line.add_column(max_width=rest, overflow="fold")
             cells.append(_stacked(event))
         else:
-            half = rest * 11 // 20
+            half = rest * 9 // 16
             line.add_column(width=half - _GAP, overflow="fold")
             line.add_column(max_width=rest - half, overflow="fold")
             cells += [Text(wording.what(event)), Text(wording.meaning(event), _REMARK)]

@@ -62,6 +62,7 @@ def test_online_signal_is_logged_with_name_and_uid(terminal: Terminal) -> None:
     mark = terminal.events.mark()
     terminal.daemon.push_online()
     next_status(terminal, mark)
+    terminal.sync()
     assert 'velkg restart sendonline   "zhang.wei" 20001' in log_lines(terminal, mark)
 
 
@@ -115,6 +116,7 @@ def test_signals_during_a_slow_start_are_handled_after_it_in_their_order(termina
 
     terminal.start_agent(ready=signals_come_while_the_name_is_read)
     next_notification(terminal, mark)
+    next_status(terminal, mark, count=2)
     assert announcements(terminal, mark) == [
         ("UpdateUserInfo", ("zhang.wei", 20001)),
         ("SendUserStatus", (1, "zhang.wei")),

@@ -3,6 +3,7 @@
 from __future__ import annotations
 
 import configparser
+import os
 from pathlib import Path
 
 import pytest
@@ -182,6 +183,24 @@ def test_script_that_takes_longer_than_the_minute_delays_the_reboot_to_its_end(s
     session.sync()
     session.sync()
     assert road(session, mark) == [*ROAD, ("logind", "Reboot")]
+
+
+@pytest.mark.parametrize("stream", [1, 2], ids=["stdout", "stderr"])
+def test_script_writes_where_the_agent_writes(session: Terminal, stream: int) -> None:
+    session.files.write_restore_script(f"restore_config $(readlink /proc/$$/fd/{stream})\n")
+    mark = leave_domain(session)
+    script = session.events.wait_for(target="restore_config", after=mark)
+    assert script.args == (os.readlink(f"/proc/{session.agent.pid}/fd/{stream}"),)
+
+
+@pytest.mark.real_time
+def test_script_is_waited_for_by_the_clock_on_the_wall(session: Terminal) -> None:
+    """Longer than the 30 s after which a child process is given up by default."""
+    session.files.write_restore_script("sleep 31; restore_config\n")
+    mark = session.events.mark()
+    session.daemon.push_policy(EXIT)
+    session.events.wait_for(target="identity", member="Set", after=mark, timeout=120)
+    assert road(session, mark) == ROAD
 
 
 def test_script_leaves_a_child_that_does_not_hold_up_the_exit(session: Terminal) -> None:

@@ -45,6 +45,13 @@ def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, code: i
     assert forced_actions(session, mark) == ["Terminate"]
 
 
+@pytest.mark.parametrize("app_id", ["", "another", "终端"])
+def test_policy_is_obeyed_whatever_its_application(session: Terminal, app_id: str) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy({"type": 1300}, app_id)
+    assert next_notification(session, mark).body == "该终端1分钟后进行关机"
+
+
 def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
     mark = session.events.mark()
     session.daemon.push_policy({"type": 1201})

@@ -21,6 +21,28 @@ def test_log_calls_carry_file_line_and_function(terminal: Terminal) -> None:
     assert "MessageTransfer::onPolicyMsg" in entry.detail["function"]
 
 
+@pytest.mark.parametrize(
+    ("beginning", "level"),
+    [
+        ("getCurrentLoginUser getusername:", "info"),
+        ("---getusername:", "info"),
+        ("onPolicyMsg ---------payload:", "info"),
+        ("velkg restart sendonline", "debug"),
+        ("get screenSaver state", "debug"),
+        ("get screenLocked state", "debug"),
+        ("sendUID :", "debug"),
+    ],
+)
+def test_line_is_logged_at_its_level(terminal: Terminal, beginning: str, level: str) -> None:
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    terminal.daemon.push_online()
+    terminal.daemon.push_policy({"type": 1202, "payload": {"uid": 7}})
+    terminal.sync()
+    lines = terminal.events.all(lambda event: event.args[0].startswith(beginning), kind="log", after=mark)
+    assert {line.member for line in lines} == {level}
+
+
 def test_login_name_is_logged_as_it_is_and_without_its_first_at_sign(terminal: Terminal) -> None:
     terminal.files.write_accounts(User("@@zhang@wei", terminal.user.uid))
     mark = terminal.events.mark()

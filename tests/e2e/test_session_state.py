@@ -8,6 +8,7 @@ import pytest
 
 from sandbox.peers.exported import Reply
 from sandbox.peers.fault import Fault
+from sandbox.peers.logind import USER
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, log_lines, next_status
 
@@ -68,16 +69,29 @@ def test_each_present_service_is_logged(terminal: Terminal) -> None:
     assert states == ["get screenSaver state  true", "get screenLocked state  false"]
 
 
-def test_absent_service_is_not_logged(terminal: Terminal) -> None:
-    terminal.screensaver.set("isRunning", True)
-    terminal.session_manager.leave()
+@pytest.mark.parametrize(
+    ("absent", "logged"),
+    [
+        ("session_manager", ["get screenSaver state  true"]),
+        ("screensaver", ["get screenLocked state  true"]),
+    ],
+)
+def test_absent_service_is_not_logged(terminal: Terminal, absent: str, logged: list[str]) -> None:
+    show(terminal, running=True, locked=True)
+    terminal.peers[absent].leave()
     terminal.start_agent()
     mark = terminal.events.mark()
     five_minute_report(terminal)
-    assert [line for line in log_lines(terminal, mark) if line.startswith("get screen")] == [
-        "get screenSaver state  true"
-    ]
+    assert [line for line in log_lines(terminal, mark) if line.startswith("get screen")] == logged
     assert terminal.events.all(kind="log", member="warning", after=mark) == []
+
+
+def test_report_reads_the_name_then_the_screen_saver_then_the_lock(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    five_minute_report(terminal)
+    calls = terminal.events.all(source="velks", kind="call", after=mark)
+    assert [call.target for call in calls] == ["logind", "screensaver", "session_manager", "daemon"]
 
 
 def test_status_at_start_is_active_whatever_the_screen_shows(terminal: Terminal) -> None:
@@ -134,6 +148,17 @@ def test_properties_of_another_type_do_not_keep_the_report_back(
     status, name = five_minute_report(terminal)
     assert status in (ACTIVE, LOCKED, SCREEN_SAVER)
     assert name == "zhang.wei"
+
+
+@pytest.mark.parametrize(("signature", "value"), [("as", ["a", "b"]), ("(ii)", (1, 2)), ("a{sv}", {})], ids=str)
+def test_user_of_another_type_is_reported_as_unknown(terminal: Terminal, signature: str, value: Any) -> None:
+    for name in ("Name", "UID"):
+        terminal.logind.set(name, value, signature, path=USER)
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    announced = terminal.events.wait_for(target="daemon", member="UpdateUserInfo", after=mark)
+    assert announced.args == ("", 0)
+    assert five_minute_report(terminal) == (ACTIVE, "")
 
 
 @pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])

@@ -44,9 +44,19 @@ class FakeDesktop(dbus.service.Object):
         return self._capabilities
 
     @dbus.service.method(_NAME, in_signature="susssasa{sv}i", out_signature="u")
-    def Notify(self, *args: Any) -> int:
+    def Notify(
+        self,
+        app_name: str,
+        replaces: int,
+        icon: str,
+        summary: str,
+        body: str,
+        actions: list[str],
+        hints: dict[str, Any],
+        timeout: int,
+    ) -> int:
         """Keep it."""
-        self.shown.put(args)
+        self.shown.put((app_name, replaces, icon, summary, body, actions, hints, timeout))
         return 1
 
 

@@ -6,7 +6,7 @@ from pathlib import Path
 
 import pytest
 
-from people import idle_agent, run_program
+from people import run_program
 from sandbox.users import current_user
 
 

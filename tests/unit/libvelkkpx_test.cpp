@@ -46,7 +46,7 @@ private Q_SLOTS:
     void file_is_in_the_home_folder_without_configuration_folder();
     void other_content_of_the_file_is_kept();
     void switch_that_cannot_be_kept_returns_the_error();
-    void file_that_is_no_ini_file_is_an_error();
+    void switch_is_kept_although_the_file_was_damaged();
     void lists_and_hotspot_that_cannot_be_kept_are_one_warning_each();
 
     void reboot_asks_the_login_manager();
@@ -165,16 +165,17 @@ void LibvelkkpxTest::switch_that_cannot_be_kept_returns_the_error()
     QCOMPARE(recorder.texts(), QStringList());
 }
 
-void LibvelkkpxTest::file_that_is_no_ini_file_is_an_error()
+void LibvelkkpxTest::switch_is_kept_although_the_file_was_damaged()
 {
     QVERIFY(QDir(m_folder->path()).mkdir(QStringLiteral("norix")));
     QFile file(m_file);
     QVERIFY(file.open(QIODevice::WriteOnly));
-    file.write("not at all\n");
+    file.write("not INI at all\n[restrictions]\nOther=x\n");
     file.close();
 
-    QCOMPARE(m_control.SetLauncherDisplayable(true), m_file + QStringLiteral(" is not an INI file"));
-    QCOMPARE(contentOf(m_file), QByteArray("?"));
+    QCOMPARE(m_control.SetLauncherDisplayable(true),
+             QStringLiteral("lines that are not INI are lost from ") + m_file);
+    QCOMPARE(contentOf(m_file), QByteArray("[restrictions]\nLauncherDisplayable=true\nOther=x\n"));
 }
 
 void LibvelkkpxTest::lists_and_hotspot_that_cannot_be_kept_are_one_warning_each()

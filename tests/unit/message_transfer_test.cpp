@@ -8,6 +8,19 @@
 #include "message_transfer.h"
 #include "recorded_service.h"
 
+namespace {
+
+/// What getuid() answers instead of the program's own uid.
+std::optional<uid_t> pretendedUid;
+
+} // namespace
+
+/// Goes before the C library's own: the box has one user above and one below the limit, and none at it.
+uid_t getuid() noexcept
+{
+    return pretendedUid.value_or(geteuid());
+}
+
 /// Runs as a domain user with a login manager and a notification service that only record.
 class MessageTransferTest : public QObject
 {
@@ -18,11 +31,14 @@ private Q_SLOTS:
     void cleanup();
 
     void slotsStandInTheirOrder();
+    void userAboveTheLocalRangeIsDomainUser_data();
     void userAboveTheLocalRangeIsDomainUser();
     void accountPolicyNamesUserByUid_data();
     void accountPolicyNamesUserByUid();
     void accountPolicyCheckIsLogged();
+    void messageWithoutPayloadNamesNobodyNotEvenRoot();
     void countdownTakesAMinute();
+    void countdownIsNotRounded();
     void expiredCountdownStops_data();
     void expiredCountdownStops();
     void expiredCountdownForcesActionOfItsCode_data();
@@ -75,6 +91,7 @@ void MessageTransferTest::init()
 
 void MessageTransferTest::cleanup()
 {
+    pretendedUid.reset();
     m_notifications.reset();
     m_logind.reset();
 }
@@ -91,10 +108,23 @@ void MessageTransferTest::slotsStandInTheirOrder()
     QCOMPARE(names, expected);
 }
 
+void MessageTransferTest::userAboveTheLocalRangeIsDomainUser_data()
+{
+    QTest::addColumn<uint>("uid");
+    QTest::addColumn<bool>("isDomainUser");
+
+    QTest::newRow("root") << 0U << false;
+    QTest::newRow("last local") << 10000U << false;
+    QTest::newRow("first of the domain") << 10001U << true;
+    QTest::newRow("beyond the signed range") << 3000000000U << true;
+}
+
 void MessageTransferTest::userAboveTheLocalRangeIsDomainUser()
 {
-    QVERIFY(getuid() > 10000);
-    QVERIFY(MessageTransfer().isLdapUser());
+    QFETCH(uint, uid);
+    MessageTransfer transfer;
+    pretendedUid = uid;
+    QTEST(transfer.isLdapUser(), "isDomainUser");
 }
 
 void MessageTransferTest::accountPolicyNamesUserByUid_data()
@@ -129,12 +159,29 @@ void MessageTransferTest::accountPolicyCheckIsLogged()
     MessageTransfer().isExecPolicyByUID(message);
 }
 
+void MessageTransferTest::messageWithoutPayloadNamesNobodyNotEvenRoot()
+{
+    // A payload without a uid would be read as uid 0.
+    QJsonObject message;
+    MessageTransfer transfer;
+    pretendedUid = 0;
+    QVERIFY(!transfer.isExecPolicyByUID(message));
+}
+
 void MessageTransferTest::countdownTakesAMinute()
 {
     MessageTransfer transfer;
     QVERIFY(timerOf(transfer, isCountdown) == nullptr);
     transfer.startTime(QString(), 1201);
     QVERIFY(timerOf(transfer, isCountdown) != nullptr);
+}
+
+void MessageTransferTest::countdownIsNotRounded()
+{
+    // Qt lets a timer of this length fire half a second early unless it is told not to.
+    MessageTransfer transfer;
+    transfer.startTime(QString(), 1201);
+    QCOMPARE(timerOf(transfer, isCountdown)->timerType(), Qt::PreciseTimer);
 }
 
 void MessageTransferTest::expiredCountdownStops_data()
