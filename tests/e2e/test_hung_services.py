@@ -6,7 +6,7 @@ import pytest
 
 from sandbox.peers.fault import Fault
 from sandbox.terminal import Terminal
-from wire import forced_actions, next_notification, next_status
+from wire import forced_actions, log_lines, next_notification, next_status
 
 DBUS_LIMIT = 25
 
@@ -56,6 +56,22 @@ def test_hung_notifications_delay_a_policy_by_the_limit_and_the_log_out_still_co
     assert forced_actions(terminal, mark) == []
     terminal.advance(1)
     assert forced_actions(terminal, mark) == ["Terminate"]
+
+
+def test_no_signal_is_handled_while_a_notification_is_waited_for(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.notifications.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1300})
+    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
+    terminal.daemon.push_policy({"type": 5})
+    terminal.jump(DBUS_LIMIT)
+    terminal.sync()
+
+    lines = log_lines(terminal, mark)
+    given_up = next(number for number, line in enumerate(lines) if line.startswith("--@@@@--"))
+    forwarded = lines.index('onPolicyMsg ---------payload: "{\\"type\\": 5}"')
+    assert given_up < forwarded
 
 
 def test_failed_warning_is_logged(terminal: Terminal) -> None:

@@ -55,6 +55,13 @@ def test_login_name_is_logged_as_it_is_and_without_its_first_at_sign(terminal: T
     ]
 
 
+def test_login_name_is_read_in_the_encoding_of_the_locale(terminal: Terminal) -> None:
+    terminal.files.write_accounts(User("张伟é", terminal.user.uid))
+    mark = terminal.events.mark()
+    terminal.start_agent(extra_env={"LANG": "C.UTF-8"})
+    assert 'getCurrentLoginUser getusername: "张伟é"' in log_lines(terminal, mark)
+
+
 def test_user_without_account_entry_has_an_empty_login_name(terminal: Terminal) -> None:
     terminal.files.write_accounts()
     mark = terminal.events.mark()

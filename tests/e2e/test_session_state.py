@@ -150,7 +150,9 @@ def test_properties_of_another_type_do_not_keep_the_report_back(
     assert name == "zhang.wei"
 
 
-@pytest.mark.parametrize(("signature", "value"), [("as", ["a", "b"]), ("(ii)", (1, 2)), ("a{sv}", {})], ids=str)
+@pytest.mark.parametrize(
+    ("signature", "value"), [("as", ["a", "b"]), ("(ii)", (1, 2)), ("a{sv}", {})], ids=str
+)
 def test_user_of_another_type_is_reported_as_unknown(terminal: Terminal, signature: str, value: Any) -> None:
     for name in ("Name", "UID"):
         terminal.logind.set(name, value, signature, path=USER)
