@@ -23,6 +23,47 @@ def test_hung_login_manager_at_start_gives_an_empty_name(terminal: Terminal) -> 
     assert next_status(terminal, mark) == (1, "")
 
 
+def start_with_slow_login_manager(terminal: Terminal) -> None:
+    """Start the agent; it gets the user's name and uid just before the limit."""
+    terminal.logind.fault = Fault.hold()
+    mark = terminal.events.mark()
+
+    def answer_late() -> None:
+        terminal.events.wait_for(target="logind", member="Get", count=2, after=mark)
+        terminal.jump(DBUS_LIMIT - 5)
+        terminal.logind.release()
+
+    terminal.start_agent(ready=answer_late)
+
+
+def test_slow_login_manager_is_waited_for(terminal: Terminal) -> None:
+    mark = terminal.events.mark()
+    start_with_slow_login_manager(terminal)
+    announced = terminal.events.wait_for(target="daemon", member="UpdateUserInfo", after=mark)
+    assert announced.args == ("zhang.wei", 20001)
+
+
+def test_five_minutes_begin_when_the_name_is_known(terminal: Terminal) -> None:
+    mark = terminal.events.mark()
+    start_with_slow_login_manager(terminal)
+    next_status(terminal, mark)
+    mark = terminal.events.mark()
+    terminal.advance(299)
+    assert terminal.events.all(member="SendUserStatus", after=mark) == []
+
+
+def test_slow_notifications_are_no_failure(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.notifications.fault = Fault.hold()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1300})
+    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
+    terminal.jump(DBUS_LIMIT - 5)
+    terminal.notifications.release()
+    terminal.sync()
+    assert terminal.events.all(kind="log", member="warning", after=mark) == []
+
+
 @pytest.mark.parametrize(
     ("hung", "status"), [("screensaver", 2), ("session_manager", 3), ("logind", 3)], ids=str
 )

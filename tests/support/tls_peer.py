@@ -78,9 +78,8 @@ def _outdated_context(identity: Identity, clients: Authority) -> ssl.SSLContext:
     return context
 
 
-def _doors(platform: Authority, stranger: Authority) -> dict[str, ssl.SSLContext | None]:
+def _doors(platform: Authority, stranger: Authority, proper: Identity) -> dict[str, ssl.SSLContext | None]:
     """The doors' names and TLS sides; None: nothing is ever said there."""
-    proper = platform.issue_server(_HOST, "localhost")
     return {
         "proper": _context(proper, platform, ssl.CERT_OPTIONAL),
         "demanding": _context(proper, platform, ssl.CERT_REQUIRED),
@@ -104,7 +103,7 @@ def _encrypt_key(identity: Identity) -> Path:
     return encrypted
 
 
-def _files(platform: Authority, stranger: Authority) -> dict[str, str]:
+def _files(platform: Authority, stranger: Authority, proper: Identity) -> dict[str, str]:
     client = platform.issue_client("terminal")
     files = {
         "ca": platform.certificate,
@@ -112,6 +111,8 @@ def _files(platform: Authority, stranger: Authority) -> dict[str, str]:
         "client": client.certificate,
         "client-key": client.key,
         "encrypted-key": _encrypt_key(client),
+        "server": proper.certificate,
+        "server-key": proper.key,
     }
     return {name: str(path) for name, path in files.items()}
 
@@ -125,7 +126,8 @@ def main() -> None:
     folder = parser.parse_args().folder
 
     platform, stranger = Authority(folder, "platform"), Authority(folder, "stranger")
-    doors = _doors(platform, stranger)
+    proper = platform.issue_server(_HOST, "localhost")
+    doors = _doors(platform, stranger, proper)
     sockets = {name: socket.create_server((_HOST, 0), backlog=_LISTEN_BACKLOG) for name in doors}
     for name, context in doors.items():
         if context:
@@ -135,7 +137,7 @@ def main() -> None:
     sockets["refusing"].bind((_HOST, 0))
 
     ports = {name: listener.getsockname()[1] for name, listener in sockets.items()}
-    _print_json({"ports": ports, "files": _files(platform, stranger)})
+    _print_json({"ports": ports, "files": _files(platform, stranger, proper)})
     sys.stdin.buffer.read()
 
 
