@@ -15,8 +15,9 @@ _SHOWN_CHARACTERS = 300
 class Event:
     """One thing that happened.
 
-    `kind` is "call", "signal", "log", "output", "http", "command" or "life"; `member` the D-Bus member, log
-    level, route or command; `args` plain Python values, whose exact types `detail["signature"]` tells.
+    `kind` is "call", "signal", "log", "output", "http", "reply" (of the platform), "post" (to it), "command",
+    "life", or "file" and "inbox" for what was found there; `member` the D-Bus member, log level, route or
+    command; `args` plain Python values, whose exact types `detail["signature"]` tells.
     """
 
     time: float

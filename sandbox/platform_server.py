@@ -16,9 +16,10 @@ from urllib.parse import urlsplit
 from sandbox import layout
 from sandbox.certificates import Authority, Identity
 from sandbox.events import Events
-from sandbox.platform_store import Route, Store
+from sandbox.platform_store import Reply, Route, Store
 
 Request = Mapping[str, Any]
+_ADMINISTRATOR = "administrator"
 
 
 @dataclass(frozen=True)
@@ -76,8 +77,8 @@ class Platform:
     """HTTPS server that demands a certificate of its own authority from the client.
 
     Every request is an event of kind "http": member "list", "read", "tips" or "other"; args the request line
-    and the body; detail headers and the client's name. A failed handshake is an event with member "tls".
-    `fault` applies to all requests, `faults` to those of one route.
+    and the body; detail headers and the client's name. A failed handshake is an event with member "tls", and
+    an answer one of kind "reply": args route, status and body, detail the answer's own headers. `fault` applies to all requests, `faults` to those of one route.
     """
 
     def __init__(
@@ -89,17 +90,36 @@ class Platform:
         self.faults: dict[Route, HttpFault] = {}
         self.events = events
         self.released = threading.Event()
-        self._server = _Server((layout.PLATFORM_HOST, port), _Handler)
-        self._server.platform = self
-        self._server.socket = self._context(server or trust().server).wrap_socket(
-            self._server.socket, server_side=True, do_handshake_on_connect=False
+        self._identity = server or trust().server
+        self._server: _Server | None = None
+        self.appear()
+
+    @property
+    def present(self) -> bool:
+        """Whether it serves."""
+        return self._server is not None
+
+    def appear(self) -> None:
+        """Begin to serve."""
+        assert not self.present, "the platform serves already"
+        server = _Server((layout.PLATFORM_HOST, self.port), _Handler)
+        server.platform = self
+        server.socket = self._context(self._identity).wrap_socket(
+            server.socket, server_side=True, do_handshake_on_connect=False
         )
-        threading.Thread(
-            target=self._server.serve_forever, args=(0.02,), name="platform", daemon=True
-        ).start()
+        threading.Thread(target=server.serve_forever, args=(0.02,), name="platform", daemon=True).start()
+        self._server = server
+
+    def leave(self) -> None:
+        """Stop listening; connections that are open break when they are used."""
+        server, self._server = self._server, None
+        if server:
+            server.shutdown()
+            server.server_close()
 
     def post_message(self, uid: str, title: str, content: str, sender: str = "admin") -> str:
         """Leave a message for a user; the result is its uuid."""
+        self.events.record(_ADMINISTRATOR, "platform", "post", "message", (uid, title, content, sender))
         return self.store.post(uid, title, content, sender)
 
     def messages(self, uid: str | None = None) -> list[dict[str, str]]:
@@ -108,6 +128,7 @@ class Platform:
 
     def password_tip(self, user: str, message: str | None) -> None:
         """Warn a user of the end of the password's life; None takes the warning back."""
+        self.events.record(_ADMINISTRATOR, "platform", "post", "tip", (user, message))
         self.store.set_tip(user, message)
 
     def fault_for(self, route: Route) -> HttpFault:
@@ -122,10 +143,9 @@ class Platform:
         self.released = threading.Event()
 
     def close(self) -> None:
-        """Stop serving."""
+        """Stop serving, and let nothing hang."""
         self.released.set()
-        self._server.shutdown()
-        self._server.server_close()
+        self.leave()
 
     def _context(self, identity: Identity) -> ssl.SSLContext:
         context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
@@ -146,6 +166,7 @@ class _Server(ThreadingHTTPServer):
 class _Handler(BaseHTTPRequestHandler):
     raw_requestline: bytes
     protocol_version = "HTTP/1.1"
+    disable_nagle_algorithm = True  # the body must not wait until the headers have been acknowledged
 
     def setup(self) -> None:
         connection = self.request
@@ -178,6 +199,9 @@ class _Handler(BaseHTTPRequestHandler):
         body = self.rfile.read(int(self.headers.get("Content-Length", 0)))
         url = urlsplit(self.path)
         route = self._platform.store.route(method, url.path)
+        if not self._platform.present:
+            self._hang_up()
+            return
         fault, released = self._platform.fault_for(route), self._platform.released
         self._record(route, body)
         if fault.kind == "hang":
@@ -185,11 +209,12 @@ class _Handler(BaseHTTPRequestHandler):
             fault = HttpFault.none()
         if fault.kind == "none":
             reply = self._platform.store.serve(route, url.query, body)
-            self._reply(reply.status, reply.headers, reply.body)
+            self._reply(route, reply)
         elif fault.kind == "close":
             self._hang_up()
         else:
-            self._reply(fault.status, fault.headers, fault.body, missing=1000 if fault.kind == "cut" else 0)
+            reply = Reply(fault.status, fault.body, fault.headers)
+            self._reply(route, reply, missing=1000 if fault.kind == "cut" else 0)
 
     def _record(self, route: Route, body: bytes) -> None:
         line = self.raw_requestline.decode("latin-1").rstrip("\r\n")
@@ -198,13 +223,15 @@ class _Handler(BaseHTTPRequestHandler):
         detail = {"headers": list(self.headers.items()), "client": subject}
         self._platform.events.record("velks", "platform", "http", route, (line, body.decode()), detail)
 
-    def _reply(self, status: int, headers: Mapping[str, str], body: bytes, missing: int = 0) -> None:
-        self.send_response(status)
-        for name, value in {"Content-Type": "application/json", **headers}.items():
+    def _reply(self, route: Route, reply: Reply, missing: int = 0) -> None:
+        args = (route, reply.status, reply.body.decode(errors="replace"))
+        self._platform.events.record("platform", "velks", "reply", "reply", args, {"headers": reply.headers})
+        self.send_response(reply.status)
+        for name, value in {"Content-Type": "application/json", **reply.headers}.items():
             self.send_header(name, value)
-        self.send_header("Content-Length", str(len(body) + missing))
+        self.send_header("Content-Length", str(len(reply.body) + missing))
         self.end_headers()
-        self.wfile.write(body)
+        self.wfile.write(reply.body)
         if missing:
             self._hang_up()
 

@@ -95,12 +95,13 @@ curl_socket_t openSocket(void*, curlsocktype, curl_sockaddr* address)
 }
 
 /// Percent-encodes, as UTF-8, the characters that a request line cannot carry. QUrl would also alter others.
+/// A "#" is one of them: what follows it would be taken for a fragment, which is never sent.
 QByteArray encodedUrl(const QString& url)
 {
     QByteArray encoded;
     for (const char byte : url.toUtf8()) {
         const auto code = static_cast<unsigned char>(byte);
-        if (code > 0x20 && code < 0x7f) {
+        if (code > 0x20 && code < 0x7f && byte != '#') {
             encoded += byte;
         } else {
             encoded += '%' + QByteArray(1, byte).toHex().toUpper();

@@ -16,7 +16,8 @@
 /// A request without a response (refused, TLS failure, time limit, truncated or oversized reply) returns 0,
 /// empties the reply and the raw headers, and logs one warning. Limits: 10 s to connect, 30 s in all; 8 MiB
 /// of body, 256 KiB of headers, of which libcurl takes at most 100 KiB in one line.
-/// A body that comes without a length ends where the connection ends.
+/// A body that comes without a length ends where the connection ends: libcurl does not tell a cut from an
+/// end.
 class HttpClientApi : public QObject
 {
     Q_OBJECT
@@ -36,7 +37,8 @@ public:
     /// Requests `url`, with `body` as content unless it is empty, and returns the status (0: no response).
     /// `reply` receives the body of the response, read as UTF-8. `isJson`: the content is declared as JSON,
     /// otherwise no content type is sent. Characters of `url` that a request line cannot carry (control
-    /// characters, blanks, those outside ASCII) go out percent-encoded as UTF-8; all else is sent as it is.
+    /// characters, blanks, "#", those outside ASCII) go out percent-encoded as UTF-8; all else is sent as it
+    /// is.
     int getRequest(QString& reply, const QString& url, const QString& body, bool isJson);
     int putRequest(QString& reply, const QString& url, const QString& body, bool isJson);
 

@@ -96,6 +96,19 @@ def test_commands_and_calls_carry_their_arguments(session: Terminal) -> None:
     assert arguments["identity"] == ("com.norix.velk.iam", "Enable", False)
 
 
+def test_daemon_and_identity_service_are_told_after_the_policy_service_was_stopped(session: Terminal) -> None:
+    session.commands.hold("systemctl")
+    mark = session.events.mark()
+    session.daemon.push_policy(EXIT)
+    session.events.wait_for(target="systemctl", after=mark)
+    session.receive_all()
+    told = session.events.all(source="velks", kind="call", after=mark)
+    assert [call.target for call in told] == ["notifications"]
+
+    session.commands.release("systemctl")
+    session.events.wait_for(target="identity", member="Set", after=mark)
+
+
 def test_identity_service_is_switched_off(session: Terminal) -> None:
     leave_domain(session)
     assert session.identity.value("Enable") is False

@@ -99,6 +99,30 @@ def test_hung_notifications_delay_a_policy_by_the_limit_and_the_log_out_still_co
     assert forced_actions(terminal, mark) == ["Terminate"]
 
 
+def test_minute_before_the_reboot_begins_when_the_warning_has_been_tried(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.notifications.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1200})
+    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
+    terminal.jump(DBUS_LIMIT)
+    terminal.events.wait_for(target="identity", member="Set", after=mark)
+
+    terminal.advance(59)
+    assert forced_actions(terminal, mark) == []
+    terminal.advance(1)
+    assert forced_actions(terminal, mark) == ["Reboot"]
+
+
+def test_hung_policy_service_does_not_hold_up_the_agent(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.policy_service.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 5})
+    terminal.daemon.push_policy({"type": 1300})
+    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+
+
 def test_no_signal_is_handled_while_a_notification_is_waited_for(terminal: Terminal) -> None:
     terminal.start_agent()
     terminal.notifications.fault = Fault.hang()

@@ -67,6 +67,7 @@ private Q_SLOTS:
     void messageRequestIsGetWithoutContent();
     void replyIsReportedBeforeTheRequestReturns();
     void replyIsLoggedWithStatusBodyAndHeaderCount();
+    void replyIsLoggedBeforeItIsReported();
     void requestWithoutResponseIsReportedAsStatusZero();
     void answerIsPutAsJsonAndItsReplyDropped();
     void passwordRequestCarriesTheUserName();
@@ -143,6 +144,17 @@ void HandleEventPlatformTest::replyIsLoggedWithStatusBodyAndHeaderCount()
     HandleEvent::GetInstance()->getPlatformMsg(said(*m_peer, 404, QStringLiteral("[]")));
 }
 
+void HandleEventPlatformTest::replyIsLoggedBeforeItIsReported()
+{
+    const LogRecorder log;
+    QStringList linesWhenReported;
+    const QObject receiver;
+    connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
+            [&linesWhenReported] { linesWhenReported = LogRecorder::lines(); });
+    HandleEvent::GetInstance()->getPlatformMsg(said(*m_peer, 200, QStringLiteral("[]")));
+    QCOMPARE(linesWhenReported, QStringList{QStringLiteral(R"(getPlatformMsg ----nCode: 200 : "[]" : 2)")});
+}
+
 void HandleEventPlatformTest::requestWithoutResponseIsReportedAsStatusZero()
 {
     auto* event = HandleEvent::GetInstance();
@@ -177,6 +189,7 @@ void HandleEventPlatformTest::passwordRequestCarriesTheUserName()
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
     QCOMPARE(request[QStringLiteral("body")].toString(),
              QStringLiteral("{\n    \"username\": \"张 \\\"%1\\\"\"\n}\n"));
+    QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
 }
 
 void HandleEventPlatformTest::passwordReplyIsReportedLikeAnyOther()

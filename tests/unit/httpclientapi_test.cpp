@@ -128,6 +128,7 @@ void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_
     row("escapes in lower case", "/%c3%bc?a=%2f", "/%c3%bc?a=%2f");
     row("dot segments", "/a/../b/./c", "/a/../b/./c");
     row("punctuation", "/a\"<>[]\\^`{|}!$'()*,;:@", "/a\"<>[]\\^`{|}!$'()*,;:@");
+    row("hash sign", "/?a=b#c&d=e", "/?a=b%23c&d=e");
     row("signs in the query", "/?a=b+c@d?e/f=", "/?a=b+c@d?e/f=");
 }
 

@@ -46,6 +46,7 @@ private Q_SLOTS:
     void expiredCountdownWithoutForcedActionDoesNothing_data();
     void expiredCountdownWithoutForcedActionDoesNothing();
     void laterCodeReplacesPendingOne();
+    void expiryKeepsThePendingCode();
     void stateIsReportedEveryFiveMinutes();
 
 private:
@@ -251,6 +252,15 @@ void MessageTransferTest::laterCodeReplacesPendingOne()
     transfer.onTimeout();
     QCOMPARE(forcedActions(*m_logind).size(), 1);
     QVERIFY(forcedActions(*m_logind).constFirst().endsWith(QLatin1String("Session.Terminate")));
+}
+
+void MessageTransferTest::expiryKeepsThePendingCode()
+{
+    MessageTransfer transfer;
+    transfer.startTime(QString(), 1201);
+    transfer.onTimeout();
+    transfer.onTimeout();
+    QCOMPARE(forcedActions(*m_logind).size(), 2);
 }
 
 void MessageTransferTest::stateIsReportedEveryFiveMinutes()

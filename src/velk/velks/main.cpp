@@ -4,6 +4,7 @@
 #include <pwd.h>
 #include <unistd.h>
 
+#include "message_platform.h"
 #include "message_transfer.h"
 #include "types.h"
 
@@ -38,6 +39,7 @@ int main(int argc, char* argv[])
         userName.remove(0, 1);
     }
     qInfo() << "---getusername:" << userName;
+    const MessagePlatform messagePlatform(nullptr, userName, &messageTransfer);
 
     return QCoreApplication::exec();
 }

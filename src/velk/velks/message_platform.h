@@ -1,0 +1,106 @@
+#pragma once
+
+#include <QByteArray>
+#include <QList>
+#include <QObject>
+#include <QPair>
+#include <QString>
+#include <QVector>
+
+#include <functional>
+
+class MessageTransfer;
+class QTimer;
+
+/// The parameters of one list request.
+struct NotifyMessageOption
+{
+    QString uid;
+    bool is_not_read = false;
+    int limit = 10;
+    int offset = 0;
+    QString order = QStringLiteral("create_at");
+    QString desc = QStringLiteral("1");
+};
+
+/// One message of the platform; it is unread exactly when read_at is empty.
+struct NotifyMessage
+{
+    QString uuid;
+    QString uid;
+    QString send_uid;
+    QString title;
+    QString content;
+    QString created_at;
+    QString read_at;
+};
+
+/// One reply to a list request; the counts are 0 where the platform gives none.
+struct NotifyMessageResponse
+{
+    int total = 0;
+    int offset = 0;
+    int limit = 0;
+    QVector<NotifyMessage> messages;
+};
+
+using list_message_callback = std::function<void(bool, const NotifyMessageResponse&)>;
+
+/// Brings the platform's unread messages to a domain user: polls while the session is active, shows each
+/// message as a notification and marks it read. Idle for local users, and where the daemon's information
+/// file names no host and port. Requests block; see HandleEvent.
+class MessagePlatform : public QObject
+{
+    Q_OBJECT
+
+public:
+    MessagePlatform(QObject* parent, const QString& userName, MessageTransfer* transfer);
+
+    bool isLdapUser();
+    bool loadCfg();
+    void initHttpApi();
+    void initPlatformMessage();
+
+    /// A poll interval in milliseconds, at least min and below max (min where both are equal). It depends on
+    /// the second of the day at which it is drawn.
+    int generateRandnum(const int& max, const int& min);
+
+    void unreadMessages(const QString& uid, const int& page, const int& limit);
+
+    /// Both request a list and return 0 when it and its follow-ups have been handled. Results reach the
+    /// program through OnRecvMsg only; the callback is never called.
+    int getNotifyMessageList(const QString& uid, bool isNotRead, int page, int limit,
+                             const list_message_callback& callback);
+    int getNotifyMessageList(const NotifyMessageOption& option, const list_message_callback& callback);
+
+    /// Marks one message read on the platform.
+    void messageRespond(const QString& uuid);
+
+public Q_SLOTS:
+    void onUnReadMessages();
+
+    /// Handles any reply of the platform, and asks for the next message while the reply counts more than one.
+    void OnRecvMsg(const int& statusCode, const QString& body,
+                   const QList<QPair<QByteArray, QByteArray>>& rawHeaders);
+
+private:
+    void show(const NotifyMessage& message);
+    void requestList(const NotifyMessageOption& option);
+    void askForFollowUps();
+
+    QTimer* m_timer = nullptr;
+    QString m_userName;
+    QString m_appPath;
+    QString m_host;
+    QString m_port;
+    QString m_requestUrl;
+    QString m_listUrl;
+    QString m_readUrl;
+    MessageTransfer* m_transfer;
+
+    // One reply's follow-up is asked for by the outermost caller, in a loop, so that a long row of messages
+    // needs no more stack than one.
+    bool m_asking = false;
+    bool m_followUpDue = false;
+    bool m_followUpQueued = false;
+};

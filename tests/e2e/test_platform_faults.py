@@ -1,0 +1,264 @@
+"""A platform that is down, slow, lying or somebody else: the agent logs it, goes on, and comes back."""
+
+from __future__ import annotations
+
+import subprocess
+from pathlib import Path
+from tempfile import mkdtemp
+from typing import Iterator
+
+import pytest
+
+from sandbox import layout
+from sandbox.certificates import Authority, Identity
+from sandbox.platform_server import HttpFault, Platform, trust
+from sandbox.terminal import Terminal
+from wire import log_lines, next_notification
+
+SURELY_NEXT_POLL = 181
+USER = "zhang.wei"
+TRANSFER_LIMIT = 30
+
+
+def poll(terminal: Terminal) -> int:
+    """Let the next poll come, with all that follows from it; the result is the mark before it."""
+    mark = terminal.events.mark()
+    terminal.advance(SURELY_NEXT_POLL)
+    return mark
+
+
+def warnings(terminal: Terminal, after: int) -> list[str]:
+    """What the agent has warned of since a mark."""
+    return [event.args[0] for event in terminal.events.all(kind="log", member="warning", after=after)]
+
+
+def next_poll_is_well(terminal: Terminal) -> None:
+    """Assert that a message posted now arrives with the next poll."""
+    terminal.platform.post_message(USER, "later", "text")
+    assert next_notification(terminal, poll(terminal)).summary == "later"
+
+
+def carries_out_policies(terminal: Terminal) -> None:
+    """Assert that a policy reaches the user."""
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1300})
+    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+
+
+@pytest.mark.parametrize("fault", [HttpFault.close(), HttpFault.cut()], ids=lambda fault: fault.kind)
+def test_broken_reply_is_one_warning_and_shows_nothing(terminal: Terminal, fault: HttpFault) -> None:
+    terminal.platform.post_message(USER, "T", "C")
+    terminal.start_agent()
+    terminal.platform.fault = fault
+    mark = poll(terminal)
+    assert len(warnings(terminal, mark)) == 1
+    assert warnings(terminal, mark)[0].startswith("HTTP GET without a response: ")
+    assert terminal.events.all(member="Notify", after=mark) == []
+
+    terminal.platform.release()
+    carries_out_policies(terminal)
+    next_poll_is_well_after_the_first(terminal)
+
+
+def next_poll_is_well_after_the_first(terminal: Terminal) -> None:
+    """Assert that the message that waited arrives with the next poll."""
+    assert next_notification(terminal, poll(terminal)).summary == "T"
+
+
+def test_platform_that_is_down_is_asked_again_with_every_poll(terminal: Terminal) -> None:
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    assert len(warnings(terminal, mark)) == 1
+    mark = poll(terminal)
+    assert len(warnings(terminal, mark)) == 1
+    carries_out_policies(terminal)
+    next_poll_is_well(terminal)
+
+
+def test_hanging_platform_costs_the_transfer_limit_and_no_more(terminal: Terminal) -> None:
+    terminal.platform.post_message(USER, "T", "C")
+    terminal.start_agent()
+    terminal.platform.fault = HttpFault.hang()
+    mark = terminal.events.mark()
+    terminal.sync()
+    terminal.jump(SURELY_NEXT_POLL)
+    terminal.events.wait_for(kind="http", member="list", after=mark)
+    terminal.daemon.push_policy({"type": 5})
+    terminal.jump(TRANSFER_LIMIT)
+    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+    assert len(warnings(terminal, mark)) == 1
+
+    terminal.platform.release()
+    next_poll_is_well_after_the_first(terminal)
+
+
+def test_hanging_receipt_does_not_keep_the_message_from_being_shown(terminal: Terminal) -> None:
+    terminal.platform.post_message(USER, "T", "C")
+    terminal.start_agent()
+    terminal.platform.faults["read"] = HttpFault.hang()
+    mark = terminal.events.mark()
+    terminal.sync()
+    terminal.jump(SURELY_NEXT_POLL)
+    terminal.events.wait_for(kind="http", member="read", after=mark)
+    terminal.jump(TRANSFER_LIMIT)
+    assert next_notification(terminal, mark).summary == "T"
+
+
+def test_reply_left_over_counts_are_not_read_again(terminal: Terminal) -> None:
+    """A reply that counted five is followed by none at all: the chain ends there."""
+    terminal.start_agent()
+    terminal.platform.faults["list"] = HttpFault.reply(200, b"[]", {"X-Total-Count": "5"})
+
+    def break_platform(event: object) -> None:
+        if getattr(event, "member", "") == "list":
+            terminal.platform.faults["list"] = HttpFault.close()
+
+    terminal.events.subscribe(break_platform)
+    mark = poll(terminal)
+    assert len(warnings(terminal, mark)) == 1
+
+
+def stranger() -> Identity:
+    """A server's certificate from an authority that the terminal does not know."""
+    return Authority(Path(mkdtemp()), "Stranger").issue_server(layout.PLATFORM_HOST)
+
+
+def misnamed() -> Identity:
+    """A certificate of the platform's authority for another host."""
+    return trust().authority.issue_server("elsewhere.box")
+
+
+def expired() -> Identity:
+    """The platform's certificate, too old."""
+    return trust().authority.issue_server(layout.PLATFORM_HOST, expired=True)
+
+
+@pytest.mark.parametrize("identity", [stranger, misnamed, expired])
+def test_platform_with_a_wrong_certificate_is_told_nothing(terminal: Terminal, identity: object) -> None:
+    assert callable(identity)
+    terminal.platform.close()
+    impostor = Platform(terminal.events, server=identity())
+    try:
+        mark = terminal.events.mark()
+        terminal.start_agent()
+        poll(terminal)
+        requests = terminal.events.all(kind="http", after=mark)
+        assert {event.member for event in requests} <= {"tls"}
+        assert len(warnings(terminal, mark)) == 2
+        carries_out_policies(terminal)
+    finally:
+        impostor.close()
+
+
+def test_terminal_without_its_certificate_gets_nothing_and_goes_on(terminal: Terminal) -> None:
+    assert terminal.platform
+    layout.CLIENT_CERTIFICATE.unlink()
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    poll(terminal)
+    assert [
+        event.member for event in terminal.events.all(kind="http", after=mark) if event.member != "tls"
+    ] == []
+    assert len(warnings(terminal, mark)) == 2
+    carries_out_policies(terminal)
+
+
+NGINX = """
+daemon off;
+pid {folder}/nginx.pid;
+error_log stderr;
+events {{}}
+http {{
+    access_log off;
+    client_body_temp_path {folder}/body;
+    proxy_temp_path {folder}/proxy;
+    fastcgi_temp_path {folder}/fastcgi;
+    uwsgi_temp_path {folder}/uwsgi;
+    scgi_temp_path {folder}/scgi;
+    server {{
+        listen {front} ssl http2;
+        ssl_certificate "{server.certificate}";
+        ssl_certificate_key "{server.key}";
+        ssl_client_certificate "{authority}";
+        ssl_verify_client on;
+        location / {{
+            proxy_pass https://{host}:{back};
+            proxy_http_version 1.1;
+            proxy_set_header Host $http_host;
+            proxy_ssl_certificate "{terminal.certificate}";
+            proxy_ssl_certificate_key "{terminal.key}";
+        }}
+    }}
+}}
+"""
+NGINX_PORT = 9443
+
+
+@pytest.fixture
+def nginx(terminal: Terminal) -> Iterator[int]:
+    """A web server of somebody else's in front of the platform; the result is its port."""
+    folder = Path(mkdtemp())
+    known = trust()
+    (folder / "nginx.conf").write_text(
+        NGINX.format(
+            folder=folder,
+            front=NGINX_PORT,
+            back=terminal.platform.port,
+            host=layout.PLATFORM_HOST,
+            server=known.server,
+            terminal=known.terminal,
+            authority=known.authority.certificate,
+        )
+    )
+    process = subprocess.Popen(["/usr/sbin/nginx", "-e", "stderr", "-c", folder / "nginx.conf"])
+    subprocess.run(
+        ["bash", "-c", f"until : 2>/dev/null < /dev/tcp/127.0.0.1/{NGINX_PORT}; do :; done"],
+        check=True,
+        timeout=20,
+    )
+    yield NGINX_PORT
+    process.terminate()
+    process.wait()
+
+
+def test_messages_come_through_a_web_server_that_offers_http_2(terminal: Terminal, nginx: int) -> None:
+    terminal.files.write_userinfo(server_port=str(nginx))
+    for title in ("first", "second", "third"):
+        terminal.platform.post_message(USER, title, "text")
+    terminal.start_agent()
+    mark = poll(terminal)
+    assert [event.args[3] for event in terminal.events.all(member="Notify", after=mark)] == [
+        "first",
+        "second",
+        "third",
+    ]
+    assert all(sent["read_at"] for sent in terminal.platform.messages())
+
+
+@pytest.mark.parametrize(
+    "content",
+    [None, b"", b"garbage", b"[]", b'{"server_host":"platform.box"}', b'{"server_port":"8443"}'],
+    ids=repr,
+)
+def test_without_host_and_port_the_platform_is_never_asked(terminal: Terminal, content: bytes | None) -> None:
+    assert terminal.platform
+    if content is None:
+        layout.USERINFO.unlink()
+    else:
+        terminal.files.write_userinfo(content)
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    poll(terminal)
+    assert terminal.events.all(kind="http", after=mark) == []
+    assert "---------load cfg" not in log_lines(terminal, mark)
+    carries_out_policies(terminal)
+
+
+@pytest.mark.local_user
+def test_local_user_is_logged_and_the_platform_never_asked(terminal: Terminal) -> None:
+    assert terminal.platform
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    poll(terminal)
+    assert terminal.events.all(kind="http", after=mark) == []
+    assert f'is not ldap user: "{terminal.user.name}"' in log_lines(terminal, mark)
