@@ -68,6 +68,11 @@ class Events:
         with self._changed:
             self._subscribers.append(subscriber)
 
+    def forget(self) -> None:
+        """Drop what has happened so far; marks taken before mean nothing any more."""
+        with self._changed:
+            self._events.clear()
+
     def mark(self) -> int:
         """A place in the list: what comes `after` it has not happened yet."""
         with self._changed:
@@ -92,9 +97,12 @@ class Events:
         Waits for it if need be; an AssertionError after `timeout` seconds lists what came instead.
         """
         found: list[Event] = []
+        looked_at = after
 
         def came() -> bool:
-            found[:] = [event for event in self._events[after:] if _matches(event, predicate, fields)]
+            nonlocal looked_at
+            fresh, looked_at = self._events[looked_at:], len(self._events)
+            found.extend(event for event in fresh if _matches(event, predicate, fields))
             return len(found) >= count
 
         with self._changed:

@@ -6,6 +6,7 @@ import json
 import threading
 from dataclasses import dataclass, field
 from datetime import datetime
+from itertools import islice
 from typing import Any, Literal, Mapping
 from urllib.parse import parse_qs
 from uuid import uuid4
@@ -33,7 +34,8 @@ class Store:
 
     def __init__(self) -> None:
         self._lock = threading.Lock()
-        self._messages: list[dict[str, str]] = []
+        self._messages: dict[str, dict[str, str]] = {}
+        self._unread: dict[str, dict[str, dict[str, str]]] = {}  # by user, then by uuid
         self._tips: dict[str, str] = {}
 
     @staticmethod
@@ -53,13 +55,14 @@ class Store:
             "read_at": "",
         }
         with self._lock:
-            self._messages.append(message)
+            self._messages[message["uuid"]] = message
+            self._unread.setdefault(uid, {})[message["uuid"]] = message
         return message["uuid"]
 
     def messages(self, uid: str | None = None) -> list[dict[str, str]]:
         """Copies of the messages, oldest first."""
         with self._lock:
-            return [dict(message) for message in self._messages if uid in (None, message["uid"])]
+            return [dict(message) for message in self._messages.values() if uid in (None, message["uid"])]
 
     def set_tip(self, user: str, message: str | None) -> None:
         """Set or, with None, remove the warning of a user."""
@@ -80,19 +83,24 @@ class Store:
 
     def _list(self, query: Mapping[str, str]) -> Reply:
         limit, offset = int(query.get("limit", "10")), int(query.get("offset", "0"))
-        found = self.messages(query.get("uid", ""))
+        uid = query.get("uid", "")
         if query.get("is_not_read") == "1":
-            found = [message for message in found if not message["read_at"]]
-        headers = {"X-Total-Count": len(found), "X-Total-Offset": offset, "X-Total-Limit": limit}
-        page = found[offset : offset + limit]
+            with self._lock:
+                unread = self._unread.get(uid, {})
+                count, page = len(unread), list(islice(unread.values(), offset, offset + limit))
+        else:
+            found = self.messages(uid)
+            count, page = len(found), found[offset : offset + limit]
+        headers = {"X-Total-Count": count, "X-Total-Offset": offset, "X-Total-Limit": limit}
         return Reply(200, _json(page), {name: str(value) for name, value in headers.items()})
 
     def _mark_read(self, uuid: Any) -> Reply:
         with self._lock:
-            for message in self._messages:
-                if message["uuid"] == uuid:
-                    message["read_at"] = _now()
-                    return Reply(200, _json({"code": 0}))
+            message = self._messages.get(uuid)
+            if message:
+                message["read_at"] = _now()
+                self._unread[message["uid"]].pop(uuid, None)
+                return Reply(200, _json({"code": 0}))
         return Reply(404, _json({"code": 1}))
 
     def _tip(self, user: Any) -> Reply:

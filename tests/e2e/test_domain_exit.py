@@ -57,7 +57,7 @@ def road(session: Terminal, mark: int) -> list[tuple[str, str]]:
 def restrictions() -> dict[str, str]:
     """The user's restriction switches as they stand in the file."""
     file = configparser.RawConfigParser()
-    file.optionxform = str  # type: ignore[assignment, method-assign]
+    file.optionxform = str  # type: ignore[assignment]
     file.read(Path.home() / ".config" / "norix" / "desktop-control.ini")
     return dict(file["restrictions"])
 
