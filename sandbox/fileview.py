@@ -13,8 +13,6 @@ from sandbox.users import User
 MACHINE_ID = "box-file-machine-0001"
 DEFAULT_USERINFO: dict[str, Any] = {
     "is_Domain": True,
-    "server_host": layout.PLATFORM_HOST,
-    "server_port": str(layout.PLATFORM_PORT),
     "domain_host": layout.PLATFORM_HOST,
     "domain_port": "636",
     "terminal_name": "box-terminal",
@@ -78,6 +76,10 @@ class FileView:
         """Write the daemon's information file: the default with `keys` changed, or `content` as it stands."""
         default = json.dumps({**DEFAULT_USERINFO, **keys}, ensure_ascii=False, indent=4)
         self.write(layout.USERINFO, default if content is None else content)
+
+    def write_platform_address(self, port: int) -> None:
+        """Record where the platform is; without it the agent never asks the platform for anything."""
+        self.write_userinfo(server_host=layout.PLATFORM_HOST, server_port=str(port))
 
     def write_machine_id(self, text: str) -> None:
         """Write the terminal's machine identifier."""

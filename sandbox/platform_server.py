@@ -78,7 +78,8 @@ class Platform:
 
     Every request is an event of kind "http": member "list", "read", "tips" or "other"; args the request line
     and the body; detail headers and the client's name. A failed handshake is an event with member "tls", and
-    an answer one of kind "reply": args route, status and body, detail the answer's own headers. `fault` applies to all requests, `faults` to those of one route.
+    an answer one of kind "reply": args route, status and body, detail the answer's own headers. `fault`
+    applies to all requests, `faults` to those of one route.
     """
 
     def __init__(
@@ -135,9 +136,9 @@ class Platform:
         """What happens to a request of this route now."""
         return self.faults.get(route, self.fault)
 
-    def release(self) -> None:
-        """Let hanging requests go on, and serve later ones."""
-        self.fault = HttpFault.none()
+    def release(self, then: HttpFault = HttpFault("none")) -> None:
+        """Let hanging requests go on; they and later ones get `then`, or are served."""
+        self.fault = then
         self.faults.clear()
         self.released.set()
         self.released = threading.Event()
@@ -206,7 +207,7 @@ class _Handler(BaseHTTPRequestHandler):
         self._record(route, body)
         if fault.kind == "hang":
             released.wait()
-            fault = HttpFault.none()
+            fault = self._platform.fault_for(route)
         if fault.kind == "none":
             reply = self._platform.store.serve(route, url.query, body)
             self._reply(route, reply)

@@ -90,13 +90,15 @@ class Terminal:
 
     @cached_property
     def platform(self) -> Platform:
-        """The platform, which starts serving when it is first looked at; the terminal then has its
-        certificates."""
+        """The platform, which starts serving when it is first looked at; the terminal then knows its address
+        and has its certificates. Until then no poll falls into what a test watches."""
         known = trust()
         self.files.write_certificates(
             known.authority.certificate, known.terminal.certificate, known.terminal.key
         )
-        return Platform(self.events)
+        platform = Platform(self.events)
+        self.files.write_platform_address(platform.port)
+        return platform
 
     def start_agent(
         self, ready: Callable[[], object] | None = None, extra_env: Mapping[str, str] | None = None

@@ -45,9 +45,13 @@ class Tour:
         self._timeline = timeline
         self._patience = patience
         self._outcomes: list[Outcome] = []
+        self._mark = 0
+        self._cue = 0.0
 
     def play(self, scenes: Mapping[int, Scene]) -> list[Outcome]:
         """Play the scenes, which are given by number; one outcome for each expectation of each scene."""
+        for scene in scenes.values():
+            scene.beforehand(self._terminal)
         for number, scene in scenes.items():
             self._play_scene(f"{number}. {scene.title}", scene)
         return self._outcomes
@@ -70,28 +74,39 @@ class Tour:
             self._timeline.print(Text(scene.remark, "dim"))
 
     def _play_step(self, title: str, step: Step) -> list[Outcome]:
-        mark = self._terminal.events.mark()
-        cue = time.monotonic()
-        step.cue(self._terminal)
-        wanted = [expectation for expectation in step.then if not expectation.forbidden]
-        came = all(self._comes(expectation, mark, cue) for expectation in wanted)
-        is_silent = came and not self._settles()
-        outcomes = [self._judge(title, expectation, mark, cue) for expectation in step.then]
+        if step.cue:
+            self._mark, self._cue = self._terminal.events.mark(), time.monotonic()
+            step.cue(self._terminal)
+        is_silent = self._all_come(step) and not self._settles()
+        outcomes = self._judge(title, step)
         if is_silent:
             outcomes.append(Outcome(title, _STILL_THERE, "missing"))
-        elif not wanted and all(outcome.verdict == "as expected" for outcome in outcomes):
+        elif not step.wanted and all(outcome.verdict == "as expected" for outcome in outcomes):
             self._tell_of_silence(step)
         return outcomes
 
-    def _comes(self, expectation: Expectation, mark: int, cue: float) -> bool:
-        due = cue + expectation.within / self._timeline.time.speed + self._patience
+    def _all_come(self, step: Step) -> bool:
+        """Wait for what is wanted, until something does not come."""
+        place = self._mark
+        for expectation in step.wanted:
+            event = self._wait_for(expectation, place)
+            if event is None:
+                return False
+            place = self._next_place(step, event)
+        return True
+
+    def _wait_for(self, expectation: Expectation, place: int) -> Event | None:
+        due = self._cue + expectation.within / self._timeline.time.speed + self._patience
         timeout = max(0.0, due - time.monotonic())
         with self._timeline.waiting(expectation.words):
             try:
-                self._terminal.events.wait_for(expectation.matches, after=mark, timeout=timeout)
+                return self._terminal.events.wait_for(expectation.matches, after=place, timeout=timeout)
             except AssertionError:
-                return False
-        return True
+                return None
+
+    def _next_place(self, step: Step, event: Event) -> int:
+        """Where to look for what comes next."""
+        return self._terminal.events.all().index(event) + 1 if step.in_order else self._mark
 
     def _settles(self) -> bool:
         """Whether the agent has handled everything, so that what has not come by now will not come."""
@@ -106,14 +121,23 @@ class Tour:
         words = "; ".join(expectation.words for expectation in step.then)
         self._timeline.print(Padding(Text(f"Nothing follows: {words}.", "italic"), _INDENTED))
 
-    def _judge(self, title: str, expectation: Expectation, mark: int, cue: float) -> Outcome:
-        event = self._first(expectation, mark)
+    def _judge(self, title: str, step: Step) -> list[Outcome]:
+        outcomes = []
+        place = self._mark
+        for expectation in step.then:
+            event = self._first(expectation, self._mark if expectation.forbidden else place)
+            outcomes.append(self._outcome(title, expectation, event))
+            if event and not expectation.forbidden:
+                place = self._next_place(step, event)
+        return outcomes
+
+    def _outcome(self, title: str, expectation: Expectation, event: Event | None) -> Outcome:
         if (event is None) == expectation.forbidden:
             verdict: Verdict = "as expected"
         else:
             verdict = "forbidden" if expectation.forbidden else "missing"
-        delay = (event.time - cue) * self._timeline.time.speed if event else 0.0
+        delay = (event.time - self._cue) * self._timeline.time.speed if event else 0.0
         return Outcome(title, expectation, verdict, event, delay)
 
-    def _first(self, expectation: Expectation, mark: int) -> Event | None:
-        return next(iter(self._terminal.events.all(expectation.matches, after=mark)), None)
+    def _first(self, expectation: Expectation, place: int) -> Event | None:
+        return next(iter(self._terminal.events.all(expectation.matches, after=place)), None)

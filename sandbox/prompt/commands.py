@@ -6,7 +6,9 @@ from typing import Any, Iterable
 
 from rich.table import Table
 
+from sandbox import layout
 from sandbox.peers.fault import Fault
+from sandbox.prompt import platform_commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, command, number
 from sandbox.timeline import glosses
@@ -108,6 +110,13 @@ def well(desk: Desk, name: str) -> None:
     desk.peer(name).fault = Fault.none()
 
 
+@command("login", "", "the session ends and begins anew, and the agent with it")
+def login(desk: Desk) -> None:
+    """Returns at once: what the agent then does shows in the traffic."""
+    desk.terminal.agent.stop()
+    desk.terminal.start_agent(ready=lambda: None)
+
+
 @command("log", "on|off", "show the agent's own log lines or not", _on_off)
 def log(desk: Desk, wanted: str) -> None:
     """For the lines to come."""
@@ -120,15 +129,19 @@ def wait(desk: Desk, member: str, seconds: str = _WAIT_SECONDS) -> None:
     desk.follow(member, number(seconds, float))
 
 
-@command("state", "", "the services: whether they are there, and how they behave")
+@command("state", "", "the services and the platform: whether they are there, and how they behave")
 def state(desk: Desk) -> None:
     """And the agent."""
-    table = Table("Service", "Bus", "Name on the bus", "Present", "Behaves")
+    table = Table("Service", "Bus", "Name there", "Present", "Behaves")
     for name, peer in desk.terminal.peers.items():
         fault = peer.fault
         manner = f"slow ({fault.seconds:g} s)" if fault.kind == "slow" else fault.kind
         manner = "well" if fault.kind == "none" else manner
         table.add_row(name, peer.bus.kind, peer.bus_name, "yes" if peer.present else "no", manner)
+    platform = desk.terminal.platform
+    address = f"{layout.PLATFORM_HOST}:{platform.port}"
+    present = "yes" if platform.present else "no"
+    table.add_row("platform", "https", address, present, platform_commands.behaviour(platform))
     desk.show(table)
     running = desk.terminal.agent.alive
     user = desk.terminal.user

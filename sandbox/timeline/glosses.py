@@ -12,6 +12,12 @@ NOTICES = {
     "该终端1分钟后进行重启": "this terminal will reboot in 1 minute",
     "管理员调整密码规则，避免影响登录，请及时修改密码": "the administrator has changed the password rules; "
     "change your password in time so that you can go on logging in",
+    # What the platform says in the tour.
+    "您的密码将在3天后过期，请及时修改": "your password will expire in 3 days; change it in time",
+    "今晚22:00停机，请保存文件": "shutdown tonight at 22:00; save your files",
+    '请读 "须知", 周五前回复': 'read the "rules" and answer by Friday',
+    "图书馆本周六闭馆": "the library is closed this Saturday",
+    "三楼打印机已修好": "the printer on the third floor works again",
 }
 ACTIONS = {"重启": "reboot", "查看": "view"}
 POLICIES = {
@@ -24,6 +30,11 @@ POLICIES = {
     1304: "the password must be changed",
 }
 STATUSES = {1: "the session is active", 2: "the session is locked", 3: "the screen saver is running"}
+REQUESTS = {
+    "list": "are there unread messages? (one at a time)",
+    "read": "this one is being shown to the user",
+    "tips": "is the user's password about to expire?",
+}
 PROPERTIES = {
     "isRunning": "is the screen saver running?",
     "Locked": "is the session locked?",

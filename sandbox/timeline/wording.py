@@ -34,6 +34,8 @@ def what(event: Event) -> str:
 
 def meaning(event: Event) -> str:
     """What it means, empty when what was said speaks for itself."""
+    if event.kind == "http":
+        return glosses.REQUESTS.get(event.member, "")
     known = _MEANING.get(event.member)
     return known(event.args) if known else ""
 
@@ -51,6 +53,20 @@ def _notify(event: Event) -> str:
     return f"Notify “{event.args[3]}” “{event.args[4]}”{''.join(actions)}"
 
 
+def _request(event: Event) -> str:
+    """Without the query, which is long; the agent's log has it."""
+    line, body = event.args
+    method, target = line.split()[:2]
+    path, query, _ = target.partition("?")
+    return " ".join((method, path + ("?…" if query else ""), *body.split()))
+
+
+def _reply(event: Event) -> str:
+    _, status, body = event.args
+    unread = event.detail["headers"].get("X-Total-Count")
+    return f"{status} {body}" if unread is None else f"{status}, {unread} unread"
+
+
 def _property_change(event: Event) -> str:
     return ", ".join(f"{name} = {_value(value)}" for name, value in event.args[1].items())
 
@@ -62,21 +78,26 @@ _WHAT: dict[str, Callable[[Event], str]] = {
     "PropertiesChanged": _property_change,
     "Get": lambda event: f"Get {event.args[1]}",
     "Set": lambda event: f"Set {event.args[1]} = {_value(event.args[2])}",
+    "message": lambda event: f"message “{event.args[1]}” “{event.args[2]}”",
+    "tip": lambda event: "no tip" if event.args[1] is None else f"tip “{event.args[1]}”",
+    "tls": lambda event: f"no TLS connection: {event.args[0]}",
+    "reply": _reply,
 }
 _WHAT_OF_KIND: dict[str, Callable[[Event], str]] = {
     "command": lambda event: " ".join((event.member, *event.args)),
     "file": lambda event: f"{event.member} = {event.args[0]}",
+    "inbox": lambda event: f"“{event.member}” {event.args[0]}",
     "life": lambda event: event.member,
     "log": lambda event: f"{event.member}: {event.args[0]}",
     "output": lambda event: str(event.args[0]),
-    "http": lambda event: " ".join(event.args),
+    "http": _request,
 }
 
 
 def _notice_meaning(args: tuple[Any, ...]) -> str:
     gloss = glosses.NOTICES.get(args[4], "")
     actions = [f"[{glosses.ACTIONS.get(label, label)}]" for label in args[5][1::2]]
-    return " ".join((gloss, *actions))
+    return " ".join(filter(None, (gloss, *actions)))
 
 
 def _policy_meaning(args: tuple[Any, ...]) -> str:
@@ -110,4 +131,6 @@ _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
     "Reboot": lambda args: "forced reboot",
     "systemctl": lambda args: "the policy service is stopped for all users" if "stop" in args else "",
     "restore_config": lambda args: "what the daemon changed on the terminal is undone",
+    "message": lambda args: f"for {args[0]}, from {args[3]}",
+    "tip": lambda args: f"for {args[0]}: the password is about to expire" if args[1] else f"for {args[0]}",
 }

@@ -87,6 +87,7 @@ def test_daemon_that_never_answers_is_still_told_and_obeyed(terminal: Terminal) 
 
 
 def test_daemon_that_refuses_every_call_changes_nothing(terminal: Terminal) -> None:
+    assert terminal.platform, "a missing one would be warned of"
     terminal.daemon.fault = Fault.fail()
     mark = terminal.events.mark()
     terminal.start_agent()

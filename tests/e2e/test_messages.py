@@ -5,18 +5,20 @@ from __future__ import annotations
 import json
 import re
 from pathlib import Path
-from typing import Any
+from typing import Any, Iterator
+from uuid import uuid4
 
 import pytest
 
 from sandbox.events import Event
 from sandbox.platform_server import HttpFault
 from sandbox.terminal import Terminal
-from wire import forced_actions, log_lines, next_notification
+from wire import FORWARDED_CODE, forced_actions, log_lines, next_notification
 
 # The first poll comes 60 to 120 s after the start, a later one 60 to 180 s after the one before.
 SURELY_FIRST_POLL, SURELY_NEXT_POLL = 121, 181
 BEFORE_ANY_POLL = 58
+LESS_THAN_A_REQUEST_MAY_TAKE = 20
 USER = "zhang.wei"
 
 
@@ -310,30 +312,51 @@ def test_count_that_never_falls_does_not_keep_a_log_out_waiting(session: Termina
     session.sync()
 
 
-def test_policies_have_their_turn_after_every_fifty_messages(session: Terminal) -> None:
-    """Also when the next poll falls into a drain: it does not start a second one beside it."""
-    answer_always(session, b"[]", {"X-Total-Count": "1000"})
+COUNT_NEVER_FALLS = HttpFault.reply(200, b"[]", {"X-Total-Count": "1000"})
+
+
+def policy_goes_before_the_51st_message(terminal: Terminal) -> None:
+    """Assert it of a policy that comes now, while the platform holds a list request."""
+    marker = str(uuid4())
+    terminal.daemon.push_policy({"type": FORWARDED_CODE, "marker": marker})
+    mark = terminal.events.mark()
+
+    def hold_the_51st(event: Event) -> None:
+        if event.member == "list" and len(requests(terminal, "list", mark)) == 50:
+            terminal.platform.fault = HttpFault.hang()
+
+    terminal.events.subscribe(hold_the_51st)
+    terminal.platform.release(then=COUNT_NEVER_FALLS)
+    terminal.events.wait_for(kind="http", member="list", count=51, after=mark)
+    terminal.events.wait_for(
+        lambda event: marker in event.args[0], target="policy_service", member="onPolicyMsg", after=mark
+    )
+
+
+@pytest.fixture
+def held(session: Terminal) -> Iterator[Terminal]:
+    """A terminal whose agent waits for the reply to its first list request."""
+    session.platform.fault = HttpFault.hang()
     mark = session.events.mark()
     session.sync()
     session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark, count=120)
-    session.jump(SURELY_NEXT_POLL)
-    for _ in range(6):
-        session.sync()
-    turns = [len(requests(session, "list", start)) for start in turns_of(session, mark)]
-    answer_always(session, b"[]")
-    between = [earlier - later for earlier, later in zip(turns, turns[1:])]
-    assert max(between[-5:]) <= 75
+    session.events.wait_for(kind="http", member="list", after=mark)
+    yield session
+    session.platform.release()
 
 
-def turns_of(terminal: Terminal, after: int) -> list[int]:
-    """Marks of the moments at which the agent handled a policy."""
-    events = terminal.events.all()
-    return [
-        number
-        for number, event in enumerate(events)
-        if number >= after and event.kind == "log" and "onPolicyMsg ---------payload: " in event.args[0]
-    ]
+def test_policies_have_their_turn_after_every_fifty_messages(held: Terminal) -> None:
+    policy_goes_before_the_51st_message(held)
+    policy_goes_before_the_51st_message(held)
+
+
+def test_poll_that_falls_into_a_drain_does_not_start_a_second_one_beside_it(held: Terminal) -> None:
+    mark = held.events.mark()
+    for _ in range(SURELY_NEXT_POLL // LESS_THAN_A_REQUEST_MAY_TAKE + 1):
+        held.jump(LESS_THAN_A_REQUEST_MAY_TAKE)
+        policy_goes_before_the_51st_message(held)
+    held.events.wait_for(lambda event: "screen state-----" in event.args[0], kind="log", after=mark)
+    policy_goes_before_the_51st_message(held)
 
 
 def test_long_drain_needs_no_more_stack_than_a_short_one(session: Terminal) -> None:

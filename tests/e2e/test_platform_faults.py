@@ -66,12 +66,14 @@ def next_poll_is_well_after_the_first(terminal: Terminal) -> None:
 
 
 def test_platform_that_is_down_is_asked_again_with_every_poll(terminal: Terminal) -> None:
+    terminal.platform.leave()
     mark = terminal.events.mark()
     terminal.start_agent()
     assert len(warnings(terminal, mark)) == 1
     mark = poll(terminal)
     assert len(warnings(terminal, mark)) == 1
     carries_out_policies(terminal)
+    terminal.platform.appear()
     next_poll_is_well(terminal)
 
 
@@ -106,6 +108,7 @@ def test_hanging_receipt_does_not_keep_the_message_from_being_shown(terminal: Te
 
 def test_reply_left_over_counts_are_not_read_again(terminal: Terminal) -> None:
     """A reply that counted five is followed by none at all: the chain ends there."""
+    assert terminal.platform
     terminal.start_agent()
     terminal.platform.faults["list"] = HttpFault.reply(200, b"[]", {"X-Total-Count": "5"})
 
@@ -222,7 +225,7 @@ def nginx(terminal: Terminal) -> Iterator[int]:
 
 
 def test_messages_come_through_a_web_server_that_offers_http_2(terminal: Terminal, nginx: int) -> None:
-    terminal.files.write_userinfo(server_port=str(nginx))
+    terminal.files.write_platform_address(nginx)
     for title in ("first", "second", "third"):
         terminal.platform.post_message(USER, title, "text")
     terminal.start_agent()

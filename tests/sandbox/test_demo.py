@@ -4,13 +4,13 @@ from __future__ import annotations
 
 import io
 from pathlib import Path
-from typing import Any
+from typing import Any, Callable
 
 import pytest
 from people import idle_agent, rude_agent, run_program
 from rich.console import Console
 
-from sandbox.demo.scene import NOTHING_SHOWN, Scene, Step, from_agent, never
+from sandbox.demo.scene import NOTHING_ASKED, NOTHING_SHOWN, Scene, Step, from_agent, never
 from sandbox.demo.scenes import SCENES
 from sandbox.demo.tour import Outcome, Tour
 from sandbox.events import Event
@@ -25,6 +25,14 @@ _NO_PATIENCE = 0.01
 def _play(terminal: Terminal, patience: float, *steps: Step) -> list[Outcome]:
     timeline = Timeline(terminal.events, AgentTime(1), [Console(file=io.StringIO())])
     return Tour(terminal, timeline, patience).play({1: Scene("Title", "Sentence.", steps)})
+
+
+def _says(*members: str) -> Callable[[Terminal], None]:
+    def cue(terminal: Terminal) -> None:
+        for member in members:
+            terminal.events.record("velks", "somebody", "call", member)
+
+    return cue
 
 
 def _verdicts(outcomes: list[Outcome]) -> list[str]:
@@ -43,7 +51,7 @@ def test_an_agent_that_does_nothing_fails_the_tour(tmp_path: Path) -> None:
     ended = run_program("demo", "--patience", "0.01", "--only", "1", agent=idle_agent(tmp_path))
 
     assert ended.returncode == 1
-    assert "missing" in ended.stdout and "0 of 2 expectations" in ended.stdout
+    assert "missing" in ended.stdout and "0 of 3 expectations" in ended.stdout
 
 
 def test_an_agent_that_breaks_a_contract_fails_the_tour_even_if_all_else_is_well(tmp_path: Path) -> None:
@@ -51,7 +59,7 @@ def test_an_agent_that_breaks_a_contract_fails_the_tour_even_if_all_else_is_well
 
     assert ended.returncode == 1
     assert (
-        "2 of 2 expectations" in ended.stdout and "has no method com.norix.velk.velkg.greet" in ended.stdout
+        "3 of 3 expectations" in ended.stdout and "has no method com.norix.velk.velkg.greet" in ended.stdout
     )
 
 
@@ -64,6 +72,17 @@ def test_chosen_scenes_are_played_after_the_first_one() -> None:
         "5.",
     ]
     assert "---getusername:" in ended.stdout
+
+
+def test_waiting_messages_and_the_password_warning_are_told_with_what_they_mean() -> None:
+    ended = run_program("demo", "--only", "2,3")
+
+    assert ended.returncode == 0, ended.stdout
+    lines = [line.split(maxsplit=1)[1] for line in ended.stdout.splitlines() if line[2:3] == ":"]
+    counts = [line.split()[-2:] for line in lines if line.startswith("platform → agent") and "unread" in line]
+    assert counts == [["3", "unread"], ["2", "unread"], ["1", "unread"]]
+    assert any("your password will expire in 3 days" in line for line in lines)
+    assert any("are there unread messages?" in line for line in lines)
 
 
 def test_a_scene_that_does_not_exist_is_one_line() -> None:
@@ -83,7 +102,7 @@ def test_a_missing_agent_is_one_line_that_says_how_to_build_it(tmp_path: Path) -
 def test_the_picture_needs_nothing_from_elsewhere_and_tells_nothing_of_the_machine(tmp_path: Path) -> None:
     picture = tmp_path / "demo.svg"
 
-    ended = run_program("demo", "--only", "4", "--svg", str(picture))
+    ended = run_program("demo", "--only", "6", "--svg", str(picture))
 
     drawn = picture.read_text()
     assert ended.returncode == 0, ended.stdout
@@ -115,6 +134,70 @@ def test_after_a_failure_nothing_more_is_played(terminal: Terminal) -> None:
 
     assert _verdicts(outcomes) == ["missing", "not played", "not played"]
     assert not played
+
+
+@pytest.mark.parametrize(
+    ("said", "in_order", "verdicts"),
+    [
+        (("list", "read"), True, ["as expected", "as expected"]),
+        (("read", "list"), True, ["as expected", "missing"]),
+        (("read", "list"), False, ["as expected", "as expected"]),
+    ],
+)
+def test_the_order_counts_where_it_matters(
+    terminal: Terminal, said: tuple[str, ...], in_order: bool, verdicts: list[str]
+) -> None:
+    terminal.start_agent()
+    then = (from_agent("a list", "somebody", "list"), from_agent("a receipt", "somebody", "read"))
+
+    outcomes = _play(terminal, _NO_PATIENCE, Step(_says(*said), then, in_order))
+
+    assert _verdicts(outcomes) == verdicts
+
+
+@pytest.mark.parametrize(("times", "verdict"), [(1, "missing"), (2, "as expected")])
+def test_what_is_expected_twice_in_order_must_come_twice(
+    terminal: Terminal, times: int, verdict: str
+) -> None:
+    terminal.start_agent()
+    twice = (from_agent("a list", "somebody", "list"),) * 2
+
+    outcomes = _play(terminal, _NO_PATIENCE, Step(_says(*["list"] * times), twice, in_order=True))
+
+    assert _verdicts(outcomes) == ["as expected", verdict]
+
+
+def test_a_step_without_a_cue_looks_at_what_followed_the_last_one(terminal: Terminal) -> None:
+    terminal.start_agent()
+    _says("too early")(terminal)
+
+    outcomes = _play(
+        terminal,
+        _NO_PATIENCE,
+        Step(_says("list", "read"), (from_agent("a list", "somebody", "list"),)),
+        Step(
+            None, (from_agent("a receipt", "somebody", "read"), never("nothing old", "somebody", "too early"))
+        ),
+    )
+
+    assert _verdicts(outcomes) == ["as expected"] * 3
+
+
+def test_what_a_scene_needs_beforehand_is_done_before_the_first_one(terminal: Terminal) -> None:
+    terminal.start_agent()
+    done: list[str] = []
+    first = Scene("First", "Sentence.", (Step(lambda terminal: done.append("cue"), ()),))
+    second = Scene("Second", "Sentence.", (), beforehand=lambda terminal: done.append("beforehand"))
+    timeline = Timeline(terminal.events, AgentTime(1), [Console(file=io.StringIO())])
+
+    Tour(terminal, timeline, _PATIENCE).play({1: first, 2: second})
+
+    assert done == ["beforehand", "cue"]
+
+
+@pytest.mark.parametrize("member", ["list", "read", "tips", "other"])
+def test_no_request_of_any_kind_counts_as_nothing_asked(member: str) -> None:
+    assert NOTHING_ASKED.matches(Event(0.0, "velks", "platform", "http", member))
 
 
 @pytest.mark.parametrize(

@@ -4,7 +4,7 @@ from __future__ import annotations
 
 import json
 import ssl
-from http.client import HTTPSConnection
+from http.client import HTTPSConnection, RemoteDisconnected
 from typing import Any
 
 import pytest
@@ -22,16 +22,21 @@ def request(
     method: str, path: str, body: Any = None, with_certificate: bool = True
 ) -> tuple[Any, str | None]:
     """The JSON reply to a request with the terminal's certificates, and its count of messages."""
-    context = ssl.create_default_context(cafile=str(layout.SERVER_CERTIFICATE))
-    if with_certificate:
-        context.load_cert_chain(layout.CLIENT_CERTIFICATE, layout.CLIENT_KEY)
-    connection = HTTPSConnection(layout.PLATFORM_HOST, layout.PLATFORM_PORT, context=context, timeout=20)
+    connection = connect(with_certificate)
     try:
         connection.request(method, path, None if body is None else json.dumps(body))
         reply = connection.getresponse()
         return json.loads(reply.read()), reply.getheader("X-Total-Count")
     finally:
         connection.close()
+
+
+def connect(with_certificate: bool = True) -> HTTPSConnection:
+    """A connection to the platform, with the terminal's certificate or without."""
+    context = ssl.create_default_context(cafile=str(layout.SERVER_CERTIFICATE))
+    if with_certificate:
+        context.load_cert_chain(layout.CLIENT_CERTIFICATE, layout.CLIENT_KEY)
+    return HTTPSConnection(layout.PLATFORM_HOST, layout.PLATFORM_PORT, context=context, timeout=20)
 
 
 def test_unread_messages_come_one_at_a_time_with_their_count(terminal: Terminal) -> None:
@@ -75,6 +80,43 @@ def test_a_fault_of_one_route_spares_the_others(terminal: Terminal) -> None:
     terminal.platform.faults["list"] = HttpFault.reply(500, b'"broken"')
 
     assert (request("GET", LIST)[0], request("GET", TIPS, {"username": "li"})[0]["code"]) == ("broken", 0)
+
+
+def test_a_platform_that_left_refuses_until_it_appears_again(terminal: Terminal) -> None:
+    uuid = terminal.platform.post_message("zhang", "one", "text")
+    terminal.platform.leave()
+    with pytest.raises(ConnectionRefusedError):
+        request("GET", LIST)
+
+    terminal.platform.appear()
+
+    assert [message["uuid"] for message in request("GET", LIST)[0]] == [uuid]
+
+
+def test_a_connection_that_was_open_when_the_platform_left_breaks_when_it_is_used(terminal: Terminal) -> None:
+    assert terminal.platform
+    connection = connect()
+    connection.request("GET", LIST)
+    connection.getresponse().read()
+
+    terminal.platform.leave()
+    mark = terminal.events.mark()
+    connection.request("GET", LIST)
+
+    with pytest.raises(RemoteDisconnected):
+        connection.getresponse()
+    assert not terminal.events.all(after=mark)
+    connection.close()
+
+
+def test_what_comes_to_the_platform_and_what_it_answers_is_recorded_in_order(terminal: Terminal) -> None:
+    terminal.platform.post_message("zhang", "one", "text")
+    terminal.platform.password_tip("zhang", "soon")
+    request("GET", LIST)
+
+    told = [event for event in terminal.events.all() if event.kind in ("post", "http", "reply")]
+    assert [event.member for event in told] == ["message", "tip", "list", "reply"]
+    assert told[-1].args[:2] == ("list", 200)
 
 
 def test_every_request_is_recorded_with_the_clients_name(terminal: Terminal) -> None:

@@ -8,6 +8,7 @@ import json
 import pytest
 from rich.console import Console
 
+from sandbox import layout
 from sandbox.prompt import commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, run_line
@@ -17,6 +18,10 @@ from sandbox.timeline.timeline import Timeline
 from sandbox.users import DOMAIN_USER
 
 assert commands, "importing the module makes its commands known"
+
+_SURELY_NEXT_POLL = 181
+# The notice's timer is coarse: half a second more or less.
+_PASSWORD_NOTICE_DELAY = 61
 
 
 class Paper(Desk):
@@ -34,7 +39,8 @@ class Paper(Desk):
 
 @pytest.fixture
 def desk(terminal: Terminal) -> Paper:
-    """A desk at a terminal whose agent is not started."""
+    """A desk at a terminal with a platform, whose agent is not started."""
+    assert terminal.platform
     return Paper(terminal)
 
 
@@ -130,6 +136,85 @@ def test_the_state_tells_who_is_away(desk: Paper) -> None:
     assert " no " in line
 
 
+def test_a_message_reaches_the_user_and_is_then_read(desk: Paper) -> None:
+    desk.terminal.start_agent()
+    run_line(desk, """message "停机, 今晚" 'save "all"' li.na""")
+    run_line(desk, "messages")
+    desk.terminal.advance(_SURELY_NEXT_POLL)
+    run_line(desk, "messages")
+
+    shown = desk.terminal.events.wait_for(source="velks", member="Notify")
+    assert shown.args[3:5] == ("停机, 今晚", 'save "all"')
+    (sent,) = desk.terminal.platform.messages(DOMAIN_USER.plain_name)
+    assert sent["send_uid"] == "li.na"
+    unread, read = [line for line in desk.lines_with("停机, 今晚") if line.startswith("│")]
+    assert "not yet" in unread and read.count(sent["read_at"]) >= 1 and sent["created_at"] in read
+    assert desk.lines_with("agent → platform") and desk.lines_with("200, 1 unread")
+
+
+@pytest.mark.parametrize(("lines", "notices"), [(["tip 3天后过期"], ["3天后过期"]), (["tip x", "tip off"], [])])
+def test_a_tip_is_told_a_minute_after_the_next_login(
+    desk: Paper, lines: list[str], notices: list[str]
+) -> None:
+    desk.terminal.start_agent()
+    for line in lines:
+        run_line(desk, line)
+    mark = desk.terminal.events.mark()
+
+    run_line(desk, "login")
+
+    desk.terminal.events.wait_for(member="SendUserStatus", after=mark)
+    desk.terminal.advance(_PASSWORD_NOTICE_DELAY)
+    told = desk.terminal.events.all(source="velks", member="Notify", after=mark)
+    assert [notice.args[4] for notice in told] == notices
+
+
+@pytest.mark.parametrize(
+    ("line", "manner", "reply"),
+    [
+        ("platform error 503", "error 503", b"503"),
+        ("platform garbage", "garbage", b"200"),
+        ("platform cut", "cut", b"200"),
+        ("platform up", "well", b"200"),
+    ],
+)
+def test_the_platform_answers_as_told(desk: Paper, line: str, manner: str, reply: bytes) -> None:
+    run_line(desk, line)
+    desk.terminal.start_agent()
+    run_line(desk, "state")
+
+    (row,) = desk.lines_with(f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}")
+    assert " yes " in row and manner in row
+    assert desk.terminal.events.wait_for(kind="reply").args[1] == int(reply)
+
+
+def test_a_platform_that_hangs_answers_once_it_is_up(desk: Paper) -> None:
+    run_line(desk, "platform hang")
+    desk.terminal.start_agent(ready=lambda: desk.terminal.events.wait_for(kind="http", member="tips"))
+    assert not desk.terminal.events.all(kind="reply")
+
+    run_line(desk, "platform up")
+
+    assert desk.terminal.events.wait_for(kind="reply").args[:2] == ("tips", 200)
+
+
+def test_a_platform_that_is_down_gets_no_request_until_it_is_up(desk: Paper) -> None:
+    desk.terminal.start_agent()
+    mark = desk.terminal.events.mark()
+    for _ in range(2):
+        run_line(desk, "platform down")
+    run_line(desk, "state")
+    desk.terminal.advance(_SURELY_NEXT_POLL)
+    (row,) = desk.lines_with(f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}")
+    assert " no " in row
+    assert not desk.terminal.events.all(kind="http", after=mark)
+
+    run_line(desk, "platform up")
+    desk.terminal.advance(_SURELY_NEXT_POLL)
+
+    assert desk.terminal.events.wait_for(kind="http", after=mark).member == "list"
+
+
 def test_help_knows_every_command(desk: Paper) -> None:
     run_line(desk, "help")
 
@@ -184,6 +269,14 @@ def test_empty_lines_and_remarks_do_nothing(desk: Paper, line: str) -> None:
         ("slow daemon", "usage: slow SERVICE SECONDS"),
         ("slow daemon long", "'long' is not a number"),
         ("appear daemon", "daemon is on the bus already"),
+        ("message title", "usage: message TITLE CONTENT [SENDER]"),
+        ("tip", "usage: tip TEXT|off"),
+        ("platform", "usage: platform up|down|"),
+        ("platform ill", "usage: platform up|down|"),
+        ("platform error", "usage: platform up|down|"),
+        ("platform up 503", "usage: platform up|down|"),
+        ("platform error soon", "'soon' is not a number"),
+        ("platform error 200", "200 is no error status (400 to 599)"),
     ],
 )
 def test_what_cannot_be_done_is_refused_with_a_reason(desk: Paper, line: str, reason: str) -> None:

@@ -103,8 +103,7 @@ void FileManagerTest::unopenableFileReadsAsEmptyWithWarning()
     const LogRecorder log;
     QCOMPARE(m_manager->readFile(path), QString());
     QCOMPARE(log.lines(),
-             QStringList(
-                 QStringLiteral("warning: File open error--#33333333333------ \"%1\"").arg(path)));
+             QStringList(QStringLiteral("warning: File open error--#33333333333------ \"%1\"").arg(path)));
 }
 
 void FileManagerTest::hugeFileIsReadWhole()

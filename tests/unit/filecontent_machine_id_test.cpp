@@ -7,6 +7,9 @@
 
 using velk::base::FileContent;
 
+using FileChange = void (*)();
+Q_DECLARE_METATYPE(FileChange)
+
 class FileContentMachineIdTest : public QObject
 {
     Q_OBJECT
@@ -134,14 +137,16 @@ void FileContentMachineIdTest::reloadReadsAgain()
 
 void FileContentMachineIdTest::unopenableFileLeavesWhatWasKept_data()
 {
-    QTest::addColumn<void (*)()>("spoil");
+    QTest::addColumn<FileChange>("spoil");
     QTest::addColumn<bool>("exists");
 
-    const auto row = [](const char* name, void (*spoil)(), bool exists) {
+    const auto row = [](const char* name, FileChange spoil, bool exists) {
         QTest::newRow(name) << spoil << exists;
     };
-    row("missing", [] { removeAny(kMachineId); }, false);
-    row("unreadable", [] { setPermissions(kMachineId, kNoAccess); }, true);
+    row(
+        "missing", [] { removeAny(kMachineId); }, false);
+    row(
+        "unreadable", [] { setPermissions(kMachineId, kNoAccess); }, true);
     row(
         "folder",
         [] {
@@ -153,7 +158,7 @@ void FileContentMachineIdTest::unopenableFileLeavesWhatWasKept_data()
 
 void FileContentMachineIdTest::unopenableFileLeavesWhatWasKept()
 {
-    QFETCH(void (*)(), spoil);
+    QFETCH(FileChange, spoil);
     QFETCH(bool, exists);
     writeBytes(kMachineId, "id-1");
     m_content->getMachineID(nullptr, false);

@@ -19,33 +19,29 @@ private Q_SLOTS:
 
     void domainMembershipIsSaved_data();
     void domainMembershipIsSaved();
-    void saveDomainNeedsAReadableAndWritableFile_data();
-    void saveDomainNeedsAReadableAndWritableFile();
-    void unchangedMembershipNeedsNoWritableFile();
     void valueIsUpdated_data();
     void valueIsUpdated();
-    void updateNeedsAReadableAndWritableFile_data();
-    void updateNeedsAReadableAndWritableFile();
     void recordReplacesFile();
     void recordCreatesFile();
-    void recordNeedsAWritableFile_data();
-    void recordNeedsAWritableFile();
-    void fullDiskFailsEveryWrite();
-    void firstByteMakesAWriteGood();
-    void noHandleStaysOpen();
-
-private:
-    static void addObstacles();
 };
 
 namespace {
 
-const QString kName = QStringLiteral("terminal_name");
-
-void noObstacle(const QByteArray& content)
+bool saveRecord()
 {
-    writeBytes(kUserInfo, content);
+    return FileContent::saveUserInfo({true, QStringLiteral("1"), QStringLiteral("s"), QStringLiteral("d"),
+                                      QStringLiteral("2"), QStringLiteral("终端")});
 }
+
+const QByteArray kRecord = R"({
+    "domain_host": "d",
+    "domain_port": "2",
+    "is_Domain": true,
+    "server_host": "s",
+    "server_port": "1",
+    "terminal_name": "终端"
+}
+)";
 
 } // namespace
 
@@ -115,16 +111,57 @@ void FileContentSaveTest::domainMembershipIsSaved()
     QCOMPARE(log.lines(), line.isEmpty() ? QStringList() : QStringList(line));
 }
 
-/// What keeps a file from being read or written, and the mode whose failure is logged (at %1 the mode of
-/// the operation's own write).
-void FileContentSaveTest::addObstacles()
+void FileContentSaveTest::valueIsUpdated_data()
 {
-    QTest::addColumn<bool>("present");
-    QTest::addColumn<QFile::Permissions>("permissions");
-    QTest::addColumn<bool>("readFails");
+    QTest::addColumn<QByteArray>("before");
+    QTest::addColumn<QByteArray>("after");
 
-    QTest::newRow("missing") << false << kReadWrite << true;
-    QTest::newRow("unreadable and unwritable") << true << kNoAccess << true;
-    QTest::newRow("unreadable, writable") << true << QFile::Permissions(QFile::WriteOwner) << true;
-    QTest::newRow("readable, unwritable") << true << QFile::Permissions(QFile::ReadOwner) << false;
+    const auto row = [](const char* name, const char* before, const char* after) {
+        QTest::newRow(name) << QByteArray(before) << QByteArray(after);
+    };
+    const char* const alone = "{\n    \"terminal_name\": \"new\"\n}\n";
+    row("added", R"({"a":1.5,"z":null})",
+        "{\n    \"a\": 1.5,\n    \"terminal_name\": \"new\",\n    \"z\": null\n}\n");
+    row("replaced", R"({"terminal_name":"old"})", alone);
+    row("replaced whatever it was", R"({"terminal_name":{"a":1}})", alone);
+    row("written even if unchanged", R"({"terminal_name":"new"})", alone);
+    row("no JSON becomes an object", "terminal_name=old", alone);
+    row("array becomes an object", "[1]", alone);
+    row("empty becomes an object", "", alone);
 }
+
+void FileContentSaveTest::valueIsUpdated()
+{
+    QFETCH(QByteArray, before);
+    writeBytes(kUserInfo, before);
+    const LogRecorder log;
+    QVERIFY(updateUserInfo(QStringLiteral("terminal_name"), QStringLiteral("new")));
+    QTEST(readBytes(kUserInfo), "after");
+    QCOMPARE(log.lines(), QStringList());
+}
+
+void FileContentSaveTest::recordReplacesFile()
+{
+    writeBytes(kUserInfo, R"({"is_Domain":false,"server_ip":"10.0.0.1","other":1})" + QByteArray(9999, ' '));
+    const LogRecorder log;
+    QVERIFY(saveRecord());
+    QCOMPARE(readBytes(kUserInfo), kRecord);
+    QCOMPARE(log.lines(), QStringList());
+}
+
+void FileContentSaveTest::recordCreatesFile()
+{
+    QVERIFY(FileContent::saveUserInfo(UserInfo()));
+    QCOMPARE(readBytes(kUserInfo), QByteArray(R"({
+    "domain_host": "",
+    "domain_port": "",
+    "is_Domain": false,
+    "server_host": "",
+    "server_port": "",
+    "terminal_name": ""
+}
+)"));
+}
+
+QTEST_GUILESS_MAIN(FileContentSaveTest)
+#include "filecontent_save_test.moc"

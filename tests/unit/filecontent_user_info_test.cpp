@@ -194,8 +194,9 @@ void FileContentUserInfoTest::secondReadFindsTheMigratedFile()
 
 void FileContentUserInfoTest::todaysKeysGoBeforeOlderOnes()
 {
-    const QByteArray both = R"({"is_Domain":false,"server_port":"1","server_host":"s","server_ip":"10.0.0.1",)"
-                            R"("domain_host":"","domain_port":"","terminal_name":"t"})";
+    const QByteArray both =
+        R"({"is_Domain":false,"server_port":"1","server_host":"s","server_ip":"10.0.0.1",)"
+        R"("domain_host":"","domain_port":"","terminal_name":"t"})";
     writeBytes(kUserInfo, both);
     const LogRecorder log;
     // An empty text is a value too.
@@ -210,8 +211,7 @@ void FileContentUserInfoTest::hostAloneIsMigrated()
     bool ok = true;
     QCOMPARE(FileContent::getUserInfo(&ok).domainHost, QStringLiteral("17"));
     QVERIFY(!ok);
-    QCOMPARE(readBytes(kUserInfo),
-             QByteArray("{\n    \"domain_host\": \"17\",\n    \"server_ip\": 17\n}\n"));
+    QCOMPARE(readBytes(kUserInfo), QByteArray("{\n    \"domain_host\": \"17\",\n    \"server_ip\": 17\n}\n"));
 }
 
 void FileContentUserInfoTest::failedMigrationOfHostDoesNotCount()

@@ -7,6 +7,9 @@
 
 using velk::base::FileContent;
 
+using FileChange = void (*)();
+Q_DECLARE_METATYPE(FileChange)
+
 /// The single values of the user information: domain membership, alias, host and port.
 class FileContentValuesTest : public QObject
 {
@@ -166,13 +169,14 @@ void FileContentValuesTest::fileThatIsNoObjectHoldsNothing()
 
 void FileContentValuesTest::unopenableFileIsLoggedAndCountsAsRead_data()
 {
-    QTest::addColumn<void (*)()>("prepare");
+    QTest::addColumn<FileChange>("prepare");
     QTest::addColumn<bool>("exists");
 
-    const auto row = [](const char* name, void (*prepare)(), bool exists) {
+    const auto row = [](const char* name, FileChange prepare, bool exists) {
         QTest::newRow(name) << prepare << exists;
     };
-    row("missing", [] {}, false);
+    row(
+        "missing", [] {}, false);
     row(
         "unreadable",
         [] {
@@ -180,12 +184,13 @@ void FileContentValuesTest::unopenableFileIsLoggedAndCountsAsRead_data()
             setPermissions(kUserInfo, kNoAccess);
         },
         true);
-    row("folder", [] { QDir().mkdir(kUserInfo); }, true);
+    row(
+        "folder", [] { QDir().mkdir(kUserInfo); }, true);
 }
 
 void FileContentValuesTest::unopenableFileIsLoggedAndCountsAsRead()
 {
-    QFETCH(void (*)(), prepare);
+    QFETCH(FileChange, prepare);
     QFETCH(bool, exists);
     prepare();
     const LogRecorder log;

@@ -1,14 +1,64 @@
 #include <QtTest>
 
+#include <QDBusVariant>
 #include <QFile>
+#include <QTextCodec>
 #include <QUrl>
 
-#include <memory>
+#include <sys/time.h>
+#include <unistd.h>
 
+#include <array>
+#include <ctime>
+#include <memory>
+#include <optional>
+#include <utility>
+
+#include "handleevent.h"
+#include "log_recorder.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "recorded_service.h"
 #include "tls_peer.h"
+
+namespace {
+
+/// What getuid() answers instead of the program's own uid.
+std::optional<uid_t> pretendedUid;
+
+/// The time of day that Qt reads instead of the clock's, in seconds since the epoch.
+std::optional<time_t> pretendedTime;
+
+// Seconds of different days, up to the last that the platform can be told.
+constexpr std::array<time_t, 6> kMoments = {0, 1234567890, 1800000000, 1900012345, 2147483648, 4294967295};
+
+/// The interval that the generator gives at the pretended time.
+int intervalNow(int max, int min)
+{
+    QT_WARNING_PUSH
+    QT_WARNING_DISABLE_DEPRECATED
+    qsrand(static_cast<uint>(QTime::currentTime().msecsSinceStartOfDay() / 1000));
+    return qrand() % (max - min) + min;
+    QT_WARNING_POP
+}
+
+} // namespace
+
+/// Both go before the C library's own.
+uid_t getuid() noexcept
+{
+    return pretendedUid.value_or(geteuid());
+}
+
+// The header's names of the parameters are reserved.
+// NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name)
+int gettimeofday(timeval* now, void* /*zone*/) noexcept
+{
+    timespec clock{};
+    clock_gettime(CLOCK_REALTIME, &clock);
+    *now = {pretendedTime.value_or(clock.tv_sec), clock.tv_nsec / 1000};
+    return 0;
+}
 
 /// The message client on its own, as a domain user, with a platform that has no messages.
 class MessagePlatformTest : public QObject
@@ -18,20 +68,33 @@ class MessagePlatformTest : public QObject
 private Q_SLOTS:
     void initTestCase();
     void init();
+    void cleanup();
 
+    void userAboveTheLocalRangeIsDomainUser_data();
+    void userAboveTheLocalRangeIsDomainUser();
+    void startIsLogged();
+    void firstPollComesInOneToTwoMinutes();
+    void activePollPutsTheNextOffByOneToThreeMinutes();
+    void idleSessionKeepsTheInterval();
     void intervalIsAtLeastTheShortestAndBelowTheLongest();
     void intervalBetweenEqualBoundsIsTheBound();
+    void intervalDependsOnTheSecondOfTheDay();
     void pageGivesTheOffset_data();
     void pageGivesTheOffset();
     void optionsAreSentInTheirOrder();
     void defaultOptionsAskForTenMessages();
     void unusualUserNameIsSentAsItIs_data();
     void unusualUserNameIsSentAsItIs();
+    void timeIsUnsignedInListsAndSignedInReceipts_data();
+    void timeIsUnsignedInListsAndSignedInReceipts();
+    void bodyIsReadInTheEncodingOfTheLocale();
     void callbackIsNeverCalled();
+    void followUpIsAskedForBeforeTheListReturns();
     void replyOnItsOwnAsksForTheNextAtOnce();
     void replyOfOneMessageAsksForNoOther();
 
 private:
+    QString requestTarget();
     /// The path and query of the next list request, without its time.
     QString nextList();
 
@@ -63,10 +126,86 @@ void MessagePlatformTest::init()
     m_peer->forgetRequests();
 }
 
+void MessagePlatformTest::cleanup()
+{
+    pretendedUid.reset();
+    pretendedTime.reset();
+}
+
+QString MessagePlatformTest::requestTarget()
+{
+    return m_peer->nextRequest()[QStringLiteral("line")].toString().section(QLatin1Char(' '), 1, 1);
+}
+
 QString MessagePlatformTest::nextList()
 {
-    const QString line = m_peer->nextRequest()[QStringLiteral("line")].toString();
-    return line.section(QLatin1Char(' '), 1, 1).section(QStringLiteral("&timestaps="), 0, 0);
+    return requestTarget().section(QStringLiteral("&timestaps="), 0, 0);
+}
+
+void MessagePlatformTest::userAboveTheLocalRangeIsDomainUser_data()
+{
+    QTest::addColumn<uint>("uid");
+    QTest::addColumn<bool>("expected");
+    QTest::newRow("root") << 0U << false;
+    QTest::newRow("last local") << 10000U << false;
+    QTest::newRow("first of the domain") << 10001U << true;
+    QTest::newRow("beyond a signed number") << 3000000000U << true;
+}
+
+void MessagePlatformTest::userAboveTheLocalRangeIsDomainUser()
+{
+    QFETCH(uint, uid);
+    pretendedUid = uid;
+    QTEST(m_platform->isLdapUser(), "expected");
+}
+
+void MessagePlatformTest::startIsLogged()
+{
+    const LogRecorder log;
+    const MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
+    const QString tips = m_peer->url("demanding", "/uim/v3/client/password/tips");
+    const QStringList expected{QStringLiteral("info: ---------load cfg"),
+                               QStringLiteral(R"(info: MessagePlatform app path "/usr/bin/velkm")"),
+                               QStringLiteral("info: url  \"%1\"").arg(tips)};
+    QCOMPARE(log.lines().mid(0, 3), expected);
+}
+
+void MessagePlatformTest::firstPollComesInOneToTwoMinutes()
+{
+    for (const time_t moment : kMoments) {
+        pretendedTime = moment;
+        const MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
+        const auto* timer = platform.findChild<QTimer*>();
+        QVERIFY(timer->isActive() && !timer->isSingleShot());
+        QCOMPARE(timer->interval(), intervalNow(120000, 60000));
+    }
+}
+
+void MessagePlatformTest::activePollPutsTheNextOffByOneToThreeMinutes()
+{
+    const auto* timer = m_platform->findChild<QTimer*>();
+    for (const time_t moment : kMoments) {
+        pretendedTime = moment;
+        QTest::ignoreMessage(QtInfoMsg, "screen state-----: 2");
+        m_platform->onUnReadMessages();
+        QVERIFY(timer->isActive() && !timer->isSingleShot());
+        QCOMPARE(timer->interval(), intervalNow(180000, 60000));
+    }
+}
+
+void MessagePlatformTest::idleSessionKeepsTheInterval()
+{
+    const RecordedService screenSaver(
+        QDBusConnection::SessionBus, QStringLiteral("com.norix.ScreenSaver"),
+        [](const QDBusMessage& call) { return call.createReply(QVariant::fromValue(QDBusVariant(true))); });
+    const auto* timer = m_platform->findChild<QTimer*>();
+    const int before = timer->interval();
+    for (const time_t moment : kMoments) {
+        pretendedTime = moment;
+        m_platform->onUnReadMessages();
+        QVERIFY(timer->isActive());
+        QCOMPARE(timer->interval(), before);
+    }
 }
 
 void MessagePlatformTest::intervalIsAtLeastTheShortestAndBelowTheLongest()
@@ -80,6 +219,14 @@ void MessagePlatformTest::intervalIsAtLeastTheShortestAndBelowTheLongest()
 void MessagePlatformTest::intervalBetweenEqualBoundsIsTheBound()
 {
     QCOMPARE(m_platform->generateRandnum(60000, 60000), 60000);
+}
+
+void MessagePlatformTest::intervalDependsOnTheSecondOfTheDay()
+{
+    for (const time_t moment : kMoments) {
+        pretendedTime = moment;
+        QCOMPARE(m_platform->generateRandnum(99999, 7), intervalNow(99999, 7));
+    }
 }
 
 void MessagePlatformTest::pageGivesTheOffset_data()
@@ -148,6 +295,38 @@ void MessagePlatformTest::unusualUserNameIsSentAsItIs()
                  + QStringLiteral("&is_not_read=1&limit=1&offset=0&order=create_at&desc=1"));
 }
 
+void MessagePlatformTest::timeIsUnsignedInListsAndSignedInReceipts_data()
+{
+    QTest::addColumn<qint64>("now");
+    QTest::addColumn<QString>("inList");
+    QTest::addColumn<QString>("inReceipt");
+    const auto row = [](const char* name, qint64 now, const char* inList, const char* inReceipt) {
+        QTest::newRow(name) << now << QString::fromLatin1(inList) << QString::fromLatin1(inReceipt);
+    };
+    row("today", 1800000000, "1800000000", "1800000000");
+    row("last that fits a signed number", 2147483647, "2147483647", "2147483647");
+    row("first that does not", 2147483648, "2147483648", "-2147483648");
+}
+
+void MessagePlatformTest::timeIsUnsignedInListsAndSignedInReceipts()
+{
+    QFETCH(qint64, now);
+    pretendedTime = now;
+    m_platform->unreadMessages(QStringLiteral("a"), 1, 1);
+    QTEST(requestTarget().section(QStringLiteral("&timestaps="), 1), "inList");
+    m_platform->messageRespond(QStringLiteral("u"));
+    QTEST(requestTarget().section(QStringLiteral("?timestaps="), 1), "inReceipt");
+}
+
+void MessagePlatformTest::bodyIsReadInTheEncodingOfTheLocale()
+{
+    auto* const before = QTextCodec::codecForLocale();
+    QTextCodec::setCodecForLocale(QTextCodec::codecForName("ISO-8859-1"));
+    m_platform->OnRecvMsg(200, QStringLiteral(R"([{"uuid":"u终"}])"), {});
+    QTextCodec::setCodecForLocale(before);
+    QCOMPARE(m_peer->nextRequest()[QStringLiteral("body")].toString(), QStringLiteral(R"({"uuid":"u?"})"));
+}
+
 void MessagePlatformTest::callbackIsNeverCalled()
 {
     bool called = false;
@@ -155,6 +334,25 @@ void MessagePlatformTest::callbackIsNeverCalled()
     m_platform->getNotifyMessageList(NotifyMessageOption(), callback);
     m_platform->getNotifyMessageList(QString(), true, 1, 1, callback);
     QVERIFY(!called);
+}
+
+void MessagePlatformTest::followUpIsAskedForBeforeTheListReturns()
+{
+    // Adds a count to the first reply, while the client waits for it.
+    const QObject receiver;
+    connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
+            [this, counted = false]() mutable {
+                if (!std::exchange(counted, true)) {
+                    m_platform->OnRecvMsg(200, QString(), {{"X-Total-Count", "2"}});
+                    m_platform->messageRespond(QStringLiteral("marker"));
+                }
+            });
+    m_platform->unreadMessages(QStringLiteral("first"), 1, 1);
+    QVERIFY(nextList().endsWith(
+        QLatin1String("/list?uid=first&is_not_read=1&limit=1&offset=0&order=create_at&desc=1")));
+    // The reply is handled to its end first.
+    QVERIFY(requestTarget().startsWith(QLatin1String("/notification/v2/read")));
+    QVERIFY(nextList().startsWith(QLatin1String("/notification/v2/list?uid=zhang.wei&")));
 }
 
 void MessagePlatformTest::replyOnItsOwnAsksForTheNextAtOnce()

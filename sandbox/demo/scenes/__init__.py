@@ -3,11 +3,13 @@
 from __future__ import annotations
 
 from sandbox.demo.scene import Scene
-from sandbox.demo.scenes import domain_exit, policies, session
+from sandbox.demo.scenes import domain_exit, messages, policies, session
 
 # The first one starts the agent; any of the others can be left out.
 SCENES: tuple[Scene, ...] = (
     session.BEGIN,
+    messages.PASSWORD_EXPIRES,
+    messages.WAITING,
     session.STATES,
     policies.FORWARDED,
     policies.NOTICES,

@@ -2,13 +2,16 @@
 
 from __future__ import annotations
 
-from sandbox.demo.scene import Expectation, Scene, Step, from_agent
+from sandbox.demo.scene import NOTHING_ASKED, Expectation, Scene, Step, from_agent, message_comes
 from sandbox.terminal import Terminal
 from sandbox.users import DOMAIN_USER as USER
 
 _REPORT_PERIOD = 300
+_LONGEST_POLL_INTERVAL = 180
+_MESSAGE = ("打印机", "三楼打印机已修好")
 
 _IDENTITY = from_agent("the user's name and uid", "daemon", "UpdateUserInfo", USER.plain_name, USER.uid)
+_PASSWORD_CHECK = from_agent("a question about the password", "platform", "tips")
 
 
 def _status(code: int, words: str, within: int = 0) -> Expectation:
@@ -18,6 +21,11 @@ def _status(code: int, words: str, within: int = 0) -> Expectation:
 
 def _start(terminal: Terminal) -> None:
     terminal.start_agent(ready=lambda: None)
+
+
+def _walk_away(terminal: Terminal) -> None:
+    terminal.platform.post_message(USER.plain_name, *_MESSAGE)
+    terminal.screensaver.run()
 
 
 def _unlock(terminal: Terminal) -> None:
@@ -32,17 +40,24 @@ def _restart_daemon(terminal: Terminal) -> None:
 
 BEGIN = Scene(
     "The session begins",
-    "The agent tells the daemon whose session this is, and that the user is active.",
-    (Step(_start, (_IDENTITY, _status(1, "active"))),),
+    "The agent tells the daemon whose session this is, and that the user is active; it asks the platform "
+    "about the user's password.",
+    (Step(_start, (_IDENTITY, _status(1, "active"), _PASSWORD_CHECK)),),
+    beforehand=lambda terminal: terminal.platform,
 )
 
 STATES = Scene(
     "Locked, behind the screen saver, active again",
-    "Every five minutes the agent looks at the screen and reports what it finds.",
+    "Every five minutes the agent looks at the screen and reports what it finds. The platform's messages "
+    "wait until somebody is there.",
     (
         Step(lambda terminal: terminal.session_manager.lock(), (_status(2, "locked", _REPORT_PERIOD),)),
-        Step(lambda terminal: terminal.screensaver.run(), (_status(3, "screen saver", _REPORT_PERIOD),)),
-        Step(_unlock, (_status(1, "active", _REPORT_PERIOD),)),
+        # Longer than any poll interval, and locked all the time.
+        Step(_walk_away, (_status(3, "screen saver", _REPORT_PERIOD), NOTHING_ASKED)),
+        Step(
+            _unlock,
+            (_status(1, "active", _REPORT_PERIOD), *message_comes(*_MESSAGE, within=_LONGEST_POLL_INTERVAL)),
+        ),
     ),
 )
 

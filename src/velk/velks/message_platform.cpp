@@ -102,7 +102,7 @@ bool MessagePlatform::loadCfg()
     return velk::base::FileContent::getHostAndPort(m_host, m_port);
 }
 
-void MessagePlatform::initHttpApi()
+void MessagePlatform::initHttpApi() const
 {
     HandleEvent::GetInstance()->initHttpApi();
     connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, this, &MessagePlatform::OnRecvMsg);
@@ -160,7 +160,9 @@ int MessagePlatform::getNotifyMessageList(const NotifyMessageOption& option,
                                           const list_message_callback& /*callback*/)
 {
     requestList(option);
-    askForFollowUps();
+    if (!m_followUpQueued) { // else a drain is on its way, and a row of its own would keep others waiting
+        askForFollowUps();
+    }
     return 0;
 }
 

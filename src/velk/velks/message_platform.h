@@ -58,7 +58,7 @@ public:
 
     bool isLdapUser();
     bool loadCfg();
-    void initHttpApi();
+    void initHttpApi() const;
     void initPlatformMessage();
 
     /// A poll interval in milliseconds, at least min and below max (min where both are equal). It depends on

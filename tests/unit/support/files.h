@@ -21,12 +21,12 @@ inline void writeBytes(const QString& path, const QByteArray& content)
     }
 }
 
-/// The content of a file, whoever may read it; null if there is none.
+/// The content of a file, made readable for that; nothing if there is none.
 inline QByteArray readBytes(const QString& path)
 {
     QFile file(path);
     QFile::setPermissions(path, kReadWrite);
-    return file.open(QIODevice::ReadOnly) ? file.readAll() + "" : QByteArray();
+    return file.open(QIODevice::ReadOnly) ? file.readAll() : QByteArray();
 }
 
 inline void setPermissions(const QString& path, QFile::Permissions permissions)
@@ -63,10 +63,12 @@ class FileSizeLimit
 public:
     explicit FileSizeLimit(rlim_t bytes)
     {
-        std::signal(SIGXFSZ, SIG_IGN); // a write then fails instead of ending the program
         getrlimit(RLIMIT_FSIZE, &m_previous);
         const rlimit limit{bytes, m_previous.rlim_max};
-        setrlimit(RLIMIT_FSIZE, &limit);
+        // With its signal ignored, a write beyond the limit fails instead of ending the program.
+        if (std::signal(SIGXFSZ, SIG_IGN) == SIG_ERR || setrlimit(RLIMIT_FSIZE, &limit) != 0) {
+            qFatal("cannot limit the size of files");
+        }
     }
     ~FileSizeLimit() { setrlimit(RLIMIT_FSIZE, &m_previous); }
     Q_DISABLE_COPY_MOVE(FileSizeLimit)
