@@ -2,6 +2,7 @@
 
 #include <QDBusArgument>
 #include <QList>
+#include <QMap>
 #include <QMetaType>
 #include <QString>
 
@@ -19,8 +20,17 @@ struct LauncherItemInfo
 
 using LauncherItemInfoList = QList<LauncherItemInfo>;
 
+/// One window of a dock entry. What a dock tells of it differs between docks and is not kept.
+struct WindowInfo
+{
+};
+
+/// The windows of an entry by their identifiers.
+using WindowInfoMap = QMap<uint, WindowInfo>;
+
 Q_DECLARE_METATYPE(LauncherItemInfo)
 Q_DECLARE_METATYPE(LauncherItemInfoList)
+Q_DECLARE_METATYPE(WindowInfo)
 
 QDBusArgument& operator<<(QDBusArgument& argument, const LauncherItemInfo& info);
 const QDBusArgument& operator>>(const QDBusArgument& argument, LauncherItemInfo& info);

@@ -171,6 +171,7 @@ def test_limit_holds_by_the_clock_on_the_wall(terminal: Terminal) -> None:
     terminal.daemon.push_policy({"type": 1300})
     terminal.daemon.push_policy({"type": 5})
     terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark, timeout=120)
+    terminal.sync()
     assert [line.args[0] for line in terminal.events.all(kind="log", member="warning", after=mark)] == [
         '--@@@@-- QDBusError("org.freedesktop.DBus.Error.NoReply", "Did not receive a reply. Possible causes '
         "include: the remote application did not send a reply, the message bus security policy blocked the "

@@ -170,6 +170,8 @@ _ENDINGS: dict[str, tuple[bytes, Callable[[Conversation], None]]] = {
     "/cut-length": (_LENGTH_100 + b"abc", Conversation.close),
     "/cut-chunk": (_chunked_reply(b"abc", end=b"ff\r\nab"), Conversation.close),
     "/cut-connection": (_LENGTH_100 + b"abc", Conversation.break_off),
+    "/reset-header": (b"HTTP/1.1 200 Scr", Conversation.reset),
+    "/reset-body": (_LENGTH_100 + b"abc", Conversation.reset),
     "/until-close": (_NO_LENGTH + b"all of it", Conversation.close),
     "/until-break": (_NO_LENGTH + b"all of it", Conversation.break_off),
     "/announced-close": (_reply(b"{}", b"Connection: close"), Conversation.close),

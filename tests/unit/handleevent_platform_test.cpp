@@ -1,12 +1,13 @@
 #include <QtTest>
 
-#include <QFile>
+#include <QTextCodec>
 #include <QUrl>
 
 #include <memory>
 
 #include "handleevent.h"
 #include "manual_clock.h"
+#include "platform_files.h"
 #include "recorded_service.h"
 #include "tls_peer.h"
 
@@ -77,6 +78,7 @@ private Q_SLOTS:
     void passwordThatDoesNotExpireIsLoggedTwiceAndNotShown_data();
     void passwordThatDoesNotExpireIsLoggedTwiceAndNotShown();
     void expiringPasswordIsShownAfterAMinute();
+    void passwordReplyIsReadAsUtf8InAnyLocale();
 
 private:
     std::unique_ptr<TlsPeer> m_peer;
@@ -89,10 +91,7 @@ void HandleEventPlatformTest::initTestCase()
     qRegisterMetaType<Headers>("QList<QPair<QByteArray,QByteArray> >");
     setClockAhead(0);
     m_peer = std::make_unique<TlsPeer>();
-    const QString folder = QStringLiteral("/etc/velk/");
-    QVERIFY(QFile::copy(m_peer->file("ca"), folder + QStringLiteral("clientapi_ca.crt")));
-    QVERIFY(QFile::copy(m_peer->file("client"), folder + QStringLiteral("ZEF_Velk.pem")));
-    QVERIFY(QFile::copy(m_peer->file("client-key"), folder + QStringLiteral(".ZEF_Velk.key")));
+    installCertificates(*m_peer);
     HandleEvent::GetInstance()->initHttpApi();
 }
 
@@ -269,6 +268,19 @@ void HandleEventPlatformTest::expiringPasswordIsShownAfterAMinute()
     QCOMPARE(arguments.value(4), QVariant(QStringLiteral("您的密码还有3天过期")));
     QCOMPARE(arguments.value(7), QVariant(-1));
     QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 3);
+}
+
+void HandleEventPlatformTest::passwordReplyIsReadAsUtf8InAnyLocale()
+{
+    const QString reply = tips(QStringLiteral("0"), QStringLiteral("true"));
+    auto* const before = QTextCodec::codecForLocale();
+    QTextCodec::setCodecForLocale(QTextCodec::codecForName("ISO-8859-1"));
+    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_peer, 200, reply), QString());
+    QTextCodec::setCodecForLocale(before);
+    setClockAhead(m_ahead += 61);
+    QTRY_COMPARE(m_notifications->calls().size(), 1);
+    QCOMPARE(m_notifications->calls().constFirst().arguments().value(4),
+             QVariant(QStringLiteral("您的密码还有3天过期")));
 }
 
 QTEST_GUILESS_MAIN(HandleEventPlatformTest)

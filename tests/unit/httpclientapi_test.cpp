@@ -232,6 +232,8 @@ void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning_d
     row("body shorter than its length", path("/cut-length"), "97 bytes remaining");
     row("last chunk cut", path("/cut-chunk"), "outstanding read data remaining");
     row("connection broken off in the body", path("/cut-connection"), "97 bytes remaining");
+    row("connection reset in the header", path("/reset-header"), "reset by peer");
+    row("connection reset in the body", path("/reset-body"), "reset by peer");
     row("body over 8 MiB", path("/body-over-cap"), "8 MiB");
     row("body over 8 MiB, length unknown", path("/chunks-over-cap"), "8 MiB");
     row("headers over 256 KiB", path("/headers-over-cap"), "256 KiB");

@@ -1,7 +1,6 @@
 #include <QtTest>
 
 #include <QDBusVariant>
-#include <QFile>
 #include <QTextCodec>
 #include <QUrl>
 
@@ -12,12 +11,12 @@
 #include <ctime>
 #include <memory>
 #include <optional>
-#include <utility>
 
 #include "handleevent.h"
 #include "log_recorder.h"
 #include "message_platform.h"
 #include "message_transfer.h"
+#include "platform_files.h"
 #include "recorded_service.h"
 #include "tls_peer.h"
 
@@ -73,8 +72,10 @@ private Q_SLOTS:
     void userAboveTheLocalRangeIsDomainUser_data();
     void userAboveTheLocalRangeIsDomainUser();
     void startIsLogged();
+    void unusualAddressIsUsedAsItIs();
     void firstPollComesInOneToTwoMinutes();
     void activePollPutsTheNextOffByOneToThreeMinutes();
+    void intervalIsDrawnWhenThePollIsOver();
     void idleSessionKeepsTheInterval();
     void intervalIsAtLeastTheShortestAndBelowTheLongest();
     void intervalBetweenEqualBoundsIsTheBound();
@@ -89,9 +90,6 @@ private Q_SLOTS:
     void timeIsUnsignedInListsAndSignedInReceipts();
     void bodyIsReadInTheEncodingOfTheLocale();
     void callbackIsNeverCalled();
-    void followUpIsAskedForBeforeTheListReturns();
-    void replyOnItsOwnAsksForTheNextAtOnce();
-    void replyOfOneMessageAsksForNoOther();
 
 private:
     QString requestTarget();
@@ -106,16 +104,8 @@ private:
 void MessagePlatformTest::initTestCase()
 {
     m_peer = std::make_unique<TlsPeer>();
-    const QString folder = QStringLiteral("/etc/velk/");
-    QVERIFY(QFile::copy(m_peer->file("ca"), folder + QStringLiteral("clientapi_ca.crt")));
-    QVERIFY(QFile::copy(m_peer->file("client"), folder + QStringLiteral("ZEF_Velk.pem")));
-    QVERIFY(QFile::copy(m_peer->file("client-key"), folder + QStringLiteral(".ZEF_Velk.key")));
-
-    QFile info(folder + QStringLiteral("userinfo.json"));
-    QVERIFY(info.open(QIODevice::WriteOnly));
-    const int port = QUrl(m_peer->url("demanding", "/")).port();
-    info.write(R"({"server_host":"127.0.0.1","server_port":")" + QByteArray::number(port) + R"("})");
-    info.close();
+    installCertificates(*m_peer);
+    writePlatformAddress(*m_peer);
 
     m_transfer = std::make_unique<MessageTransfer>();
     m_platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("zhang.wei"), m_transfer.get());
@@ -170,6 +160,23 @@ void MessagePlatformTest::startIsLogged()
     QCOMPARE(log.lines().mid(0, 3), expected);
 }
 
+void MessagePlatformTest::unusualAddressIsUsedAsItIs()
+{
+    writePlatformAddress("%2.box", "%1");
+    const LogRecorder log;
+    MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
+    platform.unreadMessages(QStringLiteral("a"), 1, 1);
+    platform.messageRespond(QStringLiteral("u"));
+    writePlatformAddress(*m_peer);
+
+    const QString base = QStringLiteral("\"https://%2.box:%1/");
+    const QStringList addresses = log.lines().filter(base);
+    QCOMPARE(addresses.size(), 3);
+    QVERIFY(addresses.at(0).endsWith(base + QStringLiteral("uim/v3/client/password/tips\"")));
+    QVERIFY(addresses.at(1).contains(base + QStringLiteral("notification/v2/list?uid=a&")));
+    QVERIFY(addresses.at(2).contains(base + QStringLiteral("notification/v2/read?timestaps=")));
+}
+
 void MessagePlatformTest::firstPollComesInOneToTwoMinutes()
 {
     for (const time_t moment : kMoments) {
@@ -191,6 +198,17 @@ void MessagePlatformTest::activePollPutsTheNextOffByOneToThreeMinutes()
         QVERIFY(timer->isActive() && !timer->isSingleShot());
         QCOMPARE(timer->interval(), intervalNow(180000, 60000));
     }
+}
+
+void MessagePlatformTest::intervalIsDrawnWhenThePollIsOver()
+{
+    pretendedTime = kMoments[1];
+    const QObject receiver;
+    connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
+            [] { pretendedTime = kMoments[2]; });
+    m_platform->onUnReadMessages();
+    pretendedTime = kMoments[2];
+    QCOMPARE(m_platform->findChild<QTimer*>()->interval(), intervalNow(180000, 60000));
 }
 
 void MessagePlatformTest::idleSessionKeepsTheInterval()
@@ -334,39 +352,6 @@ void MessagePlatformTest::callbackIsNeverCalled()
     m_platform->getNotifyMessageList(NotifyMessageOption(), callback);
     m_platform->getNotifyMessageList(QString(), true, 1, 1, callback);
     QVERIFY(!called);
-}
-
-void MessagePlatformTest::followUpIsAskedForBeforeTheListReturns()
-{
-    // Adds a count to the first reply, while the client waits for it.
-    const QObject receiver;
-    connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
-            [this, counted = false]() mutable {
-                if (!std::exchange(counted, true)) {
-                    m_platform->OnRecvMsg(200, QString(), {{"X-Total-Count", "2"}});
-                    m_platform->messageRespond(QStringLiteral("marker"));
-                }
-            });
-    m_platform->unreadMessages(QStringLiteral("first"), 1, 1);
-    QVERIFY(nextList().endsWith(
-        QLatin1String("/list?uid=first&is_not_read=1&limit=1&offset=0&order=create_at&desc=1")));
-    // The reply is handled to its end first.
-    QVERIFY(requestTarget().startsWith(QLatin1String("/notification/v2/read")));
-    QVERIFY(nextList().startsWith(QLatin1String("/notification/v2/list?uid=zhang.wei&")));
-}
-
-void MessagePlatformTest::replyOnItsOwnAsksForTheNextAtOnce()
-{
-    m_platform->OnRecvMsg(200, QString(), {{"X-Total-Count", "2"}});
-    QVERIFY(
-        nextList().startsWith(QLatin1String("/notification/v2/list?uid=zhang.wei&is_not_read=1&limit=1")));
-}
-
-void MessagePlatformTest::replyOfOneMessageAsksForNoOther()
-{
-    m_platform->OnRecvMsg(200, QString(), {{"X-Total-Count", "1"}});
-    m_platform->messageRespond(QStringLiteral("marker"));
-    QVERIFY(m_peer->nextRequest()[QStringLiteral("line")].toString().startsWith(QLatin1String("PUT ")));
 }
 
 QTEST_GUILESS_MAIN(MessagePlatformTest)

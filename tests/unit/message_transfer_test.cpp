@@ -104,8 +104,9 @@ void MessageTransferTest::slotsStandInTheirOrder()
     for (int i = meta.methodOffset(); i < meta.methodCount(); ++i) {
         names.append(QString::fromLatin1(meta.method(i).methodSignature()));
     }
-    const QStringList expected{QStringLiteral("onPolicyMsg(QString,QString)"), QStringLiteral("onTimeout()"),
-                               QStringLiteral("getUserState()")};
+    const QStringList expected{QStringLiteral("onPolicyMsg(QString,QString)"),
+                               QStringLiteral("onSoftwareChanged(QString,QStringList)"),
+                               QStringLiteral("onTimeout()"), QStringLiteral("getUserState()")};
     QCOMPARE(names, expected);
 }
 

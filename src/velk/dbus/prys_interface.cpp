@@ -7,5 +7,5 @@ prysInterface::prysInterface(const QString& service, const QString& path, const 
 
 QDBusPendingReply<> prysInterface::onPolicyMsg(const QString& payload)
 {
-    return asyncCallWithArgumentList(QStringLiteral("onPolicyMsg"), {QVariant(payload)});
+    return m_unreadCalls.send(*this, QStringLiteral("onPolicyMsg"), {QVariant(payload)});
 }

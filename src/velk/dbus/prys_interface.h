@@ -1,6 +1,7 @@
 #pragma once
 
 #include "prys_introspection.h"
+#include "unread_calls.h"
 
 #include <QDBusAbstractInterface>
 #include <QDBusPendingReply>
@@ -22,4 +23,7 @@ public:
 
 public Q_SLOTS:
     QDBusPendingReply<> onPolicyMsg(const QString& payload);
+
+private:
+    UnreadCalls m_unreadCalls;
 };

@@ -37,12 +37,12 @@ QDBusPendingReply<QString> velkgInterface::GetServerPort()
 
 QDBusPendingReply<> velkgInterface::SendUserStatus(int type, const QString& userName)
 {
-    return asyncCallWithArgumentList(QStringLiteral("SendUserStatus"), {QVariant(type), QVariant(userName)});
+    return m_unreadCalls.send(*this, QStringLiteral("SendUserStatus"), {QVariant(type), QVariant(userName)});
 }
 
 QDBusPendingReply<> velkgInterface::UpdateUserInfo(const QString& name, int id)
 {
-    return asyncCallWithArgumentList(QStringLiteral("UpdateUserInfo"), {QVariant(name), QVariant(id)});
+    return m_unreadCalls.send(*this, QStringLiteral("UpdateUserInfo"), {QVariant(name), QVariant(id)});
 }
 
 QDBusPendingReply<int> velkgInterface::onDomainConfig(const QString& type)
@@ -52,16 +52,16 @@ QDBusPendingReply<int> velkgInterface::onDomainConfig(const QString& type)
 
 QDBusPendingReply<> velkgInterface::onPolicyFinished(int taskID, int jobID, int code, const QString& ack)
 {
-    return asyncCallWithArgumentList(QStringLiteral("onPolicyFinished"),
-                                     {QVariant(taskID), QVariant(jobID), QVariant(code), QVariant(ack)});
+    return m_unreadCalls.send(*this, QStringLiteral("onPolicyFinished"),
+                              {QVariant(taskID), QVariant(jobID), QVariant(code), QVariant(ack)});
 }
 
 QDBusPendingReply<> velkgInterface::onUploadFinished(const QString& url, const QString& data)
 {
-    return asyncCallWithArgumentList(QStringLiteral("onUploadFinished"), {QVariant(url), QVariant(data)});
+    return m_unreadCalls.send(*this, QStringLiteral("onUploadFinished"), {QVariant(url), QVariant(data)});
 }
 
 QDBusPendingReply<> velkgInterface::sendAppOpenState(int type, const QString& appName)
 {
-    return asyncCallWithArgumentList(QStringLiteral("sendAppOpenState"), {QVariant(type), QVariant(appName)});
+    return m_unreadCalls.send(*this, QStringLiteral("sendAppOpenState"), {QVariant(type), QVariant(appName)});
 }

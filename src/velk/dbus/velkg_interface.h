@@ -1,5 +1,6 @@
 #pragma once
 
+#include "unread_calls.h"
 #include "velkg_introspection.h"
 
 #include <QDBusAbstractInterface>
@@ -8,10 +9,10 @@
 /// Proxy of the system daemon's interface, on the system bus.
 ///
 /// Each slot sends its call at once and does not wait. A caller that drops the pending reply drops the call's
-/// error with it. A caller that reads the value blocks until the reply is there, for D-Bus's default time at
-/// most, and asks isError() first: Qt hands out a failed call's error text as the value of a text. The proxy
-/// may be built before the daemon is on the bus: it serves whichever daemon owns the name at the moment. The
-/// mixed case of the names is what is on the wire.
+/// error with it; no number of such calls is too many for the bus. A caller that reads the value blocks until
+/// the reply is there, for D-Bus's default time at most, and asks isError() first: Qt hands out a failed
+/// call's error text as the value of a text. The proxy may be built before the daemon is on the bus: it
+/// serves whichever daemon owns the name at the moment. The mixed case of the names is what is on the wire.
 class velkgInterface : public QDBusAbstractInterface
 {
     Q_OBJECT
@@ -43,4 +44,7 @@ Q_SIGNALS:
     void pushPolicyMsg(const QString& appID, const QString& payload);
     void requestSendAppOpenState(int type, const QString& appName);
     void requestSetStoragePerm(int type, int mode);
+
+private:
+    UnreadCalls m_unreadCalls;
 };

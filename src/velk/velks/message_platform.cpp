@@ -7,7 +7,6 @@
 #include <QJsonObject>
 #include <QScopedValueRollback>
 #include <QTime>
-#include <QTimer>
 
 #include <unistd.h>
 
@@ -71,6 +70,8 @@ MessagePlatform::MessagePlatform(QObject* parent, const QString& userName, Messa
     , m_userName(userName)
     , m_transfer(transfer)
 {
+    m_nextRow.setSingleShot(true);
+    connect(&m_nextRow, &QTimer::timeout, this, &MessagePlatform::askForFollowUps);
     if (!isLdapUser()) {
         qInfo() << "is not ldap user:" << m_userName;
         return;
@@ -160,7 +161,7 @@ int MessagePlatform::getNotifyMessageList(const NotifyMessageOption& option,
                                           const list_message_callback& /*callback*/)
 {
     requestList(option);
-    if (!m_followUpQueued) { // else a drain is on its way, and a row of its own would keep others waiting
+    if (!m_nextRow.isActive()) { // else a drain is on its way, and a row of its own would keep others waiting
         askForFollowUps();
     }
     return 0;
@@ -190,13 +191,8 @@ void MessagePlatform::askForFollowUps()
         m_followUpDue = false;
         unreadMessages(m_userName, 1, 1);
     }
-    if (m_followUpDue && !m_followUpQueued) {
-        m_followUpQueued = true;
-        const auto askFurther = [this] {
-            m_followUpQueued = false;
-            askForFollowUps();
-        };
-        QMetaObject::invokeMethod(this, askFurther, Qt::QueuedConnection);
+    if (m_followUpDue) {
+        m_nextRow.start();
     }
 }
 

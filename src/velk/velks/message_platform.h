@@ -5,12 +5,12 @@
 #include <QObject>
 #include <QPair>
 #include <QString>
+#include <QTimer>
 #include <QVector>
 
 #include <functional>
 
 class MessageTransfer;
-class QTimer;
 
 /// The parameters of one list request.
 struct NotifyMessageOption
@@ -102,5 +102,7 @@ private:
     // needs no more stack than one.
     bool m_asking = false;
     bool m_followUpDue = false;
-    bool m_followUpQueued = false;
+    // Begins the next row of follow-ups from the event loop. Not a queued call: those go before timers, and
+    // a forced log-out that is due is one.
+    QTimer m_nextRow;
 };

@@ -1,6 +1,7 @@
 #include "message_transfer.h"
 
 #include <QDBusConnection>
+#include <QDateTime>
 #include <QDebug>
 #include <QProcess>
 #include <QSettings>
@@ -10,12 +11,19 @@
 
 #include <cstdlib>
 
+#include "appopenspy.h"
 #include "constants.h"
+#include "filecontent.h"
 #include "handleevent.h"
+#include "launcher_guard.h"
 #include "libvelkkpx.h"
 #include "prys_interface.h"
 #include "remote_object.h"
+#include "software_report.h"
+#include "terminal_address.h"
 #include "velkg_interface.h"
+
+using velk::module::software::AppOpenSpy;
 
 namespace {
 
@@ -73,6 +81,7 @@ MessageTransfer::MessageTransfer(QObject* parent)
     : QObject(parent)
     , m_actionTimer(new QTimer(this))
     , m_stateTimer(new QTimer(this))
+    , m_machineId(velk::base::FileContent::instace()->getMachineID())
 {
     m_velkgInterface =
         new velkgInterface(QStringLiteral("com.norix.velk.velkg"), QStringLiteral("/com/norix/velk/velkg"),
@@ -81,18 +90,34 @@ MessageTransfer::MessageTransfer(QObject* parent)
         new prysInterface(QStringLiteral("com.norix.velk.prys"), QStringLiteral("/com/norix/velk/prys"),
                           QDBusConnection::sessionBus(), this);
     connectDaemon();
+    startSoftwareReports();
 
     readLoginUser();
     // Replies are never read, here and below: a daemon that is absent emits pushOnlineMsg when it comes.
     m_velkgInterface->UpdateUserInfo(m_userName, m_uid);
     startTimers();
     m_velkgInterface->SendUserStatus(UserActive, m_userName);
+
+    // Nothing in between: each application opened or closed is one call.
+    connect(AppOpenSpy::instance(), &AppOpenSpy::appStateChange, m_velkgInterface,
+            &velkgInterface::sendAppOpenState);
 }
 
 void MessageTransfer::connectDaemon()
 {
     connect(m_velkgInterface, &velkgInterface::pushPolicyMsg, this, &MessageTransfer::onPolicyMsg);
     connect(m_velkgInterface, &velkgInterface::pushOnlineMsg, [this] { announceAgain(); });
+}
+
+void MessageTransfer::startSoftwareReports()
+{
+    m_launcherGuard = new LauncherGuard(this);
+    connect(m_launcherGuard, &LauncherGuard::softwareChanged, this, &MessageTransfer::onSoftwareChanged);
+    uploadSoftware(QString(), {});
+    connect(m_launcherGuard, &LauncherGuard::softwareInited, this, [this] {
+        qDebug() << "software inited";
+        uploadSoftware(QString(), {});
+    });
 }
 
 void MessageTransfer::startTimers()
@@ -203,6 +228,47 @@ void MessageTransfer::restoreConfiguration()
     // The exit status is not looked at: the reboot that follows stops what systemctl could not. The fixed
     // command holds nothing that a shell could misread.
     [[maybe_unused]] const int status = std::system("systemctl --global stop prys"); // NOLINT(cert-env33-c)
+}
+
+void MessageTransfer::onSoftwareChanged(const QString& action, const QStringList& info)
+{
+    uploadSoftware(action, info);
+}
+
+void MessageTransfer::uploadSoftware(const QString& type, const QStringList& info)
+{
+    const int change = softwareChange(type);
+    qDebug() << type << info;
+    if (change != 0) {
+        uploadSoftwareChange(change, info);
+    }
+
+    const QList<SoftwareInfo> list = m_launcherGuard->getSoftwareList();
+    if (!list.isEmpty()) {
+        m_velkgInterface->onUploadFinished(velk::kUploadInfoUrl, inventoryReport(m_machineId, list));
+    }
+}
+
+void MessageTransfer::uploadSoftwareChange(int change, const QStringList& info)
+{
+    SoftwareChange report;
+    report.change = change;
+    // Asked anew for each report, while the inventory bears the identifier of the start. That the two come
+    // from different places is intended: the platform compares them as they are.
+    QDBusPendingReply<QString> machineId = m_velkgInterface->GetMachineID();
+    machineId.waitForFinished();
+    report.machineId = machineId.isError() ? QString() : machineId.value();
+    report.ipAddress = terminalAddress();
+    report.hardwareAddress = terminalHardwareAddress();
+    report.name = info.value(0);
+    report.version = info.value(1);
+    report.terminalName = velk::base::FileContent::getTerminalAlias(nullptr);
+    report.time = QDateTime::currentDateTime();
+
+    const QString text = softwareChangeReport(report);
+    qInfo() << "uploadSoftware"
+            << "---------" << text;
+    m_velkgInterface->onUploadFinished(velk::kUploadInfoLogUrl, text);
 }
 
 void MessageTransfer::onTimeout()

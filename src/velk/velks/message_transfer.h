@@ -3,15 +3,18 @@
 #include <QJsonObject>
 #include <QObject>
 #include <QString>
+#include <QStringList>
 
 #include "session_policy.h"
 
+class LauncherGuard;
 class QTimer;
 class prysInterface;
 class velkgInterface;
 
 /// The agent's centre: receives the daemon's signals, carries out the policies that concern this session,
-/// forwards the others to the session policy service, and tells the daemon about the user and the session.
+/// forwards the others to the session policy service, and tells the daemon about the user, the session, the
+/// applications and the software.
 class MessageTransfer : public QObject
 {
     Q_OBJECT
@@ -23,8 +26,9 @@ public:
         ScreenActive,
     };
 
-    /// Announces the user and an active session to the daemon. Waits only for the login manager, at most
-    /// the D-Bus time limit; no service needs to be there.
+    /// Uploads the software inventory and announces the user and an active session to the daemon. Waits for
+    /// the desktop's launcher and dock and for the login manager, each for the D-Bus time limit at most, and
+    /// for the package tools; no service needs to be there.
     explicit MessageTransfer(QObject* parent = nullptr);
 
     /// Asks the desktop's screen saver and session manager now; a service that is absent or does not
@@ -51,25 +55,34 @@ public:
     /// systemctl ends; failures are not looked at, so that each step is tried.
     void restoreConfiguration();
 
+    /// Hands the daemon the full inventory, unless it is empty; before it a report of one change if type is
+    /// "created" or "update". info is the software's display name and version, either may be missing.
+    void uploadSoftware(const QString& type, const QStringList& info);
+
 public Q_SLOTS:
     void onPolicyMsg(const QString& appID, const QString& payload);
+    void onSoftwareChanged(const QString& action, const QStringList& info);
     void onTimeout();
     void getUserState();
 
 private:
     void connectDaemon();
+    void startSoftwareReports();
     void startTimers();
     void readLoginUser();
     void announceAgain();
+    void uploadSoftwareChange(int change, const QStringList& info);
     bool isMeantForThisSession(SessionPolicy::Audience audience, QJsonObject& message);
     void leaveDomain(const QString& warning, int code);
     void startCountdown(int code);
 
     velkgInterface* m_velkgInterface = nullptr;
     prysInterface* m_prysInterface = nullptr;
+    LauncherGuard* m_launcherGuard = nullptr;
     // Slots use these from the first signal on, and the daemon may emit one while the constructor waits.
     QTimer* m_actionTimer;
     QTimer* m_stateTimer;
+    QString m_machineId; ///< read once; the inventory bears it
     QString m_userName;
     qint32 m_uid = 0;
     qint32 m_pendingAction = 0; ///< the policy code of the countdown's forced action

@@ -7,6 +7,13 @@
 #include <QDBusVariant>
 #include <QVector>
 
+bool isOnBus(const QDBusConnection& bus, const QString& service)
+{
+    // There is no bus interface when the connection to the bus was never made.
+    const auto* busInterface = bus.interface();
+    return busInterface != nullptr && busInterface->isServiceRegistered(service);
+}
+
 RemoteObject::RemoteObject(const QDBusConnection& bus, const QString& service, const QString& path,
                            const QString& interface)
     : m_bus(bus)
@@ -17,9 +24,7 @@ RemoteObject::RemoteObject(const QDBusConnection& bus, const QString& service, c
 
 bool RemoteObject::isPresent() const
 {
-    // There is no bus interface when the connection to the bus was never made.
-    const auto* busInterface = m_bus.interface();
-    return busInterface != nullptr && busInterface->isServiceRegistered(m_service);
+    return isOnBus(m_bus, m_service);
 }
 
 QVariant RemoteObject::property(const QString& name) const

@@ -5,6 +5,9 @@
 #include <QStringList>
 #include <QVariant>
 
+/// Whether a name has an owner now. Asks only the bus, never the service.
+bool isOnBus(const QDBusConnection& bus, const QString& service);
+
 /// The properties of one object of another service. It is reached without introspection, so a service that
 /// introspects badly can still be read and written, and a service that hangs costs one D-Bus time limit
 /// (25 s) per read and nothing else.
@@ -14,7 +17,7 @@ public:
     RemoteObject(const QDBusConnection& bus, const QString& service, const QString& path,
                  const QString& interface);
 
-    /// Whether the service's name has an owner now. Asks only the bus, never the service.
+    /// Whether the service is on the bus now.
     bool isPresent() const;
 
     /// Waits for the value. Invalid if the service is absent, hangs, fails or has no such property.

@@ -1,5 +1,6 @@
 #include "recorded_service.h"
 
+#include <QCoreApplication>
 #include <QDebug>
 #include <QUuid>
 
@@ -63,6 +64,17 @@ RecordedService::~RecordedService()
 QList<QDBusMessage> RecordedService::calls() const
 {
     return m_object->calls();
+}
+
+void RecordedService::emitSignal(const QDBusMessage& signal, const QDBusConnection& receiver) const
+{
+    const QDBusConnection connection(m_connectionName);
+    connection.send(signal);
+    // The bus keeps the order, so the answer to a ping comes after the signal.
+    connection.call(QDBusMessage::createMethodCall(receiver.baseService(), QStringLiteral("/"),
+                                                   QStringLiteral("org.freedesktop.DBus.Peer"),
+                                                   QStringLiteral("Ping")));
+    QCoreApplication::sendPostedEvents();
 }
 
 QDBusMessage answerNothing(const QDBusMessage& call)

@@ -25,6 +25,13 @@ public:
 
     QList<QDBusMessage> calls() const;
 
+    /// Sends a signal and returns once the receiver's main thread has handled it, as far as it is listened
+    /// to.
+    void emitSignal(const QDBusMessage& signal, const QDBusConnection& receiver) const;
+
+    /// Sends a reply that was held back.
+    void send(const QDBusMessage& reply) const { QDBusConnection(m_connectionName).send(reply); }
+
 private:
     class Object;
 

@@ -1,0 +1,26 @@
+#pragma once
+
+#include <QDBusAbstractInterface>
+#include <QDBusObjectPath>
+#include <QList>
+
+/// Proxy of the desktop's dock. It may be built before the dock is there, and follows whichever dock owns the
+/// name. The desktop's library gives its proxies names with underscores.
+class __Dock
+    : public QDBusAbstractInterface // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+{
+    Q_OBJECT
+
+public:
+    static const char* staticInterfaceName() { return "com.norix.kpx.daemon.Dock"; }
+
+    __Dock(const QString& service, const QString& path, const QDBusConnection& connection,
+           QObject* parent = nullptr);
+
+    /// The objects of the entries, in the dock's order, read now; empty if the dock does not answer.
+    QList<QDBusObjectPath> entries() const;
+
+Q_SIGNALS:
+    void EntryAdded(const QDBusObjectPath& path, int index);
+    void EntryRemoved(const QString& id);
+};

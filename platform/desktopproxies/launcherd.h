@@ -1,0 +1,26 @@
+#pragma once
+
+#include <QDBusAbstractInterface>
+#include <QDBusPendingReply>
+
+#include "types.h"
+
+/// Proxy of the desktop's launcher. The launcher's item types must be registered before its signal is
+/// connected or its method called. The desktop's library gives its proxies names with underscores.
+class __Launcherd // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+    : public QDBusAbstractInterface
+{
+    Q_OBJECT
+
+public:
+    static const char* staticInterfaceName() { return "com.norix.kpx.daemon.Launcher"; }
+
+    __Launcherd(const QString& service, const QString& path, const QDBusConnection& connection,
+                QObject* parent = nullptr);
+
+    /// Asks for all items and does not wait.
+    QDBusPendingReply<LauncherItemInfoList> GetAllItemInfos();
+
+Q_SIGNALS:
+    void ItemChanged(const QString& action, LauncherItemInfo info, qlonglong categoryId);
+};

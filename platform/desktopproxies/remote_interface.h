@@ -1,0 +1,25 @@
+#pragma once
+
+#include <QDBusConnection>
+#include <QDBusMessage>
+#include <QString>
+#include <QVariant>
+
+/// The D-Bus interface of every object's properties.
+constexpr char kPropertiesInterface[] = "org.freedesktop.DBus.Properties";
+
+/// One interface of one object of a service.
+struct RemoteInterface
+{
+    QDBusConnection bus;
+    QString service;
+    QString path;
+    QString interface;
+
+    /// The call that reads a property.
+    QDBusMessage readCall(const QString& property) const;
+
+    /// Waits for a property's value, for the D-Bus time limit at most. Invalid if the service is absent,
+    /// hangs or has no such object or property.
+    QVariant read(const QString& property) const;
+};

@@ -1,0 +1,29 @@
+#include "unread_calls.h"
+
+#include <QDBusAbstractInterface>
+#include <QDBusConnection>
+#include <QDBusMessage>
+
+namespace {
+
+// Half of what a system bus allows leaves room for the calls whose replies are read.
+constexpr int kMostUnanswered = 64;
+
+} // namespace
+
+QDBusPendingCall UnreadCalls::send(QDBusAbstractInterface& proxy, const QString& method,
+                                   const QVariantList& arguments)
+{
+    while (!m_unanswered.isEmpty() && m_unanswered.head().isFinished()) {
+        m_unanswered.dequeue();
+    }
+    if (m_unanswered.size() < kMostUnanswered) {
+        m_unanswered.enqueue(proxy.asyncCallWithArgumentList(method, arguments));
+        return m_unanswered.last();
+    }
+
+    auto call = QDBusMessage::createMethodCall(proxy.service(), proxy.path(), proxy.interface(), method);
+    call.setArguments(arguments);
+    proxy.connection().send(call);
+    return QDBusPendingCall::fromCompletedCall(call.createReply());
+}

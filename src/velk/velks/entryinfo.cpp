@@ -1,0 +1,59 @@
+#include "entryinfo.h"
+
+#include <QDBusConnection>
+#include <QDBusObjectPath>
+#include <QDebug>
+
+namespace velk::module::software {
+
+EntryInfo::EntryInfo(const QDBusObjectPath& path)
+    : m_entry(QStringLiteral("com.norix.kpx.daemon.Dock"), path.path(), QDBusConnection::sessionBus())
+{
+    if (!m_entry.isValid()) {
+        qWarning() << "entry is invalid, path:" << path.path();
+        return;
+    }
+    m_entryId = m_entry.id();
+    m_appName = m_entry.name();
+    m_winSize = m_entry.windowInfos().size();
+    connect(&m_entry, &__Entry::WindowInfosChanged, this, &EntryInfo::onWinInfoChanged);
+    connect(&m_entry, &__Entry::NameChanged, this, &EntryInfo::onNameChanged);
+}
+
+QString EntryInfo::entryId() const
+{
+    return m_entryId;
+}
+
+QString EntryInfo::appName() const
+{
+    return m_appName;
+}
+
+int EntryInfo::winSize() const
+{
+    return m_winSize;
+}
+
+bool EntryInfo::isDocked() const
+{
+    return m_entry.isDocked();
+}
+
+void EntryInfo::onWinInfoChanged(const QMap<uint, WindowInfo>& infos)
+{
+    const int before = m_winSize;
+    m_winSize = infos.size();
+    if (m_winSize != before) {
+        Q_EMIT windowSizeChanged(before < m_winSize ? AppOpened : AppClosed, m_appName);
+    }
+}
+
+void EntryInfo::onNameChanged(const QString& name)
+{
+    if (!name.isEmpty()) {
+        m_appName = name;
+    }
+}
+
+} // namespace velk::module::software

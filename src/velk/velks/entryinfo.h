@@ -1,0 +1,48 @@
+#pragma once
+
+#include <QObject>
+
+#include "entry.h"
+
+class QDBusObjectPath;
+
+namespace velk::module::software {
+
+/// What an application's state change is called on the way to the daemon.
+enum AppState {
+    AppOpened = 1,
+    AppClosed = 2,
+};
+
+/// One entry of the dock: follows its name and the number of its windows. An entry that cannot be reached is
+/// empty: no identifier, no name, no window.
+class EntryInfo : public QObject
+{
+    Q_OBJECT
+
+public:
+    explicit EntryInfo(const QDBusObjectPath& path);
+
+    QString entryId() const;
+    QString appName() const;
+    int winSize() const;
+
+    /// Asks the dock now.
+    bool isDocked() const;
+
+Q_SIGNALS:
+    /// More windows (1) or fewer (2) than before, once for each change whatever its size.
+    void windowSizeChanged(int type, const QString& appName);
+
+public Q_SLOTS:
+    void onWinInfoChanged(const QMap<uint, WindowInfo>& infos);
+    void onNameChanged(const QString& name);
+
+private:
+    __Entry m_entry;
+    QString m_entryId;
+    QString m_appName;
+    qint32 m_winSize = 0;
+};
+
+} // namespace velk::module::software

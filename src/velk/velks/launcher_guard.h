@@ -1,0 +1,68 @@
+#pragma once
+
+#include <QList>
+#include <QObject>
+#include <QStringList>
+
+#include "types.h"
+
+class __Launcherd; // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+
+/// One record of the software inventory.
+struct SoftwareInfo
+{
+    QString packageName;
+    QString name; ///< display name
+    qint32 id = 0; ///< the platform's identifier, -1 for software known only from the launcher
+    QString version; ///< as installed; "failed" if it could not be found out
+    QString architecture;
+    qint32 installedType = 0; ///< how it came onto the machine, 2 for software known only from the launcher
+};
+
+/// Watches the desktop's launcher and knows what software is installed. A launcher that is absent at the
+/// start is waited for; one that goes away later is not.
+///
+/// Packages are looked up by the system's package tools, which block for 60 s each at most: 30 s to start and
+/// 30 s to end.
+class LauncherGuard : public QObject
+{
+    Q_OBJECT
+
+public:
+    explicit LauncherGuard(QObject* parent);
+
+    /// Every launcher item with its package, in the launcher's order; what an inventory file knows of a
+    /// package goes before what the package tools say. Empty without a launcher.
+    QList<SoftwareInfo> getSoftwareList();
+
+    /// Adds the records of one inventory file; false if it is no JSON array.
+    bool getSoftwareList(const QString& path);
+
+    /// Empty if the launcher is absent or fails. The misspelt name is intended, callers use it so.
+    LauncherItemInfoList GetLauncerItems();
+
+    /// Empty if no package owns the file.
+    QString getPackageNameByDesktop(const QString& desktop);
+
+    /// Empty for an unknown package; "failed" without a name or when the tool does not end in time.
+    QString getCurVersion(const QString& packageName);
+
+    /// "failed" when the tool does not end in time.
+    QString getCurArch();
+
+Q_SIGNALS:
+    /// info is the display name and the package's version.
+    void softwareChanged(QString action, QStringList info);
+    /// Once, when a launcher that was absent at the start has arrived.
+    void softwareInited();
+
+private Q_SLOTS:
+    void onItemChanged(QString action, const LauncherItemInfo& info, qlonglong categoryId);
+
+private:
+    void watchLauncher(__Launcherd* launcher);
+    SoftwareInfo softwareOf(const LauncherItemInfo& item, const QString& architecture);
+
+    QList<SoftwareInfo> m_softwareList; ///< of the inventory files, while a list is being made
+    __Launcherd* m_launcher = nullptr;
+};

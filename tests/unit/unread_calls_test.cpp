@@ -1,0 +1,103 @@
+#include "bus_peer.h"
+#include "prys_interface.h"
+#include "recorded_service.h"
+#include "velkg_interface.h"
+
+#include <QTest>
+
+#include <atomic>
+
+namespace {
+
+const QString service = QStringLiteral("com.norix.velk.velkg");
+const QString path = QStringLiteral("/com/norix/velk/velkg");
+
+constexpr int kAskedFor = 64;
+constexpr int kMany = 1000;
+
+} // namespace
+
+/// Many calls to a service that is slow to answer them.
+class UnreadCallsTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void everyCallArrivesInOrderThoughNoneIsAnswered();
+    void onlyTheFirstUnansweredCallsAskForAReply();
+    void answeredCallsMakeRoomForOthersThatAsk();
+    void callWithoutAReplyCountsAsFinished();
+    void failedCallIsAnErrorForWhoeverLooks();
+};
+
+void UnreadCallsTest::everyCallArrivesInOrderThoughNoneIsAnswered()
+{
+    const RecordedService daemon(QDBusConnection::SystemBus, service,
+                                 [](const QDBusMessage&) { return QDBusMessage(); });
+    auto bus = QDBusConnection::systemBus();
+    velkgInterface proxy(service, path, bus);
+
+    for (int number = 0; number < kMany; ++number) {
+        proxy.sendAppOpenState(number, QStringLiteral("应用"));
+    }
+
+    QTRY_COMPARE(daemon.calls().size(), kMany);
+    for (int number = 0; number < kMany; ++number) {
+        QCOMPARE(daemon.calls().at(number).arguments(), (QVariantList{number, QStringLiteral("应用")}));
+    }
+}
+
+void UnreadCallsTest::onlyTheFirstUnansweredCallsAskForAReply()
+{
+    const RecordedService daemon(QDBusConnection::SystemBus, service,
+                                 [](const QDBusMessage&) { return QDBusMessage(); });
+    velkgInterface proxy(service, path, QDBusConnection::systemBus());
+
+    for (int number = 0; number < kMany; ++number) {
+        proxy.SendUserStatus(1, QString());
+    }
+
+    QTRY_COMPARE(daemon.calls().size(), kMany);
+    int asking = 0;
+    for (const QDBusMessage& call : daemon.calls()) {
+        asking += call.isReplyRequired() ? 1 : 0;
+    }
+    QCOMPARE(asking, kAskedFor);
+}
+
+void UnreadCallsTest::answeredCallsMakeRoomForOthersThatAsk()
+{
+    const RecordedService daemon(QDBusConnection::SystemBus, service, answerNothing);
+    velkgInterface proxy(service, path, QDBusConnection::systemBus());
+    for (int number = 0; number < 3 * kAskedFor; ++number) {
+        QVERIFY(finished(proxy.UpdateUserInfo(QString(), number)));
+    }
+    for (const QDBusMessage& call : daemon.calls()) {
+        QVERIFY(call.isReplyRequired());
+    }
+}
+
+void UnreadCallsTest::callWithoutAReplyCountsAsFinished()
+{
+    const RecordedService daemon(QDBusConnection::SystemBus, service,
+                                 [](const QDBusMessage&) { return QDBusMessage(); });
+    velkgInterface proxy(service, path, QDBusConnection::systemBus());
+    for (int number = 0; number < kAskedFor; ++number) {
+        QVERIFY(!proxy.onUploadFinished(QString(), QString()).isFinished());
+    }
+    const QDBusPendingReply<> reply = proxy.onUploadFinished(QString(), QString());
+    QVERIFY(reply.isFinished());
+    QVERIFY(!reply.isError());
+}
+
+void UnreadCallsTest::failedCallIsAnErrorForWhoeverLooks()
+{
+    prysInterface proxy(QStringLiteral("com.norix.velk.prys"), QStringLiteral("/com/norix/velk/prys"),
+                        QDBusConnection::sessionBus());
+    const QDBusPendingReply<> reply = proxy.onPolicyMsg(QStringLiteral("{}"));
+    QVERIFY(finished(reply));
+    QVERIFY(reply.isError());
+}
+
+QTEST_GUILESS_MAIN(UnreadCallsTest)
+#include "unread_calls_test.moc"
