@@ -10,16 +10,20 @@ import os
 import shutil
 import subprocess
 from pathlib import Path
-from typing import Iterator, Mapping, Sequence
+from typing import Collection, Iterator, Mapping, Sequence
 
 from sandbox import layout
 from sandbox.users import USERS, User
 
 # Parts of the host's /etc that programs need to run and that say nothing of the host.
 _HOST_ETC = ("alternatives", "ld.so.cache", "ssl/openssl.cnf")
-_WRITABLE = ("/etc", "/home", "/run", "/tmp", "/var", str(layout.SHARE))
+_WRITABLE = ("/etc", "/home", "/run", "/tmp", "/var", str(layout.SHARE), str(layout.APPLICATIONS))
 _PASSED_ON = ("TERM", "COLORTERM", "CI", "ASAN_OPTIONS", "VELK_AGENT", "VELK_BUILD_DIR")
-_NAMESPACES = ("user", "pid", "net", "ipc", "uts")
+_NAMESPACES = ("user", "pid", "ipc", "uts")
+# The box's network belongs to the box's own user, which one made by bubblewrap would not: the first process
+# makes it, sets it up and gives the powers for that up (see sandbox/network.py).
+_POWERS = ("CAP_SYS_ADMIN", "CAP_NET_ADMIN")
+_OWN_NETWORK = ("/usr/bin/unshare", "--net")
 
 
 class BoxUnavailable(Exception):
@@ -27,17 +31,22 @@ class BoxUnavailable(Exception):
 
 
 def command(user: User, argv: Sequence[str], env: Mapping[str, str] | None = None) -> list[str]:
-    """The command line that runs `argv` as `user` in a box, with `env` added to the box's environment."""
+    """The command line that runs `argv` as `user` in a box, with `env` added to the box's environment.
+
+    It refers to files that are open in this process and that the child must inherit.
+    """
     return [
         "bwrap",
         "--die-with-parent",
         *(f"--unshare-{namespace}" for namespace in _NAMESPACES),
         *("--hostname", "terminal"),
         *("--uid", str(user.uid), "--gid", str(user.uid)),
+        *_powers(),
         *_file_system(),
         *_environment(user, env or {}),
         *("--chdir", _working_folder()),
         "--",
+        *_OWN_NETWORK,
         *("/usr/bin/python3", "-P", "-m", "sandbox", "inside", "--"),
         *argv,
     ]
@@ -48,7 +57,7 @@ def require() -> None:
     if not shutil.which("bwrap"):
         raise BoxUnavailable("bubblewrap is missing; install it with: apt-get install bubblewrap")
     attempt = subprocess.run(
-        ["bwrap", "--unshare-user", "--unshare-net", "--ro-bind", "/", "/", "/usr/bin/true"],
+        ["bwrap", "--unshare-user", *_powers(), "--ro-bind", "/", "/", *_OWN_NETWORK, "/usr/bin/true"],
         stdin=subprocess.DEVNULL,
         capture_output=True,
         text=True,
@@ -61,10 +70,15 @@ def require() -> None:
         )
 
 
+def _powers() -> Iterator[str]:
+    for power in _POWERS:
+        yield from ("--cap-add", power)
+
+
 def _file_system() -> Iterator[str]:
     yield from ("--proc", "/proc", "--dev", "/dev")
-    yield from _children(Path("/usr"), without="share")
-    yield from _children(layout.SHARE.parent, without=layout.SHARE.name)
+    yield from _children(Path("/usr"), without=("share",))
+    yield from _children(layout.SHARE.parent, without=(layout.SHARE.name, layout.APPLICATIONS.name))
     for link in ("bin", "lib", "lib32", "lib64", "libx32", "sbin"):
         if Path("/", link).is_symlink():
             yield from ("--symlink", os.readlink(f"/{link}"), f"/{link}")
@@ -72,18 +86,28 @@ def _file_system() -> Iterator[str]:
         yield from ("--tmpfs", folder)
     for name in _HOST_ETC:
         yield from ("--ro-bind-try", f"/etc/{name}", f"/etc/{name}")
+    yield from _package_tools()
     yield from _repository()
     yield from ("--remount-ro", "/")
 
 
-def _children(folder: Path, without: str) -> Iterator[str]:
+def _children(folder: Path, without: Collection[str]) -> Iterator[str]:
     for child in sorted(folder.iterdir()):
-        if child.name == without:
+        if child.name in without:
             continue
         if child.is_symlink():
             yield from ("--symlink", os.readlink(child), str(child))
         else:
             yield from ("--ro-bind", str(child), str(child))
+
+
+def _package_tools() -> Iterator[str]:
+    """Copies that can be written over, in the places of the real ones."""
+    for tool in layout.PACKAGE_TOOLS:
+        if tool.exists():
+            copied = os.open(tool, os.O_RDONLY)
+            os.set_inheritable(copied, True)
+            yield from ("--perms", "0755", "--bind-data", str(copied), str(tool))
 
 
 def _repository() -> Iterator[str]:

@@ -7,33 +7,38 @@ import os
 import socketserver
 import threading
 from dataclasses import dataclass
+from typing import Any, Mapping
 
 from sandbox import layout
 from sandbox.events import Events
 
 DEFAULT_COMMANDS = ("systemctl", "restore_config")
-_RECORDER = layout.REPOSITORY / "sandbox" / "recorder"
+RECORDER = layout.REPOSITORY / "sandbox" / "recorder"
 
 
 @dataclass(frozen=True)
 class Answer:
-    """What a command does: its output and exit status, or minus the number of the signal that ends it."""
+    """What a command does: its output and exit status, or minus the number of the signal that ends it; or the
+    program that is run instead, with the same arguments."""
 
     status: int = 0
     stdout: bytes = b""
     stderr: bytes = b""
+    program: str = ""
 
 
 def install(name: str) -> None:
     """Put a recorder in the place of command `name`."""
     link = layout.COMMANDS / name
     if not link.is_symlink():
-        link.symlink_to(_RECORDER)
+        link.symlink_to(RECORDER)
 
 
 def install_defaults() -> None:
-    """Put the recorders of a fresh box in place."""
+    """Put the recorders of a fresh box in place, and no others."""
     layout.COMMANDS.mkdir(parents=True, exist_ok=True)
+    for left_over in layout.COMMANDS.iterdir():
+        left_over.unlink()
     for name in DEFAULT_COMMANDS:
         install(name)
 
@@ -45,6 +50,8 @@ class Commands:
         self._events = events
         self._answers: dict[str, Answer] = {}
         self._gates: dict[str, threading.Event] = {}
+        self._passed_on: dict[str, tuple[str, Answer]] = {}
+        self._held: dict[str, list[_Call]] = {}
         layout.COMMAND_SOCKET.unlink(missing_ok=True)
         self._server = _Server(str(layout.COMMAND_SOCKET), _Call)
         self._server.commands = self
@@ -68,6 +75,18 @@ class Commands:
         if gate:
             gate.set()
 
+    def nudge(self, name: str) -> int:
+        """Let the held calls of command `name` write a blank line to their standard error, which makes those
+        who wait for them look at the clock again. Returns when all is read: the number of calls, without
+        those that were ended meanwhile."""
+        self._held[name] = [call for call in self._held.pop(name, []) if call.nudge()]
+        return len(self._held[name])
+
+    def pass_on(self, name: str, unless: str, program: str) -> None:
+        """Let `program` answer those calls of command `name` that lack the argument `unless`; they are not
+        recorded."""
+        self._passed_on[name] = (unless, Answer(program=program))
+
     def close(self) -> None:
         """Let every held call end and stop listening."""
         for name in list(self._gates):
@@ -76,10 +95,15 @@ class Commands:
         self._server.server_close()
         layout.COMMAND_SOCKET.unlink(missing_ok=True)
 
-    def called(self, name: str, args: tuple[str, ...]) -> Answer:
+    def called(self, name: str, args: tuple[str, ...], detail: Mapping[str, Any], call: _Call) -> Answer:
         """Record one call; returns once the command may end."""
+        wanted, elsewhere = self._passed_on.get(name, ("", None))
+        if elsewhere and wanted not in args:
+            return elsewhere
         gate = self._gates.get(name)
-        self._events.record("velks", name, "command", name, args)
+        if gate:
+            self._held.setdefault(name, []).append(call)
+        self._events.record("velks", name, "command", name, args, detail)
         if gate:
             gate.wait()
         return self._answers.get(name, Answer())
@@ -96,9 +120,27 @@ class _Call(socketserver.StreamRequestHandler):
         call = json.loads(self.rfile.readline())
         args = tuple(os.fsdecode(bytes.fromhex(arg)) for arg in call["argv"])
         assert isinstance(self.server, _Server)
-        answer = self.server.commands.called(call["name"], args)
-        reply = {"status": answer.status, "stdout": answer.stdout.hex(), "stderr": answer.stderr.hex()}
+        detail = {"environment": _environment(bytes.fromhex(call["environ"])), "pid": call["pid"]}
+        answer = self.server.commands.called(call["name"], args, detail, self)
+        self._tell(
+            status=answer.status,
+            stdout=answer.stdout.hex(),
+            stderr=answer.stderr.hex(),
+            program=answer.program,
+        )
+
+    def nudge(self) -> bool:
+        """Let the held command write to its standard error; false if it was ended before somebody read it."""
+        return self._tell(nudge=True) and self.rfile.readline() != b""
+
+    def _tell(self, **what: Any) -> bool:
         try:
-            self.wfile.write(json.dumps(reply).encode() + b"\n")
+            self.wfile.write(json.dumps(what).encode() + b"\n")
         except BrokenPipeError:
-            pass  # the caller was ended while it was held
+            return False  # the caller was ended while it was held
+        return True
+
+
+def _environment(content: bytes) -> dict[str, str]:
+    """What a process was started with, from the text that the system keeps of it."""
+    return dict(os.fsdecode(entry).split("=", 1) for entry in content.split(b"\0") if b"=" in entry)

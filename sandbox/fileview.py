@@ -5,9 +5,9 @@ from __future__ import annotations
 import json
 import shutil
 from pathlib import Path
-from typing import Any, Sequence
+from typing import Any, Mapping, Sequence
 
-from sandbox import layout
+from sandbox import contracts, layout
 from sandbox.users import User
 
 MACHINE_ID = "box-file-machine-0001"
@@ -55,6 +55,8 @@ class FileView:
         self.write_machine_id(MACHINE_ID)
         self.write_restore_script()
         self.write_control_center_list(DEFAULT_CONTROL_CENTER)
+        for path in (layout.SOFTWARE_LIST, layout.PRYG_SOFTWARE_LIST):
+            self.write_software_list(path, [])
 
     def write(self, path: Path | str, content: str | bytes) -> None:
         """Put a file in place, at once and whole, as the daemon does."""
@@ -73,9 +75,13 @@ class FileView:
         self.write("/etc/passwd", _SYSTEM_ACCOUNTS + "".join(user.passwd_line for user in users))
 
     def write_userinfo(self, content: str | bytes | None = None, **keys: Any) -> None:
-        """Write the daemon's information file: the default with `keys` changed, or `content` as it stands."""
-        default = json.dumps({**DEFAULT_USERINFO, **keys}, ensure_ascii=False, indent=4)
-        self.write(layout.USERINFO, default if content is None else content)
+        """Write the daemon's information file: the default with `keys` changed, which keeps to its contract,
+        or `content` as it stands."""
+        if content is None:
+            known = {**DEFAULT_USERINFO, **keys}
+            contracts.require("user-info", known)
+            content = json.dumps(known, ensure_ascii=False, indent=4)
+        self.write(layout.USERINFO, content)
 
     def write_platform_address(self, port: int) -> None:
         """Record where the platform is; without it the agent never asks the platform for anything."""
@@ -92,6 +98,11 @@ class FileView:
     def write_control_center_list(self, modules: Sequence[str]) -> None:
         """Write the control-center modules that were in force before the domain changed them."""
         self.write(layout.BACKUP_CONFIG, f"[config]\nControlCenterList={', '.join(modules)}\n")
+
+    def write_software_list(self, path: Path, records: Sequence[Mapping[str, Any]]) -> None:
+        """Write one of the two inventory files: software that the platform knows."""
+        contracts.require("software-list", list(records))
+        self.write(path, json.dumps(list(records), ensure_ascii=False, indent=4))
 
     def write_certificates(self, authority: Path, certificate: Path, key: Path) -> None:
         """Install the platform's authority and the terminal's certificate and key."""

@@ -8,7 +8,7 @@ import sys
 from types import FrameType
 from typing import Sequence
 
-from sandbox import commands
+from sandbox import commands, network, packages
 from sandbox.buses import Bus
 from sandbox.fileview import FileView
 from sandbox.users import current_user
@@ -20,8 +20,10 @@ def run(argv: Sequence[str]) -> int:
     """Run `argv` with the terminal's files and two empty buses; the result is its exit status, 128+n for
     signal n."""
     user = current_user()
+    _set_up_network()
     FileView(user).reset()
     commands.install_defaults()
+    packages.Packages()
     buses = (Bus("system", user), Bus("session", user))
     for bus in buses:
         bus.start()
@@ -30,6 +32,13 @@ def run(argv: Sequence[str]) -> int:
     finally:
         for bus in buses:
             bus.stop()
+
+
+def _set_up_network() -> None:
+    try:
+        network.set_up()
+    except network.NetworkTrouble as trouble:
+        print(f"in-box: this box has no network but the loopback: {trouble}", file=sys.stderr)
 
 
 def _run_command(argv: Sequence[str]) -> int:

@@ -12,6 +12,9 @@ SHARE = Path("/usr/share/velk")
 SCRIPTS = SHARE / "scripts"
 VELK_STATE = Path("/var/lib/velk")
 PRYG_STATE = Path("/var/lib/pryg")
+PACKAGE_DATABASE = Path("/var/lib/dpkg")
+APPLICATIONS = Path("/usr/share/applications")
+PACKAGE_TOOLS = tuple(Path("/usr/bin", name) for name in ("dpkg", "dpkg-query", "dpkg-architecture"))
 
 USERINFO = CONFIG / "userinfo.json"
 BACKUP_CONFIG = CONFIG / "config.ini"
@@ -19,12 +22,16 @@ SERVER_CERTIFICATE = CONFIG / "clientapi_ca.crt"
 CLIENT_CERTIFICATE = CONFIG / "ZEF_Velk.pem"
 CLIENT_KEY = CONFIG / ".ZEF_Velk.key"
 MACHINE_ID = SHARE / "machine.txt"
+SOFTWARE_LIST = VELK_STATE / "software_list.list"
+PRYG_SOFTWARE_LIST = PRYG_STATE / "software_list.list"
 RESTORE_SCRIPT = SCRIPTS / "restore_config.bash"
 
 BOX = Path("/run/box")
 COMMANDS = BOX / "bin"
 COMMAND_SOCKET = BOX / "commands.sock"
 COMMAND_RECORD = BOX / "commands.jsonl"
+REAL_TOOLS = BOX / "real"
+NETWORK_SOCKET = BOX / "network.sock"
 CLOCK = BOX / "clock"
 SYSTEM_BUS_SOCKET = Path("/run/dbus/system_bus_socket")
 

@@ -47,7 +47,10 @@ def enter(user: User, arguments: Sequence[str], consumer: Consumer | None = None
     argv = box.command(user, [*_PYTHON, *arguments], env)
     if consumer is None:
         os.execvp(argv[0], argv)
-    with subprocess.Popen(argv, stdout=subprocess.PIPE, stderr=sys.stdout.fileno()) as process:
+    # The box inherits the files that its command line refers to.
+    with subprocess.Popen(
+        argv, stdout=subprocess.PIPE, stderr=sys.stdout.fileno(), close_fds=False
+    ) as process:
         assert process.stdout
         consumer(process.stdout)
     return process.returncode

@@ -18,8 +18,10 @@ from sandbox.certificates import Authority, Identity
 from sandbox.events import Events
 from sandbox.platform_store import Reply, Route, Store
 
-Request = Mapping[str, Any]
 _ADMINISTRATOR = "administrator"
+
+# What the box's daemon calls itself; any other client is taken for the agent.
+DAEMON_AGENT = "daemon"
 
 
 @dataclass(frozen=True)
@@ -76,10 +78,11 @@ def trust() -> Trust:
 class Platform:
     """HTTPS server that demands a certificate of its own authority from the client.
 
-    Every request is an event of kind "http": member "list", "read", "tips" or "other"; args the request line
-    and the body; detail headers and the client's name. A failed handshake is an event with member "tls", and
-    an answer one of kind "reply": args route, status and body, detail the answer's own headers. `fault`
-    applies to all requests, `faults` to those of one route.
+    Every request is an event of kind "http", its source the agent or the daemon: member the route; args the
+    request line and the body; detail headers and the client's name. A failed handshake is an event with
+    member "tls", and an answer one of kind "reply": args route, status and body, detail its own headers and
+    whether it is the platform's own answer and no fault. `fault` applies to all requests, `faults` to those
+    of one route.
     """
 
     def __init__(
@@ -131,6 +134,14 @@ class Platform:
         """Warn a user of the end of the password's life; None takes the warning back."""
         self.events.record(_ADMINISTRATOR, "platform", "post", "tip", (user, message))
         self.store.set_tip(user, message)
+
+    def software_changes(self) -> list[dict[str, Any]]:
+        """The terminal's reports of single changes, oldest first."""
+        return self.store.software_changes()
+
+    def inventory(self) -> list[dict[str, Any]] | None:
+        """The terminal's software as it was reported last, None before the first report."""
+        return self.store.inventory()
 
     def fault_for(self, route: Route) -> HttpFault:
         """What happens to a request of this route now."""
@@ -196,6 +207,10 @@ class _Handler(BaseHTTPRequestHandler):
         assert isinstance(self.server, _Server)
         return self.server.platform
 
+    @property
+    def _client(self) -> str:
+        return "daemon" if self.headers.get("User-Agent") == DAEMON_AGENT else "velks"
+
     def _serve(self, method: str) -> None:
         body = self.rfile.read(int(self.headers.get("Content-Length", 0)))
         url = urlsplit(self.path)
@@ -210,7 +225,7 @@ class _Handler(BaseHTTPRequestHandler):
             fault = self._platform.fault_for(route)
         if fault.kind == "none":
             reply = self._platform.store.serve(route, url.query, body)
-            self._reply(route, reply)
+            self._reply(route, reply, own=True)
         elif fault.kind == "close":
             self._hang_up()
         else:
@@ -222,11 +237,12 @@ class _Handler(BaseHTTPRequestHandler):
         assert isinstance(self.connection, ssl.SSLSocket)
         subject = (self.connection.getpeercert() or {}).get("subject", ())
         detail = {"headers": list(self.headers.items()), "client": subject}
-        self._platform.events.record("velks", "platform", "http", route, (line, body.decode()), detail)
+        self._platform.events.record(self._client, "platform", "http", route, (line, body.decode()), detail)
 
-    def _reply(self, route: Route, reply: Reply, missing: int = 0) -> None:
+    def _reply(self, route: Route, reply: Reply, own: bool = False, missing: int = 0) -> None:
         args = (route, reply.status, reply.body.decode(errors="replace"))
-        self._platform.events.record("platform", "velks", "reply", "reply", args, {"headers": reply.headers})
+        detail = {"headers": reply.headers, "own": own}
+        self._platform.events.record("platform", self._client, "reply", "reply", args, detail)
         self.send_response(reply.status)
         for name, value in {"Content-Type": "application/json", **reply.headers}.items():
             self.send_header(name, value)

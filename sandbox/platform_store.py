@@ -11,13 +11,16 @@ from typing import Any, Literal, Mapping
 from urllib.parse import parse_qs
 from uuid import uuid4
 
-Route = Literal["list", "read", "tips", "other"]
+Route = Literal["list", "read", "tips", "software_change", "inventory", "other"]
 
 _ROUTES: dict[tuple[str, str], Route] = {
     ("GET", "/notification/v2/list"): "list",
     ("PUT", "/notification/v2/read"): "read",
     ("GET", "/uim/v3/client/password/tips"): "tips",
+    ("POST", "/uim/v3/client/upinfo_log"): "software_change",
+    ("POST", "/uim/v3/client/upload_info"): "inventory",
 }
+_REPORT_TYPES: dict[Route, int] = {"software_change": 2002, "inventory": 1103}
 
 
 @dataclass(frozen=True)
@@ -30,13 +33,16 @@ class Reply:
 
 
 class Store:
-    """Messages of all users with their read state, and the password warnings; thread-safe."""
+    """Messages of all users with their read state, the password warnings, and what terminals report of their
+    software; thread-safe."""
 
     def __init__(self) -> None:
         self._lock = threading.Lock()
         self._messages: dict[str, dict[str, str]] = {}
         self._unread: dict[str, dict[str, dict[str, str]]] = {}  # by user, then by uuid
         self._tips: dict[str, str] = {}
+        self._software_changes: list[dict[str, Any]] = []
+        self._inventory: list[dict[str, Any]] | None = None
 
     @staticmethod
     def route(method: str, path: str) -> Route:
@@ -71,6 +77,16 @@ class Store:
             if message is not None:
                 self._tips[user] = message
 
+    def software_changes(self) -> list[dict[str, Any]]:
+        """What was reported as installed or updated, oldest first."""
+        with self._lock:
+            return list(self._software_changes)
+
+    def inventory(self) -> list[dict[str, Any]] | None:
+        """The list of software that was reported last, None before the first report."""
+        with self._lock:
+            return self._inventory
+
     def serve(self, route: Route, query: str, body: bytes) -> Reply:
         """Answer a request."""
         if route == "list":
@@ -79,7 +95,20 @@ class Store:
             return self._mark_read(_json_object(body).get("uuid"))
         if route == "tips":
             return self._tip(_json_object(body).get("username"))
+        if route in _REPORT_TYPES:
+            return self._take_report(route, _json_object(body))
         return Reply(404, b"{}")
+
+    def _take_report(self, route: Route, report: dict[str, Any]) -> Reply:
+        payload = report.get("payload")
+        if report.get("type") != _REPORT_TYPES[route] or not isinstance(payload, dict):
+            return Reply(400, _json({"code": 1}))
+        with self._lock:
+            if route == "inventory":
+                self._inventory = payload.get("list")
+            else:
+                self._software_changes.append(payload)
+        return Reply(200, _json({"code": 0}))
 
     def _list(self, query: Mapping[str, str]) -> Reply:
         limit, offset = int(query.get("limit", "10")), int(query.get("offset", "0"))

@@ -11,11 +11,16 @@ from sandbox import commands
 from sandbox.agent import Agent
 from sandbox.buses import Bus
 from sandbox.clock import Clock, ManualClock
+from sandbox.contracts import Contracts
 from sandbox.events import Events
 from sandbox.fileview import FileView
+from sandbox.network import Network
+from sandbox.packages import Packages
 from sandbox.peers.base import Peer
 from sandbox.peers.daemon import Daemon
+from sandbox.peers.dock import Dock
 from sandbox.peers.identity import Identity
+from sandbox.peers.launcher import Launcher
 from sandbox.peers.logind import Logind
 from sandbox.peers.notifications import Notifications
 from sandbox.peers.policy_service import PolicyService
@@ -23,6 +28,7 @@ from sandbox.peers.screensaver import ScreenSaver
 from sandbox.peers.session_manager import SessionManager
 from sandbox.platform_server import Platform, trust
 from sandbox.senders import Senders
+from sandbox.tools import Tools
 from sandbox.users import User, current_user
 
 
@@ -39,6 +45,7 @@ class Terminal:
         self.user = current_user()
         assert user in (None, self.user), f"this box was entered as {self.user.name}"
         self.events = Events()
+        self.contracts = Contracts(self.events)
         self.clock: Clock = clock or ManualClock()
         self.files = FileView(self.user)
         self.files.reset()
@@ -48,6 +55,9 @@ class Terminal:
             bus.restart()
         commands.install_defaults()
         self.commands = commands.Commands(self.events)
+        self.packages = Packages()
+        self.tools = Tools(self.commands)
+        self.network = Network()
         self.senders = Senders()
         self._add_peers()
         self.agent = Agent(self.events, self.senders)
@@ -67,6 +77,8 @@ class Terminal:
         self.notifications = Notifications(*on_session)
         self.screensaver = ScreenSaver(*on_session)
         self.session_manager = SessionManager(*on_session)
+        self.dock = Dock(*on_session)
+        self.launcher = Launcher(*on_session)
         peers: tuple[Peer, ...] = (
             self.daemon,
             self.logind,
@@ -75,6 +87,8 @@ class Terminal:
             self.notifications,
             self.screensaver,
             self.session_manager,
+            self.dock,
+            self.launcher,
         )
         self.peers = {peer.name: peer for peer in peers}
 
@@ -160,8 +174,11 @@ class Terminal:
         self.daemon.push_policy("wake up")
 
     def violations(self) -> list[str]:
-        """In what the agent broke an interface's contract so far."""
-        return [violation for peer in self.peers.values() for violation in peer.violations]
+        """In what contracts were broken so far: interfaces by a caller, JSON by the agent or the platform."""
+        return [
+            *self.contracts.violations,
+            *(found for peer in self.peers.values() for found in peer.violations),
+        ]
 
     def report(self) -> str:
         """The agent's log and all events, for a person who looks for the cause of a failure."""

@@ -2,7 +2,7 @@
 
 from __future__ import annotations
 
-from typing import Any
+from typing import Any, Mapping
 
 import dbus
 import dbus.bus
@@ -130,14 +130,17 @@ class Peer:
     def _set(self, known: ExportedObject, name: str, value: Any, signature: str | None) -> None:
         known.set(name, value, signature)
         if self.present:
-            changed = dbus.Dictionary({name: known.typed_value(name)}, signature="sv")
-            self._emit(
-                known.path,
-                PROPERTIES,
-                "PropertiesChanged",
-                "sa{sv}as",
-                (known.interface_of(name), changed, []),
-            )
+            self._announce(known, name)
+
+    def _announce(self, known: ExportedObject, name: str) -> None:
+        """Tell everyone that a property has changed."""
+        self._announce_properties(known, name, {name: known.typed_value(name)}, [])
+
+    def _announce_properties(
+        self, known: ExportedObject, name: str, changed: Mapping[str, Any], invalidated: list[str]
+    ) -> None:
+        args = (known.interface_of(name), dbus.Dictionary(changed, signature="sv"), invalidated)
+        self._emit(known.path, PROPERTIES, "PropertiesChanged", "sa{sv}as", args)
 
     def _emit(self, path: str, interface: str, member: str, signature: str, args: tuple[Any, ...]) -> None:
         assert self.present, f"{self.name} is not on the bus"

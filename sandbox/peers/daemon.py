@@ -5,11 +5,14 @@ from __future__ import annotations
 import json
 from typing import Any, Mapping
 
-from sandbox import layout
+from sandbox import contracts, layout
 from sandbox.peers.base import Peer
 from sandbox.peers.exported import ExportedObject
+from sandbox.platform_server import Platform
+from sandbox.uploader import Uploader
 
 INTERFACE = "com.norix.velk.velkg"
+PATH = "/com/norix/velk/velkg"
 MACHINE_ID = "box-machine-0001"
 
 
@@ -21,7 +24,7 @@ class Daemon(Peer):
 
     def exports(self) -> list[ExportedObject]:
         """The service's only object."""
-        exported = ExportedObject("/com/norix/velk/velkg", INTERFACE)
+        exported = ExportedObject(PATH, INTERFACE)
         answers: dict[str, Any] = {
             "GetDomainStatus": 1,
             "GetMachineID": MACHINE_ID,
@@ -41,11 +44,20 @@ class Daemon(Peer):
         if announce:
             self.push_online()
 
+    def uploads_to(self, platform: Platform) -> None:
+        """From now on, upload what the sessions hand over, without letting them wait."""
+        self.objects[PATH].handlers["onUploadFinished"] = Uploader(self._events, platform.port).upload
+
     def push_online(self) -> None:
         """Ask the sessions to announce themselves."""
         self.emit(INTERFACE, "pushOnlineMsg")
 
     def push_policy(self, payload: str | Mapping[str, Any], app_id: str = "box") -> None:
-        """Broadcast a policy; a mapping goes out as JSON with characters outside ASCII as they are."""
-        text = payload if isinstance(payload, str) else json.dumps(payload, ensure_ascii=False)
+        """Broadcast a policy. A mapping keeps to its contract and goes out as JSON with characters outside
+        ASCII as they are; a text may be anything."""
+        if isinstance(payload, str):
+            text = payload
+        else:
+            contracts.require("policy-message", payload)
+            text = json.dumps(payload, ensure_ascii=False)
         self.emit(INTERFACE, "pushPolicyMsg", app_id, text)

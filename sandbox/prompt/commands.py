@@ -2,16 +2,19 @@
 
 from __future__ import annotations
 
+import json
 from typing import Any, Iterable
 
 from rich.table import Table
 
 from sandbox import layout
 from sandbox.peers.fault import Fault
-from sandbox.prompt import platform_commands
+from sandbox.prompt import application_commands, platform_commands, software_commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, command, number
 from sandbox.timeline import glosses
+
+assert application_commands and software_commands, "importing the modules makes their commands known"
 
 _WAIT_SECONDS = "20"
 
@@ -30,14 +33,15 @@ def _on_off(_desk: Desk) -> Iterable[str]:
 
 @command("policy", "CODE [UID] | {JSON}", "the daemon pushes a policy to the sessions", _codes)
 def policy(desk: Desk, code: str, uid: str | None = None) -> None:
-    """A text in braces goes out as it stands, whatever it is."""
-    payload: str | dict[str, Any] = code
+    """A text in braces goes out as it stands, whatever it is; so does a code that lacks its uid."""
+    text = code
     if not code.startswith("{"):
-        payload = {"type": number(code, int)}
+        payload: dict[str, Any] = {"type": number(code, int)}
         if uid is not None:
             payload["payload"] = {"uid": number(uid, int)}
+        text = json.dumps(payload)
     desk.present("daemon")
-    desk.terminal.daemon.push_policy(payload)
+    desk.terminal.daemon.push_policy(text)
 
 
 @command("online", "", "the daemon asks the sessions to announce themselves")

@@ -25,7 +25,7 @@ def run(options: Namespace) -> int:
     require_agent()
     result_stream = outside.result_stream()
     terminal = Terminal(clock=clock(options.speed))
-    assert terminal.platform, "it serves from when it is looked at"
+    terminal.daemon.uploads_to(terminal.platform)
     console = console_for_people()
     timeline = Timeline(terminal.events, AgentTime(options.speed), [console], options.log)
     if result_stream:

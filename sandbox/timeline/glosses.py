@@ -34,16 +34,36 @@ REQUESTS = {
     "list": "are there unread messages? (one at a time)",
     "read": "this one is being shown to the user",
     "tips": "is the user's password about to expire?",
+    "software_change": "what was installed or updated",
+    "inventory": "all software of the terminal",
 }
 PROPERTIES = {
-    "isRunning": "is the screen saver running?",
-    "Locked": "is the session locked?",
-    "Name": "what is the user's name?",
-    "UID": "what is the user's id?",
+    ("com.norix.ScreenSaver", "isRunning"): "is the screen saver running?",
+    ("com.norix.SessionManager", "Locked"): "is the session locked?",
+    ("org.freedesktop.login1.User", "Name"): "what is the user's name?",
+    ("org.freedesktop.login1.User", "UID"): "what is the user's id?",
+    ("com.norix.kpx.daemon.Dock", "Entries"): "which applications are on the dock?",
+    ("com.norix.kpx.daemon.Dock.Entry", "Id"): "which application is this?",
+    ("com.norix.kpx.daemon.Dock.Entry", "Name"): "what is the application called?",
+    ("com.norix.kpx.daemon.Dock.Entry", "IsDocked"): "is it kept on the dock?",
+    ("com.norix.kpx.daemon.Dock.Entry", "WindowInfos"): "which windows has it?",
 }
 CHANGES = {
     ("isRunning", True): "the screen saver starts",
     ("isRunning", False): "the screen saver ends",
     ("Locked", True): "the user locks the screen",
     ("Locked", False): "the user unlocks the screen",
+    ("IsDocked", True): "kept on the dock from now on",
+    ("IsDocked", False): "no longer kept on the dock",
+}
+APPLICATION_STATES = {1: "an application was opened", 2: "an application was closed"}
+ITEM_ACTIONS = {
+    "created": "an application was installed",
+    "update": "an application was updated",
+    "deleted": "an application was removed",
+}
+APPLICATIONS = {
+    "编辑器": "text editor",
+    "说明 - 编辑器": "notes, text editor",
+    "浏览器": "browser",
 }

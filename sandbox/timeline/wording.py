@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 import json
-from typing import Any, Callable
+from typing import Any, Callable, Sized
 
 from sandbox.events import Event
 from sandbox.timeline import glosses
@@ -68,7 +68,9 @@ def _reply(event: Event) -> str:
 
 
 def _property_change(event: Event) -> str:
-    return ", ".join(f"{name} = {_value(value)}" for name, value in event.args[1].items())
+    _, values, invalidated = event.args
+    changes = [f"{name} = {_value(value)}" for name, value in values.items()]
+    return ", ".join(changes + [f"{name} is another" for name in invalidated])
 
 
 _WHAT: dict[str, Callable[[Event], str]] = {
@@ -80,6 +82,9 @@ _WHAT: dict[str, Callable[[Event], str]] = {
     "Set": lambda event: f"Set {event.args[1]} = {_value(event.args[2])}",
     "message": lambda event: f"message “{event.args[1]}” “{event.args[2]}”",
     "tip": lambda event: "no tip" if event.args[1] is None else f"tip “{event.args[1]}”",
+    "sendAppOpenState": lambda event: f"sendAppOpenState {event.args[0]} “{event.args[1]}”",
+    "ItemChanged": lambda event: f"ItemChanged {event.args[0]} “{event.args[1][1]}” {event.args[1][0]}",
+    "onUploadFinished": lambda event: f"onUploadFinished {event.args[0].rpartition('/')[2]} {event.args[1]}",
     "tls": lambda event: f"no TLS connection: {event.args[0]}",
     "reply": _reply,
 }
@@ -91,6 +96,7 @@ _WHAT_OF_KIND: dict[str, Callable[[Event], str]] = {
     "log": lambda event: f"{event.member}: {event.args[0]}",
     "output": lambda event: str(event.args[0]),
     "http": _request,
+    "upload": lambda event: f"no upload to {event.args[0]}: {event.args[1]}",
 }
 
 
@@ -111,7 +117,26 @@ def _policy_meaning(args: tuple[Any, ...]) -> str:
 
 
 def _change_meaning(args: tuple[Any, ...]) -> str:
-    return "; ".join(glosses.CHANGES.get(change, "") for change in args[1].items())
+    _, values, _ = args
+    return "; ".join(_new_value(name, value) for name, value in values.items())
+
+
+def _new_value(name: str, value: Any) -> str:
+    if name == "WindowInfos":
+        return _window_count(value)
+    if name == "Name":
+        return glosses.APPLICATIONS.get(value, "")
+    return glosses.CHANGES.get((name, value), "")
+
+
+def _application_meaning(args: tuple[Any, ...]) -> str:
+    state, name = args
+    words = (glosses.APPLICATION_STATES.get(state), glosses.APPLICATIONS.get(name))
+    return ": ".join(filter(None, words))
+
+
+def _window_count(infos: Sized) -> str:
+    return "1 window" if len(infos) == 1 else f"{len(infos)} windows"
 
 
 _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
@@ -125,7 +150,7 @@ _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
     "onDomainConfig": lambda args: "take the terminal out of the domain's configuration",
     "Notify": _notice_meaning,
     "PropertiesChanged": _change_meaning,
-    "Get": lambda args: glosses.PROPERTIES.get(args[1], ""),
+    "Get": lambda args: glosses.PROPERTIES.get((args[0], args[1]), ""),
     "Set": lambda args: "switched off" if args[2] is False else "",
     "Terminate": lambda args: "forced log-out",
     "Reboot": lambda args: "forced reboot",
@@ -133,4 +158,13 @@ _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
     "restore_config": lambda args: "what the daemon changed on the terminal is undone",
     "message": lambda args: f"for {args[0]}, from {args[3]}",
     "tip": lambda args: f"for {args[0]}: the password is about to expire" if args[1] else f"for {args[0]}",
+    "EntryAdded": lambda args: "an application comes to the dock",
+    "EntryRemoved": lambda args: "an application is gone from the dock",
+    "WindowInfosChanged": lambda args: _window_count(args[0]),
+    "NameChanged": lambda args: glosses.APPLICATIONS.get(args[0], ""),
+    "sendAppOpenState": _application_meaning,
+    "GetAllItemInfos": lambda args: "which applications are installed?",
+    "ItemChanged": lambda args: glosses.ITEM_ACTIONS.get(args[0], ""),
+    "GetMachineID": lambda args: "which terminal is this?",
+    "onUploadFinished": lambda args: "for the platform; the daemon uploads it",
 }

@@ -13,7 +13,7 @@ from sandbox import layout
 from sandbox.certificates import Authority, Identity
 from sandbox.platform_server import HttpFault, Platform, trust
 from sandbox.terminal import Terminal
-from wire import log_lines, next_notification
+from wire import carries_out_policies, log_lines, next_notification
 
 SURELY_NEXT_POLL = 181
 USER = "zhang.wei"
@@ -36,13 +36,6 @@ def next_poll_is_well(terminal: Terminal) -> None:
     """Assert that a message posted now arrives with the next poll."""
     terminal.platform.post_message(USER, "later", "text")
     assert next_notification(terminal, poll(terminal)).summary == "later"
-
-
-def carries_out_policies(terminal: Terminal) -> None:
-    """Assert that a policy reaches the user."""
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1300})
-    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
 
 
 @pytest.mark.parametrize("fault", [HttpFault.close(), HttpFault.cut()], ids=lambda fault: fault.kind)
@@ -88,6 +81,7 @@ def test_hanging_platform_costs_the_transfer_limit_and_no_more(terminal: Termina
     terminal.daemon.push_policy({"type": 5})
     terminal.jump(TRANSFER_LIMIT)
     terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+    terminal.sync()
     assert len(warnings(terminal, mark)) == 1
 
     terminal.platform.release()

@@ -82,7 +82,7 @@ def test_account_policy_for_anyone_else_does_nothing(
     session: Terminal, code: int, payload: dict[str, object]
 ) -> None:
     mark = session.events.mark()
-    session.daemon.push_policy({"type": code, **payload})
+    session.daemon.push_policy(json.dumps({"type": code, **payload}))
 
     assert settled(session, mark) == []
     session.advance(60)

@@ -35,6 +35,13 @@ def next_notification(terminal: Terminal, after: int, count: int = 1) -> Notific
     return Notification(*event.args)
 
 
+def carries_out_policies(terminal: Terminal) -> None:
+    """Assert that a policy reaches the user."""
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1300})
+    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+
+
 def next_status(terminal: Terminal, after: int, count: int = 1) -> tuple[Any, ...]:
     """Arguments of the `count`th status report at the daemon since a mark; waits for it."""
     return terminal.events.wait_for(

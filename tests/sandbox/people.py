@@ -9,8 +9,31 @@ from pathlib import Path
 from subprocess import PIPE, CompletedProcess
 from tempfile import TemporaryFile
 
+from sandbox import layout
 from sandbox.agent import default_binary
 from sandbox.peers.daemon import INTERFACE as VELKG
+from sandbox.peers.policy_service import INTERFACE as PRYS
+
+_TALK = f"""
+import dbus, ssl
+from http.client import HTTPSConnection
+
+def call_daemon(member, *args):
+    call = dbus.SystemBus().call_blocking
+    call("{VELKG}", "/com/norix/velk/velkg", "{VELKG}", member, "s" * len(args), args)
+
+def call_policy_service(text):
+    call = dbus.SessionBus().call_blocking
+    call("{PRYS}", "/com/norix/velk/prys", "{PRYS}", "onPolicyMsg", "s", (text,))
+
+def ask_platform(method, path, body):
+    trust = ssl.create_default_context(cafile="{layout.SERVER_CERTIFICATE}")
+    trust.load_cert_chain("{layout.CLIENT_CERTIFICATE}", "{layout.CLIENT_KEY}")
+    connection = HTTPSConnection("{layout.PLATFORM_HOST}", {layout.PLATFORM_PORT}, context=trust)
+    connection.request(method, path, body.encode() or None)
+    connection.getresponse().read()
+
+"""
 
 
 def run_program(*arguments: str, script: str = "", agent: Path | None = None) -> CompletedProcess[str]:
@@ -35,6 +58,13 @@ def rude_agent(folder: Path) -> Path:
     call = f'dbus.SystemBus().call_blocking("{VELKG}", "/com/norix/velk/velkg", "{VELKG}", "greet", "", ())'
     real = shlex.quote(str(default_binary()))
     return _program(folder, f"/usr/bin/python3 -c 'import dbus; {call}' 2>/dev/null", f"exec {real}")
+
+
+def talking_agent(folder: Path, deeds: str) -> Path:
+    """An agent that does what is written in Python, with the calls below, and ends."""
+    script = folder / "deeds.py"
+    script.write_text(_TALK + deeds + "\n")
+    return _program(folder, f"exec /usr/bin/python3 {script}")
 
 
 def _program(folder: Path, *lines: str) -> Path:

@@ -20,10 +20,11 @@ def test_etc_holds_nothing_but_the_terminals_own_files() -> None:
     assert found - own <= {"alternatives", "ld.so.cache", "ssl"}
 
 
-def test_only_loopback_is_there() -> None:
-    devices = Path("/proc/net/dev").read_text().splitlines()[2:]
+@pytest.mark.parametrize("kind", ["CapPrm", "CapEff", "CapAmb"])
+def test_programs_have_no_power_over_the_box(kind: str) -> None:
+    status = dict(line.split(":\t") for line in Path("/proc/self/status").read_text().splitlines())
 
-    assert [line.split(":")[0].strip() for line in devices] == ["lo"]
+    assert int(status[kind], 16) == 0
 
 
 @pytest.mark.parametrize("folder", ["/", "/usr", "/usr/share", str(layout.REPOSITORY)])

@@ -2,19 +2,16 @@
 
 from __future__ import annotations
 
-import io
 import json
 
 import pytest
-from rich.console import Console
 
+from paper import Paper
 from sandbox import layout
 from sandbox.prompt import commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, run_line
 from sandbox.terminal import Terminal
-from sandbox.timeline.agenttime import AgentTime
-from sandbox.timeline.timeline import Timeline
 from sandbox.users import DOMAIN_USER
 
 assert commands, "importing the module makes its commands known"
@@ -22,19 +19,6 @@ assert commands, "importing the module makes its commands known"
 _SURELY_NEXT_POLL = 181
 # The notice's timer is coarse: half a second more or less.
 _PASSWORD_NOTICE_DELAY = 61
-
-
-class Paper(Desk):
-    """A desk whose output can be read."""
-
-    def __init__(self, terminal: Terminal) -> None:
-        self.paper = io.StringIO()
-        console = Console(file=self.paper, width=130)
-        super().__init__(terminal, Timeline(terminal.events, AgentTime(1), [console]), console)
-
-    def lines_with(self, text: str) -> list[str]:
-        """The printed lines that hold a text."""
-        return [line for line in self.paper.getvalue().splitlines() if text in line]
 
 
 @pytest.fixture

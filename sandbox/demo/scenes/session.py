@@ -43,7 +43,7 @@ BEGIN = Scene(
     "The agent tells the daemon whose session this is, and that the user is active; it asks the platform "
     "about the user's password.",
     (Step(_start, (_IDENTITY, _status(1, "active"), _PASSWORD_CHECK)),),
-    beforehand=lambda terminal: terminal.platform,
+    beforehand=lambda terminal: terminal.daemon.uploads_to(terminal.platform),
 )
 
 STATES = Scene(

@@ -1,0 +1,45 @@
+"""What the agent tells of the user's applications."""
+
+from __future__ import annotations
+
+from typing import Callable
+
+from sandbox.demo.scene import Expectation, Scene, Step, from_agent
+from sandbox.peers.dock import Dock
+from sandbox.terminal import Terminal
+
+_OPENED, _CLOSED = 1, 2
+_EDITOR, _BROWSER = "编辑器", "浏览器"
+_EDITOR_WITH_FILE = "说明 - 编辑器"
+
+
+def _on_dock(change: Callable[[Dock], object], then: Expectation) -> Step:
+    return Step(lambda terminal: change(terminal.dock), (then,))
+
+
+def _told(state: int, name: str, words: str) -> Expectation:
+    return from_agent(f"state {state}, “{name}”: {words}", "daemon", "sendAppOpenState", state, name)
+
+
+def _close_renamed(dock: Dock) -> None:
+    dock.rename("editor", _EDITOR_WITH_FILE)
+    dock.close_app("editor")
+
+
+def _keep_browser(terminal: Terminal) -> None:
+    terminal.dock.open_app("browser", _BROWSER, docked=True, windows=0)
+
+
+APPLICATIONS = Scene(
+    "Applications open and close",
+    "The agent follows the desktop's dock. The browser, which the user keeps there, is told of when it gets "
+    "its first window, the editor when it comes to the dock.",
+    (
+        _on_dock(lambda dock: dock.open_app("editor", _EDITOR), _told(_OPENED, _EDITOR, "opened")),
+        _on_dock(lambda dock: dock.set_windows("browser", 1), _told(_OPENED, _BROWSER, "opened")),
+        _on_dock(lambda dock: dock.set_windows("browser", 2), _told(_OPENED, _BROWSER, "a further window")),
+        _on_dock(_close_renamed, _told(_CLOSED, _EDITOR_WITH_FILE, "closed under its last name")),
+        _on_dock(lambda dock: dock.set_windows("browser", 0), _told(_CLOSED, _BROWSER, "closed")),
+    ),
+    beforehand=_keep_browser,
+)

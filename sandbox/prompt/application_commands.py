@@ -1,0 +1,79 @@
+"""What a person can do with applications at the prompt."""
+
+from __future__ import annotations
+
+from rich.table import Table
+from rich.text import Text
+
+from sandbox.peers.dock import Dock
+from sandbox.prompt.desk import Desk, Refused
+from sandbox.prompt.registry import command, number
+
+
+@command("open", "APPLICATION", "the user opens an application, or one more window of it")
+def open_application(desk: Desk, app: str) -> None:
+    """Without the dock nobody will see it."""
+    dock = desk.terminal.dock
+    if app in dock.apps:
+        dock.set_windows(app, dock.windows(app) + 1)
+    else:
+        dock.open_app(app, app)
+
+
+@command("close", "APPLICATION", "the user closes an application with all its windows")
+def close_application(desk: Desk, app: str) -> None:
+    """It must be on the dock."""
+    _have_windows(_dock_with(desk, app), app, 0)
+
+
+@command("windows", "APPLICATION COUNT", "the user opens or closes windows until there are so many")
+def windows(desk: Desk, app: str, count: str) -> None:
+    """The application must be on the dock."""
+    wanted = int(number(count, int))
+    if wanted < 0:
+        raise Refused(f"{wanted} is no number of windows")
+    _have_windows(_dock_with(desk, app), app, wanted)
+
+
+@command("dock", "APPLICATION", "the user keeps an application on the dock, whether or not it runs")
+def dock_application(desk: Desk, app: str) -> None:
+    """One that is not there yet comes without a window."""
+    dock = desk.terminal.dock
+    if app in dock.apps:
+        dock.pin(app)
+    else:
+        dock.open_app(app, app, docked=True, windows=0)
+
+
+@command("undock", "APPLICATION", "the user takes an application off the dock, where it stays while it runs")
+def undock_application(desk: Desk, app: str) -> None:
+    """It must be on the dock."""
+    dock = _dock_with(desk, app)
+    dock.pin(app, False)
+    if not dock.windows(app):
+        dock.close_app(app)
+
+
+@command("apps", "", "the applications on the dock")
+def applications(desk: Desk) -> None:
+    """In the dock's order."""
+    dock = desk.terminal.dock
+    table = Table("Application", "Windows", "Kept on the dock")
+    for app in dock.apps:
+        table.add_row(Text(app), str(dock.windows(app)), "yes" if dock.is_docked(app) else "no")
+    desk.show(table)
+
+
+def _dock_with(desk: Desk, app: str) -> Dock:
+    dock = desk.terminal.dock
+    if app not in dock.apps:
+        raise Refused(f"there is no application '{app}' on the dock; see: apps")
+    return dock
+
+
+def _have_windows(dock: Dock, app: str, number: int) -> None:
+    """An application without windows stays on the dock only if it is kept there."""
+    if number or dock.is_docked(app):
+        dock.set_windows(app, number)
+    else:
+        dock.close_app(app)

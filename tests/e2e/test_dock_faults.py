@@ -1,0 +1,162 @@
+"""A dock that fails, hangs or answers nonsense."""
+
+from __future__ import annotations
+
+from typing import Any
+
+import pytest
+
+from dockwatch import OPENED, follows, scans, settle, start, told, warnings
+from sandbox.peers import dock
+from sandbox.peers.exported import Reply
+from sandbox.peers.fault import Fault
+from sandbox.terminal import Terminal
+from wire import carries_out_policies
+
+DBUS_LIMIT = 25
+
+
+def test_a_failing_dock_counts_as_empty_and_is_followed_when_it_is_well(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A")
+    terminal.dock.fault = Fault.fail()
+    start(terminal)
+    terminal.dock.fault = Fault.none()
+
+    assert (told(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
+    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+
+
+def test_a_dock_that_does_not_introspect_is_read_all_the_same(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A")
+    terminal.dock.faults["Introspect"] = Fault.hang()
+
+    start(terminal)
+
+    assert told(terminal) == [(OPENED, "A")]
+
+
+def test_a_hung_dock_at_start_costs_the_limit_and_counts_as_empty(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A")
+    terminal.dock.fault = Fault.hang()
+    terminal.start_agent(ready=lambda: terminal.events.wait_for(target="dock", member="Get"))
+
+    terminal.jump(DBUS_LIMIT)
+
+    terminal.events.wait_for(kind="log", member="info", args=("dock entry size: 0",))
+    carries_out_policies(terminal)
+    terminal.dock.fault = Fault.none()
+    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+
+
+def test_a_dock_that_hangs_later_holds_the_agent_up_by_the_limit_for_each_question(
+    terminal: Terminal,
+) -> None:
+    start(terminal)
+    terminal.dock.fault = Fault.hang()
+    mark = terminal.events.mark()
+    path = terminal.dock.open_app("a", "A")
+
+    # The identifier and, of an entry that did not tell it, whether it is docked.
+    for count in (1, 2):
+        terminal.events.wait_for(target="dock", member="Get", after=mark, count=count)
+        terminal.jump(DBUS_LIMIT)
+
+    carries_out_policies(terminal)
+    terminal.dock.fault = Fault.none()
+    settle(terminal)
+    assert warnings(terminal, mark) == [f'entry is invalid, path: "{path}"']
+    assert told(terminal, mark) == [(OPENED, "")]
+
+
+def test_a_dock_that_is_slow_to_tell_what_it_declared_invalid_holds_nothing_up(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A", docked=True, windows=0)
+    start(terminal)
+    terminal.dock.announces = ("invalidated",)
+    terminal.dock.fault = Fault.hold()
+    mark = terminal.events.mark()
+
+    terminal.dock.set_windows("a", 1)
+    terminal.events.wait_for(target="dock", member="Get", after=mark)
+    carries_out_policies(terminal)
+    before = told(terminal, mark)
+    terminal.dock.release()
+    settle(terminal)
+
+    assert (before, told(terminal, mark)) == ([], [(OPENED, "A")])
+
+
+def test_what_a_dock_does_not_tell_after_declaring_it_invalid_changes_nothing(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A", docked=True, windows=1)
+    start(terminal)
+    terminal.dock.announces = ("invalidated",)
+    terminal.dock.faults["Get"] = Fault.fail()
+
+    events = follows(
+        terminal, lambda: terminal.dock.set_windows("a", 0), lambda: terminal.dock.rename("a", "B")
+    )
+    assert events == []
+
+    terminal.dock.faults.clear()
+    assert follows(terminal, lambda: terminal.dock.set_windows("a", 2)) == [(OPENED, "A")]
+
+
+@pytest.mark.parametrize(
+    ("value", "signature"), [("e1", "s"), (["e1"], "as"), ({}, "a{sv}"), (5, "i"), ((1, 2), "(ii)")], ids=str
+)
+def test_a_list_of_entries_of_another_type_counts_as_empty(
+    terminal: Terminal, value: Any, signature: str
+) -> None:
+    terminal.dock.set("Entries", value, signature)
+
+    start(terminal)
+
+    assert (told(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
+    terminal.dock.set("Entries", [])
+    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+
+
+@pytest.mark.parametrize("name", ["Id", "Name", "WindowInfos"])
+@pytest.mark.parametrize(
+    ("value", "signature"), [(5, "i"), (["e1"], "as"), ({"a": "b"}, "a{ss}"), ((1, "x"), "(is)")], ids=str
+)
+def test_an_entry_with_a_property_of_another_type_does_not_stop_the_agent(
+    terminal: Terminal, name: str, value: Any, signature: str
+) -> None:
+    path = terminal.dock.open_app("a", "A", windows=2)
+    terminal.dock.objects[path].set(name, value, signature)
+
+    start(terminal)
+
+    assert told(terminal) == [(OPENED, "" if name == "Name" else "A")]
+    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+
+
+@pytest.mark.parametrize("name", ["Name", "WindowInfos"])
+@pytest.mark.parametrize("way", ["values", "invalidated", "signal"])
+@pytest.mark.parametrize(("value", "signature"), [(5, "i"), (["e1"], "as"), ({"a": "b"}, "a{ss}")], ids=str)
+def test_a_change_to_a_value_of_another_type_is_passed_over(
+    terminal: Terminal, way: dock.Announcement, name: str, value: Any, signature: str
+) -> None:
+    path = terminal.dock.open_app("a", "A", windows=2)
+    start(terminal)
+    terminal.dock.announces = (way,)
+
+    events = follows(
+        terminal,
+        lambda: terminal.dock.set(name, value, signature, path),
+        lambda: terminal.dock.set_windows("a", 3),
+    )
+
+    assert events == [(OPENED, "A")]
+
+
+@pytest.mark.parametrize("reply", [Reply("", ()), Reply("s", ("bare",))], ids=str)
+def test_replies_of_another_form_do_not_stop_the_agent(terminal: Terminal, reply: Reply) -> None:
+    start(terminal)
+    terminal.dock.answers["Get"] = reply
+    path = terminal.dock.open_app("a", "A")
+    settle(terminal)
+    del terminal.dock.answers["Get"]
+
+    assert warnings(terminal) == [f'entry is invalid, path: "{path}"']
+    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]

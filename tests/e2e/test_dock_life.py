@@ -1,0 +1,178 @@
+"""A dock that comes late, goes and comes back, and others who speak in its name."""
+
+from __future__ import annotations
+
+from typing import Iterator
+
+import pytest
+
+from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
+from sandbox.peers import dock
+from sandbox.peers.exported import PROPERTIES
+from sandbox.spoofer import Stranger
+from sandbox.terminal import Terminal
+from wire import carries_out_policies
+
+WAITING = "dock service is not registered, wait.."
+
+
+@pytest.fixture
+def stranger(terminal: Terminal) -> Iterator[Stranger]:
+    """Someone else on the session bus."""
+    someone = Stranger(terminal.session_bus)
+    yield someone
+    someone.close()
+
+
+def let_reach_the_bus(stranger: Stranger) -> None:
+    """Return once the bus has passed on what the stranger sent."""
+    stranger.call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", "GetId")
+
+
+def start_without_dock(terminal: Terminal) -> None:
+    """The agent misses the dock at its start."""
+    terminal.dock.leave()
+    terminal.start_agent()
+    terminal.events.wait_for(kind="log", member="warning", args=(WAITING,))
+
+
+def appear(terminal: Terminal) -> None:
+    """The dock appears, and the agent has read it."""
+    mark = terminal.events.mark()
+    terminal.dock.appear()
+    terminal.events.wait_for(
+        lambda event: event.args[0].startswith("dock entry size:"), kind="log", after=mark
+    )
+    settle(terminal)
+
+
+def test_an_absent_dock_is_warned_of_once_and_nothing_is_told(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A")
+
+    start_without_dock(terminal)
+    carries_out_policies(terminal)
+    terminal.sync()
+
+    assert (told(terminal), scans(terminal), warnings(terminal)) == ([], [], [WAITING])
+
+
+def test_a_late_dock_is_read_whole_and_then_followed(terminal: Terminal) -> None:
+    start_without_dock(terminal)
+    for app, docked in (("b", False), ("a", True), ("c", False)):
+        terminal.dock.open_app(app, app.upper(), docked=docked)
+
+    appear(terminal)
+
+    assert (told(terminal), scans(terminal)) == ([(OPENED, "B"), (OPENED, "C")], ["dock entry size: 3"])
+    events = follows(
+        terminal,
+        lambda: terminal.dock.open_app("d", "D"),
+        lambda: terminal.dock.set_windows("a", 0),
+        lambda: terminal.dock.close_app("b"),
+    )
+    assert events == [(OPENED, "D"), (CLOSED, "A"), (CLOSED, "B")]
+
+
+def test_a_late_dock_that_comes_back_is_not_read_again(terminal: Terminal) -> None:
+    start_without_dock(terminal)
+    terminal.dock.open_app("a", "A")
+    appear(terminal)
+    mark = terminal.events.mark()
+
+    terminal.dock.restart()
+    settle(terminal)
+
+    assert (told(terminal, mark), scans(terminal, mark), warnings(terminal, mark)) == ([], [], [])
+
+
+def test_a_dock_that_goes_and_comes_back_is_not_read_again_but_still_followed(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A")
+    start(terminal)
+    mark = terminal.events.mark()
+
+    terminal.dock.leave()
+    terminal.dock.open_app("missed", "Missed")
+    terminal.dock.appear()
+    settle(terminal)
+
+    assert (told(terminal, mark), scans(terminal, mark), warnings(terminal, mark)) == ([], [], [])
+    events = follows(
+        terminal, lambda: terminal.dock.open_app("b", "B"), lambda: terminal.dock.set_windows("a", 2)
+    )
+    assert events == [(OPENED, "B"), (OPENED, "A")]
+
+
+@pytest.mark.parametrize("straight", [False, True], ids=["broadcast", "straight"])
+def test_a_stranger_that_speaks_like_the_dock_is_ignored(
+    terminal: Terminal, stranger: Stranger, straight: bool
+) -> None:
+    path = terminal.dock.open_app("mail", "Mail")
+    start(terminal)
+    mark = terminal.events.mark()
+
+    agent: list[str | None] = [*terminal.agent.bus_names(terminal.session_bus)]
+    for receiver in agent if straight else [None]:
+        for place, interface, member, signature, args in (
+            (path, dock.ENTRY, "NameChanged", "s", ("Spoof",)),
+            (path, dock.ENTRY, "WindowInfosChanged", "a{us}", ({},)),
+            (path, PROPERTIES, "PropertiesChanged", "sa{sv}as", (dock.ENTRY, {"Name": "Spoof"}, [])),
+            (path, PROPERTIES, "PropertiesChanged", "sa{sv}as", (dock.ENTRY, {}, ["WindowInfos"])),
+            (dock.PATH, dock.INTERFACE, "EntryAdded", "oi", (path, 0)),
+            (dock.PATH, dock.INTERFACE, "EntryRemoved", "s", ("mail",)),
+        ):
+            stranger.emit(place, interface, member, *args, signature=signature, destination=receiver)
+    let_reach_the_bus(stranger)
+    settle(terminal)
+
+    assert (told(terminal, mark), warnings(terminal, mark)) == ([], [])
+    assert terminal.events.all(source="velks", target="dock", after=mark) == []
+    assert follows(terminal, lambda: terminal.dock.close_app("mail")) == [(CLOSED, "Mail")]
+
+
+def test_a_stranger_is_ignored_while_the_dock_is_awaited(terminal: Terminal, stranger: Stranger) -> None:
+    path = terminal.dock.open_app("mail", "Mail")
+    start_without_dock(terminal)
+
+    stranger.emit(dock.PATH, dock.INTERFACE, "EntryAdded", path, 0, signature="oi")
+    let_reach_the_bus(stranger)
+    appear(terminal)
+
+    assert (told(terminal), warnings(terminal)) == ([(OPENED, "Mail")], [WAITING])
+
+
+def test_signals_of_another_form_do_nothing(terminal: Terminal, stranger: Stranger) -> None:
+    path = terminal.dock.open_app("mail", "Mail")
+    start(terminal)
+    mark = terminal.events.mark()
+
+    terminal.dock.leave()
+    assert stranger.own(dock.INTERFACE) == 1
+    for place, interface, member, signature, args in (
+        (dock.PATH, dock.INTERFACE, "EntryAdded", "", ()),
+        (dock.PATH, dock.INTERFACE, "EntryAdded", "si", (path, 0)),
+        (dock.PATH, dock.INTERFACE, "EntryRemoved", "as", (["mail"],)),
+        (dock.PATH, dock.ENTRY, "EntryRemoved", "s", ("mail",)),
+        (path, dock.ENTRY, "NameChanged", "", ()),
+        (path, dock.ENTRY, "WindowInfosChanged", "", ()),
+        (path, dock.ENTRY, "Changed", "s", ("Other",)),
+        (path, PROPERTIES, "PropertiesChanged", "s", (dock.ENTRY,)),
+        (path, PROPERTIES, "PropertiesChanged", "sa{sv}as", ("com.norix.Other", {"Name": "Other"}, [])),
+    ):
+        stranger.emit(place, interface, member, *args, signature=signature)
+    let_reach_the_bus(stranger)
+    stranger.release(dock.INTERFACE)
+    terminal.dock.appear()
+    settle(terminal)
+
+    assert (told(terminal, mark), warnings(terminal, mark)) == ([], [])
+    assert follows(terminal, lambda: terminal.dock.close_app("mail")) == [(CLOSED, "Mail")]
+
+
+def test_the_end_of_the_session_bus_does_not_stop_the_agent(terminal: Terminal) -> None:
+    terminal.dock.open_app("a", "A")
+    start(terminal)
+
+    terminal.session_bus.restart()
+
+    terminal.sync()
+    assert terminal.agent.alive

@@ -1,0 +1,243 @@
+"""The launcher is absent, late, restarting, gone, hung or wrong."""
+
+from __future__ import annotations
+
+import pytest
+
+from sandbox.peers.exported import Reply
+from sandbox.peers.fault import Fault
+from sandbox.peers.launcher import LauncherItem
+from sandbox.terminal import Terminal
+from software import (
+    CHANGE,
+    EDITOR,
+    INVENTORY,
+    LISTED,
+    announce,
+    install,
+    next_inventory,
+    next_upload,
+    uploads,
+)
+from wire import log_lines
+
+DBUS_LIMIT = 25
+WAITING = "launcher service is not registered, wait.."
+UNKNOWN = "launcher service is not init"
+ARRIVED = "software inited"
+ASKED = "GetLauncerItems -------- QDBusError("
+
+
+def marker_lines(terminal: Terminal, after: int = 0) -> list[tuple[str, str]]:
+    """Level and text of the lines that tell how it goes with the launcher."""
+    lines = terminal.events.all(kind="log", after=after)
+    return [(line.member, line.args[0]) for line in lines if line.args[0] in (WAITING, UNKNOWN, ARRIVED)]
+
+
+def wait_for_list(terminal: Terminal, after: int) -> None:
+    """Wait until the agent has made a list of the software, and sent it if there is any."""
+    terminal.events.wait_for(lambda event: event.args[0].startswith(LISTED), kind="log", after=after)
+    terminal.sync()
+
+
+def start_without_launcher(terminal: Terminal) -> None:
+    """Start the agent; software is there, but nobody who lists it."""
+    install(terminal, EDITOR)
+    terminal.launcher.leave()
+    terminal.start_agent()
+
+
+def start_with(terminal: Terminal, fault: Fault) -> int:
+    """Start the agent; it has just asked the launcher. The mark before it."""
+    install(terminal, EDITOR)
+    terminal.launcher.fault = fault
+    mark = terminal.events.mark()
+    terminal.start_agent(ready=lambda: terminal.events.wait_for(member="GetAllItemInfos", after=mark))
+    return mark
+
+
+def test_inventory_is_reported_once_to_begin_with(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+
+    terminal.start_agent()
+
+    assert [url for url, _ in uploads(terminal)] == [INVENTORY]
+    assert marker_lines(terminal) == []
+
+
+def test_inventory_is_reported_before_the_session_is_announced(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+
+    terminal.start_agent()
+
+    on_system_bus = terminal.events.all(kind="call", source="velks")
+    sent = sorted(
+        (call for call in on_system_bus if call.target in ("daemon", "logind")),
+        key=lambda call: call.detail["serial"],
+    )
+    assert [call.member for call in sent] == [
+        "onUploadFinished",
+        "Get",
+        "Get",
+        "UpdateUserInfo",
+        "SendUserStatus",
+    ]
+
+
+def test_machine_is_read_before_the_launcher_is_asked(terminal: Terminal) -> None:
+    """And the list is on its way before the user's name is asked for."""
+    mark = start_with(terminal, Fault.hold())
+    terminal.files.write_machine_id("too-late")
+    assert terminal.events.all(target="logind", member="Get", after=mark) == []
+
+    terminal.launcher.release()
+
+    assert "box-file-machine-0001" in next_upload(terminal, INVENTORY, mark)
+
+
+def test_nothing_is_reported_without_a_launcher(terminal: Terminal) -> None:
+    start_without_launcher(terminal)
+
+    assert uploads(terminal) == []
+    assert marker_lines(terminal) == [("warning", WAITING), ("info", UNKNOWN)]
+
+
+def test_inventory_is_reported_when_the_launcher_arrives(terminal: Terminal) -> None:
+    start_without_launcher(terminal)
+    mark = terminal.events.mark()
+
+    terminal.launcher.appear()
+    wait_for_list(terminal, mark)
+
+    assert [url for url, _ in uploads(terminal)] == [INVENTORY]
+    assert marker_lines(terminal, mark) == [("debug", ARRIVED)]
+
+
+def test_late_launcher_is_waited_for_without_asking(terminal: Terminal) -> None:
+    start_without_launcher(terminal)
+    mark = terminal.events.mark()
+
+    terminal.advance(3600)
+
+    assert (uploads(terminal), marker_lines(terminal, mark)) == ([], [])
+
+
+def test_changes_are_reported_of_a_launcher_that_came_late(terminal: Terminal) -> None:
+    start_without_launcher(terminal)
+    mark = terminal.events.mark()
+    terminal.launcher.appear()
+    wait_for_list(terminal, mark)
+
+    mark = announce(terminal, "created", EDITOR)
+
+    assert [url for url, _ in uploads(terminal, mark)] == [CHANGE, INVENTORY]
+
+
+@pytest.mark.parametrize("late", [False, True], ids=["present at the start", "late"])
+def test_restart_of_the_launcher_is_not_noticed(terminal: Terminal, late: bool) -> None:
+    install(terminal, EDITOR)
+    if late:
+        terminal.launcher.leave()
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    if late:
+        terminal.launcher.appear()
+    next_inventory(terminal, mark)
+    terminal.sync()
+    mark = terminal.events.mark()
+
+    terminal.launcher.restart()
+    # The announcement comes after the news of the restart: the one inventory is its own.
+    announce(terminal, "deleted", EDITOR)
+
+    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY]
+    assert marker_lines(terminal, mark) == []
+
+
+def test_launcher_that_has_gone_lists_nothing(terminal: Terminal) -> None:
+    mark = start_with(terminal, Fault.hang())
+
+    terminal.launcher.leave()
+    wait_for_list(terminal, mark)
+
+    assert uploads(terminal) == []
+    assert any(line.startswith(f'{ASKED}"org.freedesktop.DBus.Error.') for line in log_lines(terminal, mark))
+
+
+def test_launcher_that_hangs_costs_the_limit(terminal: Terminal) -> None:
+    mark = start_with(terminal, Fault.hang())
+
+    terminal.jump(DBUS_LIMIT)
+    wait_for_list(terminal, mark)
+
+    assert uploads(terminal) == []
+    assert any("Error.NoReply" in line for line in log_lines(terminal, mark) if line.startswith(ASKED))
+
+
+def test_slow_launcher_is_waited_for(terminal: Terminal) -> None:
+    mark = start_with(terminal, Fault.hold())
+
+    terminal.jump(DBUS_LIMIT - 5)
+    terminal.launcher.release()
+
+    assert [record["name"] for record in next_inventory(terminal, mark)] == ["Editor"]
+
+
+def test_launcher_that_refuses_lists_nothing(terminal: Terminal) -> None:
+    mark = start_with(terminal, Fault.fail("com.norix.Error"))
+    wait_for_list(terminal, mark)
+
+    assert uploads(terminal) == []
+    assert f'{ASKED}"com.norix.Error", "told to fail")' in log_lines(terminal, mark)
+
+
+@pytest.mark.parametrize(
+    ("signature", "values"),
+    [
+        ("as", (["x"],)),
+        ("s", ("x",)),
+        ("a(ss)", ([("/x", "X")],)),
+        ("(ssssxx)", (("/x", "X", "", "", 0, 0),)),
+        ("", ()),
+    ],
+    ids=str,
+)
+def test_list_of_a_wrong_type_counts_as_none(
+    terminal: Terminal, signature: str, values: tuple[object, ...]
+) -> None:
+    terminal.launcher.answers["GetAllItemInfos"] = Reply(signature, values)
+
+    terminal.start_agent()
+
+    assert uploads(terminal) == []
+    assert "SoftwareGuard::getSoftwareList()--- 0" in log_lines(terminal, 0)
+
+
+def test_list_that_could_be_read_is_logged_without_an_error(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+
+    terminal.start_agent()
+
+    lines = [line for line in log_lines(terminal, 0) if line.startswith("GetLauncerItems")]
+    assert lines == ['GetLauncerItems -------- QDBusError("", "")']
+
+
+def test_changes_in_a_row_are_reported_in_their_order(terminal: Terminal) -> None:
+    names = [f"application {number}" for number in range(20)]
+    terminal.start_agent()
+    mark = terminal.events.mark()
+
+    for name in names:
+        terminal.launcher.announce("created", LauncherItem(EDITOR.path, name))
+    next_upload(terminal, CHANGE, mark, count=len(names))
+
+    sent = [text for url, text in uploads(terminal, mark) if url == CHANGE]
+    assert [name for name, text in zip(names, sent) if f'"{name}"' in text] == names
+
+
+def test_session_is_reported_while_nobody_lists_software(terminal: Terminal) -> None:
+    terminal.launcher.leave()
+
+    terminal.start_agent()
+
+    assert terminal.events.all(member="SendUserStatus")

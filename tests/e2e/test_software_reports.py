@@ -1,0 +1,260 @@
+"""The reports of the terminal's software that the agent hands to the daemon for upload."""
+
+from __future__ import annotations
+
+import json
+
+import pytest
+
+from sandbox.peers.exported import Reply
+from sandbox.peers.fault import Fault
+from sandbox.peers.launcher import LauncherItem
+from sandbox.terminal import Terminal
+from software import (
+    CHANGE,
+    EDITOR,
+    INVENTORY,
+    PLAYER,
+    announce,
+    install,
+    inventory_at_start,
+    next_change,
+    next_inventory,
+    next_upload,
+    now,
+    uploads,
+)
+from wire import log_lines
+
+DBUS_LIMIT = 25
+
+
+def test_inventory_is_compact_json_with_sorted_keys(terminal: Terminal) -> None:
+    install(terminal, EDITOR, PLAYER)
+
+    terminal.start_agent()
+
+    arch = json.loads(uploads(terminal)[0][1])["payload"]["list"][0]["arch"]
+    record = (
+        '{"arch":"%s","installed_type":2,"name":"%s","package_name":"%s","software_id":-1,"version":"%s"}'
+    )
+    records = record % (arch, "Editor", "editor", "1") + "," + record % (arch, "播放器", "player", "2")
+    whole = '{"payload":{"list":[%s],"machine_id":"box-file-machine-0001"},"type":1103}' % records
+    assert uploads(terminal) == [(INVENTORY, whole)]
+
+
+@pytest.mark.parametrize(("action", "code"), [("created", 1), ("update", 2)])
+def test_change_is_compact_json_with_sorted_keys(terminal: Terminal, action: str, code: int) -> None:
+    install(terminal, EDITOR, PLAYER)
+    terminal.start_agent()
+    mark = terminal.events.mark()
+
+    terminal.launcher.announce(action, PLAYER)
+
+    assert next_upload(terminal, CHANGE, mark) == (
+        '{"payload":{"mac":"F4:0B:93:00:00:07","machine_id":"box-machine-0001","operated_at":"%s",'
+        '"pc_ip":"192.168.1.7","pc_name":"box-terminal","software_name":"播放器","software_version":"2",'
+        '"type":%d},"type":2002}'
+    ) % (now(), code)
+
+
+@pytest.mark.parametrize("action", ["created", "update"])
+def test_change_is_followed_by_the_inventory(terminal: Terminal, action: str) -> None:
+    install(terminal, EDITOR)
+    terminal.start_agent()
+
+    terminal.packages.install("editor", "1.1")
+    mark = announce(terminal, action, EDITOR)
+
+    assert [url for url, _ in uploads(terminal, mark)] == [CHANGE, INVENTORY]
+    assert next_change(terminal, mark)["software_version"] == "1.1"
+    assert next_inventory(terminal, mark)[0]["version"] == "1.1"
+
+
+@pytest.mark.parametrize("action", ["deleted", "Created", "UPDATE", "updated", " created", "", "创建"])
+def test_any_other_action_reports_the_inventory_alone(terminal: Terminal, action: str) -> None:
+    install(terminal, EDITOR)
+    terminal.start_agent()
+
+    mark = announce(terminal, action, EDITOR)
+
+    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY]
+
+
+def test_change_without_items_reports_the_change_alone(terminal: Terminal) -> None:
+    terminal.packages.install("editor", "1")
+    terminal.start_agent()
+
+    announce(terminal, "created", EDITOR)
+
+    assert [url for url, _ in uploads(terminal)] == [CHANGE]
+
+
+def test_nothing_is_reported_of_an_empty_inventory(terminal: Terminal) -> None:
+    terminal.start_agent()
+
+    announce(terminal, "deleted", EDITOR)
+
+    assert uploads(terminal) == []
+
+
+def test_records_come_in_the_launchers_order(terminal: Terminal) -> None:
+    items = [LauncherItem(EDITOR.path, name) for name in ("z", "a", "M", "a")]
+    terminal.packages.install("editor", "1")
+    terminal.launcher.items = items
+
+    assert [record["name"] for record in inventory_at_start(terminal)] == ["z", "a", "M", "a"]
+
+
+@pytest.mark.parametrize(
+    "name", ["", 'say "hi" \\ / \t', "\x7f\u2028\U0001f600", "n" * 100_000], ids=range(4)
+)
+def test_any_display_name_is_reported_as_it_is(terminal: Terminal, name: str) -> None:
+    item = LauncherItem(EDITOR.path, name)
+    install(terminal, item)
+    terminal.start_agent()
+
+    terminal.launcher.announce("created", item)
+
+    assert next_change(terminal)["software_name"] == name
+    assert next_inventory(terminal)[0]["name"] == name
+
+
+def test_change_of_an_unknown_file_has_no_known_version(terminal: Terminal) -> None:
+    terminal.start_agent()
+
+    terminal.launcher.announce("created", EDITOR)
+
+    assert next_change(terminal)["software_version"] == "failed"
+
+
+def test_change_tells_the_time_and_the_alias_of_that_moment(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.files.write_userinfo(terminal_name="another name")
+    terminal.advance(61)
+
+    terminal.launcher.announce("created", EDITOR)
+
+    change = next_change(terminal)
+    assert (change["operated_at"], change["pc_name"]) == (now(), "another name")
+
+
+def test_change_asks_the_daemon_for_the_machine_and_the_inventory_keeps_the_one_of_the_start(
+    terminal: Terminal,
+) -> None:
+    install(terminal, EDITOR)
+    terminal.start_agent()
+    terminal.files.write_machine_id("another-in-the-file")
+    terminal.daemon.answers["GetMachineID"] = Reply("s", ("another-at-the-daemon",))
+    mark = terminal.events.mark()
+
+    terminal.launcher.announce("created", EDITOR)
+
+    assert next_change(terminal, mark)["machine_id"] == "another-at-the-daemon"
+    inventory = json.loads(next_upload(terminal, INVENTORY, mark))
+    assert inventory["payload"]["machine_id"] == "box-file-machine-0001"
+
+
+def test_inventory_alone_asks_the_daemon_nothing(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+    terminal.start_agent()
+
+    announce(terminal, "deleted", EDITOR)
+
+    assert terminal.events.all(member="GetMachineID") == []
+
+
+@pytest.mark.parametrize(
+    ("signature", "value"), [("i", (7,)), ("b", (True,)), ("as", (["x"],)), ("v", ("x",)), ("", ())], ids=str
+)
+def test_machine_of_a_wrong_type_is_reported_as_empty(
+    terminal: Terminal, signature: str, value: tuple[object, ...]
+) -> None:
+    terminal.start_agent()
+    terminal.daemon.answers["GetMachineID"] = Reply(signature, value)
+
+    terminal.launcher.announce("created", EDITOR)
+
+    assert next_change(terminal)["machine_id"] == ""
+
+
+def test_machine_that_the_daemon_refuses_to_tell_is_reported_as_empty(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.daemon.faults["GetMachineID"] = Fault.fail("com.norix.Error")
+
+    terminal.launcher.announce("created", EDITOR)
+
+    assert next_change(terminal)["machine_id"] == ""
+
+
+def test_daemon_that_does_not_tell_the_machine_is_waited_for_until_the_limit(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.daemon.faults["GetMachineID"] = Fault.hang()
+    mark = terminal.events.mark()
+
+    terminal.launcher.announce("created", EDITOR)
+    terminal.events.wait_for(member="GetMachineID", after=mark)
+    terminal.jump(DBUS_LIMIT)
+
+    assert next_change(terminal, mark)["machine_id"] == ""
+
+
+def test_slow_daemon_is_waited_for(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.daemon.faults["GetMachineID"] = Fault.hold()
+    mark = terminal.events.mark()
+
+    terminal.launcher.announce("created", EDITOR)
+    terminal.events.wait_for(member="GetMachineID", after=mark)
+    terminal.jump(DBUS_LIMIT - 5)
+    terminal.daemon.release()
+
+    assert next_change(terminal, mark)["machine_id"] == "box-machine-0001"
+
+
+def test_without_a_daemon_the_report_is_made_with_an_empty_machine(terminal: Terminal) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.leave()
+
+    terminal.launcher.announce("created", EDITOR)
+    line = terminal.events.wait_for(
+        lambda event: event.args[0].startswith("uploadSoftware ---------"), kind="log", after=mark
+    )
+
+    assert '\\"machine_id\\":\\"\\"' in line.args[0]
+
+
+def test_replies_to_the_uploads_are_not_waited_for(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+    terminal.daemon.faults["onUploadFinished"] = Fault.hang()
+    terminal.start_agent()
+
+    mark = announce(terminal, "created", EDITOR)
+
+    assert [url for url, _ in uploads(terminal, mark)] == [CHANGE, INVENTORY]
+
+
+def test_change_is_logged(terminal: Terminal) -> None:
+    item = LauncherItem("/usr/share/applications/editor.desktop", "Editor", "one", "two", 3, -(2**63))
+    install(terminal, item)
+    terminal.start_agent()
+
+    mark = announce(terminal, "created", item)
+
+    escaped = next_upload(terminal, CHANGE, mark).replace('"', '\\"')
+    assert log_lines(terminal, mark)[:3] == [
+        'onItemChanged ---------- "created" "/usr/share/applications/editor.desktop" "Editor" "one" "two" 3 '
+        "-9223372036854775808",
+        '"created" ("Editor", "1")',
+        f'uploadSoftware --------- "{escaped}"',
+    ]
+
+
+def test_levels_of_the_logged_lines(terminal: Terminal) -> None:
+    terminal.start_agent()
+
+    mark = announce(terminal, "created", EDITOR)
+
+    levels = [event.member for event in terminal.events.all(kind="log", after=mark)]
+    assert levels[:5] == ["info", "warning", "warning", "debug", "info"]

@@ -1,0 +1,105 @@
+"""What the prompt's commands for applications do to the dock, and how they are refused."""
+
+from __future__ import annotations
+
+import pytest
+
+from paper import Paper
+from sandbox.prompt import commands
+from sandbox.prompt.desk import Refused
+from sandbox.prompt.registry import run_line
+from sandbox.terminal import Terminal
+
+assert commands, "importing the module makes its commands known"
+
+
+@pytest.fixture
+def desk(terminal: Terminal) -> Paper:
+    """A desk at a terminal whose agent is not started."""
+    return Paper(terminal)
+
+
+def on_dock(desk: Paper) -> dict[str, tuple[int, bool]]:
+    """The number of windows of each application, and whether it is kept on the dock."""
+    dock = desk.terminal.dock
+    return {app: (dock.windows(app), dock.is_docked(app)) for app in dock.apps}
+
+
+@pytest.mark.parametrize(
+    ("lines", "expected"),
+    [
+        (["open 编辑器"], {"编辑器": (1, False)}),
+        (["open a", "open a"], {"a": (2, False)}),
+        (["open a", "close a"], {}),
+        (["dock a"], {"a": (0, True)}),
+        (["dock a", "open a"], {"a": (1, True)}),
+        (["dock a", "open a", "close a"], {"a": (0, True)}),
+        (["open a", "dock a"], {"a": (1, True)}),
+        (["open a", "windows a 3"], {"a": (3, False)}),
+        (["open a", "windows a 0"], {}),
+        (["dock a", "undock a"], {}),
+        (["dock a", "open a", "undock a"], {"a": (1, False)}),
+        (["open 'text editor'", "open mail"], {"text editor": (1, False), "mail": (1, False)}),
+    ],
+    ids=str,
+)
+def test_the_dock_is_as_the_user_left_it(
+    desk: Paper, lines: list[str], expected: dict[str, tuple[int, bool]]
+) -> None:
+    for line in lines:
+        run_line(desk, line)
+
+    assert on_dock(desk) == expected
+
+
+def test_the_applications_are_listed(desk: Paper) -> None:
+    for line in ("dock mail", "open editor", "windows editor 4", "apps"):
+        run_line(desk, line)
+
+    mail, editor = [line for line in desk.lines_with("│") if "mail" in line or "editor" in line]
+    assert ("0" in mail, "yes" in mail, "4" in editor, "no" in editor) == (True, True, True, True)
+
+
+def test_what_the_dock_tells_has_a_meaning(desk: Paper) -> None:
+    for line in ("open editor", "windows editor 2", "dock editor", "undock editor", "close editor"):
+        run_line(desk, line)
+
+    for meaning in (
+        "an application comes to the dock",
+        "2 windows",
+        "kept on the dock from now on",
+        "no longer kept on the dock",
+        "an application is gone from the dock",
+    ):
+        assert desk.lines_with(meaning), meaning
+
+
+def test_an_entry_whose_values_are_not_told_shows_what_is_another(desk: Paper) -> None:
+    desk.terminal.dock.announces = ("invalidated",)
+    run_line(desk, "open editor")
+
+    run_line(desk, "windows editor 2")
+
+    assert desk.lines_with("WindowInfos is another")
+
+
+@pytest.mark.parametrize(
+    ("line", "reason"),
+    [
+        ("close mail", "there is no application 'mail' on the dock; see: apps"),
+        ("windows mail 1", "there is no application 'mail' on the dock"),
+        ("undock mail", "there is no application 'mail' on the dock"),
+        ("windows editor many", "'many' is not a number"),
+        ("windows editor -1", "-1 is no number of windows"),
+        ("open", "usage: open APPLICATION"),
+    ],
+)
+def test_what_cannot_be_done_is_refused_with_a_reason(desk: Paper, line: str, reason: str) -> None:
+    run_line(desk, "open editor")
+    mark = desk.terminal.events.mark()
+
+    with pytest.raises(Refused) as refused:
+        run_line(desk, line)
+
+    assert reason in str(refused.value)
+    assert not desk.terminal.events.all(after=mark)

@@ -1,0 +1,99 @@
+"""What the prompt's commands for software do to the terminal, and how they are refused."""
+
+from __future__ import annotations
+
+import subprocess
+
+import pytest
+
+from paper import Paper
+from sandbox.packages import desktop_file
+from sandbox.prompt import commands
+from sandbox.prompt.desk import Refused
+from sandbox.prompt.registry import run_line
+from sandbox.terminal import Terminal
+
+assert commands, "importing the module makes its commands known"
+
+
+@pytest.fixture
+def desk(terminal: Terminal) -> Paper:
+    """A desk at a terminal with a platform, which the daemon uploads to; the agent is not started."""
+    terminal.daemon.uploads_to(terminal.platform)
+    return Paper(terminal)
+
+
+def installed() -> dict[str, str]:
+    """Versions of the packages as the package tools know them."""
+    shown = subprocess.run(["dpkg-query", "-W"], capture_output=True, text=True).stdout
+    return dict(line.split("\t", 1) for line in shown.splitlines())
+
+
+@pytest.mark.parametrize(
+    ("lines", "versions", "actions"),
+    [
+        (["install editor 2.1"], {"editor": "2.1"}, ["created"]),
+        (["install editor 2.1", "update editor 2.2"], {"editor": "2.2"}, ["created", "update"]),
+        (
+            ["install editor 2.1", "install mail 1", "uninstall editor"],
+            {"mail": "1"},
+            ["created"] * 2 + ["deleted"],
+        ),
+    ],
+    ids=str,
+)
+def test_packages_and_launcher_are_as_told(
+    desk: Paper, lines: list[str], versions: dict[str, str], actions: list[str]
+) -> None:
+    for line in lines:
+        run_line(desk, line)
+
+    assert installed() == versions
+    assert [item.path for item in desk.terminal.launcher.items] == [desktop_file(name) for name in versions]
+    changes = desk.terminal.events.all(source="launcher", member="ItemChanged")
+    assert [change.args[0] for change in changes] == actions
+
+
+def test_an_installation_reaches_the_platform(desk: Paper) -> None:
+    desk.terminal.start_agent()
+    mark = desk.terminal.events.mark()
+
+    run_line(desk, "install editor 2.1")
+    desk.terminal.events.wait_for(kind="reply", target="daemon", after=mark, count=2)
+    run_line(desk, "software")
+
+    (change,) = desk.terminal.platform.software_changes()
+    assert (change["software_name"], change["software_version"]) == ("editor", "2.1")
+    (row,) = [line for line in desk.lines_with("editor") if line.startswith("│")]
+    assert "2.1" in row
+
+
+def test_what_the_agent_reports_has_a_meaning(desk: Paper) -> None:
+    desk.terminal.start_agent()
+
+    run_line(desk, "install editor 2.1")
+    desk.terminal.events.wait_for(kind="reply", target="daemon", count=2)
+
+    for meaning in ("an application was installed", "what was installed or updated", "all software of the"):
+        assert desk.lines_with(meaning), meaning
+
+
+@pytest.mark.parametrize(
+    ("line", "reason"),
+    [
+        ("install editor 3", "editor is installed already; a new version comes with: update editor VERSION"),
+        ("update mail 1", "mail is not installed; do it with: install mail VERSION"),
+        ("uninstall mail", "mail is not installed"),
+        ("install Editor 1", "no package can be called 'Editor'"),
+        ("install mail", "usage: install PACKAGE VERSION"),
+    ],
+)
+def test_what_cannot_be_done_is_refused_with_a_reason(desk: Paper, line: str, reason: str) -> None:
+    run_line(desk, "install editor 2.1")
+    mark = desk.terminal.events.mark()
+
+    with pytest.raises(Refused) as refused:
+        run_line(desk, line)
+
+    assert reason in str(refused.value)
+    assert installed() == {"editor": "2.1"} and not desk.terminal.events.all(after=mark)
