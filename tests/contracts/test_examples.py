@@ -1,0 +1,80 @@
+"""The JSON contracts are sound, and their examples tell what keeps to them and what does not."""
+
+from __future__ import annotations
+
+import json
+import subprocess
+from pathlib import Path
+
+import pytest
+from jsonschema import Draft202012Validator
+
+from sandbox import contracts, layout
+
+EXAMPLES = contracts.FOLDER / "examples"
+
+
+def examples(kind: str) -> list[Path]:
+    """All examples that are "valid", or all that are "invalid"."""
+    return sorted(EXAMPLES.glob(f"*/{kind}-*.json"))
+
+
+def label(path: Path) -> str:
+    """How a test of an example is called."""
+    return f"{path.parent.name}/{path.stem}"
+
+
+def broken_rule(example: Path) -> str | None:
+    """In what an example breaks the contract whose folder it lies in."""
+    return contracts.violation_of_text(example.parent.name, example.read_text())
+
+
+@pytest.mark.parametrize("name", contracts.names())
+def test_schema_is_a_schema_that_explains_itself(name: str) -> None:
+    schema = json.loads(contracts.schema_file(name).read_text())
+
+    Draft202012Validator.check_schema(schema)
+    assert schema["$schema"] == Draft202012Validator.META_SCHEMA["$id"]
+    assert schema["$id"].endswith(f"/contracts/json/{name}.schema.json")
+    assert schema["title"] and schema["description"]
+    undescribed = [key for key, value in schema.get("properties", {}).items() if "description" not in value]
+    assert undescribed == []
+
+
+@pytest.mark.parametrize("name", contracts.names())
+def test_schema_has_examples_of_both_kinds(name: str) -> None:
+    of_schema = {path.name.partition("-")[0] for path in (EXAMPLES / name).iterdir()}
+    assert of_schema == {"valid", "invalid"}
+
+
+def test_examples_belong_to_a_schema() -> None:
+    assert {path.name for path in EXAMPLES.iterdir()} <= set(contracts.names())
+
+
+@pytest.mark.parametrize("example", examples("valid"), ids=label)
+def test_valid_example_keeps_to_the_contract(example: Path) -> None:
+    assert broken_rule(example) is None
+
+
+@pytest.mark.parametrize("example", examples("invalid"), ids=label)
+def test_invalid_example_breaks_the_contract(example: Path) -> None:
+    assert broken_rule(example) is not None
+
+
+@pytest.mark.parametrize(
+    ("names", "status", "said"),
+    [
+        (["valid-1201", "valid-forwarded"], 0, ["keeps to the contract", "keeps to the contract"]),
+        (["valid-1201", "invalid-no-type"], 1, ["keeps to the contract", "'type' is a required property"]),
+    ],
+)
+def test_people_can_check_their_own_messages(names: list[str], status: int, said: list[str]) -> None:
+    files = [str(EXAMPLES / "policy-message" / f"{name}.json") for name in names]
+    ended = subprocess.run(
+        ["/usr/bin/python3", "-m", "sandbox.contracts", "policy-message", *files],
+        cwd=layout.REPOSITORY,
+        capture_output=True,
+        text=True,
+    )
+    assert ended.returncode == status
+    assert [line.rpartition(": ")[2] for line in ended.stdout.splitlines()] == said
