@@ -6,8 +6,8 @@
 
 /// Proxy of the desktop's dock. It may be built before the dock is there, and follows whichever dock owns the
 /// name. The desktop's library gives its proxies names with underscores.
-class __Dock
-    : public QDBusAbstractInterface // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+// NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+class __Dock : public QDBusAbstractInterface
 {
     Q_OBJECT
 

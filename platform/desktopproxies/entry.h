@@ -17,7 +17,8 @@ class EntrySignals;
 /// Docks announce changes in different ways: by the standard signal of properties, with the value or without
 /// it, or by signals of the entry's own. All are listened to from the start, and each change is told once. A
 /// value that a dock only declares invalid is read without waiting.
-class __Entry : public QObject // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+// NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+class __Entry : public QObject
 {
     Q_OBJECT
 

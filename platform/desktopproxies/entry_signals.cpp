@@ -25,9 +25,8 @@ EntrySignals::EntrySignals(const QDBusConnection& bus, const QString& service)
     const QString anyMember;
     const auto interface = QString::fromLatin1(__Entry::staticInterfaceName());
     QDBusConnection connection = bus;
-    connection.connect(service, anyPath, QLatin1String(kPropertiesInterface),
-                       QStringLiteral("PropertiesChanged"), {interface}, QString(), this,
-                       SLOT(onPropertiesChanged(QDBusMessage)));
+    connection.connect(service, anyPath, kPropertiesInterface, QStringLiteral("PropertiesChanged"),
+                       {interface}, QString(), this, SLOT(onPropertiesChanged(QDBusMessage)));
     connection.connect(service, anyPath, interface, anyMember, this, SLOT(onOwnSignal(QDBusMessage)));
 }
 

@@ -7,8 +7,8 @@
 
 /// Proxy of the desktop's launcher. The launcher's item types must be registered before its signal is
 /// connected or its method called. The desktop's library gives its proxies names with underscores.
-class __Launcherd // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
-    : public QDBusAbstractInterface
+// NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
+class __Launcherd : public QDBusAbstractInterface
 {
     Q_OBJECT
 

@@ -5,8 +5,7 @@
 
 QDBusMessage RemoteInterface::readCall(const QString& property) const
 {
-    auto call = QDBusMessage::createMethodCall(service, path, QLatin1String(kPropertiesInterface),
-                                               QStringLiteral("Get"));
+    auto call = QDBusMessage::createMethodCall(service, path, kPropertiesInterface, QStringLiteral("Get"));
     call << interface << property;
     return call;
 }

@@ -6,7 +6,7 @@
 #include <QVariant>
 
 /// The D-Bus interface of every object's properties.
-constexpr char kPropertiesInterface[] = "org.freedesktop.DBus.Properties";
+inline const QString kPropertiesInterface = QStringLiteral("org.freedesktop.DBus.Properties");
 
 /// One interface of one object of a service.
 struct RemoteInterface

@@ -64,7 +64,8 @@ void LauncherGuard::watchLauncher(__Launcherd* launcher)
     connect(m_launcher, &__Launcherd::ItemChanged, this, &LauncherGuard::onItemChanged);
 }
 
-void LauncherGuard::onItemChanged(QString action, const LauncherItemInfo& info, qlonglong /*categoryId*/)
+void LauncherGuard::onItemChanged(const QString& action, const LauncherItemInfo& info,
+                                  qlonglong /*categoryId*/)
 {
     qInfo() << "onItemChanged"
             << "----------" << action << info.path << info.name << info.firstDetail << info.secondDetail

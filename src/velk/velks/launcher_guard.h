@@ -57,7 +57,7 @@ Q_SIGNALS:
     void softwareInited();
 
 private Q_SLOTS:
-    void onItemChanged(QString action, const LauncherItemInfo& info, qlonglong categoryId);
+    void onItemChanged(const QString& action, const LauncherItemInfo& info, qlonglong categoryId);
 
 private:
     void watchLauncher(__Launcherd* launcher);
