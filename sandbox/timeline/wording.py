@@ -54,11 +54,13 @@ def _notify(event: Event) -> str:
 
 
 def _request(event: Event) -> str:
-    """Without the query, which is long; the agent's log has it."""
+    """Without the query, which is long and stands in the agent's log, and without what the daemon was just
+    handed to upload."""
     line, body = event.args
     method, target = line.split()[:2]
     path, query, _ = target.partition("?")
-    return " ".join((method, path + ("?…" if query else ""), *body.split()))
+    shown = body.split() if event.source == "velks" else ()
+    return " ".join((method, path + ("?…" if query else ""), *shown))
 
 
 def _reply(event: Event) -> str:
@@ -91,7 +93,7 @@ _WHAT: dict[str, Callable[[Event], str]] = {
 _WHAT_OF_KIND: dict[str, Callable[[Event], str]] = {
     "command": lambda event: " ".join((event.member, *event.args)),
     "file": lambda event: f"{event.member} = {event.args[0]}",
-    "inbox": lambda event: f"“{event.member}” {event.args[0]}",
+    "inbox": lambda event: f"“{event.member}” {', '.join(event.args)}",
     "life": lambda event: event.member,
     "log": lambda event: f"{event.member}: {event.args[0]}",
     "output": lambda event: str(event.args[0]),

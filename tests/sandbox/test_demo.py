@@ -102,7 +102,7 @@ def test_a_missing_agent_is_one_line_that_says_how_to_build_it(tmp_path: Path) -
 def test_the_picture_needs_nothing_from_elsewhere_and_tells_nothing_of_the_machine(tmp_path: Path) -> None:
     picture = tmp_path / "demo.svg"
 
-    ended = run_program("demo", "--only", "7", "--svg", str(picture))
+    ended = run_program("demo", "--only", "8", "--svg", str(picture))
 
     drawn = picture.read_text()
     assert ended.returncode == 0, ended.stdout

@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 from sandbox.demo.scene import Scene
-from sandbox.demo.scenes import applications, domain_exit, messages, policies, session
+from sandbox.demo.scenes import applications, domain_exit, messages, policies, session, software
 
 # The first one starts the agent; any of the others can be left out.
 SCENES: tuple[Scene, ...] = (
@@ -12,6 +12,7 @@ SCENES: tuple[Scene, ...] = (
     messages.WAITING,
     session.STATES,
     applications.APPLICATIONS,
+    software.SOFTWARE,
     policies.FORWARDED,
     policies.NOTICES,
     policies.PASSWORD,
