@@ -74,6 +74,7 @@ QString __Entry::id() const
 QString __Entry::name() const
 {
     m_knownName = textOf(m_object.read(kName));
+    m_signals->catchUp();
     return *m_knownName;
 }
 
@@ -86,13 +87,14 @@ WindowInfoMap __Entry::windowInfos() const
 {
     const auto infos = windowInfosOf(m_object.read(kWindowInfos)).value_or(WindowInfoMap());
     m_knownWindows = infos.keys();
+    m_signals->catchUp();
     return infos;
 }
 
 void __Entry::onPropertiesChanged(const QVariantMap& changed, const QStringList& invalidated)
 {
     for (auto property = changed.cbegin(); property != changed.cend(); ++property) {
-        tellOf(property.key(), property.value());
+        announce(property.key(), property.value());
     }
     for (const QString& property : {kName, kWindowInfos}) {
         if (invalidated.contains(property)) {
@@ -105,7 +107,16 @@ void __Entry::onOwnSignal(const QDBusMessage& signal)
 {
     const QString suffix = QStringLiteral("Changed");
     if (signal.member().endsWith(suffix)) {
-        tellOf(signal.member().chopped(suffix.size()), signal.arguments().value(0));
+        announce(signal.member().chopped(suffix.size()), signal.arguments().value(0));
+    }
+}
+
+void __Entry::announce(const QString& property, const QVariant& value)
+{
+    if (!m_signals->isCatchingUp()) {
+        tellOf(property, value);
+    } else if (property == kName || property == kWindowInfos) {
+        readAgain(property);
     }
 }
 

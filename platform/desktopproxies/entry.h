@@ -16,7 +16,8 @@ class EntrySignals;
 ///
 /// Docks announce changes in different ways: by the standard signal of properties, with the value or without
 /// it, or by signals of the entry's own. All are listened to from the start, and each change is told once. A
-/// value that a dock only declares invalid is read without waiting.
+/// value that a dock only declares invalid is read without waiting; so is one that it announces while older
+/// announcements may still be under way (see EntrySignals::isCatchingUp()).
 // NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 class __Entry : public QObject
 {
@@ -51,6 +52,7 @@ private:
     void onPropertiesChanged(const QVariantMap& changed, const QStringList& invalidated);
     void onOwnSignal(const QDBusMessage& signal);
 
+    void announce(const QString& property, const QVariant& value);
     void readAgain(const QString& property);
     void tellOf(const QString& property, const QVariant& value);
     void tellOfWindowInfos(const WindowInfoMap& infos);

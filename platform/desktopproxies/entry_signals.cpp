@@ -2,6 +2,7 @@
 
 #include <QDBusArgument>
 #include <QDBusMessage>
+#include <QDBusPendingCallWatcher>
 #include <QHash>
 
 #include "entry.h"
@@ -20,14 +21,14 @@ std::shared_ptr<EntrySignals> EntrySignals::of(const QDBusConnection& bus, const
 }
 
 EntrySignals::EntrySignals(const QDBusConnection& bus, const QString& service)
+    : m_bus(bus)
 {
     const QString anyPath;
     const QString anyMember;
     const auto interface = QString::fromLatin1(__Entry::staticInterfaceName());
-    QDBusConnection connection = bus;
-    connection.connect(service, anyPath, kPropertiesInterface, QStringLiteral("PropertiesChanged"),
-                       {interface}, QString(), this, SLOT(onPropertiesChanged(QDBusMessage)));
-    connection.connect(service, anyPath, interface, anyMember, this, SLOT(onOwnSignal(QDBusMessage)));
+    m_bus.connect(service, anyPath, kPropertiesInterface, QStringLiteral("PropertiesChanged"), {interface},
+                  QString(), this, SLOT(onPropertiesChanged(QDBusMessage)));
+    m_bus.connect(service, anyPath, interface, anyMember, this, SLOT(onOwnSignal(QDBusMessage)));
 }
 
 void EntrySignals::add(const QString& path, __Entry* entry)
@@ -38,6 +39,39 @@ void EntrySignals::add(const QString& path, __Entry* entry)
 void EntrySignals::remove(const QString& path, __Entry* entry)
 {
     m_entries.remove(path, entry);
+}
+
+void EntrySignals::catchUp()
+{
+    if (m_isCatchingUp) {
+        m_wasReadMeanwhile = true;
+        return;
+    }
+    m_isCatchingUp = true;
+    QMetaObject::invokeMethod(this, &EntrySignals::askBus, Qt::QueuedConnection);
+}
+
+bool EntrySignals::isCatchingUp() const
+{
+    return m_isCatchingUp;
+}
+
+/// Whatever has come by now is passed on before the bus's answer. The question is asked from the event loop:
+/// until it runs for the first time, Qt holds signals back, but no answers.
+void EntrySignals::askBus()
+{
+    m_wasReadMeanwhile = false;
+    const auto question = QDBusMessage::createMethodCall(
+        QStringLiteral("org.freedesktop.DBus"), QStringLiteral("/org/freedesktop/DBus"),
+        QStringLiteral("org.freedesktop.DBus.Peer"), QStringLiteral("Ping"));
+    auto* watcher = new QDBusPendingCallWatcher(m_bus.asyncCall(question), this);
+    connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, watcher] {
+        watcher->deleteLater();
+        m_isCatchingUp = m_wasReadMeanwhile;
+        if (m_isCatchingUp) {
+            askBus();
+        }
+    });
 }
 
 void EntrySignals::onPropertiesChanged(const QDBusMessage& signal)

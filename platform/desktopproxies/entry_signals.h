@@ -23,6 +23,13 @@ public:
     void add(const QString& path, __Entry* entry);
     void remove(const QString& path, __Entry* entry);
 
+    /// To be called whenever a value was read: what the dock announced before is then older than what was
+    /// read, but is passed on only when the event loop runs.
+    void catchUp();
+
+    /// Whether some of what is passed on may be older than what was read last.
+    bool isCatchingUp() const;
+
 private Q_SLOTS:
     void onPropertiesChanged(const QDBusMessage& signal);
     void onOwnSignal(const QDBusMessage& signal);
@@ -30,7 +37,11 @@ private Q_SLOTS:
 private:
     EntrySignals(const QDBusConnection& bus, const QString& service);
 
+    void askBus();
     void forEachEntry(const QString& path, const std::function<void(__Entry&)>& call);
 
+    QDBusConnection m_bus;
     QMultiHash<QString, __Entry*> m_entries; ///< by path
+    bool m_isCatchingUp = false;
+    bool m_wasReadMeanwhile = false;
 };

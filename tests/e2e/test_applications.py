@@ -6,6 +6,7 @@ import pytest
 
 from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
 from sandbox.peers import dock
+from sandbox.peers.fault import Fault
 from sandbox.terminal import Terminal
 
 
@@ -93,13 +94,18 @@ def test_an_application_that_lost_its_windows_first_is_closed_once(session: Term
     assert events == [(CLOSED, "Mail")]
 
 
-def test_an_entry_that_has_gone_is_followed_no_more(session: Terminal) -> None:
-    path = session.dock.open_app("mail", "Mail")
-    settle(session)
-    session.dock.close_app("mail")
-    settle(session)
+@pytest.mark.parametrize("at_start", [True, False], ids=["known at start", "came later"])
+def test_an_entry_that_has_gone_is_followed_no_more(terminal: Terminal, at_start: bool) -> None:
+    if not at_start:
+        start(terminal)
+    path = terminal.dock.open_app("mail", "Mail")
+    if at_start:
+        start(terminal)
+    settle(terminal)
+    terminal.dock.close_app("mail")
+    settle(terminal)
 
-    assert follows(session, lambda: session.dock.set("WindowInfos", {1: "a", 2: "b"}, path=path)) == []
+    assert follows(terminal, lambda: terminal.dock.set("WindowInfos", {1: "a", 2: "b"}, path=path)) == []
 
 
 def test_an_application_may_come_and_go_many_times(session: Terminal) -> None:
@@ -113,6 +119,16 @@ def test_an_application_may_come_and_go_many_times(session: Terminal) -> None:
 
     assert events == [(OPENED, "Mail"), (CLOSED, "Mail")] * 3
     assert warnings(session) == []
+
+
+def test_an_entry_without_windows_that_goes_and_comes_again_is_a_new_one(session: Terminal) -> None:
+    for _ in range(2):
+        session.dock.open_app("mail", "Mail", docked=True, windows=0)
+        settle(session)
+        session.dock.close_app("mail")
+        settle(session)
+
+    assert (told(session), warnings(session)) == ([], [])
 
 
 def test_the_removal_of_an_unknown_entry_is_warned_of_and_nothing_else(session: Terminal) -> None:
@@ -208,3 +224,26 @@ def test_a_local_users_applications_are_told_too(terminal: Terminal) -> None:
 
     assert told(terminal) == [(OPENED, "A")]
     assert follows(terminal, lambda: terminal.dock.close_app("a")) == [(CLOSED, "A")]
+
+
+@pytest.mark.parametrize("known", [True, False], ids=["with another entry", "alone"])
+def test_what_an_application_did_before_it_was_read_is_no_change(session: Terminal, known: bool) -> None:
+    if known:
+        session.dock.open_app("editor", "Editor", docked=True, windows=0)
+        settle(session)
+    mark = session.events.mark()
+    session.notifications.fault = Fault.hold()
+    session.daemon.push_policy({"type": 1300})
+    session.events.wait_for(target="notifications", member="Notify", after=mark)
+    session.dock.open_app("mail", "Mail", docked=True, windows=0)
+    for number in (1, 2, 3):
+        session.dock.set_windows("mail", number)
+    session.dock.rename("mail", "Post")
+
+    session.notifications.release()
+    settle(session)
+
+    assert told(session, mark) == []
+    session.dock.set_windows("mail", 1)
+    settle(session)
+    assert told(session, mark) == [(CLOSED, "Post")]

@@ -27,7 +27,7 @@ public:
 Q_SIGNALS:
     void appStateChange(int type, const QString& appName);
 
-private Q_SLOTS:
+public Q_SLOTS:
     void onEntryAdded(const QDBusObjectPath& path);
     void onEntryRemoved(const QString& id);
 

@@ -42,11 +42,11 @@ bool EntryInfo::isDocked() const
 
 void EntryInfo::onWinInfoChanged(const QMap<uint, WindowInfo>& infos)
 {
-    const int before = m_winSize;
-    m_winSize = infos.size();
-    if (m_winSize != before) {
-        Q_EMIT windowSizeChanged(before < m_winSize ? AppOpened : AppClosed, m_appName);
+    const int size = infos.size();
+    if (size != m_winSize) {
+        Q_EMIT windowSizeChanged(size > m_winSize ? AppOpened : AppClosed, m_appName);
     }
+    m_winSize = size;
 }
 
 void EntryInfo::onNameChanged(const QString& name)

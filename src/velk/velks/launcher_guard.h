@@ -56,7 +56,7 @@ Q_SIGNALS:
     /// Once, when a launcher that was absent at the start has arrived.
     void softwareInited();
 
-private Q_SLOTS:
+public Q_SLOTS:
     void onItemChanged(const QString& action, const LauncherItemInfo& info, qlonglong categoryId);
 
 private:

@@ -40,6 +40,7 @@ private:
 
 RecordedService::RecordedService(QDBusConnection::BusType bus, const QString& name, Answer answer)
     : m_connectionName(QUuid::createUuid().toString())
+    , m_name(name)
     , m_object(std::make_unique<Object>(std::move(answer)))
 {
     auto connection = QDBusConnection::connectToBus(bus, m_connectionName);
@@ -54,8 +55,11 @@ RecordedService::RecordedService(QDBusConnection::BusType bus, const QString& na
 
 RecordedService::~RecordedService()
 {
-    // The connection is closed later, in a thread of its own, and must not find the object then.
-    QDBusConnection(m_connectionName).unregisterObject(QStringLiteral("/"), QDBusConnection::UnregisterTree);
+    // The connection is closed later, in a thread of its own: until then it would keep the name, and it must
+    // not find the object.
+    QDBusConnection connection(m_connectionName);
+    connection.unregisterService(m_name);
+    connection.unregisterObject(QStringLiteral("/"), QDBusConnection::UnregisterTree);
     QDBusConnection::disconnectFromBus(m_connectionName);
     m_thread.quit();
     m_thread.wait();

@@ -19,6 +19,7 @@ public:
     /// Owns the name when the constructor returns. An answer of type InvalidMessage sends no reply: the
     /// service hangs.
     RecordedService(QDBusConnection::BusType bus, const QString& name, Answer answer);
+    /// The name is free when the destructor returns.
     ~RecordedService();
     RecordedService(const RecordedService&) = delete;
     RecordedService& operator=(const RecordedService&) = delete;
@@ -36,6 +37,7 @@ private:
     class Object;
 
     QString m_connectionName;
+    QString m_name;
     QThread m_thread;
     std::unique_ptr<Object> m_object;
 };

@@ -1,0 +1,104 @@
+"""In which order the agent reaches its services when it starts, seen while one of them keeps it waiting."""
+
+from __future__ import annotations
+
+from dockwatch import CLOSED, OPENED, settle, told
+from sandbox.peers import dock
+from sandbox.peers.fault import Fault
+from sandbox.terminal import Terminal
+from software import CHANGE, EDITOR, INVENTORY, install, next_inventory, uploads
+from wire import log_lines, next_notification
+
+SHUTDOWN_NOTICE = "该终端1分钟后进行关机"
+
+
+def start_until(terminal: Terminal, target: str, member: str) -> int:
+    """Start the agent, which now waits for a service's answer; the mark before it."""
+    terminal.peers[target].faults[member] = Fault.hold()
+    mark = terminal.events.mark()
+    terminal.start_agent(ready=lambda: terminal.events.wait_for(target=target, member=member, after=mark))
+    return mark
+
+
+def test_dock_is_not_asked_before_the_launcher_has_answered(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+    mark = start_until(terminal, "launcher", "GetAllItemInfos")
+    assert terminal.events.all(target="dock", after=mark) == []
+
+    terminal.launcher.release()
+
+    terminal.events.wait_for(target="dock", member="Get", after=mark)
+
+
+def test_session_is_announced_before_the_dock_has_answered(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+    terminal.dock.open_app("mail", "Mail")
+
+    mark = start_until(terminal, "dock", "Get")
+
+    terminal.events.wait_for(source="velks", target="daemon", member="SendUserStatus", after=mark)
+    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY]
+    terminal.dock.faults.clear()
+    terminal.dock.release()
+    settle(terminal)
+    assert told(terminal, mark) == [(OPENED, "Mail")]
+
+
+def test_what_the_dock_says_while_it_is_read_is_heard(terminal: Terminal) -> None:
+    mark = start_until(terminal, "dock", "Get")
+
+    terminal.dock.emit(dock.INTERFACE, "EntryRemoved", "printer")
+    terminal.dock.faults.clear()
+    terminal.dock.release()
+    settle(terminal)
+
+    assert 'unknow entry removed, id: "printer"' in log_lines(terminal, mark)
+
+
+def test_what_the_dock_said_before_it_was_read_is_no_change(terminal: Terminal) -> None:
+    terminal.dock.open_app("editor", "Editor", docked=True, windows=0)
+    terminal.dock.open_app("mail", "Mail", docked=True, windows=0)
+    terminal.dock.faults["Id"] = Fault.hold()
+    mark = terminal.events.mark()
+    terminal.start_agent(
+        ready=lambda: terminal.events.wait_for(target="dock", member="Get", after=mark, count=2)
+    )
+    for number in (1, 2, 3):
+        terminal.dock.set_windows("mail", number)
+
+    terminal.dock.release()
+    settle(terminal)
+
+    assert told(terminal, mark) == []
+    terminal.dock.set_windows("mail", 0)
+    settle(terminal)
+    assert told(terminal, mark) == [(CLOSED, "Mail")]
+
+
+def test_policy_that_comes_while_the_launcher_is_asked_is_carried_out(terminal: Terminal) -> None:
+    mark = start_until(terminal, "launcher", "GetAllItemInfos")
+
+    terminal.daemon.push_policy({"type": 1300})
+    terminal.launcher.release()
+
+    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
+
+
+def test_change_that_comes_while_the_first_inventory_is_made_is_reported_after_it(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+    mark = start_until(terminal, "launcher", "GetAllItemInfos")
+
+    terminal.launcher.announce("created", EDITOR)
+    terminal.launcher.faults.clear()
+    terminal.launcher.release()
+    next_inventory(terminal, mark, count=2)
+
+    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY, CHANGE, INVENTORY]
+
+
+def test_first_inventory_is_logged_like_a_report_without_an_action(terminal: Terminal) -> None:
+    terminal.start_agent()
+
+    lines = [(line.member, line.args[0]) for line in terminal.events.all(kind="log")]
+    first = lines.index(("debug", '"" ()'))
+    assert lines[first + 1] == ("info", 'GetLauncerItems -------- QDBusError("", "")')
