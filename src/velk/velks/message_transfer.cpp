@@ -79,8 +79,6 @@ void runScript(const QString& path)
 
 MessageTransfer::MessageTransfer(QObject* parent)
     : QObject(parent)
-    , m_actionTimer(new QTimer(this))
-    , m_stateTimer(new QTimer(this))
     , m_machineId(velk::base::FileContent::instace()->getMachineID())
 {
     m_velkgInterface =
@@ -122,9 +120,11 @@ void MessageTransfer::startSoftwareReports()
 
 void MessageTransfer::startTimers()
 {
+    m_actionTimer = new QTimer(this);
     // A coarse timer may fire half a second early; the user was promised a minute.
     m_actionTimer->setTimerType(Qt::PreciseTimer);
     connect(m_actionTimer, &QTimer::timeout, this, &MessageTransfer::onTimeout);
+    m_stateTimer = new QTimer(this);
     m_stateTimer->start(kStatePeriod);
     connect(m_stateTimer, &QTimer::timeout, this, &MessageTransfer::getUserState);
 }
@@ -253,13 +253,13 @@ void MessageTransfer::uploadSoftwareChange(int change, const QStringList& info)
 {
     SoftwareChange report;
     report.change = change;
+    report.ipAddress = terminalAddress();
+    report.hardwareAddress = terminalHardwareAddress();
     // Asked anew for each report, while the inventory bears the identifier of the start. That the two come
     // from different places is intended: the platform compares them as they are.
     QDBusPendingReply<QString> machineId = m_velkgInterface->GetMachineID();
     machineId.waitForFinished();
     report.machineId = machineId.isError() ? QString() : machineId.value();
-    report.ipAddress = terminalAddress();
-    report.hardwareAddress = terminalHardwareAddress();
     report.name = info.value(0);
     report.version = info.value(1);
     report.terminalName = velk::base::FileContent::getTerminalAlias(nullptr);

@@ -79,9 +79,8 @@ private:
     velkgInterface* m_velkgInterface = nullptr;
     prysInterface* m_prysInterface = nullptr;
     LauncherGuard* m_launcherGuard = nullptr;
-    // Slots use these from the first signal on, and the daemon may emit one while the constructor waits.
-    QTimer* m_actionTimer;
-    QTimer* m_stateTimer;
+    QTimer* m_actionTimer = nullptr;
+    QTimer* m_stateTimer = nullptr;
     QString m_machineId; ///< read once; the inventory bears it
     QString m_userName;
     qint32 m_uid = 0;
