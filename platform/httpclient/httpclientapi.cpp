@@ -110,15 +110,16 @@ QByteArray encodedUrl(const QString& url)
     return encoded;
 }
 
-/// One request on a handle. libcurl keeps pointers into it, which the handle forgets when it ends.
+/// One request, on a handle of its own: a used handle reads freed memory when the next response begins with a
+/// folded header line (seen in libcurl 7.88). What is worth keeping lives in `share`.
 class Exchange
 {
 public:
-    explicit Exchange(CURL* curl)
-        : m_curl(curl)
-    { }
-    ~Exchange() { curl_easy_reset(m_curl); }
-    Q_DISABLE_COPY_MOVE(Exchange)
+    explicit Exchange(CURLSH* share)
+    {
+        Q_CHECK_PTR(m_curl);
+        set(CURLOPT_SHARE, share);
+    }
 
     void setTransport()
     {
@@ -176,11 +177,11 @@ public:
         set(CURLOPT_HEADERFUNCTION, receive<&Reception::addHeaderLine>);
         set(CURLOPT_HEADERDATA, &m_reception);
         if (m_result == CURLE_OK) {
-            m_result = curl_easy_perform(m_curl);
+            m_result = curl_easy_perform(m_curl.get());
         }
         long status = 0;
         if (m_result == CURLE_OK) {
-            curl_easy_getinfo(m_curl, CURLINFO_RESPONSE_CODE, &status);
+            curl_easy_getinfo(m_curl.get(), CURLINFO_RESPONSE_CODE, &status);
         }
         return static_cast<int>(status);
     }
@@ -200,7 +201,7 @@ private:
     template <typename Value> void set(CURLoption option, Value value)
     {
         if (m_result == CURLE_OK) {
-            m_result = curl_easy_setopt(m_curl, option, value);
+            m_result = curl_easy_setopt(m_curl.get(), option, value);
         }
     }
 
@@ -209,20 +210,24 @@ private:
         m_headerLines.reset(curl_slist_append(m_headerLines.release(), line));
     }
 
-    CURL* m_curl;
     CURLcode m_result = CURLE_OK;
     std::array<char, CURL_ERROR_SIZE> m_error{};
     std::unique_ptr<curl_slist, decltype(&curl_slist_free_all)> m_headerLines{nullptr, curl_slist_free_all};
     Reception m_reception;
+    // The last member, so the first to go: it points to the others.
+    std::unique_ptr<CURL, decltype(&curl_easy_cleanup)> m_curl{curl_easy_init(), curl_easy_cleanup};
 };
 
 } // namespace
 
 HttpClientApi::HttpClientApi(QObject* parent, bool)
     : QObject(parent)
-    , m_curl(curl_easy_init())
+    , m_share(curl_share_init())
 {
-    Q_CHECK_PTR(m_curl);
+    Q_CHECK_PTR(m_share);
+    for (const auto kept : {CURL_LOCK_DATA_CONNECT, CURL_LOCK_DATA_DNS, CURL_LOCK_DATA_SSL_SESSION}) {
+        curl_share_setopt(m_share.get(), CURLSHOPT_SHARE, kept);
+    }
 }
 
 HttpClientApi::~HttpClientApi() = default;
@@ -249,15 +254,15 @@ QList<QPair<QByteArray, QByteArray>> HttpClientApi::getRawHeader() const
     return m_rawHeaders;
 }
 
-void HttpClientApi::CloseHandle::operator()(void* curl) const
+void HttpClientApi::CloseShare::operator()(void* share) const
 {
-    curl_easy_cleanup(curl);
+    curl_share_cleanup(share);
 }
 
 int HttpClientApi::request(const char* method, QString& reply, const QString& url, const QString& body,
                            bool isJson)
 {
-    Exchange exchange(m_curl.get());
+    Exchange exchange(m_share.get());
     exchange.setTransport();
     exchange.setTls(m_caCert, m_clientCert, m_clientKey);
     exchange.setRequest(method, url);

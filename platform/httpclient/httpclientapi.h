@@ -47,14 +47,14 @@ public:
     [[nodiscard]] QList<QPair<QByteArray, QByteArray>> getRawHeader() const;
 
 private:
-    struct CloseHandle
+    struct CloseShare
     {
-        void operator()(void* curl) const;
+        void operator()(void* share) const;
     };
 
     int request(const char* method, QString& reply, const QString& url, const QString& body, bool isJson);
 
-    std::unique_ptr<void, CloseHandle> m_curl;
+    std::unique_ptr<void, CloseShare> m_share; // connections, TLS sessions, looked-up names
     QByteArray m_caCert;
     QByteArray m_clientCert;
     QByteArray m_clientKey;
