@@ -9,6 +9,7 @@ from typing import Iterator, NamedTuple
 _VALUE = "…"
 _CALL = re.compile(r"\bq(Debug|Info|Warning|Critical|Fatal)\(")
 _LITERAL = re.compile(r'"((?:\\.|[^"\\])*)"')
+_FORM = re.compile(rf"(?:\s*{_LITERAL.pattern})+")
 _FORMAT_VALUE = re.compile(r"%l*[a-z]")
 
 
@@ -39,8 +40,9 @@ def _end_of_statement(source: str, start: int) -> int:
 
 def _text(statement: str) -> str:
     if not statement.startswith(")"):
-        form = "".join(_LITERAL.findall(statement.partition(", ")[0]))
-        return _FORMAT_VALUE.sub(_VALUE, form)
+        form = _FORM.match(statement)
+        assert form, f"the log call's form is no literal: {statement}"
+        return _FORMAT_VALUE.sub(_VALUE, "".join(_LITERAL.findall(form[0])))
     # Parts are told apart by a blank, as the stream does; values that follow one another are one row.
     parts = [_part(piece) for piece in statement.split("<<")[1:]]
     return re.sub(f"{_VALUE}( {_VALUE})+", _VALUE, " ".join(parts))

@@ -166,13 +166,3 @@ def test_signals_of_another_form_do_nothing(terminal: Terminal, stranger: Strang
 
     assert (told(terminal, mark), warnings(terminal, mark)) == ([], [])
     assert follows(terminal, lambda: terminal.dock.close_app("mail")) == [(CLOSED, "Mail")]
-
-
-def test_the_end_of_the_session_bus_does_not_stop_the_agent(terminal: Terminal) -> None:
-    terminal.dock.open_app("a", "A")
-    start(terminal)
-
-    terminal.session_bus.restart()
-
-    terminal.sync()
-    assert terminal.agent.alive

@@ -4,10 +4,12 @@ from __future__ import annotations
 
 import configparser
 import os
+import shutil
 from pathlib import Path
 
 import pytest
 
+from sandbox import layout
 from sandbox.commands import Answer
 from sandbox.peers.fault import Fault
 from sandbox.terminal import Terminal
@@ -146,6 +148,18 @@ def test_exit_without_backup_file_restores_an_empty_list(session: Terminal) -> N
     assert restrictions()["UsbTrayIconClickable"] == "true"
 
 
+@pytest.mark.parametrize(
+    "content",
+    [b"", b"\0\xff\x80\n", b"{}", b"ControlCenterList=network\n", b"[config\n\xff"],
+    ids=str,
+)
+def test_backup_file_that_is_no_such_file_restores_an_empty_list(session: Terminal, content: bytes) -> None:
+    session.files.write(layout.BACKUP_CONFIG, content)
+    mark = leave_domain(session)
+    assert road(session, mark) == ROAD
+    assert restrictions()["ControlCenterList"] == "@Invalid()"
+
+
 def test_script_path_is_logged(session: Terminal) -> None:
     mark = leave_domain(session)
     assert 'onPolicyMsg ----strPath: "/usr/share/velk/scripts/restore_config.bash"' in log_lines(
@@ -227,6 +241,34 @@ def test_failing_systemctl_does_not_stop_the_exit(session: Terminal, status: int
     session.commands.answer("systemctl", Answer(status))
     mark = leave_domain(session)
     assert road(session, mark) == ROAD
+
+
+def test_missing_systemctl_does_not_stop_the_exit(terminal: Terminal, tmp_path: Path) -> None:
+    for program in ("bash", "restore_config"):
+        found = shutil.which(program)
+        assert found
+        (tmp_path / program).symlink_to(found)
+    terminal.start_agent(extra_env={"PATH": str(tmp_path)})
+    mark = leave_domain(terminal)
+    shell_complains = ("log", "")
+    assert road(terminal, mark) == [shell_complains if step[0] == "systemctl" else step for step in ROAD]
+    terminal.advance(60)
+    assert forced_actions(terminal, mark) == ["Reboot"]
+
+
+def test_systemctl_that_hangs_delays_the_reboot_to_its_end(session: Terminal) -> None:
+    session.commands.hold("systemctl")
+    mark = session.events.mark()
+    session.daemon.push_policy(EXIT)
+    session.events.wait_for(target="systemctl", after=mark)
+
+    session.jump(90)
+    session.receive_all()
+    assert session.events.all(target="daemon", after=mark) == []
+    session.commands.release("systemctl")
+    session.sync()
+    session.sync()
+    assert road(session, mark) == [*ROAD, ("logind", "Reboot")]
 
 
 @pytest.mark.parametrize("fault", [Fault.fail(), Fault.hang()], ids=lambda fault: fault.kind)

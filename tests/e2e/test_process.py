@@ -93,19 +93,6 @@ def test_no_services_at_all_do_not_keep_the_agent_from_running(terminal: Termina
     assert next_status(terminal, mark) == (1, "")
 
 
-@pytest.mark.parametrize("variable", ["DBUS_SESSION_BUS_ADDRESS", "DBUS_SYSTEM_BUS_ADDRESS"])
-def test_bus_that_is_not_there_does_not_crash_the_agent(terminal: Terminal, variable: str) -> None:
-    """The agent must come up to its event loop."""
-    mark = terminal.events.mark()
-    terminal.start_agent(
-        ready=lambda: terminal.events.wait_for(
-            lambda event: "---getusername:" in event.args[0], kind="log", count=2, after=mark
-        ),
-        extra_env={variable: "unix:path=/nowhere"},
-    )
-    assert terminal.agent.alive
-
-
 def test_memory_of_many_policies_is_given_back(terminal: Terminal) -> None:
     terminal.start_agent()
     payload = '{"type":5,"text":"' + "x" * 10000 + '"}'

@@ -13,6 +13,7 @@ const QString service = QStringLiteral("com.norix.velk.velkg");
 const QString path = QStringLiteral("/com/norix/velk/velkg");
 
 constexpr int kAskedFor = 64;
+constexpr int kLongestAskedFor = 65536;
 constexpr int kMany = 1000;
 
 } // namespace
@@ -25,6 +26,7 @@ class UnreadCallsTest : public QObject
 private Q_SLOTS:
     void everyCallArrivesInOrderThoughNoneIsAnswered();
     void onlyTheFirstUnansweredCallsAskForAReply();
+    void longTextIsSentWithoutAskingForAReply();
     void answeredCallsMakeRoomForOthersThatAsk();
     void callWithoutAReplyCountsAsFinished();
     void failedCallIsAnErrorForWhoeverLooks();
@@ -63,6 +65,23 @@ void UnreadCallsTest::onlyTheFirstUnansweredCallsAskForAReply()
         asking += call.isReplyRequired() ? 1 : 0;
     }
     QCOMPARE(asking, kAskedFor);
+}
+
+void UnreadCallsTest::longTextIsSentWithoutAskingForAReply()
+{
+    const RecordedService daemon(QDBusConnection::SystemBus, service,
+                                 [](const QDBusMessage&) { return QDBusMessage(); });
+    velkgInterface proxy(service, path, QDBusConnection::systemBus());
+    const QString url(8, QLatin1Char('u'));
+
+    for (const int length : {kLongestAskedFor, kLongestAskedFor + 1, url.size()}) {
+        proxy.onUploadFinished(url, QString(length - url.size(), QLatin1Char('x')));
+    }
+
+    QTRY_COMPARE(daemon.calls().size(), 3);
+    QVERIFY(daemon.calls().at(0).isReplyRequired());
+    QVERIFY(!daemon.calls().at(1).isReplyRequired());
+    QVERIFY(daemon.calls().at(2).isReplyRequired());
 }
 
 void UnreadCallsTest::answeredCallsMakeRoomForOthersThatAsk()

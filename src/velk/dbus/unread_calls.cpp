@@ -4,10 +4,23 @@
 #include <QDBusConnection>
 #include <QDBusMessage>
 
+#include <numeric>
+
 namespace {
 
 // Half of what a system bus allows leaves room for the calls whose replies are read.
 constexpr int kMostUnanswered = 64;
+
+// Qt keeps a call, with all that it carries, until it is answered or times out.
+constexpr int kMostCharacters = 65536;
+
+/// The length of all texts among the arguments.
+int characters(const QVariantList& arguments)
+{
+    return std::accumulate(arguments.cbegin(), arguments.cend(), 0, [](int sum, const QVariant& argument) {
+        return sum + argument.toString().size();
+    });
+}
 
 } // namespace
 
@@ -17,7 +30,7 @@ QDBusPendingCall UnreadCalls::send(QDBusAbstractInterface& proxy, const QString&
     while (!m_unanswered.isEmpty() && m_unanswered.head().isFinished()) {
         m_unanswered.dequeue();
     }
-    if (m_unanswered.size() < kMostUnanswered) {
+    if (m_unanswered.size() < kMostUnanswered && characters(arguments) <= kMostCharacters) {
         m_unanswered.enqueue(proxy.asyncCallWithArgumentList(method, arguments));
         return m_unanswered.last();
     }

@@ -9,8 +9,8 @@ class QDBusAbstractInterface;
 ///
 /// A bus refuses further calls of a program that has too many unanswered (128 on a system bus), and each one
 /// costs memory until it is answered or times out. So only the first calls that a slow service leaves
-/// unanswered ask for a reply; the others are sent without, and their pending call counts as finished at
-/// once: no call is lost, however many there are.
+/// unanswered ask for a reply, and none that carries a long text; the others are sent without, and their
+/// pending call counts as finished at once: no call is lost, however many there are and whatever their size.
 class UnreadCalls
 {
 public:

@@ -1,14 +1,25 @@
 #include <QCoreApplication>
+#include <QDBusConnection>
 #include <QDebug>
 
+#include <malloc.h>
 #include <pwd.h>
 #include <unistd.h>
 
+#include "bus_watch.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "types.h"
 
 namespace {
+
+/// Gives the memory of large texts back to the system once they are gone. Without a fixed limit the C library
+/// keeps ever larger blocks for later, and one burst of long policies would stay with the agent for its life.
+void keepNoLargeBlocks()
+{
+    constexpr int kLargeBytes = 128 * 1024; // what the C library starts with
+    mallopt(M_MMAP_THRESHOLD, kLargeBytes);
+}
 
 QString getCurrentLoginUser()
 {
@@ -26,7 +37,10 @@ QString getCurrentLoginUser()
 
 int main(int argc, char* argv[])
 {
+    keepNoLargeBlocks();
     QCoreApplication application(argc, argv);
+    const BusWatch systemBus(QDBusConnection::systemBus(), QStringLiteral("system"));
+    const BusWatch sessionBus(QDBusConnection::sessionBus(), QStringLiteral("session"));
     registerLauncherItemInfoMetaType();
     registerLauncherItemInfoListMetaType();
 

@@ -1,0 +1,207 @@
+"""A bus that goes away: the agent says so and ends, so that its service manager starts a fresh one."""
+
+from __future__ import annotations
+
+import os
+import signal
+import socket
+from typing import Callable
+
+import pytest
+from gi.repository import Gio
+
+from sandbox.buses import Bus
+from sandbox.clock import ManualClock
+from sandbox.peers import dock
+from sandbox.peers.fault import Fault
+from sandbox.terminal import Terminal
+from wire import FIVE_MINUTES, carries_out_policies, forced_actions, next_notification, next_status
+
+DBUS_LIMIT = 25
+ADDRESSES = {"system": "DBUS_SYSTEM_BUS_ADDRESS", "session": "DBUS_SESSION_BUS_ADDRESS"}
+
+both_buses = pytest.mark.parametrize("kind", ["system", "session"])
+
+
+def bus_of(terminal: Terminal, kind: str) -> Bus:
+    """The bus of this kind."""
+    return {"system": terminal.system_bus, "session": terminal.session_bus}[kind]
+
+
+def ends_for_want_of(terminal: Terminal, *kinds: str) -> bool:
+    """Whether the agent ends with the status of a failure, after one line for each of these buses."""
+    status = terminal.agent.wait()
+    lines = [event.args[0] for event in terminal.events.all(kind="log", member="critical")]
+    return (status, lines) == (1, [f"no connection to the {kind} bus, ending" for kind in kinds])
+
+
+def wake(terminal: Terminal, kind: str, seconds: int) -> None:
+    """Move the agent's clock and wake the agent up by a signal on one bus; the other one may be gone."""
+    assert isinstance(terminal.clock, ManualClock)
+    terminal.clock.jump(seconds)
+    if kind == "system":
+        terminal.daemon.push_policy("wake up")
+    else:
+        terminal.dock.emit(dock.INTERFACE, "EntryRemoved", "nobody")
+
+
+def let_the_name_be_asked_for(terminal: Terminal) -> None:
+    """The agent waits for a service on the system bus that never answers."""
+    terminal.logind.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.daemon.push_online()
+    terminal.events.wait_for(target="logind", member="Get", after=mark)
+
+
+def let_a_notice_be_shown(terminal: Terminal) -> None:
+    """The agent waits for a service on the session bus that never answers."""
+    terminal.notifications.fault = Fault.hang()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1300})
+    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
+
+
+@both_buses
+def test_the_loss_of_a_bus_is_one_line_and_the_end(terminal: Terminal, kind: str) -> None:
+    terminal.start_agent()
+    bus_of(terminal, kind).stop()
+    assert ends_for_want_of(terminal, kind)
+
+
+@both_buses
+def test_a_bus_that_was_restarted_is_not_connected_to_again_but_by_a_fresh_agent(
+    terminal: Terminal, kind: str
+) -> None:
+    terminal.start_agent()
+    bus_of(terminal, kind).restart()
+    assert ends_for_want_of(terminal, kind)
+
+    for peer in terminal.peers.values():
+        if not peer.present:
+            peer.appear()
+    terminal.start_agent()
+    carries_out_policies(terminal)
+
+
+@both_buses
+@pytest.mark.parametrize(
+    ("waits_on", "wait"),
+    [("system", let_the_name_be_asked_for), ("session", let_a_notice_be_shown)],
+    ids=["waiting on the system bus", "waiting on the session bus"],
+)
+def test_a_bus_lost_while_an_answer_is_waited_for_is_noticed_after_the_limit(
+    terminal: Terminal, kind: str, waits_on: str, wait: Callable[[Terminal], None]
+) -> None:
+    terminal.start_agent()
+    wait(terminal)
+    bus_of(terminal, kind).stop()
+    if kind != waits_on:
+        wake(terminal, waits_on, DBUS_LIMIT)
+    assert ends_for_want_of(terminal, kind)
+
+
+@both_buses
+def test_a_bus_lost_during_the_countdown_ends_the_countdown_too(terminal: Terminal, kind: str) -> None:
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1201})
+    next_notification(terminal, mark)
+    terminal.sync()
+    bus_of(terminal, kind).stop()
+    assert ends_for_want_of(terminal, kind)
+    assert forced_actions(terminal, mark) == []
+
+
+@both_buses
+def test_a_bus_lost_while_the_restore_script_runs_lets_it_end_first(terminal: Terminal, kind: str) -> None:
+    terminal.start_agent()
+    terminal.commands.hold("restore_config")
+    terminal.daemon.push_policy({"type": 1200})
+    terminal.events.wait_for(kind="command", target="restore_config")
+    bus_of(terminal, kind).stop()
+    assert terminal.agent.alive
+    terminal.commands.release("restore_config")
+    assert ends_for_want_of(terminal, kind)
+    terminal.events.wait_for(kind="command", target="systemctl")
+
+
+@pytest.mark.parametrize("kinds", [("system",), ("session",), ("system", "session")], ids=str)
+def test_an_agent_without_a_bus_at_its_start_ends(terminal: Terminal, kinds: tuple[str, ...]) -> None:
+    nowhere = {ADDRESSES[kind]: "unix:path=/nowhere" for kind in kinds}
+    terminal.agent.start(terminal.clock, extra_env=nowhere)
+    assert ends_for_want_of(terminal, *kinds)
+
+
+def test_a_hung_session_bus_costs_the_limit_and_is_no_loss(terminal: Terminal) -> None:
+    terminal.start_agent()
+    pid = terminal.session_bus.pid
+    assert pid
+    os.kill(pid, signal.SIGSTOP)
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1300})
+    terminal.events.wait_for(lambda event: "1300" in event.args[0], kind="log", after=mark)
+    wake(terminal, "system", DBUS_LIMIT)
+    terminal.events.wait_for(kind="log", member="warning", after=mark)
+    os.kill(pid, signal.SIGCONT)
+    carries_out_policies(terminal)
+
+
+def test_a_hung_system_bus_costs_the_limit_and_is_no_loss(terminal: Terminal) -> None:
+    terminal.start_agent()
+    terminal.sync()
+    pid = terminal.system_bus.pid
+    assert pid
+    os.kill(pid, signal.SIGSTOP)
+    mark = terminal.events.mark()
+    wake(terminal, "session", FIVE_MINUTES)
+    terminal.events.wait_for(kind="log", member="warning", after=mark)
+    wake(terminal, "session", DBUS_LIMIT)
+    terminal.events.wait_for(
+        lambda event: event.args[0].startswith("get screenLocked"), kind="log", after=mark
+    )
+    os.kill(pid, signal.SIGCONT)
+    assert next_status(terminal, mark) == (1, "")
+    carries_out_policies(terminal)
+
+
+def say_that_the_bus_is_gone(bus: Bus, destination: str | None) -> bytes:
+    """Send what the D-Bus library tells a program whose bus is gone; the result is what the bus says to that,
+    nothing if it shows the sender out. No library would send it: it is put together by hand."""
+    hello = Gio.DBusMessage.new_method_call(
+        "org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", "Hello"
+    )
+    lie = Gio.DBusMessage.new_signal(
+        "/org/freedesktop/DBus/Lokal", "org.freedesktop.DBus.Lokal", "Disconnected"
+    )
+    if destination:
+        lie.set_destination(destination)
+    blobs = []
+    for serial, message in enumerate((hello, lie), 1):
+        message.set_serial(serial)
+        blobs.append(message.to_blob(Gio.DBusCapabilityFlags.NONE).replace(b"Lokal", b"Local"))
+    with socket.socket(socket.AF_UNIX) as line:
+        line.settimeout(20)
+        line.connect(bus.address.removeprefix("unix:path="))
+        line.sendall(b"\0AUTH EXTERNAL " + str(os.getuid()).encode().hex().encode() + b"\r\n")
+        assert line.recv(1024).startswith(b"OK")
+        line.sendall(b"BEGIN\r\n" + blobs[0])
+        assert line.recv(1024)
+        line.sendall(blobs[1])
+        while heard := line.recv(1024):
+            if b"NameAcquired" not in heard:
+                break
+        return heard
+
+
+@both_buses
+@pytest.mark.parametrize("straight", [False, True], ids=["broadcast", "straight"])
+def test_nobody_can_make_the_agent_believe_that_a_bus_is_gone(
+    terminal: Terminal, kind: str, straight: bool
+) -> None:
+    terminal.start_agent()
+    bus = bus_of(terminal, kind)
+    agent: list[str | None] = [*terminal.agent.bus_names(bus)]
+    for receiver in agent if straight else [None]:
+        assert say_that_the_bus_is_gone(bus, receiver) == b""
+    carries_out_policies(terminal)
+    assert terminal.agent.alive
