@@ -7,6 +7,7 @@
 #include <unistd.h>
 
 #include "bus_watch.h"
+#include "log_sink.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "types.h"
@@ -38,6 +39,7 @@ QString getCurrentLoginUser()
 int main(int argc, char* argv[])
 {
     keepNoLargeBlocks();
+    sendLogToJournal();
     QCoreApplication application(argc, argv);
     const BusWatch systemBus(QDBusConnection::systemBus(), QStringLiteral("system"));
     const BusWatch sessionBus(QDBusConnection::sessionBus(), QStringLiteral("session"));

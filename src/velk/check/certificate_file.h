@@ -1,0 +1,44 @@
+#pragma once
+
+#include <QDateTime>
+#include <QString>
+
+#include <openssl/evp.h>
+#include <openssl/x509.h>
+
+#include <memory>
+#include <vector>
+
+namespace velk::check {
+
+struct FreeOpenSsl
+{
+    void operator()(X509* certificate) const { X509_free(certificate); }
+    void operator()(EVP_PKEY* key) const { EVP_PKEY_free(key); }
+    void operator()(BIO* stream) const { BIO_free(stream); }
+};
+
+using Certificate = std::unique_ptr<X509, FreeOpenSsl>;
+using Key = std::unique_ptr<EVP_PKEY, FreeOpenSsl>;
+
+/// The certificates of a PEM file, the owner's own one first. `error` is empty on success.
+struct CertificateFile
+{
+    explicit CertificateFile(const QString& path);
+
+    std::vector<Certificate> certificates;
+    QDateTime validFrom; ///< when the last of them begins to be valid
+    QDateTime validUntil; ///< when the first of them ends to be valid
+    QString error;
+};
+
+/// The private key of a PEM file. An encrypted one counts as unreadable: nobody is there to be asked.
+struct KeyFile
+{
+    explicit KeyFile(const QString& path);
+
+    Key key;
+    QString error;
+};
+
+} // namespace velk::check

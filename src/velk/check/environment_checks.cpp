@@ -1,0 +1,147 @@
+#include "environment_checks.h"
+
+#include <QDBusConnection>
+#include <QDBusError>
+#include <QDir>
+#include <QFileInfo>
+
+#include <unistd.h>
+
+#include "package_tool.h"
+#include "remote_object.h"
+
+namespace velk::check {
+
+namespace {
+
+struct Service
+{
+    const char* name;
+    Grade whenAbsent;
+    const char* purpose; ///< what does not work without it
+};
+
+const QList<Service> kSystemServices{
+    {"com.norix.velk.velkg", Grade::Bad, "no policy arrives, nothing is reported"},
+    {"org.freedesktop.login1", Grade::Bad, "the user's name is not known, nobody can be logged out"},
+    {"com.norix.velk.iam", Grade::Warning, "leaving the domain does not switch it off"},
+};
+
+const QList<Service> kSessionServices{
+    {"com.norix.velk.prys", Grade::Warning, "forwarded policies are lost"},
+    {"com.norix.kpx.Notification", Grade::Bad, "the user sees no warning and no message"},
+    {"com.norix.ScreenSaver", Grade::Warning, "the session never counts as behind the screen saver"},
+    {"com.norix.SessionManager", Grade::Warning, "the session never counts as locked"},
+    {"com.norix.kpx.daemon.Dock", Grade::Warning, "opened applications are not reported"},
+    {"com.norix.kpx.daemon.Launcher", Grade::Warning, "software is not reported"},
+};
+
+Finding checkService(const QDBusConnection& bus, const Service& service)
+{
+    const QString name = QString::fromLatin1(service.name);
+    if (isOnBus(bus, name)) {
+        return {Grade::Good, QStringLiteral("service"), name + QStringLiteral(" is there")};
+    }
+    return {service.whenAbsent, QStringLiteral("service"),
+            QStringLiteral("%1 is not there: %2").arg(name, QString::fromLatin1(service.purpose))};
+}
+
+Findings checkBus(const QDBusConnection& bus, const QString& kind, const QList<Service>& services)
+{
+    if (!bus.isConnected()) {
+        return {{Grade::Bad, kind + QStringLiteral(" bus"),
+                 QStringLiteral("cannot be reached: ") + bus.lastError().message()}};
+    }
+    Findings findings;
+    for (const Service& service : services) {
+        findings.append(checkService(bus, service));
+    }
+    return findings;
+}
+
+Finding checkPackageTool(const QString& program, const QStringList& arguments)
+{
+    const PackageToolRun run = runPackageTool(program, arguments);
+    const QString subject = QStringLiteral("package tool");
+    if (run.ended && !run.output.isEmpty()) {
+        return {Grade::Good, subject, program + QStringLiteral(" works")};
+    }
+    return {Grade::Warning, subject,
+            program + QStringLiteral(" does not work: reports of software are incomplete")};
+}
+
+Finding checkUnit()
+{
+    const QString subject = QStringLiteral("unit");
+    const QString state = runPackageTool(QStringLiteral("systemctl"),
+                                         {QStringLiteral("--user"), QStringLiteral("is-active"),
+                                          QStringLiteral("velks.service")})
+                              .output.trimmed();
+    if (state == QLatin1String("active")) {
+        return {Grade::Good, subject, QStringLiteral("velks.service is active")};
+    }
+    if (state == QLatin1String("failed")) {
+        return {Grade::Bad, subject,
+                QStringLiteral("velks.service has failed; see journalctl --user -u velks")};
+    }
+    if (state.isEmpty()) {
+        return {Grade::Warning, subject, QStringLiteral("there is no user service manager to ask")};
+    }
+    return {Grade::Warning, subject,
+            QStringLiteral("velks.service is %1; start it with systemctl --user start velks").arg(state)};
+}
+
+QByteArray processName(const QString& folder)
+{
+    QFile file(folder + QStringLiteral("/comm"));
+    return file.open(QIODevice::ReadOnly) ? file.readAll().trimmed() : QByteArray();
+}
+
+int runningAgents()
+{
+    int count = 0;
+    const QFileInfoList processes =
+        QDir(QStringLiteral("/proc")).entryInfoList({QStringLiteral("[1-9]*")}, QDir::Dirs);
+    for (const QFileInfo& process : processes) {
+        if (process.ownerId() == getuid() && processName(process.filePath()) == "velks") {
+            ++count;
+        }
+    }
+    return count;
+}
+
+Finding checkProcess()
+{
+    const QString subject = QStringLiteral("agent");
+    const int count = runningAgents();
+    if (count == 1) {
+        return {Grade::Good, subject, QStringLiteral("runs")};
+    }
+    if (count == 0) {
+        return {Grade::Bad, subject, QStringLiteral("does not run")};
+    }
+    return {Grade::Bad, subject, QStringLiteral("runs %1 times; there must be one").arg(count)};
+}
+
+} // namespace
+
+Findings checkServices()
+{
+    return checkBus(QDBusConnection::systemBus(), QStringLiteral("system"), kSystemServices)
+        + checkBus(QDBusConnection::sessionBus(), QStringLiteral("session"), kSessionServices);
+}
+
+Findings checkPackageTools()
+{
+    const QString versionOption = QStringLiteral("--version");
+    return {checkPackageTool(QStringLiteral("dpkg"), {versionOption}),
+            checkPackageTool(QStringLiteral("/usr/bin/dpkg-query"), {versionOption}),
+            checkPackageTool(QStringLiteral("/usr/bin/dpkg-architecture"), {versionOption})};
+}
+
+Findings checkAgent()
+{
+    return {checkUnit(), checkProcess()};
+}
+
+} // namespace velk::check

@@ -1,0 +1,14 @@
+#pragma once
+
+#include "finding.h"
+#include "session_user.h"
+
+namespace velk::check {
+
+/// The daemon's information file: whether it can be read, and what the agent misses in it.
+Findings checkInformationFile(const SessionUser& user);
+
+/// The identifier that the platform knows the terminal by.
+Finding checkMachineIdentifier();
+
+} // namespace velk::check

@@ -1,0 +1,73 @@
+#include "platform_check.h"
+
+#include <QJsonDocument>
+
+#include "captured_log.h"
+#include "constants.h"
+#include "filecontent.h"
+#include "handleevent.h"
+
+namespace velk::check {
+
+namespace {
+
+struct Answer
+{
+    int status = 0;
+    QString body;
+};
+
+Answer ask(const QString& url)
+{
+    auto* gateway = HandleEvent::GetInstance();
+    gateway->initHttpApi();
+    Answer answer;
+    const auto connection = QObject::connect(gateway, &HandleEvent::recvPlatformMsg, gateway,
+                                             [&answer](int status, const QString& body) {
+                                                 answer = {status, body};
+                                             });
+    gateway->getPlatformMsg(url);
+    QObject::disconnect(connection);
+    return answer;
+}
+
+/// The platform knows users by their login name without one leading "@".
+QString platformName(const SessionUser& user)
+{
+    return user.loginName.startsWith(QLatin1Char('@')) ? user.loginName.mid(1) : user.loginName;
+}
+
+} // namespace
+
+Finding checkPlatform(const SessionUser& user)
+{
+    const QString subject = QStringLiteral("platform");
+    QString host;
+    QString port;
+    velk::base::FileContent::getHostAndPort(host, port);
+    if (host.isEmpty() || port.isEmpty()) {
+        return {Grade::Bad, subject, QStringLiteral("cannot be asked: its address is not known")};
+    }
+
+    const QString url = kUrlHead.arg(host, port)
+        + QStringLiteral("notification/v2/list?uid=%1&is_not_read=1&limit=1").arg(platformName(user));
+    const Answer answer = ask(url);
+    if (answer.status == 0) {
+        return {Grade::Bad, subject, QStringLiteral("does not answer: ") + CapturedLog::lastWarning()};
+    }
+    if (answer.status == 401 || answer.status == 403) {
+        return {Grade::Bad, subject,
+                QStringLiteral("answers, but does not accept this terminal or user (HTTP status %1)")
+                    .arg(answer.status)};
+    }
+    if (answer.status != 200) {
+        return {Grade::Bad, subject,
+                QStringLiteral("answers with HTTP status %1 instead of messages").arg(answer.status)};
+    }
+    if (!QJsonDocument::fromJson(answer.body.toUtf8()).isArray()) {
+        return {Grade::Bad, subject, QStringLiteral("answers with something else than messages")};
+    }
+    return {Grade::Good, subject, QStringLiteral("answers and accepts this terminal")};
+}
+
+} // namespace velk::check

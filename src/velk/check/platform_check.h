@@ -1,0 +1,12 @@
+#pragma once
+
+#include "finding.h"
+#include "session_user.h"
+
+namespace velk::check {
+
+/// Asks the platform for one unread message, the way the agent does, and neither shows it nor marks it read.
+/// Takes 30 s at most. Needs a CapturedLog, which knows why there was no answer.
+Finding checkPlatform(const SessionUser& user);
+
+} // namespace velk::check

@@ -1,0 +1,21 @@
+#pragma once
+
+#include <QString>
+
+#include "finding.h"
+
+namespace velk::check {
+
+/// Whose session this is. Only domain users get messages of the platform.
+struct SessionUser
+{
+    QString loginName; ///< empty without an account entry
+    uint uid;
+    bool isDomainUser;
+
+    static SessionUser current();
+};
+
+Finding checkUser(const SessionUser& user);
+
+} // namespace velk::check

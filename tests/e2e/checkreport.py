@@ -1,0 +1,121 @@
+"""velks-check in the simulated terminal: its runs, and certificates for it to judge."""
+
+from __future__ import annotations
+
+import json
+import subprocess
+from dataclasses import dataclass
+from datetime import datetime, timedelta
+from pathlib import Path
+from typing import Mapping
+
+from cryptography import x509
+from cryptography.hazmat.primitives import hashes, serialization
+from cryptography.hazmat.primitives.asymmetric import ec
+from cryptography.x509.oid import NameOID
+
+from sandbox.commands import Answer
+from sandbox.terminal import Terminal
+
+
+@dataclass(frozen=True)
+class Line:
+    """What it found of one subject."""
+
+    result: str
+    text: str
+
+
+@dataclass(frozen=True)
+class Report:
+    """One run with --json."""
+
+    status: int
+    result: str
+    lines: list[tuple[str, Line]]
+
+    def line(self, subject: str, about: str = "") -> Line:
+        """The one line of a subject whose text has `about` in it."""
+        (found,) = [line for name, line in self.lines if name == subject and about in line.text]
+        return found
+
+    def subjects(self) -> set[str]:
+        """All that was looked at."""
+        return {name for name, _ in self.lines}
+
+    def worse_than_good(self) -> list[tuple[str, Line]]:
+        """The lines that somebody should look at."""
+        return [entry for entry in self.lines if entry[1].result != "good"]
+
+
+@dataclass(frozen=True)
+class Pair:
+    """A certificate and its key in PEM form."""
+
+    certificate: bytes
+    key: bytes
+
+
+def binary(terminal: Terminal) -> Path:
+    """The program that was built, or installed, along with the agent."""
+    folder = terminal.agent.binary.parent
+    built = folder / "velk" / "check" / "velks-check"
+    return built if built.exists() else folder / built.name
+
+
+def run(
+    terminal: Terminal, *arguments: str, env: Mapping[str, str] | None = None
+) -> subprocess.CompletedProcess[str]:
+    """Run it as the session's user, `env` being added to the session's environment."""
+    command = ["env", *(f"{name}={value}" for name, value in (env or {}).items()), str(binary(terminal))]
+    return subprocess.run([*command, *arguments], capture_output=True, text=True, timeout=100)
+
+
+def report(terminal: Terminal, env: Mapping[str, str] | None = None) -> Report:
+    """What it finds now."""
+    ended = run(terminal, "--json", env=env)
+    assert ended.stderr == ""
+    content = json.loads(ended.stdout)
+    lines = [(entry["subject"], Line(entry["result"], entry["text"])) for entry in content["findings"]]
+    return Report(ended.returncode, content["result"], lines)
+
+
+def make_all_well(terminal: Terminal) -> None:
+    """A session that lacks nothing: platform, unit and agent."""
+    terminal.commands.answer("systemctl", Answer(stdout=b"active\n"))
+    if terminal.user.is_domain_user:
+        assert terminal.platform.present
+    terminal.start_agent()
+
+
+def pair(begins_in_days: int = -1, ends_in_days: int = 365) -> Pair:
+    """A fresh certificate with this time of validity, signed by itself."""
+    key = ec.generate_private_key(ec.SECP256R1())
+    name = x509.Name([x509.NameAttribute(NameOID.COMMON_NAME, "terminal")])
+    now = datetime.utcnow()
+    certificate = (
+        x509.CertificateBuilder()
+        .subject_name(name)
+        .issuer_name(name)
+        .public_key(key.public_key())
+        .serial_number(x509.random_serial_number())
+        .not_valid_before(now + timedelta(days=begins_in_days))
+        .not_valid_after(now + timedelta(days=ends_in_days))
+        .sign(key, hashes.SHA256())
+    )
+    return Pair(
+        certificate.public_bytes(serialization.Encoding.PEM),
+        key_text(key, serialization.NoEncryption()),
+    )
+
+
+def encrypted(key: bytes) -> bytes:
+    """The same key, to be opened with a password only."""
+    loaded = serialization.load_pem_private_key(key, None)
+    return key_text(loaded, serialization.BestAvailableEncryption(b"secret"))
+
+
+def key_text(key: object, encryption: serialization.KeySerializationEncryption) -> bytes:
+    """A private key in PEM form."""
+    assert isinstance(key, ec.EllipticCurvePrivateKey)
+    return key.private_bytes(serialization.Encoding.PEM, serialization.PrivateFormat.PKCS8, encryption)

@@ -1,0 +1,146 @@
+"""velks-check on certificates, key and platform: each way in which the agent cannot get messages."""
+
+from __future__ import annotations
+
+import pytest
+
+from checkreport import encrypted, make_all_well, pair, report
+from sandbox import layout
+from sandbox.certificates import Authority
+from sandbox.platform_server import HttpFault, Platform
+from sandbox.terminal import Terminal
+
+CERTIFICATES = {
+    "platform authority": layout.SERVER_CERTIFICATE,
+    "terminal certificate": layout.CLIENT_CERTIFICATE,
+    "terminal key": layout.CLIENT_KEY,
+}
+
+
+@pytest.fixture
+def working(terminal: Terminal) -> Terminal:
+    """A terminal on which all is well before the test breaks something."""
+    make_all_well(terminal)
+    return terminal
+
+
+@pytest.mark.parametrize("subject", CERTIFICATES)
+def test_file_that_is_missing_is_bad(working: Terminal, subject: str) -> None:
+    working.files.remove(CERTIFICATES[subject])
+    line = report(working).line(subject)
+    assert line.result == "bad"
+    assert f"{CERTIFICATES[subject]} cannot be read (No such file or directory)" in line.text
+
+
+@pytest.mark.parametrize("subject", CERTIFICATES)
+def test_file_that_the_user_may_not_read_is_bad(working: Terminal, subject: str) -> None:
+    CERTIFICATES[subject].chmod(0)
+    line = report(working).line(subject)
+    assert line.result == "bad"
+    assert "cannot be read (Permission denied)" in line.text
+
+
+@pytest.mark.parametrize("subject", CERTIFICATES)
+@pytest.mark.parametrize("content", [b"", b"no PEM\n", b"-----BEGIN CERTIFICATE-----\nAAAA\n"])
+def test_file_that_is_no_pem_is_bad(working: Terminal, subject: str, content: bytes) -> None:
+    working.files.write(CERTIFICATES[subject], content)
+    line = report(working).line(subject)
+    assert line.result == "bad"
+    assert " in PEM form" in line.text
+
+
+def test_certificate_broken_after_a_sound_one_is_bad(working: Terminal) -> None:
+    path = layout.SERVER_CERTIFICATE
+    working.files.write(path, path.read_bytes() + b"-----BEGIN CERTIFICATE-----\nAAAA\n")
+    assert report(working).line("platform authority").result == "bad"
+
+
+@pytest.mark.parametrize("subject", ["platform authority", "terminal certificate"])
+@pytest.mark.parametrize(
+    ("begins", "ends", "result", "words"),
+    [
+        (-30, -1, "bad", " expired on "),
+        (2, 30, "bad", " is not valid before "),
+        (-30, 10, "warning", " is only valid until "),
+        (-30, 40, "good", " is valid until "),
+    ],
+)
+def test_time_of_a_certificate_counts(
+    working: Terminal, subject: str, begins: int, ends: int, result: str, words: str
+) -> None:
+    working.files.write(CERTIFICATES[subject], pair(begins, ends).certificate)
+    line = report(working).line(subject)
+    assert line.result == result
+    assert words in line.text
+
+
+def test_certificate_that_ends_first_counts_for_the_whole_file(working: Terminal) -> None:
+    path = layout.SERVER_CERTIFICATE
+    working.files.write(path, path.read_bytes() + pair(-30, -1).certificate)
+    assert " expired on " in report(working).line("platform authority").text
+
+
+def test_key_of_another_certificate_is_bad(working: Terminal) -> None:
+    working.files.write(layout.CLIENT_KEY, pair().key)
+    found = report(working)
+    assert found.line("terminal key", "does not match").result == "bad"
+    assert found.line("terminal certificate").result == "good"
+
+
+def test_key_with_a_password_is_bad(working: Terminal) -> None:
+    fresh = pair()
+    working.files.write(layout.CLIENT_CERTIFICATE, fresh.certificate)
+    working.files.write(layout.CLIENT_KEY, encrypted(fresh.key))
+    assert report(working).line("terminal key", "no unencrypted private key").result == "bad"
+
+
+def test_platform_that_is_down_is_bad_with_the_reason(working: Terminal) -> None:
+    working.platform.leave()
+    line = report(working).line("platform")
+    assert line.result == "bad"
+    assert line.text.startswith("does not answer: HTTP GET without a response: ")
+    assert "refused" in line.text or "connect" in line.text
+
+
+def test_platform_with_a_certificate_of_somebody_else_is_bad(working: Terminal) -> None:
+    stranger = Authority(layout.BOX / "stranger", "stranger").issue_server(layout.PLATFORM_HOST)
+    working.platform.leave()
+    impostor = Platform(working.events, working.platform.port, stranger)
+    try:
+        line = report(working).line("platform")
+    finally:
+        impostor.close()
+    assert line.result == "bad"
+    assert "certificate" in line.text
+
+
+def test_platform_that_rejects_the_terminals_certificate_is_bad(working: Terminal) -> None:
+    fresh = pair()
+    working.files.write(layout.CLIENT_CERTIFICATE, fresh.certificate)
+    working.files.write(layout.CLIENT_KEY, fresh.key)
+    found = report(working)
+    assert found.line("terminal key").result == "good"
+    assert found.line("platform").text.startswith("does not answer: ")
+
+
+@pytest.mark.parametrize(
+    ("fault", "text"),
+    [
+        (HttpFault.reply(401), "answers, but does not accept this terminal or user (HTTP status 401)"),
+        (HttpFault.reply(403), "answers, but does not accept this terminal or user (HTTP status 403)"),
+        (HttpFault.reply(500, b"[]"), "answers with HTTP status 500 instead of messages"),
+        (HttpFault.reply(200, b"{}"), "answers with something else than messages"),
+        (HttpFault.reply(200, b"<html>"), "answers with something else than messages"),
+    ],
+)
+def test_platform_that_answers_otherwise_is_bad(working: Terminal, fault: HttpFault, text: str) -> None:
+    working.platform.fault = fault
+    line = report(working).line("platform")
+    assert (line.result, line.text) == ("bad", text)
+
+
+def test_platform_is_asked_for_the_user_as_the_agent_asks(working: Terminal) -> None:
+    mark = working.events.mark()
+    report(working)
+    (request,) = working.events.all(kind="http", after=mark)
+    assert request.args[0] == "GET /notification/v2/list?uid=zhang.wei&is_not_read=1&limit=1 HTTP/1.1"

@@ -1,0 +1,95 @@
+"""Where the log goes: to the journal under a service manager, to standard error anywhere else."""
+
+from __future__ import annotations
+
+from pathlib import Path
+from typing import Iterator
+
+import pytest
+
+from journal import Journal, service
+from sandbox.terminal import Terminal
+from wire import carries_out_policies
+
+PLAIN = {"QT_MESSAGE_PATTERN": "%{if-category}%{category}: %{endif}%{message}"}
+
+
+@pytest.fixture
+def journal() -> Iterator[Journal]:
+    """A journal that takes entries."""
+    opened = Journal()
+    yield opened
+    opened.close()
+
+
+def start_as_service(terminal: Terminal, journal: Journal, folder: Path) -> None:
+    """Start the agent as a unit of a service manager; returns when it has announced the session."""
+    terminal.agent.binary = service(terminal.agent.binary, folder)
+    mark = terminal.events.mark()
+    terminal.start_agent(
+        ready=lambda: terminal.events.wait_for(target="daemon", member="SendUserStatus", after=mark),
+        extra_env=PLAIN,
+    )
+
+
+def test_entry_has_text_priority_file_line_and_function(
+    terminal: Terminal, journal: Journal, tmp_path: Path
+) -> None:
+    start_as_service(terminal, journal, tmp_path)
+    terminal.daemon.push_policy('no JSON, 中文\nand a second "line"')
+    entry = journal.wait_for("onPolicyMsg ---------payload:")
+    assert entry["MESSAGE"] == r'onPolicyMsg ---------payload: "no JSON, 中文\nand a second \"line\""'
+    assert entry["PRIORITY"] == "6"
+    assert entry["CODE_FILE"] == "src/velk/velks/message_transfer.cpp"
+    assert int(entry["CODE_LINE"]) > 0
+    assert entry["CODE_FUNC"] == "MessageTransfer::onPolicyMsg"
+    assert entry["SYSLOG_IDENTIFIER"] == "velks"
+    assert terminal.agent.log == ""
+
+
+def test_function_inside_a_namespace_has_its_name(
+    terminal: Terminal, journal: Journal, tmp_path: Path
+) -> None:
+    start_as_service(terminal, journal, tmp_path)
+    assert journal.wait_for("getCurrentLoginUser")["CODE_FUNC"] == "{anonymous}::getCurrentLoginUser"
+
+
+@pytest.mark.parametrize(
+    ("text", "priority"),
+    [("velkg restart sendonline", "7"), ("--@@@@--", "4"), ("----HandleEvent::sendMessage----", "6")],
+)
+def test_level_is_the_priority(
+    terminal: Terminal, journal: Journal, tmp_path: Path, text: str, priority: str
+) -> None:
+    terminal.notifications.leave()
+    start_as_service(terminal, journal, tmp_path)
+    terminal.daemon.push_online()
+    terminal.daemon.push_policy({"type": 1300})  # the service is absent: a warning
+    terminal.daemon.push_policy({"type": 1200})  # a notification with an action
+    assert journal.wait_for(text)["PRIORITY"] == priority
+
+
+def test_line_too_long_for_a_datagram_arrives_whole(
+    terminal: Terminal, journal: Journal, tmp_path: Path
+) -> None:
+    start_as_service(terminal, journal, tmp_path)
+    payload = "x" * 5_000_000
+    terminal.daemon.push_policy(payload)
+    assert journal.wait_for("payload:")["MESSAGE"] == f'onPolicyMsg ---------payload: "{payload}"'
+
+
+def test_log_stays_on_a_standard_error_that_is_not_the_journals(
+    terminal: Terminal, journal: Journal, tmp_path: Path
+) -> None:
+    """A child of a service inherits the variable; its standard error may lead elsewhere."""
+    terminal.agent.binary = service(terminal.agent.binary, tmp_path, stream="0")
+    terminal.start_agent()
+    assert '---getusername: "@zhang.wei"' in terminal.agent.log
+
+
+def test_journal_that_has_gone_does_not_stop_the_agent(
+    terminal: Terminal, journal: Journal, tmp_path: Path
+) -> None:
+    start_as_service(terminal, journal, tmp_path)
+    journal.close()
+    carries_out_policies(terminal)
