@@ -117,9 +117,12 @@ def _repository() -> Iterator[str]:
 
 
 def _build_folders() -> list[Path]:
-    """Folders of built programs, which stay writable for coverage counters and test output."""
+    """Folders of built programs, which stay writable for coverage counters and test output.
+
+    An installed agent is seen with the rest of /usr, which stays as it is.
+    """
     chosen = [Path(os.environ[name]) for name in ("VELK_BUILD_DIR",) if os.environ.get(name)]
-    if os.environ.get("VELK_AGENT"):
+    if os.environ.get("VELK_AGENT") and not os.environ["VELK_AGENT"].startswith("/usr/"):
         chosen.append(Path(os.environ["VELK_AGENT"]).parent)
     folders = [layout.REPOSITORY / "build", *chosen]
     return [folder.resolve() for folder in folders if folder.is_dir()]
