@@ -24,8 +24,7 @@ HttpClientApi::HttpClientApi(QObject* parent, bool)
 
 HttpClientApi::~HttpClientApi() = default;
 
-void HttpClientApi::setSSLConfig(const QString&, const QString&, const QString&)
-{ }
+void HttpClientApi::setSSLConfig(const QString&, const QString&, const QString&) { }
 
 int HttpClientApi::getRequest(QString& reply, const QString&, const QString&, bool)
 {
@@ -44,5 +43,4 @@ QList<QPair<QByteArray, QByteArray>> HttpClientApi::getRawHeader() const
     return lastReply.headers;
 }
 
-void HttpClientApi::CloseShare::operator()(void*) const
-{ }
+void HttpClientApi::CloseShare::operator()(void*) const { }

@@ -4,8 +4,8 @@
 #include <QEvent>
 
 #include <cstdint>
-#include <cstdio>
 #include <cstdlib>
+#include <iostream>
 
 namespace {
 
@@ -17,7 +17,7 @@ void dropLine(QtMsgType, const QMessageLogContext&, const QString&) { }
 void require(bool condition, const char* what)
 {
     if (!condition) {
-        std::fprintf(stderr, "not so: %s\n", what);
+        std::cerr << "not so: " << what << std::endl;
         std::abort();
     }
 }
@@ -37,7 +37,8 @@ __lsan_default_suppressions() // NOLINT(bugprone-reserved-identifier,cert-dcl37-
     return "leak:QJsonDocument::fromJson\n";
 }
 
-// The names are libFuzzer's.
+// The names are libFuzzer's, and so are the types.
+// NOLINTNEXTLINE(readability-non-const-parameter)
 extern "C" int LLVMFuzzerInitialize(int* argc, char*** argv)
 {
     // The targets write over the daemon's files and the package tools.

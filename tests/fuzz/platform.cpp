@@ -6,6 +6,7 @@
 #include "fuzzing.h"
 #include "handleevent.h"
 #include "message_platform.h"
+#include "message_transfer.h"
 #include "platform_files.h"
 
 namespace {
@@ -26,7 +27,7 @@ CannedReply replyOf(const QByteArray& input)
     return reply;
 }
 
-/// Lets the notices come that wait for their minute.
+/// Lets every timer be due: the notices come that wait for their minute, and the next poll.
 void endWaiting()
 {
     auto* dispatcher = QAbstractEventDispatcher::instance();
@@ -46,7 +47,8 @@ void endWaiting()
 void tryInput(const QByteArray& input)
 {
     static const bool prepared = (writePlatformAddress("localhost", "1"), true);
-    static const MessagePlatform platform(nullptr, QStringLiteral("zhang.wei"), nullptr);
+    static MessageTransfer transfer;
+    static const MessagePlatform platform(nullptr, QStringLiteral("zhang.wei"), &transfer);
     if (!prepared || input.count(',') > kMostCommas) {
         return;
     }

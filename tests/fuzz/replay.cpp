@@ -2,7 +2,7 @@
 #include <QFileInfo>
 
 #include <cstdint>
-#include <cstdio>
+#include <iostream>
 
 #include "files.h"
 
@@ -18,8 +18,7 @@ int main(int argc, char* argv[])
     for (int i = 1; i < argc; ++i) {
         const auto inputs = QDir(QString::fromLocal8Bit(argv[i])).entryInfoList(QDir::Files, QDir::Name);
         for (const QFileInfo& input : inputs) {
-            std::puts(qPrintable(input.fileName()));
-            std::fflush(stdout);
+            std::cout << qPrintable(input.fileName()) << std::endl;
             const QByteArray content = readBytes(input.filePath());
             LLVMFuzzerTestOneInput(reinterpret_cast<const std::uint8_t*>(content.constData()),
                                    static_cast<std::size_t>(content.size()));
@@ -27,7 +26,7 @@ int main(int argc, char* argv[])
         }
     }
     if (replayed == 0) {
-        std::fputs("there is no input to replay\n", stderr);
+        std::cerr << "there is no input to replay\n";
         return 1;
     }
     return 0;

@@ -2,6 +2,7 @@
 // lose its counters.
 
 #include <csignal>
+#include <cstdlib>
 
 extern "C" void __gcov_dump(); // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 
@@ -10,8 +11,9 @@ namespace {
 void flushAndEnd(int signal)
 {
     __gcov_dump();
-    std::signal(signal, SIG_DFL);
-    std::raise(signal);
+    if (std::signal(signal, SIG_DFL) == SIG_ERR || std::raise(signal) != 0) {
+        std::abort();
+    }
 }
 
 [[maybe_unused]] const auto previous = std::signal(SIGTERM, flushAndEnd);

@@ -1,7 +1,7 @@
 #include <QCommandLineParser>
 #include <QCoreApplication>
 
-#include <cstdio>
+#include <iostream>
 
 #include "captured_log.h"
 #include "certificate_checks.h"
@@ -66,12 +66,12 @@ int main(int argc, char* argv[])
     const QCommandLineOption json(QStringLiteral("json"), QStringLiteral("Report as JSON."));
     parser.addOption(json);
     if (!readCommandLine(parser, QCoreApplication::arguments())) {
-        std::fputs("velks-check: wrong usage; see velks-check --help\n", stderr);
+        std::cerr << "velks-check: wrong usage; see velks-check --help\n";
         return kWrongUsage;
     }
 
     const Findings findings = checkAll();
     const QByteArray report = parser.isSet(json) ? jsonReport(findings) : textReport(findings);
-    std::fputs(report.constData(), stdout);
+    std::cout << report.constData();
     return static_cast<int>(overall(findings));
 }
