@@ -8,7 +8,7 @@ import signal
 import subprocess
 from concurrent.futures import Future
 from pathlib import Path
-from typing import Any, Iterable, Literal
+from typing import Any, Callable, Iterable, Literal
 from xml.etree import ElementTree
 
 import dbus
@@ -63,6 +63,7 @@ class Bus:
         self._pid_file = layout.BOX / f"{kind}-bus.pid"
         self._daemon: subprocess.Popen[bytes] | None = None
         self._control: Any = None
+        self._listeners: list[Callable[[], None]] = []
         # Unique names are never used again while the bus runs.
         self._processes: dict[str, int] = {}
 
@@ -85,36 +86,39 @@ class Bus:
             folder.mkdir(parents=True, exist_ok=True)
         config = self._pid_file.with_suffix(".conf")
         config.write_text(_CONFIG.format(kind=self.kind, socket=self._socket, limits=_limits(self.kind)))
+        log = self._pid_file.with_suffix(".log")
         reading, writing = os.pipe()
-        self._daemon = subprocess.Popen(
-            [
-                "dbus-daemon",
-                f"--config-file={config}",
-                "--nofork",
-                "--nosyslog",
-                f"--print-address={writing}",
-            ],
-            pass_fds=[writing],
-            stdin=subprocess.DEVNULL,
-            stdout=subprocess.DEVNULL,
-            # Its own group: Ctrl+C at a prompt must not take the buses away from the fakes.
-            start_new_session=True,
-        )
+        with log.open("wb") as log_file:
+            self._daemon = subprocess.Popen(
+                [
+                    "dbus-daemon",
+                    f"--config-file={config}",
+                    "--nofork",
+                    "--nosyslog",
+                    f"--print-address={writing}",
+                ],
+                pass_fds=[writing],
+                stdin=subprocess.DEVNULL,
+                stdout=subprocess.DEVNULL,
+                stderr=log_file,
+                # Its own group: Ctrl+C at a prompt must not take the buses away from the fakes.
+                start_new_session=True,
+            )
         # The daemon would write it only after it has said that it is ready.
         self._pid_file.write_text(str(self._daemon.pid))
         os.close(writing)
         with open(reading) as printed:
             if not printed.readline():
-                raise RuntimeError(f"the {self.kind} bus did not start")
+                raise RuntimeError(f"the {self.kind} bus did not start: {log.read_text()}")
+        for listener in self._listeners:
+            listener()
 
     def stop(self) -> None:
         """End the bus daemon, if it runs, and with it every connection."""
-        self.run += 1
-        self._control = None
-        self._processes.clear()
         pid = self.pid
         if pid is not None:
             _end(pid)
+        MainLoop.call(self._forget)
         if self._daemon:
             self._daemon.wait(_STOP_SECONDS)
             self._daemon = None
@@ -125,6 +129,11 @@ class Bus:
         """Replace the bus daemon by a fresh one that nobody is connected to."""
         self.stop()
         self.start()
+
+    def when_started(self, listener: Callable[[], None]) -> None:
+        """Call `listener` now, when the bus runs, and again after each start."""
+        self._listeners.append(listener)
+        listener()
 
     def connect(self) -> Any:
         """A new private connection with a unique name of its own; to be used on the main loop's thread."""
@@ -145,12 +154,7 @@ class Bus:
 
     def process_of(self, unique_name: str) -> int | None:
         """Process id behind a connection; None when it had gone before anybody asked."""
-        if unique_name not in self._processes:
-            try:
-                self._processes[unique_name] = int(self.ask("GetConnectionUnixProcessID", "s", unique_name))
-            except dbus.DBusException:
-                return None
-        return self._processes[unique_name]
+        return self._processes.get(unique_name) or MainLoop.call(self._ask_for_process, unique_name)
 
     def names_of(self, pid: int) -> list[str]:
         """Unique names of the connections that a process has open."""
@@ -164,6 +168,22 @@ class Bus:
     def ask(self, member: str, signature: str, *args: Any) -> Any:
         """Call a method of the bus itself."""
         return MainLoop.call(self._ask, member, signature, args)
+
+    def _ask_for_process(self, unique_name: str) -> int | None:
+        # The connection may have ended since somebody else has asked.
+        if unique_name not in self._processes:
+            try:
+                process = int(self._ask("GetConnectionUnixProcessID", "s", (unique_name,)))
+            except dbus.DBusException:
+                return None
+            self._processes[unique_name] = process
+        return self._processes[unique_name]
+
+    def _forget(self) -> None:
+        """On the main loop's thread, where no question to the bus that has ended is half asked."""
+        self.run += 1
+        self._control = None
+        self._processes.clear()
 
     def _ask(self, member: str, signature: str, args: tuple[Any, ...]) -> Any:
         if self._control is None:

@@ -10,6 +10,7 @@ from uuid import uuid4
 from sandbox import commands
 from sandbox.agent import Agent
 from sandbox.buses import Bus
+from sandbox.busmonitor import BusMonitor
 from sandbox.clock import Clock, ManualClock
 from sandbox.contracts import Contracts
 from sandbox.events import Events
@@ -60,6 +61,9 @@ class Terminal:
         self.network = Network()
         self.senders = Senders()
         self._add_peers()
+        self.system_monitor = self._monitor(self.system_bus)
+        self.session_monitor = self._monitor(self.session_bus)
+        self.monitors = (self.system_monitor, self.session_monitor)
         self.agent = Agent(self.events, self.senders)
         unknown = set(absent) - self.peers.keys()
         assert not unknown, f"no such peers: {unknown}"
@@ -91,6 +95,10 @@ class Terminal:
             self.launcher,
         )
         self.peers = {peer.name: peer for peer in peers}
+
+    def _monitor(self, bus: Bus) -> BusMonitor:
+        served = [peer.bus_name for peer in self.peers.values() if peer.bus is bus]
+        return BusMonitor(bus, self.senders, served)
 
     def __enter__(self) -> Terminal:
         return self
@@ -155,6 +163,8 @@ class Terminal:
         for peer in self.peers.values():
             if peer.present:
                 peer.receive_all_from(self.agent.pid)
+        for monitor in self.monitors:
+            monitor.receive_all()
 
     def advance(self, seconds: int) -> None:
         """Move the agent's clock ahead and return once the timers that became due have fired.
@@ -174,10 +184,12 @@ class Terminal:
         self.daemon.push_policy("wake up")
 
     def violations(self) -> list[str]:
-        """In what contracts were broken so far: interfaces by a caller, JSON by the agent or the platform."""
+        """In what contracts were broken so far: interfaces by a caller, JSON by the agent or the platform, or
+        all of them by the agent that asked for what nobody serves."""
         return [
             *self.contracts.violations,
             *(found for peer in self.peers.values() for found in peer.violations),
+            *(found for monitor in self.monitors for found in monitor.violations),
         ]
 
     def report(self) -> str:
@@ -199,6 +211,8 @@ class Terminal:
             self.agent.stop()
         except AssertionError as error:
             problems.append(str(error))
+        for monitor in self.monitors:
+            monitor.close()
         problems += self.violations()
         for peer in self.peers.values():
             peer.leave()

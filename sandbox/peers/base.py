@@ -178,19 +178,22 @@ class Peer:
             "serial": message.get_serial(),
             "arguments": args,
         }
-        violation = self._violation(message)
-        if violation:
-            self.violations.append(f"{self.name}: {violation}")
+        try:
+            self._check(message)
+        except Refused as refused:
+            self.violations.append(f"{self.name}: {refused}")
         source = self._senders.label(self.bus, message.get_sender())
         simple = tuple(plain(arg) for arg in args)
         self._events.record(source, self.name, "call", message.get_member(), simple, detail)
         return simple
 
-    def _violation(self, message: Any) -> str | None:
+    def _check(self, message: Any) -> None:
+        """Refused if a call breaks the contract of the object that it is for."""
         known = self.objects.get(message.get_path())
         if known is None:
-            return f"no object {message.get_path()}"
-        return known.violation(str(message.get_interface()), message.get_member(), message.get_signature())
+            raise Refused("UnknownObject", f"no object {message.get_path()}")
+        arguments = message.get_args_list()
+        known.check(str(message.get_interface()), message.get_member(), message.get_signature(), arguments)
 
     def _fault_for(self, member: str, args: tuple[Any, ...]) -> Fault:
         is_property = member in ("Get", "Set") and len(args) > 1
@@ -214,9 +217,7 @@ class Peer:
         path = message.get_path()
         if path in self.withdrawn:
             raise Refused("UnknownObject", f"no object {path}")
-        broken = self._violation(message)
-        if broken:
-            raise Refused("UnknownMethod", broken)
+        self._check(message)
         args = tuple(plain(arg) for arg in message.get_args_list())
         return self.objects[path].call(str(message.get_interface()), message.get_member(), args)
 

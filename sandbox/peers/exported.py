@@ -3,12 +3,12 @@
 from __future__ import annotations
 
 from dataclasses import dataclass
-from typing import Any, Callable
+from typing import Any, Callable, Sequence
 from xml.sax.saxutils import quoteattr
 
 from sandbox.peers import contract
 from sandbox.peers.contract import Contract
-from sandbox.peers.values import plain, typed
+from sandbox.peers.values import plain, signature_in_variant, typed
 
 PROPERTIES = "org.freedesktop.DBus.Properties"
 INTROSPECTABLE = "org.freedesktop.DBus.Introspectable"
@@ -69,20 +69,23 @@ class ExportedObject:
         """Value of a property as it goes out on the bus."""
         return self._values[name]
 
-    def violation(self, interface: str, member: str, signature: str) -> str | None:
-        """In what a call breaks the contract, None when it keeps to it."""
+    def check(self, interface: str, member: str, signature: str, args: Sequence[Any]) -> None:
+        """Refused if a call, with its arguments as they came, breaks the contract."""
         expected = _STANDARD_METHODS.get((interface, member))
         if expected is None:
             methods = self.contracts[interface].methods if interface in self.contracts else {}
             if member not in methods:
-                return f"{self.path} has no method {interface}.{member}"
+                raise Refused("UnknownMethod", f"{self.path} has no method {interface}.{member}")
             expected = methods[member].arguments
         if signature != expected:
-            return f"{interface}.{member} takes ({expected}), called with ({signature})"
-        return None
+            raise Refused(
+                "InvalidArgs", f"{interface}.{member} takes ({expected}), called with ({signature})"
+            )
+        if interface == PROPERTIES:
+            self._check_property_call(*args)
 
     def call(self, interface: str, member: str, args: tuple[Any, ...]) -> Reply:
-        """Carry out a call that keeps to the contract; raises Refused."""
+        """Carry out a call that keeps to the contract."""
         if interface == INTROSPECTABLE:
             return Reply("s", (self._introspection(),))
         if interface == PROPERTIES:
@@ -97,16 +100,28 @@ class ExportedObject:
                 name: value for name, value in self._values.items() if self.interface_of(name) == args[0]
             }
             return Reply("a{sv}", (values,))
-        interface, name, *rest = args
-        found, known = self._property(name)
-        if found.name != interface:
-            raise Refused("UnknownProperty", f"no property {interface}.{name}")
+        _, name, *rest = args
         if member == "Get":
             return Reply("v", (self._values[name],))
-        if "write" not in known.access:
-            raise Refused("PropertyReadOnly", f"{interface}.{name} is read-only")
         self.set(name, rest[0])
         return Reply("", ())
+
+    def _check_property_call(self, interface: str, name: str | None = None, *values: Any) -> None:
+        if interface not in self.contracts:
+            raise Refused("UnknownInterface", f"{self.path} has no interface {interface}")
+        if name is None:
+            return
+        known = self.contracts[interface].properties.get(name)
+        if known is None:
+            raise Refused("UnknownProperty", f"{self.path} has no property {interface}.{name}")
+        if values:
+            self._check_change(f"{interface}.{name}", known, signature_in_variant(values[0]))
+
+    def _check_change(self, name: str, known: contract.Property, signature: str) -> None:
+        if "write" not in known.access:
+            raise Refused("PropertyReadOnly", f"{name} is read-only")
+        if signature != known.signature:
+            raise Refused("InvalidArgs", f"{name} is ({known.signature}), set to ({signature})")
 
     def _property(self, name: str) -> tuple[Contract, contract.Property]:
         for candidate in self.contracts.values():

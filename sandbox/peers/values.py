@@ -35,6 +35,25 @@ def typed(signature: str, value: Any) -> Any:
     return value
 
 
+def signature_in_variant(value: Any) -> str:
+    """The type of what a received variant holds."""
+    return "v" if getattr(value, "variant_level", 0) > 1 else _signature(value)
+
+
+def _signature(value: Any) -> str:
+    if isinstance(value, dbus.Struct):
+        return f"({''.join(_signature_of_item(item) for item in value)})"
+    if isinstance(value, dbus.Dictionary):
+        return f"a{{{value.signature}}}"
+    if isinstance(value, dbus.Array):
+        return f"a{value.signature}"
+    return next(signature for signature, kind in _BASIC.items() if kind is type(value))
+
+
+def _signature_of_item(item: Any) -> str:
+    return "v" if getattr(item, "variant_level", 0) > 0 else _signature(item)
+
+
 def plain(value: Any) -> Any:
     """A D-Bus value as bool, int, float, str, list, tuple or dict."""
     if isinstance(value, dbus.Boolean):

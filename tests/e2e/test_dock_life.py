@@ -11,7 +11,7 @@ from sandbox.peers import dock
 from sandbox.peers.exported import PROPERTIES
 from sandbox.spoofer import Stranger
 from sandbox.terminal import Terminal
-from wire import carries_out_policies
+from wire import STATE_QUESTIONS, asked_of_the_session_bus, carries_out_policies
 
 WAITING = "dock service is not registered, wait.."
 
@@ -54,6 +54,12 @@ def test_an_absent_dock_is_warned_of_once_and_nothing_is_told(terminal: Terminal
     terminal.sync()
 
     assert (told(terminal), scans(terminal), warnings(terminal)) == ([], [], [WAITING])
+
+
+def test_a_late_dock_is_waited_for_without_asking(terminal: Terminal) -> None:
+    start_without_dock(terminal)
+
+    assert asked_of_the_session_bus(terminal, lambda: terminal.advance(3600)) == STATE_QUESTIONS
 
 
 def test_a_late_dock_is_read_whole_and_then_followed(terminal: Terminal) -> None:

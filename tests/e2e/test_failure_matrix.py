@@ -1,4 +1,4 @@
-"""Whatever happens to one service: policies go on, reports go on, and no call is waited for past its limit."""
+"""Whatever happens to one service: policies and reports go on, and no call is waited for past its limit."""
 
 from __future__ import annotations
 
@@ -52,7 +52,7 @@ def lie(peer: Peer) -> None:
 
 
 def let_limits_pass(terminal: Terminal, limit: int, kind: str, name: str) -> None:
-    """With each request that comes to a service, the time that the agent waits for an answer passes at once."""
+    """With each request that comes to a service, the time that the agent waits for its answer passes."""
 
     def on_event(event: Event) -> None:
         if (event.source, event.kind, event.target) == ("velks", kind, name):

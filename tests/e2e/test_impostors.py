@@ -132,8 +132,8 @@ def test_stranger_that_speaks_like_the_launcher_is_ignored(
     assert (settled(terminal, mark), uploads(terminal, mark)) == ([], [])
 
 
-# Every signal with arguments that the agent listens to: whose it is, where it is sent from, and what it should
-# carry. The one without, pushOnlineMsg, says all by its name.
+# Every signal with arguments that the agent listens to: whose it is, where it is sent from, and what it
+# should carry. The one without, pushOnlineMsg, says all by its name.
 SIGNALS = [
     ("daemon", daemon.PATH, daemon.INTERFACE, "pushPolicyMsg", "ss"),
     ("dock", dock.PATH, dock.INTERFACE, "EntryAdded", "oi"),

@@ -14,6 +14,7 @@ from sandbox.commands import Answer
 from sandbox.peers.launcher import LauncherItem
 from sandbox.terminal import Terminal
 from software import EDITOR, PLAYER, announce, install, inventory_at_start, next_inventory, tool_calls
+from wire import log_lines
 
 FILES = {"daemon": layout.SOFTWARE_LIST, "policy service": layout.PRYG_SOFTWARE_LIST}
 LOGGED = " SoftwareGuard::getSoftwareList---------"
@@ -132,6 +133,28 @@ def test_each_record_costs_one_lookup_and_its_item_no_other(terminal: Terminal) 
         "editor",
         "player",
     ]
+
+
+@pytest.mark.parametrize("has_launcher", [True, False], ids=["no items", "no launcher"])
+def test_records_are_looked_up_even_if_there_is_nothing_to_report(
+    terminal: Terminal, has_launcher: bool
+) -> None:
+    if not has_launcher:
+        terminal.launcher.leave()
+    for tool in ("dpkg-query", "dpkg-architecture"):
+        terminal.tools.record(tool)
+    write(terminal, "daemon", record("editor"))
+    write(terminal, "policy service", record("player"))
+
+    terminal.start_agent()
+
+    calls = [(event.target, event.args[-1]) for event in terminal.events.all(kind="command")]
+    assert calls == [
+        ("dpkg-query", "editor"),
+        ("dpkg-query", "player"),
+        ("dpkg-architecture", "DEB_HOST_ARCH_CPU"),
+    ]
+    assert "SoftwareGuard::getSoftwareList()--11111111111- 2" in log_lines(terminal, 0)
 
 
 @pytest.mark.parametrize("content", BROKEN, ids=lambda content: repr(content[:20]))

@@ -127,6 +127,15 @@ def test_link_is_looked_up_by_its_target(terminal: Terminal, links: Path) -> Non
     assert lookup(terminal, link(f"{links}/a link.desktop", EDITOR.path)) == ("editor", "1")
 
 
+def test_link_to_a_file_that_no_package_owns_is_warned_of_by_its_target(
+    terminal: Terminal, links: Path
+) -> None:
+    lookup(terminal, link(f"{links}/link.desktop", EDITOR.path))
+
+    warnings = [line.args[0] for line in terminal.events.all(kind="log", member="warning")]
+    assert warnings[0] == f'get package name failed, desktop: "{EDITOR.path}" ""'
+
+
 def test_links_relative_target_begins_at_the_link(terminal: Terminal) -> None:
     install(terminal, EDITOR)
     path = link(desktop_file("sub/link"), "../editor.desktop")

@@ -93,6 +93,27 @@ def test_hung_tool_is_ended_once_it_is_given_up(terminal: Terminal, tool: str) -
     assert not is_running(process)
 
 
+@pytest.mark.parametrize(
+    ("tool", "printed", "value"),
+    [
+        ("dpkg", b"player: /x\n", "player"),
+        ("dpkg-query", b"'1'", "failed"),
+        ("dpkg-architecture", b"slow\n", "failed"),
+    ],
+)
+def test_what_a_tool_printed_before_it_hung_counts_for_the_package_alone(
+    terminal: Terminal, tool: str, printed: bytes, value: str
+) -> None:
+    install(terminal, EDITOR)
+    mark, _ = start_with_hung(terminal, tool)
+    terminal.tools.nudge(tool, printed)
+
+    pass_time(terminal, tool, TOOL_LIMIT)
+
+    assert is_given_up(terminal, tool)
+    assert next_inventory(terminal, mark)[0][WHEN_GIVEN_UP[tool][0]] == value
+
+
 @pytest.mark.parametrize("tool", TOOLS)
 def test_slow_tool_is_waited_for(terminal: Terminal, tool: str) -> None:
     install(terminal, EDITOR)
@@ -240,6 +261,11 @@ def languages(terminal: Terminal, tool: str) -> list[str | None]:
 def start_recorded(terminal: Terminal, **environment: Any) -> None:
     """Start the agent with two items; each call of a tool is recorded."""
     install(terminal, EDITOR, PLAYER)
+    record_and_start(terminal, environment)
+
+
+def record_and_start(terminal: Terminal, environment: dict[str, str]) -> None:
+    """Start the agent with these variables; each call of a tool is recorded."""
     for tool in TOOLS:
         terminal.tools.record(tool)
     terminal.start_agent(extra_env=environment)
@@ -257,6 +283,18 @@ def test_first_version_is_asked_for_in_the_sessions_language(terminal: Terminal)
     start_recorded(terminal, LC_ALL="zh_CN.UTF-8")
 
     assert languages(terminal, "dpkg-query") == ["zh_CN.UTF-8", "C"]
+
+
+@pytest.mark.parametrize("environment", [{}, {"LC_ALL": "zh_CN.UTF-8"}], ids=["none", "Chinese"])
+def test_item_without_a_package_leaves_the_language_to_the_sessions(
+    terminal: Terminal, environment: dict[str, str]
+) -> None:
+    install(terminal, PLAYER)
+    terminal.launcher.items = [EDITOR, PLAYER]
+    record_and_start(terminal, environment)
+
+    assert languages(terminal, "dpkg") == [environment.get("LC_ALL")] * 2
+    assert languages(terminal, "dpkg-query") == [environment.get("LC_ALL")]
 
 
 def test_other_tools_speak_plainly_once_a_version_was_asked_for(terminal: Terminal) -> None:

@@ -110,9 +110,7 @@ def test_a_login_manager_that_has_gone_by_the_last_second_is_one_warning(termina
     terminal.sync()
     terminal.logind.leave()
     terminal.advance(60)
-    assert [line.partition(":")[0] for line in warnings(terminal, mark)] == [
-        "cannot call Terminate"
-    ]
+    assert [line.partition(":")[0] for line in warnings(terminal, mark)] == ["cannot call Terminate"]
     terminal.logind.appear()
     terminal.advance(FIVE_MINUTES)
     assert forced_actions(terminal, mark) == []

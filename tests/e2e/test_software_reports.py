@@ -139,6 +139,15 @@ def test_change_tells_the_time_and_the_alias_of_that_moment(terminal: Terminal) 
     assert (change["operated_at"], change["pc_name"]) == (now(), "another name")
 
 
+def test_change_tells_the_time_of_the_sessions_zone(terminal: Terminal) -> None:
+    """The terminal's clock stands for the local time of whatever zone a program lives in."""
+    terminal.start_agent(extra_env={"TZ": "Asia/Shanghai"})
+
+    terminal.launcher.announce("created", EDITOR)
+
+    assert next_change(terminal)["operated_at"] == now()
+
+
 def test_change_asks_the_daemon_for_the_machine_and_the_inventory_keeps_the_one_of_the_start(
     terminal: Terminal,
 ) -> None:

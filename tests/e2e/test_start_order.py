@@ -30,6 +30,19 @@ def test_dock_is_not_asked_before_the_launcher_has_answered(terminal: Terminal) 
     terminal.events.wait_for(target="dock", member="Get", after=mark)
 
 
+def test_login_manager_is_not_asked_before_the_first_inventory_is_made(terminal: Terminal) -> None:
+    install(terminal, EDITOR)
+    mark = start_until(terminal, "launcher", "GetAllItemInfos")
+    terminal.receive_all()
+    assert terminal.events.all(target="logind", after=mark) == []
+
+    terminal.launcher.release()
+
+    terminal.events.wait_for(target="logind", member="Get", after=mark)
+    terminal.receive_all()
+    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY]
+
+
 def test_session_is_announced_before_the_dock_has_answered(terminal: Terminal) -> None:
     install(terminal, EDITOR)
     terminal.dock.open_app("mail", "Mail")

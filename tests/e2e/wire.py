@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 from dataclasses import dataclass
-from typing import Any
+from typing import Any, Callable
 from uuid import uuid4
 
 from sandbox.events import Event
@@ -12,6 +12,11 @@ from sandbox.terminal import Terminal
 FORWARDED_CODE = 5
 # The agent's five-minute timer is coarse: half a second more or less.
 FIVE_MINUTES = 301
+# What the agent asks the session bus itself each time that it reports the session's state.
+STATE_QUESTIONS = [
+    ("NameHasOwner", "com.norix.ScreenSaver"),
+    ("NameHasOwner", "com.norix.SessionManager"),
+]
 
 
 @dataclass(frozen=True)
@@ -70,6 +75,17 @@ def settled(terminal: Terminal, after: int) -> list[Event]:
     terminal.sync()
     actions = [event for event in terminal.events.all(source="velks", after=after) if event.kind != "log"]
     return [event for event in actions if marker not in str(event.args)]
+
+
+def asked_of_the_session_bus(terminal: Terminal, change: Callable[[], object]) -> list[tuple[str, ...]]:
+    """What the agent asks the session bus itself, or services that are absent, while this happens."""
+    terminal.receive_all()
+    before = len(terminal.session_monitor.calls)
+    change()
+    terminal.receive_all()
+    present = [peer.bus_name for peer in terminal.peers.values() if peer.present]
+    calls = terminal.session_monitor.calls[before:]
+    return [(call.member, *call.args) for call in calls if call.destination not in present]
 
 
 def log_lines(terminal: Terminal, after: int) -> list[str]:

@@ -2,18 +2,34 @@
 
 from __future__ import annotations
 
+import re
 from concurrent.futures import ThreadPoolExecutor
 from typing import Any, Iterator
 
 import dbus
 import pytest
 
+from sandbox.buses import Bus
 from sandbox.peers.fault import Fault
 from sandbox.spoofer import Stranger
 from sandbox.terminal import Terminal
 
 DAEMON = ("com.norix.velk.velkg", "/com/norix/velk/velkg", "com.norix.velk.velkg")
 SCREEN_SAVER = ("com.norix.ScreenSaver", "/com/norix/ScreenSaver", "org.freedesktop.DBus.Properties")
+
+IDENTITY = ("com.norix.velk.iam", "/com/norix/velk/iam", "org.freedesktop.DBus.Properties")
+
+
+def property_call(bus: Bus, known: tuple[str, ...], member: str, *args: Any) -> Any:
+    """What a service answers to a client that reads or sets a property; the last part of an error's name."""
+    client = Stranger(bus)
+    signature = {"Get": "ss", "GetAll": "s", "Set": "ssv"}[member]
+    try:
+        return client.call(*known, member, *args, signature=signature)
+    except dbus.DBusException as error:
+        return error.get_dbus_name().rpartition(".")[2]
+    finally:
+        client.close()
 
 
 @pytest.fixture
@@ -59,6 +75,57 @@ def test_a_call_that_breaks_the_contract_fails_the_test(
 
     with pytest.raises(AssertionError, match=member):
         terminal.close()
+
+
+@pytest.mark.parametrize(
+    ("args", "error", "complaint"),
+    [
+        (("Get", IDENTITY[0], "enable"), "UnknownProperty", "com.norix.velk.iam.enable"),
+        (("Get", "com.norix.iam", "Enable"), "UnknownInterface", "com.norix.iam"),
+        (("GetAll", "com.norix.iam"), "UnknownInterface", "com.norix.iam"),
+        (("Set", IDENTITY[0], "enable", True), "UnknownProperty", "com.norix.velk.iam.enable"),
+    ],
+    ids=str,
+)
+def test_a_property_that_no_contract_has_fails_the_test(
+    args: tuple[Any, ...], error: str, complaint: str
+) -> None:
+    with pytest.raises(AssertionError, match=f"(?m)^identity: .* {complaint}$"), Terminal() as terminal:
+        assert property_call(terminal.system_bus, IDENTITY, *args) == error
+
+
+def test_a_change_of_a_property_that_is_only_read_fails_the_test() -> None:
+    with pytest.raises(AssertionError, match="isRunning is read-only"), Terminal() as terminal:
+        refused = property_call(terminal.session_bus, SCREEN_SAVER, "Set", SCREEN_SAVER[0], "isRunning", True)
+        assert (refused, terminal.screensaver.value("isRunning")) == ("PropertyReadOnly", False)
+
+
+@pytest.mark.parametrize(
+    ("value", "signature"),
+    [
+        (dbus.Int32(0), "i"),
+        (dbus.UInt32(0), "u"),
+        ("false", "s"),
+        (dbus.ObjectPath("/"), "o"),
+        (dbus.Boolean(False, variant_level=2), "v"),
+        (dbus.Array([True], "b"), "ab"),
+        (dbus.Array([[True]], "av"), "aav"),
+        (dbus.Dictionary({"a": 1}, "sv"), "a{sv}"),
+        (dbus.Struct((1, "a", dbus.Boolean(True, variant_level=1))), "(isv)"),
+    ],
+    ids=str,
+)
+def test_a_property_set_to_a_value_of_another_type_fails_the_test(value: Any, signature: str) -> None:
+    complaint = f"Enable is (b), set to ({signature})"
+    with pytest.raises(AssertionError, match=re.escape(complaint)), Terminal() as terminal:
+        refused = property_call(terminal.system_bus, IDENTITY, "Set", IDENTITY[0], "Enable", value)
+        assert (refused, terminal.identity.value("Enable")) == ("InvalidArgs", True)
+
+
+def test_a_property_may_be_read_and_set_as_its_contract_says(terminal: Terminal) -> None:
+    assert property_call(terminal.system_bus, IDENTITY, "Set", IDENTITY[0], "Enable", False) == []
+    assert property_call(terminal.system_bus, IDENTITY, "Get", IDENTITY[0], "Enable") is False
+    assert property_call(terminal.system_bus, IDENTITY, "GetAll", IDENTITY[0]) == {"Enable": False}
 
 
 def test_a_failing_service_answers_with_its_error(terminal: Terminal, caller: Stranger) -> None:

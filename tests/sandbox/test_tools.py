@@ -73,17 +73,17 @@ def test_held_tool_hangs_until_it_is_released(terminal: Terminal) -> None:
 
 def test_held_tool_can_be_nudged_without_its_end(terminal: Terminal) -> None:
     terminal.tools.hold("dpkg-query")
-    with subprocess.Popen(QUERY, stderr=subprocess.PIPE, text=True) as child:
-        assert child.stderr
+    with subprocess.Popen(QUERY, stdout=subprocess.PIPE, stderr=subprocess.PIPE) as child:
+        assert child.stdout and child.stderr
         terminal.events.wait_for(kind="command", target="dpkg-query")
-        nudging = threading.Thread(target=terminal.tools.nudge, args=("dpkg-query",))
+        nudging = threading.Thread(target=terminal.tools.nudge, args=("dpkg-query", b"half\n"))
         nudging.start()
-        read = child.stderr.readline()
+        read = (child.stdout.readline(), child.stderr.readline())
         nudging.join()
         still_there = child.poll() is None
         terminal.tools.release("dpkg-query")
 
-    assert (read, still_there) == ("\n", True)
+    assert (read, still_there) == ((b"half\n", b"\n"), True)
 
 
 def test_tool_that_was_ended_is_not_nudged(terminal: Terminal) -> None:

@@ -37,6 +37,7 @@ private Q_SLOTS:
     void accountPolicyNamesUserByUid();
     void accountPolicyCheckIsLogged();
     void messageWithoutPayloadNamesNobodyNotEvenRoot();
+    void messageWithoutUidNamesRoot();
     void countdownTakesAMinute();
     void countdownIsNotRounded();
     void expiredCountdownStops_data();
@@ -168,6 +169,18 @@ void MessageTransferTest::messageWithoutPayloadNamesNobodyNotEvenRoot()
     MessageTransfer transfer;
     pretendedUid = 0;
     QVERIFY(!transfer.isExecPolicyByUID(message));
+}
+
+void MessageTransferTest::messageWithoutUidNamesRoot()
+{
+    QJsonObject message{{QStringLiteral("payload"), QJsonObject()}};
+    MessageTransfer transfer;
+    pretendedUid = 0;
+    QVERIFY(transfer.isExecPolicyByUID(message));
+    for (const uid_t other : {1U, static_cast<uid_t>(-1)}) {
+        pretendedUid = other;
+        QVERIFY(!transfer.isExecPolicyByUID(message));
+    }
 }
 
 void MessageTransferTest::countdownTakesAMinute()
