@@ -1,4 +1,4 @@
-"""`run` enters a box, `inside` is its first process; `demo` and `box` are for people."""
+"""`run` enters a box, `inside` is its first process; `demo`, `box` and `soak` are for people."""
 
 from __future__ import annotations
 
@@ -44,11 +44,12 @@ def _run_for_people(verb: str, arguments: list[str]) -> int:
     from sandbox import outside
     from sandbox.demo import main as demo
     from sandbox.prompt import main as prompt
+    from sandbox.soak import main as soak
 
     # A box is deaf to Ctrl+C (see outside.enter), and so are at first the programs in it.
     signal.signal(signal.SIGINT, signal.default_int_handler)
     try:
-        return demo.run(arguments) if verb == "demo" else prompt.run(arguments)
+        return {"demo": demo.run, "box": prompt.run, "soak": soak.run}[verb](arguments)
     except outside.Trouble as trouble:
         print(f"{verb}: {trouble}", file=sys.stderr)
         return 1
@@ -63,7 +64,7 @@ def main() -> int:
         from sandbox import inside  # needs D-Bus, which only the box must have
 
         return inside.run(arguments[1:])
-    if verb in ("demo", "box"):
+    if verb in ("demo", "box", "soak"):
         return _run_for_people(verb, arguments)
     _enter(arguments)
     return 0

@@ -39,12 +39,12 @@ class Accelerated:
 class ManualClock:
     """Time that stands still until it is moved, so that a timer fires at its exact second or not at all.
 
-    It begins at the host's time, which certificates are valid at. A sleeping program does not see a move
-    before it wakes up: see Terminal.advance.
+    It begins at the host's time, unless another is given; certificates must be valid then. A sleeping program
+    does not see a move before it wakes up: see Terminal.advance.
     """
 
-    def __init__(self) -> None:
-        self._now = datetime.now().replace(microsecond=0)
+    def __init__(self, begin: datetime | None = None) -> None:
+        self._now = (begin or datetime.now()).replace(microsecond=0)
         self._write()
 
     def environment(self) -> dict[str, str]:

@@ -75,11 +75,11 @@ class Commands:
         if gate:
             gate.set()
 
-    def nudge(self, name: str) -> int:
-        """Let the held calls of command `name` write a blank line to their standard error, which makes those
-        who wait for them look at the clock again. Returns when all is read: the number of calls, without
-        those that were ended meanwhile."""
-        self._held[name] = [call for call in self._held.pop(name, []) if call.nudge()]
+    def nudge(self, name: str, printed: bytes = b"") -> int:
+        """Let the held calls of command `name` write `printed` to their standard output and a blank line to
+        their standard error, which makes those who wait for them look at the clock again. Returns when all is
+        read: the number of calls, without those that were ended meanwhile."""
+        self._held[name] = [call for call in self._held.pop(name, []) if call.nudge(printed)]
         return len(self._held[name])
 
     def pass_on(self, name: str, unless: str, program: str) -> None:
@@ -129,9 +129,10 @@ class _Call(socketserver.StreamRequestHandler):
             program=answer.program,
         )
 
-    def nudge(self) -> bool:
-        """Let the held command write to its standard error; false if it was ended before somebody read it."""
-        return self._tell(nudge=True) and self.rfile.readline() != b""
+    def nudge(self, printed: bytes) -> bool:
+        """Let the held command print this and write to its standard error; false if it was ended before
+        somebody read it."""
+        return self._tell(nudge=True, stdout=printed.hex()) and self.rfile.readline() != b""
 
     def _tell(self, **what: Any) -> bool:
         try:

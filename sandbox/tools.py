@@ -48,9 +48,10 @@ class Tools:
         """Let the held calls of a tool end, and later ones pass."""
         self._commands.release(name)
 
-    def nudge(self, name: str) -> int:
-        """Wake up those who wait for the held calls of a tool, which go on; how many still wait."""
-        return self._commands.nudge(name)
+    def nudge(self, name: str, printed: bytes = b"") -> int:
+        """Wake up those who wait for the held calls of a tool, which print this and go on; how many still
+        wait."""
+        return self._commands.nudge(name, printed)
 
     def write(self, name: str, script: str) -> None:
         """Replace a tool by a script."""

@@ -26,6 +26,13 @@ def call_policy_service(text):
     call = dbus.SessionBus().call_blocking
     call("{PRYS}", "/com/norix/velk/prys", "{PRYS}", "onPolicyMsg", "s", (text,))
 
+def ask(bus, name, member):
+    try:
+        bus = dbus.SystemBus() if bus == "system" else dbus.SessionBus()
+        bus.call_blocking(name, "/", name, member, "", ())
+    except dbus.DBusException:
+        pass
+
 def ask_platform(method, path, body):
     trust = ssl.create_default_context(cafile="{layout.SERVER_CERTIFICATE}")
     trust.load_cert_chain("{layout.CLIENT_CERTIFICATE}", "{layout.CLIENT_KEY}")

@@ -1,0 +1,127 @@
+"""The mutation check makes the changes it should, and its table and explanations keep up with the sources."""
+
+from __future__ import annotations
+
+import explanations
+import pytest
+from areas import AREAS, Area, area_of, chosen
+from mutants import mutants
+
+from sandbox import layout
+
+FUNCTION = "void Thing::act()\n{{\n    {}\n}}\n"
+
+
+def changes(statement: str) -> list[str]:
+    """What a line in a function is changed to."""
+    found, _ = mutants("thing.cpp", FUNCTION.format(statement))
+    return [mutant.after for mutant in found]
+
+
+@pytest.mark.parametrize(
+    ("statement", "expected"),
+    [
+        ("if (a == b) {}", {"if (a != b) {}"}),
+        ("if (a < b) {}", {"if (!(a < b)) {}", "if (a <= b) {}"}),
+        ("if (a && b) {}", {"if (!(a && b)) {}", "if (a || b) {}"}),
+        ("if (!a) {}", {"if (a) {}"}),
+        ("if (a) {}", {"if (!(a)) {}"}),
+        ("return a > b;", {"return a >= b;"}),
+        ("return a ? b : c;", {"return a && false ? b : c;", "return a || true ? b : c;"}),
+        ("set(true);", {"set(false);"}),
+        ("set(60000);", {"set(59999);", "set(60001);"}),
+        ('send("reboot");', {'send("");'}),
+        ('send(R"({"uuid":"%1"})");', {'send(R"()");'}),
+        ("first(); second();", {"second(); first();"}),
+        ('set(0); // 5 or "b"', {"set(-1);", "set(1);"}),
+    ],
+)
+def test_conditions_constants_and_orders_are_changed_one_at_a_time(
+    statement: str, expected: set[str]
+) -> None:
+    assert set(changes(statement)) == expected
+
+
+@pytest.mark.parametrize(
+    "statement",
+    [
+        'send("");',
+        "QList<int> list;",
+        "auto&& all = list;",
+        "call();",
+        "a.x = b; a.y = c;",
+        "call(); return;",
+        "const QString text = read(); show();",
+        "connect(a, b); call();",
+        "// if (a == b) { true; }",
+    ],
+)
+def test_what_would_change_nothing_is_left_alone(statement: str) -> None:
+    assert changes(statement) == []
+
+
+def test_a_field_that_is_set_from_another_one_is_not_moved_unnoticed() -> None:
+    assert changes("a.x = b; a.y = a.x;") == ["a.y = a.x; a.x = b;"]
+
+
+def test_what_only_changes_a_log_text_is_counted_and_left_out() -> None:
+    found, left_out = mutants("thing.cpp", FUNCTION.format('qInfo() << "text" << 5;'))
+    assert (found, left_out) == ([], 3)
+
+
+def test_a_mutant_says_where_it_is() -> None:
+    (mutant,) = mutants("thing.cpp", FUNCTION.format("set(true);"))[0]
+    assert str(mutant) == "thing.cpp:3: set(true); → set(false);"
+    assert mutant.function == "act"
+    assert mutant.content == FUNCTION.format("set(false);")
+
+
+@pytest.mark.parametrize("area", AREAS, ids=lambda area: f"{area.file}, {area.component}")
+def test_the_table_names_sources_functions_and_tests_that_exist(area: Area) -> None:
+    source = (layout.REPOSITORY / area.file).read_text()
+    tests = layout.REPOSITORY / "tests"
+    assert [name for name in area.functions if f"{name}(" not in source] == []
+    assert [name for name in area.unit if not (tests / "unit" / f"{name}.cpp").exists()] == []
+    modules = {name: tests / "e2e" / f"test_{name}.py" for name in (*area.e2e, *area.local)}
+    assert [name for name, file in modules.items() if not file.exists()] == []
+    assert [name for name in area.local if "local_user" not in modules[name].read_text()] == []
+
+
+def test_a_function_belongs_to_the_area_that_names_it() -> None:
+    file = "src/velk/velks/message_transfer.cpp"
+    components = {
+        name: area_of(file, name).component for name in ("onPolicyMsg", "statusOf", "uploadSoftware")
+    }
+    assert components == {
+        "onPolicyMsg": "dispatcher",
+        "statusOf": "state report",
+        "uploadSoftware": "uploads",
+    }
+
+
+def test_sources_are_chosen_by_name_or_pattern() -> None:
+    assert {area.file for area in chosen(["software_*.cpp"])} == {"src/velk/velks/software_report.cpp"}
+    with pytest.raises(ValueError, match="no tests are known for nothing.cpp"):
+        chosen(["nothing.cpp"])
+
+
+def test_every_explanation_is_of_a_mutant_that_still_exists() -> None:
+    known = explanations.read(explanations.FILE.read_text())
+    files = {key.place.split()[0] for key in known}
+    existing = {
+        explanations.key_of(mutant)
+        for file in files
+        for mutant in mutants(file, (layout.REPOSITORY / file).read_text())[0]
+    }
+    assert set(known) - existing == set()
+    assert all(known.values())
+
+
+def test_an_explanation_is_for_the_mutants_below_it() -> None:
+    text = "# remark\nA reason,\nin two lines.\na.cpp\n- a;\n+ b;\na.cpp\n- c;\n+ d;\n\n"
+    text += "Another.\nb.cpp\n- e;\n+ f;\n"
+    assert explanations.read(text) == {
+        ("a.cpp", "a;", "b;"): "A reason, in two lines.",
+        ("a.cpp", "c;", "d;"): "A reason, in two lines.",
+        ("b.cpp", "e;", "f;"): "Another.",
+    }

@@ -1,0 +1,125 @@
+"""A day in a few minutes tells what was lost and what grew, and its status whether anything did."""
+
+from __future__ import annotations
+
+import os
+import re
+from dataclasses import replace
+from pathlib import Path
+from random import Random
+
+import pytest
+from people import run_program, talking_agent
+
+from sandbox.agent import default_binary
+from sandbox.soak.deeds import Deeds
+from sandbox.soak.ledger import FORWARDED, KINDS, RECEIPTS, Ledger
+from sandbox.soak.vitals import Vitals, growth, vitals
+from sandbox.terminal import Terminal
+
+FIRST = Vitals(resident=20_000, private_dirty=3_000, descriptors=13, threads=2)
+ALLOWANCE = 100
+
+
+def test_after_an_hour_all_has_arrived_and_nothing_has_grown() -> None:
+    ended = run_program("soak", "--hours", "1")
+
+    assert (ended.returncode, ended.stderr) == (0, ""), ended.stdout
+    assert ended.stdout.endswith("soak: all arrived, nothing grew\n")
+    counts = re.findall(r"│ +([\d,]+) │ +([\d,]+) │$", ended.stdout, re.MULTILINE)
+    assert len(counts) == len(KINDS)
+    assert all(sent == arrived for sent, arrived in counts)
+
+
+def test_the_same_seed_gives_the_same_day_and_another_one_another() -> None:
+    days = [run_program("soak", "--hours", "1", "--seed", seed).stdout for seed in ("2", "2", "3")]
+
+    counts = [re.findall(r"^│.*│$", day, re.MULTILINE) for day in days]
+    assert counts[0] == counts[1] != counts[2]
+
+
+def test_what_arrives_without_being_sent_fails_the_day_and_is_named(tmp_path: Path) -> None:
+    real = str(default_binary())
+    twice = talking_agent(
+        tmp_path,
+        f"call_policy_service('{{\"type\":5}}')\nimport os\nos.execv({real!r}, [{real!r}])",
+    )
+
+    ended = run_program("soak", "--hours", "1", agent=twice)
+
+    assert ended.returncode == 1
+    named = r"""^policies forwarded: \d+ sent, \d+ arrived; 1 too many, such as \('{"type":5}',\)$"""
+    assert re.search(named, ended.stdout, re.MULTILINE), ended.stdout
+    assert ended.stdout.endswith("soak: something was lost or grew\n")
+
+
+def test_memory_beyond_the_allowance_fails_the_day_and_is_named() -> None:
+    ended = run_program("soak", "--hours", "1", "--allowance", "-100000")
+
+    assert ended.returncode == 1
+    assert re.search(
+        r"^resident memory grew from .* KiB; -100,000 KiB are allowed$", ended.stdout, re.MULTILINE
+    )
+
+
+def test_what_is_lost_on_the_way_is_named(terminal: Terminal) -> None:
+    ledger = Ledger(terminal.events)
+    deeds = Deeds(terminal, ledger, Random(1))
+    deeds.log_in()
+    terminal.policy_service.leave()
+    deeds.push_forwarded_policies()
+
+    sent = ledger.sent(FORWARDED)
+    assert sent > 0
+    (lost,) = [line for line in ledger.differences() if line.startswith(FORWARDED)]
+    assert lost.startswith(f'{FORWARDED}: {sent} sent, 0 arrived; {sent} missing, such as (\'{{"type": ')
+
+
+def test_another_piece_than_the_one_that_was_sent_counts_as_lost(terminal: Terminal) -> None:
+    ledger = Ledger(terminal.events)
+    ledger.expect(RECEIPTS, "u1")
+    terminal.events.record("velks", "platform", "http", "read", ("PUT", '{"uuid":"u2"}'))
+
+    assert ledger.differences() == [
+        f"{RECEIPTS}: 1 sent, 1 arrived; 1 missing, such as ('u1',); 1 too many, such as ('u2',)"
+    ]
+
+
+@pytest.mark.parametrize(
+    ("later", "named"),
+    [
+        (FIRST, []),
+        (replace(FIRST, resident=20_100, private_dirty=3_100, descriptors=12), []),
+        (
+            replace(FIRST, resident=20_101),
+            ["resident memory grew from 20,000 to 20,101 KiB; 100 KiB are allowed"],
+        ),
+        (
+            replace(FIRST, private_dirty=3_101),
+            ["private dirty memory grew from 3,000 to 3,101 KiB; 100 KiB are allowed"],
+        ),
+        (replace(FIRST, descriptors=14), ["open descriptors grew from 13 to 14"]),
+        (replace(FIRST, threads=3), ["threads grew from 2 to 3"]),
+    ],
+)
+def test_growth_is_named(later: Vitals, named: list[str]) -> None:
+    assert growth([FIRST, later], ALLOWANCE) == named
+
+
+def test_descriptors_that_are_given_back_later_have_grown_all_the_same() -> None:
+    assert growth([FIRST, replace(FIRST, descriptors=20), FIRST], ALLOWANCE) == [
+        "open descriptors grew from 13 to 20"
+    ]
+
+
+def test_vitals_are_those_of_the_process() -> None:
+    before = vitals(os.getpid())
+    opened = [os.open("/dev/null", os.O_RDONLY) for _ in range(3)]
+    held = bytearray(os.urandom(4 << 20))
+    after = vitals(os.getpid())
+    for descriptor in opened:
+        os.close(descriptor)
+
+    assert after.descriptors == before.descriptors + 3
+    assert after.private_dirty - before.private_dirty > len(held) // 1024 // 2
+    assert after.resident > after.private_dirty and after.threads >= 1
