@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <atomic>
+#include <mutex>
 
 #include "recorded_service.h"
 
@@ -21,7 +22,7 @@ public:
     /// What was never set is answered with an error.
     void set(const QString& path, const QString& property, const QVariant& value)
     {
-        const QMutexLocker locker(&m_mutex);
+        const std::lock_guard lock(m_mutex);
         m_values[path + property] = value;
     }
 
@@ -32,7 +33,7 @@ public:
     void answerAgain()
     {
         m_hangs = false;
-        const QMutexLocker locker(&m_mutex);
+        const std::lock_guard lock(m_mutex);
         for (const QDBusMessage& call : qAsConst(m_waiting)) {
             m_service.send(valueFor(call));
         }
@@ -53,7 +54,7 @@ public:
 private:
     QDBusMessage answer(const QDBusMessage& call)
     {
-        const QMutexLocker locker(&m_mutex);
+        const std::lock_guard lock(m_mutex);
         if (m_hangs) {
             m_waiting.append(call);
             return {};
@@ -68,7 +69,7 @@ private:
                                : call.createErrorReply(QDBusError::UnknownObject, QStringLiteral("unknown"));
     }
 
-    mutable QMutex m_mutex;
+    mutable std::mutex m_mutex; // see RecordedService
     QMap<QString, QVariant> m_values;
     QList<QDBusMessage> m_waiting;
     std::atomic_bool m_hangs = false;

@@ -4,6 +4,8 @@
 #include <QDebug>
 #include <QUuid>
 
+#include <mutex>
+
 class RecordedService::Object : public QDBusVirtualObject
 {
 public:
@@ -11,12 +13,16 @@ public:
         : m_answer(std::move(answer))
     { }
 
+    /// Waits for a call that is being recorded.
+    ~Object() override { const std::lock_guard lock(m_mutex); }
+    Q_DISABLE_COPY_MOVE(Object)
+
     QString introspect(const QString& /*path*/) const override { return QString(); }
 
     bool handleMessage(const QDBusMessage& message, const QDBusConnection& connection) override
     {
         {
-            const QMutexLocker locker(&m_mutex);
+            const std::lock_guard lock(m_mutex);
             m_calls.append(message);
         }
         const QDBusMessage reply = m_answer(message);
@@ -28,13 +34,13 @@ public:
 
     QList<QDBusMessage> calls() const
     {
-        const QMutexLocker locker(&m_mutex);
+        const std::lock_guard lock(m_mutex);
         return m_calls;
     }
 
 private:
     Answer m_answer;
-    mutable QMutex m_mutex;
+    mutable std::mutex m_mutex; // ThreadSanitizer does not know Qt's
     QList<QDBusMessage> m_calls;
 };
 
