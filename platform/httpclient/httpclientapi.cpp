@@ -111,11 +111,13 @@ QByteArray encodedUrl(const QString& url)
 }
 
 /// One request, on a handle of its own: a used handle reads freed memory when the next response begins with a
-/// folded header line (seen in libcurl 7.88). What is worth keeping lives in `share`.
+/// folded header line (seen in libcurl 7.88). What is worth keeping lives in `multi` and `share`: an easy
+/// handle that has to make a multi handle of its own opens and closes a pair of sockets for each request.
 class Exchange
 {
 public:
-    explicit Exchange(CURLSH* share)
+    Exchange(CURLM* multi, CURLSH* share)
+        : m_multi(multi)
     {
         Q_CHECK_PTR(m_curl);
         set(CURLOPT_SHARE, share);
@@ -177,7 +179,7 @@ public:
         set(CURLOPT_HEADERFUNCTION, receive<&Reception::addHeaderLine>);
         set(CURLOPT_HEADERDATA, &m_reception);
         if (m_result == CURLE_OK) {
-            m_result = curl_easy_perform(m_curl.get());
+            m_result = perform();
         }
         long status = 0;
         if (m_result == CURLE_OK) {
@@ -197,6 +199,23 @@ public:
     }
 
 private:
+    CURLcode perform()
+    {
+        curl_multi_add_handle(m_multi, m_curl.get());
+        CURLcode result = CURLE_FAILED_INIT;
+        int running = 1;
+        while (running > 0 && curl_multi_perform(m_multi, &running) == CURLM_OK && running > 0) {
+            curl_multi_poll(m_multi, nullptr, 0, static_cast<int>(kTotalLimitMs), nullptr);
+        }
+        int left = 0;
+        const auto* message = curl_multi_info_read(m_multi, &left);
+        if (message != nullptr && message->msg == CURLMSG_DONE) {
+            result = message->data.result;
+        }
+        curl_multi_remove_handle(m_multi, m_curl.get());
+        return result;
+    }
+
     // Nothing is sent once libcurl has rejected a setting.
     template <typename Value> void set(CURLoption option, Value value)
     {
@@ -210,6 +229,7 @@ private:
         m_headerLines.reset(curl_slist_append(m_headerLines.release(), line));
     }
 
+    CURLM* m_multi;
     CURLcode m_result = CURLE_OK;
     std::array<char, CURL_ERROR_SIZE> m_error{};
     std::unique_ptr<curl_slist, decltype(&curl_slist_free_all)> m_headerLines{nullptr, curl_slist_free_all};
@@ -223,11 +243,11 @@ private:
 HttpClientApi::HttpClientApi(QObject* parent, bool)
     : QObject(parent)
     , m_share(curl_share_init())
+    , m_multi(curl_multi_init())
 {
     Q_CHECK_PTR(m_share);
-    for (const auto kept : {CURL_LOCK_DATA_CONNECT, CURL_LOCK_DATA_DNS, CURL_LOCK_DATA_SSL_SESSION}) {
-        curl_share_setopt(m_share.get(), CURLSHOPT_SHARE, kept);
-    }
+    Q_CHECK_PTR(m_multi);
+    curl_share_setopt(m_share.get(), CURLSHOPT_SHARE, CURL_LOCK_DATA_SSL_SESSION);
 }
 
 HttpClientApi::~HttpClientApi() = default;
@@ -259,10 +279,15 @@ void HttpClientApi::CloseShare::operator()(void* share) const
     curl_share_cleanup(share);
 }
 
+void HttpClientApi::CloseMulti::operator()(void* multi) const
+{
+    curl_multi_cleanup(multi);
+}
+
 int HttpClientApi::request(const char* method, QString& reply, const QString& url, const QString& body,
                            bool isJson)
 {
-    Exchange exchange(m_share.get());
+    Exchange exchange(m_multi.get(), m_share.get());
     exchange.setTransport();
     exchange.setTls(m_caCert, m_clientCert, m_clientKey);
     exchange.setRequest(method, url);

@@ -52,9 +52,15 @@ private:
         void operator()(void* share) const;
     };
 
+    struct CloseMulti
+    {
+        void operator()(void* multi) const;
+    };
+
     int request(const char* method, QString& reply, const QString& url, const QString& body, bool isJson);
 
-    std::unique_ptr<void, CloseShare> m_share; // connections, TLS sessions, looked-up names
+    std::unique_ptr<void, CloseShare> m_share; // TLS sessions
+    std::unique_ptr<void, CloseMulti> m_multi; // connections, looked-up names
     QByteArray m_caCert;
     QByteArray m_clientCert;
     QByteArray m_clientKey;

@@ -44,3 +44,6 @@ QList<QPair<QByteArray, QByteArray>> HttpClientApi::getRawHeader() const
 }
 
 void HttpClientApi::CloseShare::operator()(void*) const { }
+
+void HttpClientApi::CloseMulti::operator()(void*) const
+{ }

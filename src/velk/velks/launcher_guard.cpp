@@ -8,7 +8,10 @@
 #include <QJsonObject>
 #include <QProcess>
 
+#include <malloc.h>
+
 #include <algorithm>
+#include <optional>
 #include <utility>
 
 #include "constants.h"
@@ -38,6 +41,32 @@ PackageToolRun runCommandLine(const QString& commandLine, const QProcessEnvironm
     QStringList parts = QProcess::splitCommand(commandLine);
     const QString program = parts.takeFirst();
     return runPackageTool(program, parts, environment);
+}
+
+/// The records of an inventory file, without their versions; none if it holds no array.
+std::optional<QList<SoftwareInfo>> recordsOf(const QString& path)
+{
+    const QString text = FileManager::GetInstance()->readFile(path);
+    qInfo() << " SoftwareGuard::getSoftwareList---------" << path << ":" << text;
+
+    QJsonParseError error{};
+    const QJsonDocument document = QJsonDocument::fromJson(text.toLocal8Bit(), &error);
+    if (error.error != QJsonParseError::NoError || !document.isArray()) {
+        return {};
+    }
+    const QJsonArray array = document.array();
+    qInfo() << " SoftwareGuard::getSoftwareList---------" << array.size();
+    QList<SoftwareInfo> records;
+    for (const QJsonValue& record : array) {
+        SoftwareInfo info;
+        info.packageName = record[QLatin1String("package_name")].toString();
+        info.name = record[QLatin1String("name")].toString();
+        info.architecture = record[QLatin1String("architecture")].toString();
+        info.id = record[QLatin1String("id")].toInt();
+        info.installedType = record[QLatin1String("installed_type")].toInt();
+        records.append(info);
+    }
+    return records;
 }
 
 } // namespace
@@ -132,23 +161,14 @@ QString LauncherGuard::getCurArch()
 
 bool LauncherGuard::getSoftwareList(const QString& path)
 {
-    const QString text = FileManager::GetInstance()->readFile(path);
-    qInfo() << " SoftwareGuard::getSoftwareList---------" << path << ":" << text;
-
-    QJsonParseError error{};
-    const QJsonDocument document = QJsonDocument::fromJson(text.toLocal8Bit(), &error);
-    if (error.error != QJsonParseError::NoError || !document.isArray()) {
+    const std::optional<QList<SoftwareInfo>> records = recordsOf(path);
+    if (!records) {
         return false;
     }
-    const QJsonArray records = document.array();
-    qInfo() << " SoftwareGuard::getSoftwareList---------" << records.size();
-    for (const QJsonValue& record : records) {
-        SoftwareInfo info;
-        info.packageName = record[QLatin1String("package_name")].toString();
-        info.name = record[QLatin1String("name")].toString();
-        info.architecture = record[QLatin1String("architecture")].toString();
-        info.id = record[QLatin1String("id")].toInt();
-        info.installedType = record[QLatin1String("installed_type")].toInt();
+    // Each child is forked, which takes the longer the more memory there is: the text of the file and its
+    // document, many times as large as the records, must be gone before the first one.
+    malloc_trim(0);
+    for (SoftwareInfo info : *records) {
         info.version = getCurVersion(info.packageName);
         qInfo() << " SoftwareGuard::getSoftwareList---------" << info.id;
         m_softwareList.append(info);
