@@ -1,0 +1,1 @@
+"""What the agent costs, measured in the simulated terminal against floors that do the bare minimum."""

@@ -1,0 +1,221 @@
+/// Every service that a session agent talks to on both buses, fast enough not to be what is measured.
+///
+/// usage: bench_desktop [LAUNCHER_ITEMS [DOCK_ENTRIES]]
+///
+/// Commands, one a line on the standard input:
+///   policies COUNT SIZE WINDOW  push so many policies of so many bytes, of which at most WINDOW are on their
+///   way windows COUNT WINDOW        change the windows of the dock's entries so many times, likewise wake
+///   push a policy that is no JSON
+/// On the standard output, with the monotonic clock in nanoseconds:
+///   ready | UpdateUserInfo TIME | onUploadFinished TIME | entries TIME (all entries have been read)
+///   done BEGIN END LATENCY...   of a row; the latency of each where one at a time was on its way
+
+#include "bus_connection.h"
+#include "services.h"
+
+#include <poll.h>
+#include <unistd.h>
+
+#include <algorithm>
+#include <array>
+#include <chrono>
+#include <iostream>
+#include <sstream>
+#include <string>
+#include <vector>
+
+namespace {
+
+const char* const kDaemon = "com.norix.velk.velkg";
+const char* const kDaemonPath = "/com/norix/velk/velkg";
+constexpr int kPropertiesOfEntry = 4;
+constexpr int kChangingEntries = 100;
+
+long long now()
+{
+    return std::chrono::duration_cast<std::chrono::nanoseconds>(
+               std::chrono::steady_clock::now().time_since_epoch())
+        .count();
+}
+
+/// A row of signals, each of which is answered by one call.
+struct Row
+{
+    std::string kind;
+    std::string payload;
+    int count = 0;
+    int window = 0;
+    int sent = 0;
+    int answered = 0;
+    long long begin = 0;
+    long long lastSent = 0;
+    std::vector<long long> latencies;
+
+    [[nodiscard]] bool mayGoOn() const { return sent < count && sent - answered < window; }
+};
+
+class Desktop
+{
+public:
+    explicit Desktop(DesktopSize size)
+        : m_size(size)
+        , m_services(size)
+        , m_system(sd_bus_open_system, {kDaemon, "org.freedesktop.login1"},
+                   [this](sd_bus_message* call) { return handle(call); })
+        , m_session(sd_bus_open_user, sessionNames(size),
+                    [this](sd_bus_message* call) { return handle(call); })
+    { }
+
+    void run()
+    {
+        std::cout << "ready" << std::endl;
+        while (m_isWanted) {
+            m_system.process();
+            m_session.process();
+            goOn();
+            wait();
+        }
+    }
+
+private:
+    static std::vector<std::string> sessionNames(DesktopSize size)
+    {
+        std::vector<std::string> names{"com.norix.velk.prys", "com.norix.kpx.Notification",
+                                       "com.norix.ScreenSaver", "com.norix.SessionManager",
+                                       "com.norix.kpx.daemon.Dock"};
+        if (size.launcherItems > 0) {
+            names.emplace_back("com.norix.kpx.daemon.Launcher");
+        }
+        return names;
+    }
+
+    bool handle(sd_bus_message* call)
+    {
+        const std::string member = sd_bus_message_get_member(call);
+        if (member == "UpdateUserInfo" || member == "onUploadFinished") {
+            std::cout << member << ' ' << now() << std::endl;
+        } else if (member == m_row.kind) {
+            countAnswer();
+        }
+        const bool isKnown = m_services.answer(call);
+        if (member == "Get" && sd_bus_message_get_path(call) == Services::entryPath(m_size.dockEntries - 1)
+            && ++m_readsOfLastEntry == kPropertiesOfEntry) {
+            std::cout << "entries " << now() << std::endl;
+        }
+        return isKnown;
+    }
+
+    void countAnswer()
+    {
+        ++m_row.answered;
+        if (m_row.window == 1) {
+            m_row.latencies.push_back(now() - m_row.lastSent);
+        }
+        if (m_row.answered == m_row.count) {
+            std::cout << "done " << m_row.begin << ' ' << now();
+            for (const auto latency : m_row.latencies) {
+                std::cout << ' ' << latency;
+            }
+            std::cout << std::endl;
+            m_row = {};
+        }
+    }
+
+    void goOn()
+    {
+        while (m_row.mayGoOn()) {
+            m_row.lastSent = now();
+            m_row.kind == "onPolicyMsg" ? push(m_row.payload) : changeWindows(m_row.sent);
+            ++m_row.sent;
+        }
+    }
+
+    void push(const std::string& payload)
+    {
+        require(sd_bus_emit_signal(m_system.get(), kDaemonPath, kDaemon, "pushPolicyMsg", "ss", "bench",
+                                   payload.c_str()),
+                "push a policy");
+    }
+
+    /// Each entry gets a window, then each loses it, and so on.
+    void changeWindows(int number)
+    {
+        const int entry = number % std::min(m_size.dockEntries, kChangingEntries);
+        const bool opens = m_services.toggleWindow(entry);
+        sd_bus_message* signal = nullptr;
+        require(sd_bus_message_new_signal(m_session.get(), &signal, Services::entryPath(entry).c_str(),
+                                          "org.freedesktop.DBus.Properties", "PropertiesChanged"),
+                "make a signal");
+        sd_bus_message_append(signal, "s", "com.norix.kpx.daemon.Dock.Entry");
+        if (opens) {
+            sd_bus_message_append(signal, "a{sv}", 1U, "WindowInfos", "a{uv}", 1U, 1U, "s", "window");
+        } else {
+            sd_bus_message_append(signal, "a{sv}", 1U, "WindowInfos", "a{uv}", 0U);
+        }
+        sd_bus_message_append(signal, "as", 0U);
+        require(sd_bus_send(m_session.get(), signal, nullptr), "change windows");
+        sd_bus_message_unref(signal);
+    }
+
+    void wait()
+    {
+        std::array<pollfd, 3> files{fileOf(m_system), fileOf(m_session), pollfd{STDIN_FILENO, POLLIN, 0}};
+        if (poll(files.data(), files.size(), -1) > 0 && files.back().revents != 0) {
+            takeCommand();
+        }
+    }
+
+    static pollfd fileOf(const BusConnection& connection)
+    {
+        return {sd_bus_get_fd(connection.get()), static_cast<short>(sd_bus_get_events(connection.get())), 0};
+    }
+
+    void takeCommand()
+    {
+        std::string line;
+        m_isWanted = static_cast<bool>(std::getline(std::cin, line));
+        std::istringstream words(line);
+        std::string verb;
+        words >> verb;
+        if (verb == "wake") {
+            push("wake up");
+        } else if (verb == "policies") {
+            size_t size = 0;
+            m_row.kind = "onPolicyMsg";
+            words >> m_row.count >> size >> m_row.window;
+            m_row.payload = policyOf(size);
+            m_row.begin = now();
+        } else if (verb == "windows") {
+            m_row.kind = "sendAppOpenState";
+            words >> m_row.count >> m_row.window;
+            m_row.begin = now();
+        }
+    }
+
+    static std::string policyOf(size_t size)
+    {
+        const std::string head = R"({"type":2001,"payload":{"text":")";
+        const std::string tail = R"("}})";
+        const size_t frame = head.size() + tail.size();
+        return head + std::string(size > frame ? size - frame : 0, 'x') + tail;
+    }
+
+    DesktopSize m_size;
+    Services m_services;
+    Row m_row;
+    int m_readsOfLastEntry = 0;
+    bool m_isWanted = true;
+    BusConnection m_system;
+    BusConnection m_session;
+};
+
+} // namespace
+
+int main(int argc, char* argv[])
+{
+    DesktopSize size;
+    size.launcherItems = argc > 1 ? std::stoi(argv[1]) : 0;
+    size.dockEntries = argc > 2 ? std::stoi(argv[2]) : 0;
+    Desktop(size).run();
+    return 0;
+}

@@ -1,0 +1,41 @@
+/// Prints for each second of a day the agent's poll intervals, in milliseconds, as they are drawn at it: the
+/// one after a start, and a later one.
+
+#include <QCoreApplication>
+
+#include <sys/time.h>
+
+#include <cstdio>
+
+#include "message_platform.h"
+
+namespace {
+
+constexpr int kSecondsOfDay = 24 * 60 * 60;
+int second =
+    0; // NOLINT(cppcoreguidelines-avoid-non-const-global-variables): the clock below has no other way
+
+} // namespace
+
+/// The clock that Qt looks at, instead of the C library's.
+// NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name): the header's are reserved
+extern "C" int gettimeofday(timeval* now, void* /*zone*/) noexcept
+{
+    *now = {second, 0};
+    return 0;
+}
+
+int main(int argc, char* argv[])
+{
+    qputenv("TZ", "UTC");
+    const QCoreApplication application(argc, argv);
+    MessagePlatform platform(nullptr, QString(), nullptr);
+    constexpr int shortest = 60000;
+    constexpr int longestFirst = 120000;
+    constexpr int longest = 180000;
+    for (second = 0; second < kSecondsOfDay; ++second) {
+        const int first = platform.generateRandnum(longestFirst, shortest);
+        std::printf("%d %d\n", first, platform.generateRandnum(longest, shortest));
+    }
+    return 0;
+}

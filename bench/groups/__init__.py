@@ -1,0 +1,1 @@
+"""The figures by group; each module measures one group inside a box: see bench.inside."""

@@ -1,0 +1,114 @@
+"""Memory after the start, and how much it grows with polls and policies."""
+
+from __future__ import annotations
+
+from typing import Callable, Iterator
+
+from bench.bed import ADDRESS, Bed
+from bench.figures import Figure, Goal
+from bench.plan import Plan
+from bench.programs import Process, Program, agent, floor
+from sandbox.clock import ManualClock
+from sandbox.users import current_user
+
+_MOST_DIRTY = 4096  # KiB
+_PAGES = 64  # KiB by which two runs of one program differ
+_POLL = 181  # seconds within which the next poll surely comes
+_WARM_POLLS, _POLLS = 500, 1_500
+_BETWEEN_POLLS = 0.01  # seconds without work; a clock moved in the middle of a poll would end its request
+_PATIENCE = 0.5
+_WARM_POLICIES, _POLICIES = 10_000, 100_000
+_WINDOW = 64
+_LINES = {"Rss": "resident", "Private_Dirty": "private dirty"}
+
+
+def measure(plan: Plan) -> Iterator[Figure]:
+    """The figures of this box's user."""
+    yield from _after_start(plan)
+    if current_user().is_domain_user and not plan.quick:
+        yield from _after_polls(plan)
+        yield from _after_policies(plan)
+
+
+def _after_start(plan: Plan) -> Iterator[Figure]:
+    is_domain = current_user().is_domain_user
+    who = "domain" if is_domain else "local"
+    programs = agent(), floor("drain", ADDRESS) if is_domain else floor("start")
+    taken: dict[str, dict[str, list[float]]] = {line: {"agent": [], "floor": []} for line in _LINES}
+    with Bed(platform=is_domain) as bed:
+        for _ in plan.times():
+            plan.tell(f"memory of a {who} user's agent")
+            for program in programs:
+                with bed.start_and_wait(program) as process:
+                    for line, values in taken.items():
+                        values[program.name].append(process.memory(line))
+    goals = {"Rss": Goal("at most", 1.25), "Private_Dirty": Goal("at most", _MOST_DIRTY, "value")}
+    for line, title in _LINES.items():
+        values = taken[line]
+        yield Figure(
+            f"memory.{who}.{line}",
+            f"{title} after start, {who} user",
+            "memory",
+            "KiB",
+            values["agent"],
+            values["floor"],
+            goals[line],
+        )
+
+
+def _after_polls(plan: Plan) -> Iterator[Figure]:
+    with Bed(platform=True) as bed:
+        clock = ManualClock()
+
+        def poll(process: Process, times: int) -> None:
+            for _ in range(times):
+                process.await_calm(_BETWEEN_POLLS)
+                bed.move_clock(clock, _POLL)
+                # A program that was not calm yet has armed its timer only after the move.
+                while bed.platform.await_line("listed", _PATIENCE) is None:
+                    bed.move_clock(clock, _POLL)
+
+        plan.tell(f"memory after {_POLLS:,} polls")
+        yield from _growth(
+            bed, floor("drain", ADDRESS), "polls", poll, (_WARM_POLLS, _POLLS), clock.environment()
+        )
+
+
+def _after_policies(plan: Plan) -> Iterator[Figure]:
+    with Bed() as bed:
+
+        def push(_process: Process, times: int) -> None:
+            bed.policies(times, window=_WINDOW)
+
+        plan.tell(f"memory after {_POLICIES:,} policies")
+        yield from _growth(bed, floor("forwarding"), "policies", push, (_WARM_POLICIES, _POLICIES), {})
+
+
+def _growth(
+    bed: Bed,
+    bare: Program,
+    what: str,
+    work: Callable[[Process, int], None],
+    counts: tuple[int, int],
+    env: dict[str, str],
+) -> Iterator[Figure]:
+    """How much memory grows between the end of the warm-up and the end of the work."""
+    warm, whole = counts
+    grown: dict[str, dict[str, float]] = {line: {} for line in _LINES}
+    for program in (agent(), bare):
+        with bed.start_and_wait(program, env) as process:
+            work(process, warm)
+            before = {line: process.memory(line) for line in _LINES}
+            work(process, whole - warm)
+            for line in _LINES:
+                grown[line][program.name] = process.memory(line) - before[line]
+    for line, title in _LINES.items():
+        yield Figure(
+            f"memory.growth.{what}.{line}",
+            f"{title}, growth from {warm:,} to {whole:,} {what}",
+            "memory",
+            "KiB",
+            [grown[line]["agent"]],
+            [grown[line]["floor"]],
+            Goal("at most", _PAGES, "above floor"),
+        )

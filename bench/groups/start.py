@@ -1,0 +1,70 @@
+"""From exec until the daemon knows the user, and for a domain user until the password tips are there."""
+
+from __future__ import annotations
+
+import subprocess
+import time
+from typing import Iterator
+
+from bench import callgrind
+from bench.bed import ADDRESS, Bed
+from bench.figures import Figure, Goal
+from bench.plan import Plan
+from bench.programs import Program, agent, floor
+from sandbox.users import current_user
+
+_CHILD = ["/usr/bin/dpkg-architecture", "-q", "DEB_HOST_ARCH_CPU"]
+
+
+def measure(plan: Plan) -> Iterator[Figure]:
+    """The figures of this box's user."""
+    return _domain(plan) if current_user().is_domain_user else _local(plan)
+
+
+def _local(plan: Plan) -> Iterator[Figure]:
+    programs = agent(), floor("start")
+    with Bed() as bed:
+
+        def milliseconds(program: Program) -> float:
+            with bed.start(program) as process:
+                (told,) = bed.desktop.wait_for("UpdateUserInfo")
+            return (told - process.began) / 1e6
+
+        values, floors = plan.pairs("start of a local user", *programs, milliseconds)
+        goal = Goal("at most", 1.6)
+        yield Figure("start.local.time", "local user, to UpdateUserInfo", "time", "ms", values, floors, goal)
+
+        children = [_child_milliseconds() for _ in plan.times()]
+        yield Figure("start.local.child", "of it, dpkg-architecture, a child", "time", "ms", children)
+
+        values, floors = plan.pairs("instructions of a local user's start", *programs, callgrind.of_start)
+        goal = Goal("at most", 1.5)
+        yield _instructions("start.local.instructions", "local user, to UpdateUserInfo", values, floors, goal)
+
+
+def _domain(plan: Plan) -> Iterator[Figure]:
+    programs = agent(), floor("drain", ADDRESS)
+    with Bed(platform=True) as bed:
+
+        def milliseconds(program: Program) -> float:
+            with bed.start(program) as process:
+                (answered,) = bed.platform.wait_for("tips")
+            return (answered - process.began) / 1e6
+
+        goal = Goal("at most", 1.25)
+        values, floors = plan.pairs("start of a domain user", *programs, milliseconds)
+        yield Figure("start.domain.time", "domain user, to the tips", "time", "ms", values, floors, goal)
+
+        values, floors = plan.pairs("instructions of a domain user's start", *programs, callgrind.of_start)
+        yield _instructions("start.domain.instructions", "domain user, to the tips", values, floors, goal)
+
+
+def _instructions(name: str, title: str, values: list[float], floors: list[float], goal: Goal) -> Figure:
+    millions, floor_millions = ([value / 1e6 for value in row] for row in (values, floors))
+    return Figure(name, title, "instructions", "million", millions, floor_millions, goal)
+
+
+def _child_milliseconds() -> float:
+    begin = time.monotonic()
+    subprocess.run(_CHILD, stdin=subprocess.DEVNULL, capture_output=True, check=True)
+    return (time.monotonic() - begin) * 1e3

@@ -1,0 +1,99 @@
+"""The arithmetic of the bench: medians, ratios, goals, and what counts as a rise."""
+
+from __future__ import annotations
+
+from pathlib import Path
+from typing import Sequence
+
+import pytest
+
+from bench.comparison import Change, changes, missing
+from bench.figures import Figure, Goal, Kind, Report, load, number, spread
+
+
+def figure(
+    values: Sequence[float] = (1,),
+    floor: Sequence[float] = (),
+    goal: Goal | None = None,
+    kind: Kind = "memory",
+    name: str = "group.figure",
+) -> Figure:
+    """A figure of which only this matters."""
+    return Figure(name, "title", kind, "KiB", values, floor, goal)
+
+
+def test_ratio_is_that_of_the_medians() -> None:
+    assert figure([3, 100, 2], [1, 2, 0]).ratio == 3
+
+
+def test_figure_without_a_floor_has_no_ratio() -> None:
+    assert figure([3]).ratio is None
+
+
+def test_nothing_is_as_much_as_nothing_and_anything_is_more() -> None:
+    assert figure([0], [0]).ratio == 1
+    assert figure([1], [0]).ratio == float("inf")
+
+
+def test_spread_is_the_distance_of_the_extremes_relative_to_the_median() -> None:
+    assert spread([90, 100, 120]) == pytest.approx(0.3)
+    assert spread([0, 0]) == 0
+
+
+@pytest.mark.parametrize(
+    ("goal", "values", "reached"),
+    [
+        (Goal("at most", 1.5), [3], True),
+        (Goal("at most", 1.4), [3], False),
+        (Goal("at least", 1.5), [3], True),
+        (Goal("at least", 1.6), [3], False),
+        (Goal("at most", 3, "value"), [3], True),
+        (Goal("at most", 2, "value"), [3], False),
+        (Goal("at most", 1, "above floor"), [3], True),
+        (Goal("at most", 0.5, "above floor"), [3], False),
+    ],
+)
+def test_goal_is_a_bound_of_the_ratio_the_value_or_the_difference(
+    goal: Goal, values: list[float], reached: bool
+) -> None:
+    assert figure(values, [2], goal).is_met is reached
+
+
+def test_goal_against_a_floor_is_missed_where_there_is_no_floor() -> None:
+    assert figure([1], [], Goal("at most", 2)).is_met is False
+
+
+@pytest.mark.parametrize(
+    ("value", "text"), [(1234567.8, "1,234,568"), (12.345, "12.3"), (2.0, "2"), (0.0456, "0.0456")]
+)
+def test_numbers_show_three_digits_that_count(value: float, text: str) -> None:
+    assert number(value) == text
+
+
+def test_report_comes_back_from_its_file_as_it_was(tmp_path: Path) -> None:
+    report = Report({"machine": 1}, [figure([1, 2], [3], Goal("at most", 2)), figure()])
+    report.save(tmp_path / "report.json")
+
+    read = load(tmp_path / "report.json")
+
+    assert read.circumstances == report.circumstances
+    assert [(one.ratio, one.goal, one.middle) for one in read.figures] == [
+        (one.ratio, one.goal, one.middle) for one in report.figures
+    ]
+
+
+@pytest.mark.parametrize(
+    ("kind", "now", "is_rise"),
+    [("memory", 111, True), ("instructions", 111, True), ("memory", 109, False), ("time", 300, False)],
+)
+def test_only_instructions_and_memory_more_than_a_tenth_above_are_a_rise(
+    kind: Kind, now: float, is_rise: bool
+) -> None:
+    assert Change(figure([now], kind=kind), figure([100], kind=kind)).is_rise is is_rise
+
+
+def test_figures_are_compared_by_their_names() -> None:
+    (one, new) = changes([figure([2]), figure(name="group.new")], [figure([1]), figure(name="group.gone")])
+
+    assert (one.factor, new.before) == (2, None)
+    assert missing([figure()], [figure(), figure(name="group.gone")]) == ["group.gone"]
