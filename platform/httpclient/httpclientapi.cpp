@@ -3,10 +3,11 @@
 #include <QFile>
 #include <QtDebug>
 
-#include <curl/curl.h>
 #include <sys/socket.h>
 
 #include <array>
+
+#include "curl_library.h"
 
 namespace {
 
@@ -183,7 +184,7 @@ public:
         }
         long status = 0;
         if (m_result == CURLE_OK) {
-            curl_easy_getinfo(m_curl.get(), CURLINFO_RESPONSE_CODE, &status);
+            curl().easyGetinfo(m_curl.get(), CURLINFO_RESPONSE_CODE, &status);
         }
         return static_cast<int>(status);
     }
@@ -195,24 +196,24 @@ public:
         if (m_reception.refusal() != nullptr) {
             return m_reception.refusal();
         }
-        return m_error.front() != '\0' ? m_error.data() : curl_easy_strerror(m_result);
+        return m_error.front() != '\0' ? m_error.data() : curl().easyStrerror(m_result);
     }
 
 private:
     CURLcode perform()
     {
-        curl_multi_add_handle(m_multi, m_curl.get());
+        curl().multiAddHandle(m_multi, m_curl.get());
         CURLcode result = CURLE_FAILED_INIT;
         int running = 1;
-        while (running > 0 && curl_multi_perform(m_multi, &running) == CURLM_OK && running > 0) {
-            curl_multi_poll(m_multi, nullptr, 0, static_cast<int>(kTotalLimitMs), nullptr);
+        while (running > 0 && curl().multiPerform(m_multi, &running) == CURLM_OK && running > 0) {
+            curl().multiPoll(m_multi, nullptr, 0, static_cast<int>(kTotalLimitMs), nullptr);
         }
         int left = 0;
-        const auto* message = curl_multi_info_read(m_multi, &left);
+        const auto* message = curl().multiInfoRead(m_multi, &left);
         if (message != nullptr && message->msg == CURLMSG_DONE) {
             result = message->data.result;
         }
-        curl_multi_remove_handle(m_multi, m_curl.get());
+        curl().multiRemoveHandle(m_multi, m_curl.get());
         return result;
     }
 
@@ -220,34 +221,34 @@ private:
     template <typename Value> void set(CURLoption option, Value value)
     {
         if (m_result == CURLE_OK) {
-            m_result = curl_easy_setopt(m_curl.get(), option, value);
+            m_result = curl().easySetopt(m_curl.get(), option, value);
         }
     }
 
     void addHeaderLine(const char* line)
     {
-        m_headerLines.reset(curl_slist_append(m_headerLines.release(), line));
+        m_headerLines.reset(curl().slistAppend(m_headerLines.release(), line));
     }
 
     CURLM* m_multi;
     CURLcode m_result = CURLE_OK;
     std::array<char, CURL_ERROR_SIZE> m_error{};
-    std::unique_ptr<curl_slist, decltype(&curl_slist_free_all)> m_headerLines{nullptr, curl_slist_free_all};
+    std::unique_ptr<curl_slist, decltype(&curl_slist_free_all)> m_headerLines{nullptr, curl().slistFreeAll};
     Reception m_reception;
     // The last member, so the first to go: it points to the others.
-    std::unique_ptr<CURL, decltype(&curl_easy_cleanup)> m_curl{curl_easy_init(), curl_easy_cleanup};
+    std::unique_ptr<CURL, decltype(&curl_easy_cleanup)> m_curl{curl().easyInit(), curl().easyCleanup};
 };
 
 } // namespace
 
 HttpClientApi::HttpClientApi(QObject* parent, bool)
     : QObject(parent)
-    , m_share(curl_share_init())
-    , m_multi(curl_multi_init())
+    , m_share(curl().shareInit())
+    , m_multi(curl().multiInit())
 {
     Q_CHECK_PTR(m_share);
     Q_CHECK_PTR(m_multi);
-    curl_share_setopt(m_share.get(), CURLSHOPT_SHARE, CURL_LOCK_DATA_SSL_SESSION);
+    curl().shareSetopt(m_share.get(), CURLSHOPT_SHARE, CURL_LOCK_DATA_SSL_SESSION);
 }
 
 HttpClientApi::~HttpClientApi() = default;
@@ -276,12 +277,12 @@ QList<QPair<QByteArray, QByteArray>> HttpClientApi::getRawHeader() const
 
 void HttpClientApi::CloseShare::operator()(void* share) const
 {
-    curl_share_cleanup(share);
+    curl().shareCleanup(share);
 }
 
 void HttpClientApi::CloseMulti::operator()(void* multi) const
 {
-    curl_multi_cleanup(multi);
+    curl().multiCleanup(multi);
 }
 
 int HttpClientApi::request(const char* method, QString& reply, const QString& url, const QString& body,

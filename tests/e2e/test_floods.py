@@ -1,6 +1,6 @@
 """More than anybody should send, and larger: nothing is lost, nothing kept, and what comes after is obeyed.
 
-How fast it goes, and the full numbers, are measured by bench/floods.py.
+How fast it goes, and the full numbers, are measured by `./dev bench forwarding dock`.
 """
 
 from __future__ import annotations

@@ -68,10 +68,11 @@ def test_hanging_check_delays_the_start_by_the_transfer_limit(terminal: Terminal
     assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
 
 
-def test_tips_that_carry_a_count_ask_for_messages_at_once(terminal: Terminal) -> None:
+def test_tips_that_carry_a_count_ask_for_messages_at_once_and_mark_them_read(terminal: Terminal) -> None:
     terminal.platform.post_message(USER, "T", "C")
     body = json.dumps({"code": 0, "data": {"result": False, "msg": ""}}).encode()
     terminal.platform.faults["tips"] = HttpFault.reply(200, body, {"X-Total-Count": "2"})
     mark = terminal.events.mark()
     terminal.start_agent()
     assert next_notification(terminal, mark).summary == "T"
+    assert [message["read_at"] != "" for message in terminal.platform.messages()] == [True]

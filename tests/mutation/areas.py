@@ -44,7 +44,7 @@ AREAS = (
         f"{_FOLDER}message_transfer.cpp",
         "dispatcher",
         ("message_transfer_test", "restore_configuration_test"),
-        ("policies", "domain_exit"),
+        ("policies", "domain_exit", "hung_services"),
         functions=("leaveDomain", "restoreConfiguration", "runScript", "rebootTime"),
     ),
     Area(

@@ -18,8 +18,8 @@ Verdict = Literal["caught", "survived", "invalid"]
 
 _BUILD_SECONDS = 1800.0
 # What takes longer hangs.
-_UNIT_SECONDS = 60  # for each test
-_TEST_SECONDS = 600.0  # for all of a kind
+_UNIT_SECONDS = 90.0  # for the unit tests of an area
+_TEST_SECONDS = 600.0  # for its end-to-end tests, or for the unit tests of all areas
 _NO_TESTS = 5  # exit status of pytest when no test was chosen
 _PYTHON = "/usr/bin/python3"
 
@@ -45,7 +45,7 @@ class Workshop:
         unit = tuple({test: None for area in areas for test in area.unit})
         if not self._make("velks", *unit):
             raise Trouble(f"the tree does not compile; see {self._log}")
-        if not self._pass_unit_tests(unit):
+        if not self._pass_unit_tests(unit, _TEST_SECONDS):
             raise Trouble(f"unit tests fail without any change; see {self._log}")
 
     def judge(self, mutant: Mutant, area: Area, quick: bool) -> Verdict:
@@ -69,7 +69,7 @@ class Workshop:
     def _meet_unit_tests(self, area: Area) -> Verdict:
         if not self._make(*area.unit or ("velks",)):
             return "invalid"
-        return "survived" if self._pass_unit_tests(area.unit) else "caught"
+        return "survived" if self._pass_unit_tests(area.unit, _UNIT_SECONDS) else "caught"
 
     def _meet_e2e_tests(self, area: Area) -> Verdict:
         if not self._make("velks"):
@@ -96,12 +96,11 @@ class Workshop:
     def _make(self, *targets: str) -> bool:
         return self._run(["ninja", "-C", str(self._build), *targets], _BUILD_SECONDS) == 0
 
-    def _pass_unit_tests(self, names: tuple[str, ...]) -> bool:
+    def _pass_unit_tests(self, names: tuple[str, ...], seconds: float) -> bool:
         if not names:
             return True
         arguments = ["ctest", "--test-dir", str(self._build), "--tests-regex", f"^({'|'.join(names)})$"]
-        arguments += ["--stop-on-failure", "--output-on-failure", "--timeout", str(_UNIT_SECONDS)]
-        return self._run(arguments, _TEST_SECONDS) == 0
+        return self._run([*arguments, "--stop-on-failure", "--output-on-failure"], seconds) == 0
 
     def _pass_e2e_tests(self, area: Area) -> bool:
         return self._pass_as("domain", area.e2e) and self._pass_as("local", area.local)
