@@ -45,5 +45,4 @@ QList<QPair<QByteArray, QByteArray>> HttpClientApi::getRawHeader() const
 
 void HttpClientApi::CloseShare::operator()(void*) const { }
 
-void HttpClientApi::CloseMulti::operator()(void*) const
-{ }
+void HttpClientApi::CloseMulti::operator()(void*) const { }
