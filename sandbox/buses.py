@@ -42,7 +42,7 @@ _CONFIG = """<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-Bus Bus Configura
 """
 _SERVICE = ("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus")
 _STOP_SECONDS = 10
-_PING_SECONDS = 20.0
+_PING_SECONDS = 60.0
 
 # Never freed: the binding breaks when a connection's end is dispatched after its Python object has gone.
 _every_connection: list[Any] = []
