@@ -8,79 +8,12 @@
 #include <array>
 
 #include "curl_library.h"
+#include "reception.h"
 
 namespace {
 
 constexpr long kConnectLimitMs = 10'000;
 constexpr long kTotalLimitMs = 30'000;
-constexpr int kBodyCap = 8 * 1024 * 1024;
-constexpr int kHeaderCap = 256 * 1024;
-
-using RawHeaders = QList<QPair<QByteArray, QByteArray>>;
-
-/// What has arrived of a reply. Refuses what exceeds a cap, and then says why.
-class Reception
-{
-public:
-    [[nodiscard]] const QByteArray& body() const { return m_body; }
-    [[nodiscard]] const RawHeaders& headers() const { return m_headers; }
-    [[nodiscard]] const char* refusal() const { return m_refusal; }
-
-    bool addBody(const QByteArray& part)
-    {
-        if (m_body.size() + part.size() > kBodyCap) {
-            m_refusal = "the body exceeds 8 MiB";
-            return false;
-        }
-        m_body += part;
-        return true;
-    }
-
-    bool addHeaderLine(const QByteArray& line)
-    {
-        m_headerBytes += line.size();
-        if (m_headerBytes > kHeaderCap) {
-            m_refusal = "the headers exceed 256 KiB";
-            return false;
-        }
-        if (m_inHeaders) {
-            addHeader(line);
-        } else if (line.startsWith("HTTP/")) {
-            beginHeaders();
-        }
-        // Any other line outside of a header block is a trailer.
-        return true;
-    }
-
-private:
-    // An interim response has a header block of its own: the last block is the response's.
-    void beginHeaders()
-    {
-        m_headers.clear();
-        m_inHeaders = true;
-    }
-
-    // Own parsing: libcurl's header iteration takes quadratic time, 20 s for the headers that the cap allows.
-    void addHeader(const QByteArray& line)
-    {
-        const QByteArray content = line.trimmed();
-        const bool folded = line.startsWith(' ') || line.startsWith('\t');
-        if (folded && !m_headers.isEmpty()) {
-            m_headers.last().second += ' ' + content;
-        } else if (content.isEmpty()) {
-            m_inHeaders = false;
-        } else {
-            const int colon = content.indexOf(':');
-            m_headers.append({content.left(colon), content.mid(colon + 1).trimmed()});
-        }
-    }
-
-    QByteArray m_body;
-    RawHeaders m_headers;
-    int m_headerBytes = 0;
-    bool m_inHeaders = false;
-    const char* m_refusal = nullptr;
-};
 
 template <bool (Reception::*add)(const QByteArray&)>
 size_t receive(char* data, size_t, size_t size, void* reception)
@@ -301,7 +234,7 @@ int HttpClientApi::request(const char* method, QString& reply, const QString& ur
     if (status == 0) {
         qWarning("HTTP %s without a response: %s", method, exchange.failure());
     }
-    m_rawHeaders = status == 0 ? RawHeaders() : exchange.reception().headers();
+    m_rawHeaders = status == 0 ? Reception::Headers() : exchange.reception().headers();
     reply = status == 0 ? QString() : QString::fromUtf8(exchange.reception().body());
     return status;
 }
