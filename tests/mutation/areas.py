@@ -54,8 +54,6 @@ AREAS = (
         ("startup", "start_order", "daemon_life", "session_state", "hung_services"),
         ("local_user", "startup"),
         (
-            "loginUser",
-            "daemonUserName",
             "statusOf",
             "readLoginUser",
             "startTimers",
@@ -63,6 +61,13 @@ AREAS = (
             "getUserState",
             "getScreenState",
         ),
+    ),
+    Area(
+        f"{_FOLDER}session_state.cpp",
+        "state report",
+        ("message_transfer_test",),
+        ("startup", "daemon_life", "session_state", "service_life", "hung_services"),
+        ("local_user", "startup"),
     ),
     Area(
         f"{_FOLDER}message_transfer.cpp",

@@ -19,6 +19,7 @@
 #include "libvelkkpx.h"
 #include "prys_interface.h"
 #include "remote_object.h"
+#include "session_state.h"
 #include "software_report.h"
 #include "terminal_address.h"
 #include "velkg_interface.h"
@@ -37,19 +38,6 @@ enum UserStatus {
     UserLocked = 2,
     UserBehindScreenSaver = 3,
 };
-
-RemoteObject loginUser()
-{
-    return {QDBusConnection::systemBus(), QStringLiteral("org.freedesktop.login1"),
-            QStringLiteral("/org/freedesktop/login1/user/self"),
-            QStringLiteral("org.freedesktop.login1.User")};
-}
-
-/// A domain login name may carry "@" anywhere; the daemon knows users without it.
-QString daemonUserName(const QVariant& loginName)
-{
-    return loginName.toString().remove(QLatin1Char('@'));
-}
 
 UserStatus statusOf(MessageTransfer::Screen_State state)
 {
@@ -131,9 +119,9 @@ void MessageTransfer::startTimers()
 
 void MessageTransfer::readLoginUser()
 {
-    const QVariantList values = loginUser().properties({QStringLiteral("Name"), QStringLiteral("UID")});
-    m_userName = daemonUserName(values.at(0));
-    m_uid = values.at(1).toInt();
+    const LoginUser user = loginUser();
+    m_userName = user.name;
+    m_uid = user.uid;
 }
 
 void MessageTransfer::announceAgain()
@@ -290,30 +278,14 @@ void MessageTransfer::onTimeout()
 void MessageTransfer::getUserState()
 {
     // The name is read afresh: the daemon is told who is there now, not who was at start-up.
-    const QString name = daemonUserName(loginUser().property(QStringLiteral("Name")));
+    const QString name = loginUserName();
     m_velkgInterface->SendUserStatus(statusOf(getScreenState()), name);
 }
 
 MessageTransfer::Screen_State MessageTransfer::getScreenState()
 {
-    const RemoteObject screenSaver(QDBusConnection::sessionBus(), QStringLiteral("com.norix.ScreenSaver"),
-                                   QStringLiteral("/com/norix/ScreenSaver"),
-                                   QStringLiteral("com.norix.ScreenSaver"));
-    bool running = false;
-    if (screenSaver.isPresent()) {
-        running = screenSaver.property(QStringLiteral("isRunning")).toBool();
-        qDebug() << "get screenSaver state " << running;
-    }
-
-    const RemoteObject sessionManager(
-        QDBusConnection::sessionBus(), QStringLiteral("com.norix.SessionManager"),
-        QStringLiteral("/com/norix/SessionManager"), QStringLiteral("com.norix.SessionManager"));
-    bool locked = false;
-    if (sessionManager.isPresent()) {
-        locked = sessionManager.property(QStringLiteral("Locked")).toBool();
-        qDebug() << "get screenLocked state " << locked;
-    }
-
+    const bool running = isScreenSaverRunning();
+    const bool locked = isScreenLocked();
     if (running) {
         return ScreenSaverRunning;
     }

@@ -1,0 +1,18 @@
+#pragma once
+
+#include <QString>
+
+/// What the login manager says of the session's user; a value that it does not tell is empty or 0.
+struct LoginUser
+{
+    QString name; ///< as the daemon knows users: without any "@"
+    qint32 uid = 0;
+};
+
+/// These ask the service at once, each for the D-Bus time limit at most.
+LoginUser loginUser();
+QString loginUserName();
+
+/// A service that is absent or does not answer counts as "no".
+bool isScreenSaverRunning();
+bool isScreenLocked();
