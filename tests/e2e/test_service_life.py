@@ -38,6 +38,15 @@ def warnings(terminal: Terminal, after: int) -> list[str]:
     return [event.args[0] for event in terminal.events.all(kind="log", member="warning", after=after)]
 
 
+def begin_countdown(terminal: Terminal) -> int:
+    """Push a log-out and wait for its warning; the result is the mark before it."""
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy({"type": 1201})
+    next_notification(terminal, mark)
+    terminal.sync()
+    return mark
+
+
 def test_policies_go_to_the_policy_service_that_is_there_at_the_time(terminal: Terminal) -> None:
     terminal.policy_service.leave()
     terminal.start_agent()
@@ -93,10 +102,7 @@ def test_the_identity_of_the_start_is_announced_although_the_login_manager_came_
 
 def test_a_login_manager_that_restarts_in_the_last_minute_ends_the_session(terminal: Terminal) -> None:
     terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    next_notification(terminal, mark)
-    terminal.sync()
+    mark = begin_countdown(terminal)
     terminal.logind.restart()
     terminal.advance(60)
     assert forced_actions(terminal, mark) == ["Terminate"]
@@ -104,10 +110,7 @@ def test_a_login_manager_that_restarts_in_the_last_minute_ends_the_session(termi
 
 def test_a_login_manager_that_has_gone_by_the_last_second_is_one_warning(terminal: Terminal) -> None:
     terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    next_notification(terminal, mark)
-    terminal.sync()
+    mark = begin_countdown(terminal)
     terminal.logind.leave()
     terminal.advance(60)
     assert [line.partition(":")[0] for line in warnings(terminal, mark)] == ["cannot call Terminate"]
@@ -118,10 +121,7 @@ def test_a_login_manager_that_has_gone_by_the_last_second_is_one_warning(termina
 
 def test_a_countdown_goes_on_without_the_daemon_that_ordered_it(terminal: Terminal) -> None:
     terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    next_notification(terminal, mark)
-    terminal.sync()
+    mark = begin_countdown(terminal)
     terminal.daemon.leave()
     terminal.daemon.appear()
     terminal.advance(60)

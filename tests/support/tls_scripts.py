@@ -118,6 +118,7 @@ def _chunked_reply(*chunks: bytes, end: bytes = b"0\r\n\r\n") -> bytes:
 
 
 def _drip(conversation: Conversation) -> None:
+    # The pace of a slow server; nobody waits for anything here.
     conversation.send(_chunked_reply(end=b""))
     while True:
         conversation.send(b"1\r\nx\r\n")
