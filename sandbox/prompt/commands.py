@@ -9,10 +9,10 @@ from rich.table import Table
 
 from sandbox import layout
 from sandbox.peers.fault import Fault
+from sandbox.policies import POLICIES
 from sandbox.prompt import application_commands, platform_commands, software_commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, command, number
-from sandbox.timeline import glosses
 
 assert application_commands and software_commands, "importing the modules makes their commands known"
 
@@ -24,7 +24,7 @@ def _services(desk: Desk) -> Iterable[str]:
 
 
 def _codes(_desk: Desk) -> Iterable[str]:
-    return map(str, glosses.POLICIES)
+    return map(str, POLICIES)
 
 
 def _on_off(_desk: Desk) -> Iterable[str]:

@@ -5,6 +5,7 @@ from __future__ import annotations
 import json
 from random import Random
 
+from sandbox import policies
 from sandbox.packages import desktop_file
 from sandbox.peers.launcher import LauncherItem
 from sandbox.soak import ledger as kinds
@@ -19,17 +20,9 @@ _KEPT_ON_DOCK = {"files": "Files", "browser": "浏览器", "terminal": "Terminal
 _OTHERS = ("Mail", "Editor", "Calculator", "播放器", "Viewer", "Calendar", "Notes", "Chat")
 _FIRST_PACKAGES = ("editor", "mail", "player")
 _MOST_PACKAGES = 8
-_FORWARDED_CODES = (0, 5, 1001, 1100, 1199, 1204, 1299, 1302, 1500)
-_NOTICES = {
-    1300: "该终端1分钟后进行关机",
-    1301: "该终端1分钟后进行重启",
-    1304: "管理员调整密码规则，避免影响登录，请及时修改密码",
-}
-_LOGOUTS = {
-    1201: "当前终端已被管理员停用，1分钟后强制注销",
-    1202: "您的帐号已被管理员删除，1分钟后强制注销",
-    1203: "您的帐号已被管理员停用，1分钟后强制注销",
-}
+_NOTICES = policies.with_action("Notify", "RequestPasswordChange")
+_LOGOUTS = policies.with_action("WarnThenLogOut")
+_FOR_ONE_ACCOUNT = policies.for_one_account()
 _PASSWORD_TIP = "your password will expire in 3 days"
 _RESTARTED = ("logind", "identity", "policy_service", "notifications", "screensaver", "session_manager")
 
@@ -95,27 +88,31 @@ class Deeds:
     def push_forwarded_policies(self) -> None:
         """The platform sets a few policies that are not the agent's own."""
         for _ in range(self._random.randint(1, 8)):
-            policy = {"type": self._random.choice(_FORWARDED_CODES), "number": self._next(), "text": "终端"}
+            policy = {
+                "type": self._random.choice(policies.FORWARDED_CODES),
+                "number": self._next(),
+                "text": "终端",
+            }
             self._ledger.expect(kinds.FORWARDED, json.dumps(policy, ensure_ascii=False))
             self._terminal.daemon.push_policy(policy)
         self._terminal.sync()
 
     def push_notice(self) -> None:
         """The platform wants the user to know something."""
-        code = self._random.choice(list(_NOTICES))
-        self._ledger.expect(kinds.NOTICES, _NOTICES[code])
-        self._push(code)
+        policy = self._random.choice(_NOTICES)
+        self._ledger.expect(kinds.NOTICES, policy.notice)
+        self._push(policy.code)
 
     def push_logout(self) -> None:
         """The platform ends the session, of which the box's login manager only takes note."""
-        code = self._random.choice(list(_LOGOUTS))
-        self._ledger.expect(kinds.NOTICES, _LOGOUTS[code])
-        self._push(code)
+        policy = self._random.choice(_LOGOUTS)
+        self._ledger.expect(kinds.NOTICES, policy.notice)
+        self._push(policy.code)
         self._logout_due = True
 
     def push_for_somebody_else(self) -> None:
         """The platform ends the session of another user."""
-        self._push(1202, self._terminal.user.uid + 1)
+        self._push(self._random.choice(_FOR_ONE_ACCOUNT).code, self._terminal.user.uid + 1)
 
     def use_kept_application(self) -> None:
         """Open a window of an application that is kept on the dock, or close all."""

@@ -2,16 +2,10 @@
 
 from __future__ import annotations
 
+from sandbox.policies import POLICIES
+
 NOTICES = {
-    "当前终端已被管理员退域，1分钟后强制重启": "the administrator has removed this terminal from the domain; "
-    "forced reboot in 1 minute",
-    "当前终端已被管理员停用，1分钟后强制注销": "the administrator has disabled this terminal; " "forced log-out in 1 minute",
-    "您的帐号已被管理员删除，1分钟后强制注销": "the administrator has deleted your account; " "forced log-out in 1 minute",
-    "您的帐号已被管理员停用，1分钟后强制注销": "the administrator has disabled your account; " "forced log-out in 1 minute",
-    "该终端1分钟后进行关机": "this terminal will shut down in 1 minute",
-    "该终端1分钟后进行重启": "this terminal will reboot in 1 minute",
-    "管理员调整密码规则，避免影响登录，请及时修改密码": "the administrator has changed the password rules; "
-    "change your password in time so that you can go on logging in",
+    **{policy.notice: policy.english_notice for policy in POLICIES.values()},
     # What the platform says in the tour.
     "您的密码将在3天后过期，请及时修改": "your password will expire in 3 days; change it in time",
     "今晚22:00停机，请保存文件": "shutdown tonight at 22:00; save your files",
@@ -20,15 +14,6 @@ NOTICES = {
     "三楼打印机已修好": "the printer on the third floor works again",
 }
 ACTIONS = {"重启": "reboot", "查看": "view"}
-POLICIES = {
-    1200: "the terminal leaves the domain",
-    1201: "the terminal is disabled",
-    1202: "an account is deleted",
-    1203: "an account is disabled",
-    1300: "the terminal will shut down",
-    1301: "the terminal will reboot",
-    1304: "the password must be changed",
-}
 STATUSES = {1: "the session is active", 2: "the session is locked", 3: "the screen saver is running"}
 REQUESTS = {
     "list": "are there unread messages? (one at a time)",

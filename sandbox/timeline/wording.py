@@ -6,6 +6,7 @@ import json
 from typing import Any, Callable, Sized
 
 from sandbox.events import Event
+from sandbox.policies import POLICIES
 from sandbox.timeline import glosses
 
 _LONGEST = 160
@@ -111,7 +112,8 @@ def _notice_meaning(args: tuple[Any, ...]) -> str:
 def _policy_meaning(args: tuple[Any, ...]) -> str:
     try:
         policy = json.loads(args[1])
-        words = glosses.POLICIES.get(policy["type"], "a policy that the session agent passes on")
+        own = POLICIES.get(policy["type"])
+        words = own.meaning if own else "a policy that the session agent passes on"
         concerned = policy.get("payload", {}).get("uid")
     except (ValueError, KeyError, TypeError, AttributeError):
         return "no policy"

@@ -9,10 +9,15 @@ import pytest
 from logcalls import LogLine, log_lines, log_lines_of
 
 from sandbox import contracts, layout
+from sandbox.policies import POLICIES, Policy
 
 DOCS = layout.REPOSITORY / "docs"
 PAGES = sorted(DOCS.glob("*.md"))
-_CPP_STRING = re.compile(r'"[^"]*"')
+AUDIENCES = {
+    "EverySession": "every session",
+    "DomainUsers": "domain users",
+    "AddressedDomainUser": "the domain user whose `uid` the payload names",
+}
 
 
 def page(name: str) -> str:
@@ -26,17 +31,11 @@ def catalogued_lines() -> list[LogLine]:
     return [LogLine(*row) for row in rows]
 
 
-def policy_rows() -> dict[int, str]:
-    """The policy table of the page, by code."""
-    rows = re.findall(r"^\| (\d+) (\|.*)$", page("policy-messages.md"), re.MULTILINE)
-    return {int(code): row for code, row in rows}
-
-
-def policies_of_the_code() -> dict[int, str]:
-    """The policy table of the code: what it says of each code."""
-    source = (layout.REPOSITORY / "src/velk/velks/session_policy.cpp").read_text()
-    entries = re.findall(r"\{(\d+),\s*\{(.*?)\}\}", source, re.DOTALL)
-    return {int(code): entry for code, entry in entries}
+def policy_row(policy: Policy) -> str:
+    """A policy's row in the page's table."""
+    shown = f"{policy.notice}<br>*{policy.english_notice}*"
+    cells = (policy.code, policy.meaning, AUDIENCES[policy.audience], f"`{policy.action}`", shown)
+    return f"| {' | '.join(map(str, cells))} |"
 
 
 def named_tests() -> set[tuple[str, str]]:
@@ -65,19 +64,18 @@ def test_every_log_line_stands_in_the_catalogue_and_no_other() -> None:
     assert len(catalogued) == len(set(catalogued))
 
 
-def test_policy_page_has_exactly_the_codes_of_the_code_with_their_texts() -> None:
-    rows = policy_rows()
-    known = policies_of_the_code()
-
-    assert rows.keys() == known.keys()
-    for code, entry in known.items():
-        for text in _CPP_STRING.findall(entry):
-            assert text.strip('"') in rows[code]
+def test_policy_page_has_a_row_for_each_policy_of_the_contract() -> None:
+    rows = re.findall(r"^\| \d+ \|.*", page("policy-messages.md"), re.MULTILINE)
+    assert rows == [policy_row(policy) for policy in POLICIES.values()]
 
 
-def test_policy_contract_has_exactly_the_codes_of_the_code() -> None:
-    codes = set(map(int, re.findall(r'"const": (\d+)', contracts.schema_file("policy-message").read_text())))
-    assert codes == policies_of_the_code().keys()
+def test_policy_page_and_diagram_have_each_action() -> None:
+    actions = {"Forward", *(policy.action for policy in POLICIES.values())}
+    rows = re.findall(r"^\| `(\w+)` \|", page("policy-messages.md"), re.MULTILINE)
+
+    assert sorted(rows) == sorted(actions)
+    for diagram in ("policy.dot", "policy.svg"):
+        assert [action for action in actions if action not in page(diagram)] == []
 
 
 @pytest.mark.parametrize(("file", "name"), sorted(named_tests()))

@@ -9,7 +9,8 @@ from pathlib import Path
 import pytest
 from jsonschema import Draft202012Validator
 
-from sandbox import contracts, layout
+from sandbox import contracts, layout, policies
+from sandbox.policies import FORWARDED_CODES, POLICIES, Policy
 
 EXAMPLES = contracts.FOLDER / "examples"
 
@@ -61,11 +62,37 @@ def test_invalid_example_breaks_the_contract(example: Path) -> None:
     assert broken_rule(example) is not None
 
 
+@pytest.mark.parametrize("code", POLICIES)
+def test_code_of_the_agents_own_is_a_policy_and_is_never_forwarded(code: int) -> None:
+    message = {"type": code, "payload": {"uid": 20001}}
+    assert contracts.violation("policy-message", message) is None
+    assert contracts.violation("forwarded-policy", message) is not None
+
+
+@pytest.mark.parametrize("code", FORWARDED_CODES)
+def test_any_other_code_is_forwarded(code: int) -> None:
+    assert contracts.violation("policy-message", {"type": code}) is None
+    assert contracts.violation("forwarded-policy", {"type": code}) is None
+
+
+@pytest.mark.parametrize("policy", policies.for_one_account(), ids=lambda policy: policy.code)
+def test_policy_for_one_account_must_name_it(policy: Policy) -> None:
+    assert contracts.violation("policy-message", {"type": policy.code, "payload": {}}) is not None
+
+
 @pytest.mark.parametrize(
     ("names", "status", "said"),
     [
-        (["valid-1201", "valid-forwarded"], 0, ["keeps to the contract", "keeps to the contract"]),
-        (["valid-1201", "invalid-no-type"], 1, ["keeps to the contract", "'type' is a required property"]),
+        (
+            ["valid-terminal-disabled", "valid-forwarded"],
+            0,
+            ["keeps to the contract", "keeps to the contract"],
+        ),
+        (
+            ["valid-terminal-disabled", "invalid-no-type"],
+            1,
+            ["keeps to the contract", "'type' is a required property"],
+        ),
     ],
 )
 def test_people_can_check_their_own_messages(names: list[str], status: int, said: list[str]) -> None:

@@ -4,6 +4,8 @@ from __future__ import annotations
 
 import pytest
 
+from sandbox import policies
+from sandbox.policies import Policy
 from sandbox.terminal import Terminal
 from wire import forced_actions, next_notification, next_status, settled
 
@@ -17,10 +19,10 @@ def session(terminal: Terminal) -> Terminal:
     return terminal
 
 
-@pytest.mark.parametrize("code", [1202, 1203, 1304])
-def test_policy_for_domain_users_does_nothing(session: Terminal, code: int) -> None:
+@pytest.mark.parametrize("policy", policies.for_domain_users(), ids=str)
+def test_policy_for_domain_users_does_nothing(session: Terminal, policy: Policy) -> None:
     mark = session.events.mark()
-    session.daemon.push_policy({"type": code, "payload": {"uid": session.user.uid}})
+    session.daemon.push_policy({"type": policy.code, "payload": {"uid": session.user.uid}})
     assert settled(session, mark) == []
     session.advance(60)
     assert forced_actions(session, mark) == []

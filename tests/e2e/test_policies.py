@@ -6,6 +6,8 @@ import json
 
 import pytest
 
+from sandbox import policies
+from sandbox.policies import FORWARDED_CODES, Policy
 from sandbox.terminal import Terminal
 from wire import Notification, forced_actions, log_lines, next_notification, settled
 
@@ -24,19 +26,12 @@ def session(terminal: Terminal) -> Terminal:
     return terminal
 
 
-@pytest.mark.parametrize(
-    ("code", "warning"),
-    [
-        (1201, "当前终端已被管理员停用，1分钟后强制注销"),
-        (1202, "您的帐号已被管理员删除，1分钟后强制注销"),
-        (1203, "您的帐号已被管理员停用，1分钟后强制注销"),
-    ],
-)
-def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, code: int, warning: str) -> None:
+@pytest.mark.parametrize("policy", policies.with_action("WarnThenLogOut"), ids=str)
+def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, policy: Policy) -> None:
     mark = session.events.mark()
-    session.daemon.push_policy({"type": code, "payload": {"uid": session.user.uid}})
+    session.daemon.push_policy({"type": policy.code, "payload": {"uid": session.user.uid}})
 
-    assert next_notification(session, mark) == plain(warning, timeout=-1)
+    assert next_notification(session, mark) == plain(policy.notice, timeout=-1)
     session.advance(59)
     assert forced_actions(session, mark) == []
     session.advance(1)
@@ -64,7 +59,7 @@ def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
     assert call.args == ()
 
 
-@pytest.mark.parametrize("code", [1202, 1203])
+@pytest.mark.parametrize("policy", policies.for_one_account(), ids=str)
 @pytest.mark.parametrize(
     "payload",
     [
@@ -79,10 +74,10 @@ def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
     ids=str,
 )
 def test_account_policy_for_anyone_else_does_nothing(
-    session: Terminal, code: int, payload: dict[str, object]
+    session: Terminal, policy: Policy, payload: dict[str, object]
 ) -> None:
     mark = session.events.mark()
-    session.daemon.push_policy(json.dumps({"type": code, **payload}))
+    session.daemon.push_policy(json.dumps({"type": policy.code, **payload}))
 
     assert settled(session, mark) == []
     session.advance(60)
@@ -96,37 +91,22 @@ def test_account_check_is_logged_with_both_uids(session: Terminal) -> None:
     assert "sendUID : 7 , localUID: 20001 ,flag : false" in log_lines(session, mark)
 
 
-@pytest.mark.parametrize(("code", "notice"), [(1300, "该终端1分钟后进行关机"), (1301, "该终端1分钟后进行重启")])
-def test_shutdown_and_reboot_notices_are_notices_only(session: Terminal, code: int, notice: str) -> None:
+@pytest.mark.parametrize("policy", policies.with_action("Notify", "RequestPasswordChange"), ids=str)
+def test_notice_is_a_notice_only(session: Terminal, policy: Policy) -> None:
     mark = session.events.mark()
-    session.daemon.push_policy({"type": code})
+    session.daemon.push_policy({"type": policy.code, "payload": {"uid": session.user.uid}})
 
-    assert next_notification(session, mark) == plain(notice, timeout=0)
+    assert next_notification(session, mark) == plain(policy.notice, timeout=0)
     assert [event.member for event in settled(session, mark)] == ["Notify"]
     session.advance(60)
     assert forced_actions(session, mark) == []
 
 
-def test_password_change_is_asked_of_a_domain_user(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1304})
-
-    notice = "管理员调整密码规则，避免影响登录，请及时修改密码"
-    assert next_notification(session, mark) == plain(notice, timeout=0)
-    assert [event.member for event in settled(session, mark)] == ["Notify"]
-
-
 @pytest.mark.parametrize(
     "payload",
     [
-        '{"type":5}',
-        '{"type":0}',
+        *(f'{{"type":{code}}}' for code in FORWARDED_CODES),
         '{"type":-1}',
-        '{"type":1199}',
-        '{"type":1204}',
-        '{"type":1302}',
-        '{"type":1303}',
-        '{"type":1305}',
         '{"type":"1201"}',
         '{"type":1201.5}',
         '{"type":99999999999}',

@@ -14,6 +14,8 @@ import subprocess
 import sys
 from pathlib import Path
 
+from sandbox.policies import POLICIES
+
 _HERE = Path(__file__).resolve().parent
 _REPOSITORY = _HERE.parents[1]
 _BUILD = _REPOSITORY / "build" / "fuzz"
@@ -32,6 +34,18 @@ def _findings(target: str) -> Path:
     return _BUILD / "findings" / target
 
 
+def dictionary(target: str) -> str:
+    """The words that the inputs of a target are made of; the codes of policies come from their contract."""
+    words = (_HERE / f"{target}.dict").read_text()
+    return words + "".join(f'"{code}"\n' for code in POLICIES) if target == "policy" else words
+
+
+def _dictionary_file(target: str) -> Path:
+    file = _BUILD / f"{target}.dict"
+    file.write_text(dictionary(target))
+    return file
+
+
 def _command(target: str, seconds: int) -> list[str]:
     return [
         *(str(_REPOSITORY / "sandbox" / "in-box"), "--"),
@@ -41,7 +55,7 @@ def _command(target: str, seconds: int) -> list[str]:
         f"-rss_limit_mb={_MOST_MEMORY_MB}",
         f"-max_len={_LONGEST_INPUT}",
         "-print_final_stats=1",
-        f"-dict={_HERE / f'{target}.dict'}",
+        f"-dict={_dictionary_file(target)}",
         f"-artifact_prefix={_findings(target)}/",
         *(str(_learnt(target)), str(_HERE / "corpus" / target)),
     ]

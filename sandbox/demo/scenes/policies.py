@@ -17,6 +17,7 @@ from sandbox.demo.scene import (
     notice,
 )
 from sandbox.peers import daemon
+from sandbox.policies import POLICIES
 from sandbox.spoofer import Stranger
 from sandbox.terminal import Terminal
 from sandbox.users import DOMAIN_USER as USER
@@ -27,6 +28,10 @@ _POLICY = '{"type":2101,"payload":{"wallpaper":"/usr/share/backgrounds/校园.jp
 
 def _push(policy: Mapping[str, Any] | str, *then: Expectation) -> Step:
     return Step(lambda terminal: terminal.daemon.push_policy(policy), then)
+
+
+def _notice_of(code: int) -> Expectation:
+    return notice(POLICIES[code].notice)
 
 
 def _stranger_pushes(terminal: Terminal) -> None:
@@ -49,15 +54,15 @@ NOTICES = Scene(
     "Shutdown and reboot notices",
     "The user is told; shutting down is somebody else's work.",
     (
-        _push({"type": 1300}, notice("该终端1分钟后进行关机"), NOTHING_FORWARDED),
-        _push({"type": 1301}, notice("该终端1分钟后进行重启"), NOTHING_FORWARDED),
+        _push({"type": 1300}, _notice_of(1300), NOTHING_FORWARDED),
+        _push({"type": 1301}, _notice_of(1301), NOTHING_FORWARDED),
     ),
 )
 
 PASSWORD = Scene(
     "New password rules",
     "The user, who belongs to the domain, is asked to change the password.",
-    (_push({"type": 1304}, notice("管理员调整密码规则，避免影响登录，请及时修改密码"), NOTHING_FORWARDED),),
+    (_push({"type": 1304}, _notice_of(1304), NOTHING_FORWARDED),),
 )
 
 ACCOUNT_DISABLED = Scene(
@@ -67,7 +72,7 @@ ACCOUNT_DISABLED = Scene(
         _push({"type": 1203, "payload": {"uid": _SOMEBODY_ELSE}}, NOTHING_SHOWN, NOTHING_FORWARDED),
         _push(
             {"type": 1203, "payload": {"uid": USER.uid}},
-            notice("您的帐号已被管理员停用，1分钟后强制注销"),
+            _notice_of(1203),
             LOGOUT,
             NOTHING_FORWARDED,
             NO_REBOOT,
@@ -79,7 +84,7 @@ ACCOUNT_DISABLED = Scene(
 TERMINAL_DISABLED = Scene(
     "The terminal is disabled",
     "A warning, a minute to save one's work, then the forced log-out.",
-    (_push({"type": 1201}, notice("当前终端已被管理员停用，1分钟后强制注销"), LOGOUT, NO_REBOOT),),
+    (_push({"type": 1201}, _notice_of(1201), LOGOUT, NO_REBOOT),),
     NOT_REALLY,
 )
 

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QJsonObject>
+#include <QObject>
 #include <QString>
 
 #include <optional>
@@ -8,11 +9,15 @@
 /// What a policy code asks of the user's session.
 struct SessionPolicy
 {
+    Q_GADGET
+
+public:
     enum class Audience {
         EverySession,
         DomainUsers,
         AddressedDomainUser, ///< the domain user whose uid stands in the message
     };
+    Q_ENUM(Audience)
     enum class Action {
         Forward, ///< not for the agent: the session policy service carries it out
         LeaveDomain,
@@ -20,6 +25,7 @@ struct SessionPolicy
         Notify,
         RequestPasswordChange,
     };
+    Q_ENUM(Action)
 
     Action action = Action::Forward;
     Audience audience = Audience::EverySession;

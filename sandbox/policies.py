@@ -1,0 +1,57 @@
+"""The policies that the agent itself carries out, as their contract lists them."""
+
+from __future__ import annotations
+
+import json
+from typing import Any, Iterator, NamedTuple
+
+from sandbox import contracts
+
+
+class Policy(NamedTuple):
+    """One entry of the contract; audience and action have the names that the agent's table gives them."""
+
+    code: int
+    meaning: str
+    audience: str
+    action: str
+    notice: str
+    english_notice: str
+
+    def __str__(self) -> str:
+        return f"{self.code}"
+
+
+def _own_policies() -> Iterator[Policy]:
+    groups = json.loads(contracts.schema_file("policy-message").read_text())["$defs"]
+    for group in groups["ownCode"]["anyOf"]:
+        audience = group["$ref"].rpartition("/")[2]
+        for entry in groups[audience]["anyOf"]:
+            yield _policy(audience, entry)
+
+
+def _policy(audience: str, entry: dict[str, Any]) -> Policy:
+    notice = entry["x-notice"]
+    return Policy(entry["const"], entry["title"], audience, entry["x-action"], notice["zh"], notice["en"])
+
+
+POLICIES = {policy.code: policy for policy in sorted(_own_policies())}
+# Some of all other codes: those beside the agent's own, and a few more.
+FORWARDED_CODES = tuple(
+    sorted({0, 5, 1100}.union(*({code - 1, code + 1} for code in POLICIES)) - POLICIES.keys())
+)
+
+
+def with_action(*actions: str) -> list[Policy]:
+    """The policies with one of these actions."""
+    return [policy for policy in POLICIES.values() if policy.action in actions]
+
+
+def for_one_account() -> list[Policy]:
+    """The policies whose payload names the user that they are for."""
+    return [policy for policy in POLICIES.values() if policy.audience == "AddressedDomainUser"]
+
+
+def for_domain_users() -> list[Policy]:
+    """The policies that leave local users out."""
+    return [policy for policy in POLICIES.values() if policy.audience != "EverySession"]
