@@ -43,7 +43,9 @@ def _parser() -> argparse.ArgumentParser:
         "--only", type=_numbers, metavar="N[,N...]", help="play the start and these scenes alone"
     )
     parser.add_argument("--log", action="store_true", help="show the agent's own log lines too")
-    parser.add_argument("--svg", type=Path, metavar="FILE", help="draw the timeline into this file too")
+    parser.add_argument(
+        "--svg", type=Path, metavar="FILE", help="draw the timeline of the chosen scenes into this file too"
+    )
     parser.add_argument(
         "--patience",
         type=float,

@@ -54,7 +54,7 @@ def _tour(
     terminal = Terminal(clock=clock(options.speed))
     timeline = Timeline(terminal.events, time, consoles, options.log)
     try:
-        outcomes = Tour(terminal, timeline, options.patience).play(scenes)
+        outcomes = Tour(terminal, timeline, options.patience).play(scenes, options.only or scenes)
     finally:
         timeline.end()
         problems = terminal.shut_down()

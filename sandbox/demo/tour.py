@@ -4,7 +4,7 @@ from __future__ import annotations
 
 import time
 from dataclasses import dataclass
-from typing import Literal, Mapping
+from typing import Container, Literal, Mapping
 
 from rich.padding import Padding
 from rich.rule import Rule
@@ -48,11 +48,13 @@ class Tour:
         self._mark = 0
         self._cue = 0.0
 
-    def play(self, scenes: Mapping[int, Scene]) -> list[Outcome]:
-        """Play the scenes, which are given by number; one outcome for each expectation of each scene."""
+    def play(self, scenes: Mapping[int, Scene], drawn: Container[int]) -> list[Outcome]:
+        """Play the scenes, which are given by number, and draw some; one outcome for each expectation of each
+        scene."""
         for scene in scenes.values():
             scene.beforehand(self._terminal)
         for number, scene in scenes.items():
+            self._timeline.draw(number in drawn)
             self._play_scene(f"{number}. {scene.title}", scene)
         return self._outcomes
 

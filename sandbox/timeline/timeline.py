@@ -17,6 +17,7 @@ from sandbox.timeline import wording
 from sandbox.timeline.agenttime import AgentTime, minutes
 
 _PLAIN_WIDTH = 136
+_PICTURE_WIDTH = 115  # still read where a page shows it at two thirds of its size
 _WIDE = 110
 _TIME, _ROUTE, _GAP = 5, 27, 2
 _REMARK = "dim italic"
@@ -30,7 +31,9 @@ def console_for_people() -> Console:
 
 def console_for_picture() -> Console:
     """A console that only records, with colours."""
-    return Console(width=_PLAIN_WIDTH, highlight=False, record=True, file=io.StringIO(), force_terminal=True)
+    return Console(
+        width=_PICTURE_WIDTH, highlight=False, record=True, file=io.StringIO(), force_terminal=True
+    )
 
 
 class Timeline:
@@ -52,6 +55,11 @@ class Timeline:
         with self._output:
             for console in self._consoles:
                 console.print(what)
+
+    def draw(self, wanted: bool) -> None:
+        """Whether what comes now belongs into the picture."""
+        for console in self._consoles[1:]:
+            console.quiet = not wanted
 
     def end(self) -> None:
         """Show no more events."""

@@ -24,7 +24,7 @@ _NO_PATIENCE = 0.01
 
 def _play(terminal: Terminal, patience: float, *steps: Step) -> list[Outcome]:
     timeline = Timeline(terminal.events, AgentTime(1), [Console(file=io.StringIO())])
-    return Tour(terminal, timeline, patience).play({1: Scene("Title", "Sentence.", steps)})
+    return Tour(terminal, timeline, patience).play({1: Scene("Title", "Sentence.", steps)}, drawn=())
 
 
 def _says(*members: str) -> Callable[[Terminal], None]:
@@ -97,6 +97,16 @@ def test_a_missing_agent_is_one_line_that_says_how_to_build_it(tmp_path: Path) -
 
     assert (ended.returncode, ended.stdout) == (1, "")
     assert ended.stderr == f"demo: there is no agent at {tmp_path}/velks; build it with: ./dev build\n"
+
+
+def test_the_picture_shows_the_chosen_scenes_alone(tmp_path: Path) -> None:
+    picture = tmp_path / "demo.svg"
+
+    ended = run_program("demo", "--only", "8", "--svg", str(picture))
+
+    drawn = picture.read_text()
+    assert ended.returncode == 0, ended.stdout
+    assert "SendUserStatus" in ended.stdout and "SendUserStatus" not in drawn
 
 
 def test_the_picture_needs_nothing_from_elsewhere_and_tells_nothing_of_the_machine(tmp_path: Path) -> None:
@@ -190,7 +200,7 @@ def test_what_a_scene_needs_beforehand_is_done_before_the_first_one(terminal: Te
     second = Scene("Second", "Sentence.", (), beforehand=lambda terminal: done.append("beforehand"))
     timeline = Timeline(terminal.events, AgentTime(1), [Console(file=io.StringIO())])
 
-    Tour(terminal, timeline, _PATIENCE).play({1: first, 2: second})
+    Tour(terminal, timeline, _PATIENCE).play({1: first, 2: second}, drawn=())
 
     assert done == ["beforehand", "cue"]
 
