@@ -28,6 +28,7 @@ private Q_SLOTS:
     void onlyTheFirstUnansweredCallsAskForAReply();
     void longTextIsSentWithoutAskingForAReply();
     void answeredCallsMakeRoomForOthersThatAsk();
+    void callsAnsweredBehindAHangingOneMakeRoomToo();
     void callWithoutAReplyCountsAsFinished();
     void failedCallIsAnErrorForWhoeverLooks();
 };
@@ -91,6 +92,23 @@ void UnreadCallsTest::answeredCallsMakeRoomForOthersThatAsk()
     for (int number = 0; number < 3 * kAskedFor; ++number) {
         QVERIFY(finished(proxy.UpdateUserInfo(QString(), number)));
     }
+    QTRY_COMPARE(daemon.calls().size(), 3 * kAskedFor);
+    for (const QDBusMessage& call : daemon.calls()) {
+        QVERIFY(call.isReplyRequired());
+    }
+}
+
+void UnreadCallsTest::callsAnsweredBehindAHangingOneMakeRoomToo()
+{
+    const RecordedService daemon(QDBusConnection::SystemBus, service, [](const QDBusMessage& call) {
+        return call.arguments().constFirst() == 0 ? QDBusMessage() : call.createReply();
+    });
+    velkgInterface proxy(service, path, QDBusConnection::systemBus());
+    proxy.sendAppOpenState(0, QString());
+    for (int number = 1; number < 3 * kAskedFor; ++number) {
+        QVERIFY(finished(proxy.sendAppOpenState(number, QString())));
+    }
+    QTRY_COMPARE(daemon.calls().size(), 3 * kAskedFor);
     for (const QDBusMessage& call : daemon.calls()) {
         QVERIFY(call.isReplyRequired());
     }

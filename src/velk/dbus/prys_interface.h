@@ -6,9 +6,12 @@
 #include <QDBusAbstractInterface>
 #include <QDBusPendingReply>
 
-/// Proxy of the session policy service's interface, on the session bus. The slot sends its call at once and
-/// does not wait; a caller that drops the pending reply drops the call's error with it, as when the service
-/// is absent.
+/// Proxy of the session policy service's interface, on the session bus.
+///
+/// The slot sends its call at once and does not wait; a caller that drops the pending reply drops the call's
+/// error with it, as when the service is absent. No number of calls is too many for the bus: behind 64 that
+/// the service has not answered yet, and for a text of more than 65,536 characters, the call goes out without
+/// asking for a reply. Its pending reply is finished at once and is no error, whatever becomes of the call.
 class prysInterface : public QDBusAbstractInterface
 {
     Q_OBJECT

@@ -4,6 +4,7 @@
 #include <QDBusConnection>
 #include <QDBusMessage>
 
+#include <algorithm>
 #include <numeric>
 
 namespace {
@@ -27,11 +28,11 @@ int characters(const QVariantList& arguments)
 QDBusPendingCall UnreadCalls::send(QDBusAbstractInterface& proxy, const QString& method,
                                    const QVariantList& arguments)
 {
-    while (!m_unanswered.isEmpty() && m_unanswered.head().isFinished()) {
-        m_unanswered.dequeue();
-    }
+    const auto answered = std::remove_if(m_unanswered.begin(), m_unanswered.end(),
+                                         [](const QDBusPendingCall& call) { return call.isFinished(); });
+    m_unanswered.erase(answered, m_unanswered.end());
     if (m_unanswered.size() < kMostUnanswered && characters(arguments) <= kMostCharacters) {
-        m_unanswered.enqueue(proxy.asyncCallWithArgumentList(method, arguments));
+        m_unanswered.append(proxy.asyncCallWithArgumentList(method, arguments));
         return m_unanswered.last();
     }
 

@@ -1,16 +1,17 @@
 #pragma once
 
 #include <QDBusPendingCall>
-#include <QQueue>
+#include <QList>
 
 class QDBusAbstractInterface;
 
 /// Sends calls that return nothing, which callers mostly drop the replies of.
 ///
 /// A bus refuses further calls of a program that has too many unanswered (128 on a system bus), and each one
-/// costs memory until it is answered or times out. So only the first calls that a slow service leaves
-/// unanswered ask for a reply, and none that carries a long text; the others are sent without, and their
-/// pending call counts as finished at once: no call is lost, however many there are and whatever their size.
+/// costs memory until it is answered or times out. So a call asks for a reply only while fewer than 64 are
+/// unanswered, whichever these are, and none does that carries more than 65,536 characters; the others are
+/// sent without, and their pending call counts as finished at once, without an error: no call is lost,
+/// however many there are and whatever their size.
 class UnreadCalls
 {
 public:
@@ -18,5 +19,5 @@ public:
                           const QVariantList& arguments);
 
 private:
-    QQueue<QDBusPendingCall> m_unanswered; ///< oldest first; those answered meanwhile go with the next call
+    QList<QDBusPendingCall> m_unanswered; ///< those answered meanwhile go with the next call
 };
