@@ -160,66 +160,64 @@ def test_terminal_without_its_certificate_gets_nothing_and_goes_on(terminal: Ter
     carries_out_policies(terminal)
 
 
-NGINX = """
-daemon off;
-pid {folder}/nginx.pid;
-error_log stderr;
-events {{}}
-http {{
-    access_log off;
-    client_body_temp_path {folder}/body;
-    proxy_temp_path {folder}/proxy;
-    fastcgi_temp_path {folder}/fastcgi;
-    uwsgi_temp_path {folder}/uwsgi;
-    scgi_temp_path {folder}/scgi;
-    server {{
-        listen {front} ssl http2;
-        ssl_certificate "{server.certificate}";
-        ssl_certificate_key "{server.key}";
-        ssl_client_certificate "{authority}";
-        ssl_verify_client on;
-        location / {{
-            proxy_pass https://{host}:{back};
-            proxy_http_version 1.1;
-            proxy_set_header Host $http_host;
-            proxy_ssl_certificate "{terminal.certificate}";
-            proxy_ssl_certificate_key "{terminal.key}";
-        }}
-    }}
-}}
+WEB_SERVER = """
+ServerRoot {folder}
+ServerName {host}
+PidFile {folder}/pid
+DefaultRuntimeDir {folder}
+ErrorLog /dev/stderr
+Listen {front}
+LoadModule mpm_event_module /usr/lib/apache2/modules/mod_mpm_event.so
+LoadModule authz_core_module /usr/lib/apache2/modules/mod_authz_core.so
+LoadModule http2_module /usr/lib/apache2/modules/mod_http2.so
+LoadModule proxy_module /usr/lib/apache2/modules/mod_proxy.so
+LoadModule proxy_http_module /usr/lib/apache2/modules/mod_proxy_http.so
+LoadModule ssl_module /usr/lib/apache2/modules/mod_ssl.so
+Protocols h2 http/1.1
+SSLEngine on
+SSLCertificateFile {server.certificate}
+SSLCertificateKeyFile {server.key}
+SSLCACertificateFile {authority}
+SSLVerifyClient require
+SSLProxyEngine on
+SSLProxyMachineCertificateFile {folder}/terminal.pem
+ProxyPass / https://{host}:{back}/
+ProxyPreserveHost on
 """
-NGINX_PORT = 9443
+WEB_SERVER_PORT = 9443
 
 
 @pytest.fixture
-def nginx(terminal: Terminal) -> Iterator[int]:
+def web_server(terminal: Terminal) -> Iterator[int]:
     """A web server of somebody else's in front of the platform; the result is its port."""
     folder = Path(mkdtemp())
     known = trust()
-    (folder / "nginx.conf").write_text(
-        NGINX.format(
+    # It wants certificate and key in one file.
+    both = (known.terminal.certificate, known.terminal.key)
+    (folder / "terminal.pem").write_text("".join(path.read_text() for path in both))
+    (folder / "server.conf").write_text(
+        WEB_SERVER.format(
             folder=folder,
-            front=NGINX_PORT,
+            front=WEB_SERVER_PORT,
             back=terminal.platform.port,
             host=layout.PLATFORM_HOST,
             server=known.server,
-            terminal=known.terminal,
             authority=known.authority.certificate,
         )
     )
-    process = subprocess.Popen(["/usr/sbin/nginx", "-e", "stderr", "-c", folder / "nginx.conf"])
+    process = subprocess.Popen(["/usr/sbin/apache2", "-D", "FOREGROUND", "-f", folder / "server.conf"])
     subprocess.run(
-        ["bash", "-c", f"until : 2>/dev/null < /dev/tcp/127.0.0.1/{NGINX_PORT}; do :; done"],
+        ["bash", "-c", f"until : 2>/dev/null < /dev/tcp/127.0.0.1/{WEB_SERVER_PORT}; do :; done"],
         check=True,
         timeout=20,
     )
-    yield NGINX_PORT
+    yield WEB_SERVER_PORT
     process.terminate()
     process.wait()
 
 
-def test_messages_come_through_a_web_server_that_offers_http_2(terminal: Terminal, nginx: int) -> None:
-    terminal.files.write_platform_address(nginx)
+def test_messages_come_through_a_web_server_that_offers_http_2(terminal: Terminal, web_server: int) -> None:
+    terminal.files.write_platform_address(web_server)
     for title in ("first", "second", "third"):
         terminal.platform.post_message(USER, title, "text")
     terminal.start_agent()

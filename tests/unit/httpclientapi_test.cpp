@@ -3,6 +3,8 @@
 
 #include <QtTest>
 
+#include <curl/curlver.h>
+
 using Headers = QList<QPair<QByteArray, QByteArray>>;
 
 /// What a request sends, and what its caller gets of the response.
@@ -34,6 +36,7 @@ private Q_SLOTS:
 
     void without_a_whole_response_there_is_none_and_one_warning_data();
     void without_a_whole_response_there_is_none_and_one_warning();
+    void reply_without_length_that_breaks_off_is_none_where_the_library_can_tell();
 
 private:
     TlsPeer m_peer;
@@ -154,7 +157,6 @@ void HttpClientApiTest::status_and_body_are_returned_data()
     QTest::newRow("/not-found") << 404 << QStringLiteral("no such thing");
     QTest::newRow("/broken") << 500 << QStringLiteral("out of order");
     QTest::newRow("/until-close") << 200 << QStringLiteral("all of it");
-    QTest::newRow("/until-break") << 200 << QStringLiteral("all of it");
 }
 
 void HttpClientApiTest::status_and_body_are_returned()
@@ -229,9 +231,9 @@ void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning_d
     const QString withoutTls = path("/plain").replace(QStringLiteral("https:"), QStringLiteral("http:"));
 
     row("connection refused", m_peer.url("refusing", "/plain"), "onnect");
-    row("body shorter than its length", path("/cut-length"), "97 bytes remaining");
+    row("body shorter than its length", path("/cut-length"), "97 bytes (remaining|missing)");
     row("last chunk cut", path("/cut-chunk"), "outstanding read data remaining");
-    row("connection broken off in the body", path("/cut-connection"), "97 bytes remaining");
+    row("connection broken off in the body", path("/cut-connection"), "97 bytes remaining|unexpected eof");
     row("connection reset in the header", path("/reset-header"), "reset by peer");
     row("connection reset in the body", path("/reset-body"), "reset by peer");
     row("body over 8 MiB", path("/body-over-cap"), "8 MiB");
@@ -249,7 +251,19 @@ void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning()
 
     const HttpOutcome outcome = get(*m_client, url);
     QCOMPARE(summary(outcome), kNoResponse);
-    QVERIFY2(outcome.warnings[0].contains(cause), qUtf8Printable(outcome.warnings[0]));
+    QVERIFY2(outcome.warnings[0].contains(QRegularExpression(cause)), qUtf8Printable(outcome.warnings[0]));
+}
+
+void HttpClientApiTest::reply_without_length_that_breaks_off_is_none_where_the_library_can_tell()
+{
+    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/until-break"));
+#if LIBCURL_VERSION_NUM >= 0x080000
+    QCOMPARE(summary(outcome), kNoResponse);
+#else
+    QCOMPARE(outcome.status, 200);
+    QCOMPARE(outcome.reply, QStringLiteral("all of it"));
+    QCOMPARE(outcome.warnings, QStringList());
+#endif
 }
 
 QTEST_GUILESS_MAIN(HttpClientApiTest)
