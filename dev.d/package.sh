@@ -1,0 +1,31 @@
+# The Debian package.
+
+# The tree as a commit of it would be: no file that git ignores, no modes but those that git knows.
+export_tree() {
+    git ls-files -z --cached --others --exclude-standard | while IFS= read -r -d '' file; do
+        [[ ! -e $file ]] || printf '%s\0' "$file" # deleted, but not yet for git
+    done | tar -c --null --files-from=- --mode=u=rwX,go=rX | tar -x -p -C "$1"
+}
+
+run_package() {
+    local folder=build/package
+    require_git
+    require_plain_path
+    require_space 300
+    need_packages build package
+    rm -rf "$folder"
+    mkdir -p "$folder/velk-session-agent"
+    export_tree "$folder/velk-session-agent"
+    narrate "building the package" build_package "$folder/velk-session-agent"
+    # Which version of Debian's policy is the current one is another on each release.
+    narrate "lintian" lintian --pedantic --fail-on error,warning,info,pedantic --display-info \
+        --suppress-tags out-of-date-standards-version,newer-standards-version "$folder"/*.changes
+    (cd "$folder" && sha256sum ./*.deb ./*.dsc ./*.tar.*)
+}
+
+# A fixed locale, umask and zone: the same commit gives the same bytes.
+build_package() {
+    cd "$1" || return
+    umask 022
+    LC_ALL=C.UTF-8 TZ=UTC dpkg-buildpackage --unsigned-source --unsigned-changes --jobs="$(nproc)"
+}

@@ -1,0 +1,42 @@
+# The programs of the tree that do more than test: for people at a terminal, and for measuring and searching.
+
+run_demo() { run_in_terminal demo "$@"; }
+run_box() { run_in_terminal box "$@"; }
+run_soak() { run_in_terminal soak "$@"; }
+run_picture() { run_in_terminal demo --svg "$PWD/docs/demo.svg" --only 10 "$@"; }
+
+# What a person or a script reads is the program's alone: the preparations go to standard error.
+run_in_terminal() {
+    require_boxes
+    require_space 100
+    need_packages build terminal >&2
+    build velks >&2
+    VELK_AGENT=$AGENT exec "$PYTHON" -m sandbox "$@"
+}
+
+run_bench() {
+    local groups=(build terminal bench)
+    [[ " $* " != *" --write-docs "* ]] || groups+=(plots)
+    require_boxes
+    need_packages "${groups[@]}"
+    build velks velks-check bench_programs
+    VELK_AGENT=$AGENT exec "$PYTHON" -m bench "$@"
+}
+
+# Builds in copies of the tree of its own.
+run_mutate() {
+    require_boxes
+    require_git
+    require_space 1000
+    need_packages build terminal tests
+    narrate "trying mutants" "$PYTHON" tests/mutation/mutate.py "$@"
+}
+
+run_fuzz() {
+    require_boxes
+    require_space 400
+    need_packages build terminal fuzz
+    configure fuzz
+    show_steps cmake --build --preset fuzz || fail "the build failed; see the messages above"
+    narrate "fuzzing" "$PYTHON" -m tests.fuzz.run "$@"
+}

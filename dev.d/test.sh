@@ -1,0 +1,132 @@
+# The tests, layer by layer.
+
+# Four workers on two cores: the tests mostly wait for events.
+readonly TEST_JOBS=${VELK_TEST_JOBS:-4}
+readonly LEAST_COVERAGE=95 # per cent of the lines
+readonly PYTEST_CHOSE_NONE=5 # exit status of pytest when no test was left
+
+run_test() {
+    local layer=${1:-all}
+    (($#)) && shift
+    require_boxes
+    require_space 1000
+    need_packages build terminal tests
+    case $layer in
+        unit | all) build ;;
+        *) build velks velks-check ;;
+    esac
+    case $layer in
+        unit) run_unit_tests "$@" ;;
+        dev) run_dev_tests "$@" ;;
+        bench | contracts) run_pytest_as domain "tests/$layer" "$@" ;; # none depends on the user
+        sandbox | e2e) run_for_each_user "tests/$layer" "$@" ;;
+        all) run_all_layers ;;
+    esac
+}
+
+# One layer that fails does not keep the others from being run.
+run_all_layers() {
+    local failed=()
+    run_unit_tests || failed+=(unit)
+    run_dev_tests || failed+=(dev)
+    run_pytest_as domain tests/bench tests/contracts tests/sandbox tests/e2e || failed+=("the domain user's")
+    run_pytest_as local tests/sandbox tests/e2e || failed+=("the local user's")
+    ((${#failed[@]} == 0)) || fail "these tests failed: $(join_words "${failed[@]}"); see the messages above"
+    echo "All layers passed."
+}
+
+join_words() {
+    local IFS=,
+    printf '%s\n' "${*//,/, }" | sed 's/,/, /g'
+}
+
+run_unit_tests() {
+    narrate "running unit tests" ctest --test-dir "build/$PRESET" --parallel "$TEST_JOBS" \
+        --output-on-failure --no-tests=error "$@"
+}
+
+# ./dev itself, in copies of its parts and with stand-ins for the programs that it calls.
+run_dev_tests() {
+    narrate "testing ./dev" "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" -n "$TEST_JOBS" \
+        --confcutdir tests/dev tests/dev "$@"
+}
+
+# Each worker is a box of its own, with its own file view, buses and user.
+run_pytest_as() {
+    local user=$1
+    shift
+    VELK_BOX_USER=$user VELK_AGENT=$AGENT narrate "testing" \
+        "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" --dist load \
+        --tx "$TEST_JOBS*popen//python=sandbox/in-box-python" "$@"
+}
+
+colour() {
+    if [[ -t 1 ]]; then echo --color=yes; else echo --color=no; fi
+}
+
+# The layer's tests for a domain user, then those for a local user. A choice may leave one of them without tests.
+run_for_each_user() {
+    local user status worst=0 without=0
+    for user in domain local; do
+        status=0
+        run_pytest_as "$user" "$@" || status=$?
+        case $status in
+            0) ;;
+            "$PYTEST_CHOSE_NONE") without=$((without + 1)) ;;
+            *) worst=$status ;;
+        esac
+    done
+    ((without < 2)) || fail "no test was chosen"
+    return "$worst"
+}
+
+run_sanitize() {
+    local kind=${1:-address}
+    (($#)) && shift
+    case $kind in
+        address)
+            # Giving memory back asks for the time, which locks up under the tests' preloaded clock; a full
+            # quarantine must not look like a leak.
+            export ASAN_OPTIONS=allocator_release_to_os_interval_ms=-1:quarantine_size_mb=16
+            VELK_PRESET=asan-ubsan exec ./dev test "$@"
+            ;;
+        thread)
+            export TSAN_OPTIONS="ignore_noninstrumented_modules=1 suppressions=$PWD/tests/sanitizers/thread.supp"
+            VELK_PRESET=tsan exec ./dev test unit "$@"
+            ;;
+        memory) run_memcheck "$@" ;;
+    esac
+}
+
+# A day under valgrind: its memory says nothing about the agent's, but valgrind sees what is lost.
+run_memcheck() {
+    local logs=build/memcheck
+    require_boxes
+    need_packages build terminal bench
+    build velks
+    rm -rf "$logs"
+    mkdir -p "$logs"
+    VELK_AGENT=$PWD/tests/sanitizers/memcheck-agent narrate "running a session under valgrind" \
+        "$PYTHON" -m sandbox soak --hours 2 --allowance 1000000 "$@"
+    # A child that has not become another program yet leaves a log without a summary.
+    if grep -l 'ERROR SUMMARY: [1-9]' "$logs"/*.log; then
+        fail "valgrind found something; see the logs above"
+    fi
+    grep -q 'ERROR SUMMARY: 0 errors' "$logs"/*.log || fail "no agent ran under valgrind"
+    echo "memory: nothing lost, nothing misused"
+}
+
+run_coverage() {
+    local report=build/coverage/report status=0
+    require_boxes
+    need_packages build terminal tests coverage
+    VELK_PRESET=coverage ./dev build
+    find build/coverage -name '*.gcda' -delete # counters of an earlier run
+    VELK_PRESET=coverage ./dev test || status=$?
+    mkdir -p "$report"
+    narrate "writing the report" gcovr --root . --object-directory build/coverage --filter src/ \
+        --filter platform/ --exclude-throw-branches --print-summary --txt --html-details "$report/index.html" \
+        --fail-under-line "$LEAST_COVERAGE"
+    echo "coverage: line by line in $report/index.html"
+    return "$status"
+}

@@ -1,0 +1,100 @@
+"""What must be so before ./dev installs or builds: each trouble is one line that is true for its cause."""
+
+from __future__ import annotations
+
+from pathlib import Path
+
+import pytest
+
+from conftest import Tree, refused
+
+NEEDS_BOXES = ("demo", "box", "soak", "picture", "test", "bench", "mutate", "fuzz", "coverage")
+NEEDS_GIT = ("lint", "format", "package", "mutate")
+WORKERS = ("apt-get", "cmake", "ctest", "sandbox", "pytest", "clang-format", "dpkg-buildpackage")
+
+
+def _in_namespace(tree: Tree, preparation: str, *arguments: str) -> str:
+    """What ./dev says in a user namespace of its own, where the preparation was made."""
+    script = f'{preparation}; exec "$0" "$@"'
+    command = tree.command(*arguments, uid=0)
+    wrapped = [*command[:4], "--mount", "sh", "-c", script, *command[4:]]
+    ended = tree.run(wrapped)
+    return refused(ended)
+
+
+@pytest.mark.parametrize("command", NEEDS_BOXES)
+def test_without_boxes_nothing_is_installed_or_built(tree: Tree, command: str) -> None:
+    tree.stand_in("bwrap", "echo no >&2; exit 1")
+
+    line = refused(tree.dev(command))
+
+    assert line.startswith("no boxes can be made here: user namespaces are forbidden") and "(no)" in line
+    assert not tree.calls(*WORKERS)
+
+
+def test_user_namespaces_that_are_switched_off_can_be_switched_on(tree: Tree) -> None:
+    tree.stand_in("bwrap", "exec /usr/bin/unshare --user true")
+
+    line = _in_namespace(tree, "echo 0 >/proc/sys/user/max_user_namespaces", "demo")
+
+    assert line == (
+        "no boxes can be made here: user namespaces are switched off; "
+        "allow them with: sudo sysctl user.max_user_namespaces=10000"
+    )
+
+
+def test_in_a_chroot_no_setting_is_named_that_would_not_help(tree: Tree, tmp_path: Path) -> None:
+    tree.stand_in("bwrap", "exec /usr/bin/unshare --user true")
+    root = tmp_path / "root"
+    root.mkdir()
+
+    line = _in_namespace(tree, f'mount --rbind / {root}; set -- "$0" "$@"; exec chroot {root} "$@"', "demo")
+
+    assert "chroot" in line and "sysctl" not in line
+
+
+def test_roots_build_in_a_folder_of_somebody_else_is_refused(tree: Tree) -> None:
+    tree.stand_in("stat", "echo anna")
+
+    line = refused(tree.dev("demo", uid=0))
+
+    assert line == (
+        "this folder belongs to anna; run ./dev as anna, it asks for sudo itself where that is needed"
+    )
+    assert not tree.calls(*WORKERS)
+
+
+@pytest.mark.parametrize("command", NEEDS_GIT)
+@pytest.mark.parametrize(
+    "answer", ["fatal: detected dubious ownership in repository at '/x'", "fatal: not a git repository"]
+)
+def test_where_git_lists_nothing_nothing_is_checked(tree: Tree, command: str, answer: str) -> None:
+    tree.stand_in("git", f'echo "{answer}" >&2; echo "and more" >&2; exit 128')
+
+    assert refused(tree.dev(command)) == f"git lists no sources here: {answer}"
+    assert not tree.calls(*WORKERS)
+
+
+def test_a_tree_that_is_no_clone_is_told_before_git_is_installed(tree: Tree) -> None:
+    tree.take_away("git")
+
+    assert refused(tree.dev("lint")) == "this is no git clone, and this command works on what git lists"
+    assert not tree.calls(*WORKERS)
+
+
+@pytest.mark.parametrize("command", ["demo", "test", "lint", "fuzz", "package", "mutate"])
+def test_a_full_disk_is_told_beforehand(tree: Tree, command: str) -> None:
+    tree.stand_in("df", "echo Avail; echo '   16'")
+
+    line = refused(tree.dev(command))
+
+    assert line.startswith("this needs about ") and line.endswith("only 16 MB are free there")
+    assert not tree.calls(*WORKERS)
+
+
+def test_a_package_cannot_be_built_under_a_blank(tmp_path: Path) -> None:
+    tree = Tree(tmp_path / "vel ks")
+
+    line = refused(tree.dev("package"))
+
+    assert line == f"Debian's package tools cannot work in a folder with a blank in its name: {tree.root}"
