@@ -12,7 +12,8 @@ from rich.progress import BarColumn, MofNCompleteColumn, Progress, TextColumn, T
 
 from bench import comparison, figures, runner, table
 from bench.figures import Figure, Report
-from bench.runner import GROUPS, REPOSITORY, Options
+from bench.runner import GROUPS, Options
+from sandbox import REPOSITORY
 
 _BASELINE = Path(__file__).with_name("baseline.json")
 _REPORT = REPOSITORY / "build" / "bench" / "report.json"
@@ -126,9 +127,10 @@ def main(argv: Sequence[str] | None = None) -> int:
 
 def _after(arguments: argparse.Namespace, report: Report, console: Console) -> int:
     if arguments.write_docs:
-        from bench import document, scale_page  # need the plotting library, which takes a while to load
+        from bench import document  # the plotting library takes a while to load
+        from bench.fleet import page
 
-        written = [*document.write(report), *scale_page.write(report)]
+        written = [*document.write(report), *page.write(report)]
         console.print("written: " + ", ".join(str(path.relative_to(REPOSITORY)) for path in written))
     if arguments.compare:
         earlier = figures.load(arguments.compare).figures

@@ -7,11 +7,11 @@ from types import TracebackType
 from typing import Mapping
 
 from bench.programs import Peer, Process, Program
-from sandbox import layout
-from sandbox.clock import ManualClock
-from sandbox.fileview import FileView
-from sandbox.platform_server import trust
-from sandbox.users import current_user
+from sandbox.machine import layout
+from sandbox.machine.clock import ManualClock
+from sandbox.machine.files import FileView
+from sandbox.machine.users import current_user
+from sandbox.platform.server import trust
 
 _PROGRAM_SECONDS = 120.0
 ADDRESS = f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}"

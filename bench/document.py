@@ -7,8 +7,8 @@ from pathlib import Path
 
 from bench import plots
 from bench.figures import Figure, Report
-from bench.runner import REPOSITORY
 from bench.table import page_table
+from sandbox import REPOSITORY
 
 DOCS = REPOSITORY / "docs"
 _TEMPLATE = Path(__file__).with_name("performance.md.in")

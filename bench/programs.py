@@ -14,7 +14,7 @@ from types import TracebackType
 from typing import IO, Any, Mapping, Self, Sequence
 
 from sandbox.agent import default_binary
-from sandbox.users import current_user
+from sandbox.machine.users import current_user
 
 _SECONDS = 60.0
 _CALM = 0.3  # seconds without work that are taken for idleness
@@ -41,8 +41,8 @@ def agent() -> Program:
 
 
 def bench_program(name: str) -> str:
-    """Path of one of the programs under bench/floor, which the agent's build folder holds too."""
-    return str(default_binary().parent.parent / "bench" / "floor" / f"bench_{name}")
+    """Path of one of the programs under bench/, which the agent's build folder holds too."""
+    return str(default_binary().parent.parent / "bench" / f"bench_{name}")
 
 
 def floor(name: str, *arguments: str) -> Program:
@@ -117,7 +117,7 @@ class Process:
 
 
 class Peer(Process):
-    """One of the peers under bench/floor: it takes commands and tells what happens, a line each."""
+    """One of the programs under bench/load: it takes commands and tells what happens, a line each."""
 
     def __init__(self, name: str, *arguments: str) -> None:
         self.began = time.monotonic_ns()

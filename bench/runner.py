@@ -12,8 +12,8 @@ from pathlib import Path
 from typing import Any, Callable, Iterator, Sequence
 
 from bench.figures import Figure, figure_of
+from sandbox import REPOSITORY
 
-REPOSITORY = Path(__file__).resolve().parent.parent
 _IN_BOX = REPOSITORY / "sandbox" / "in-box"
 
 # In which users' boxes each group is measured.

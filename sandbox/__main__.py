@@ -7,8 +7,8 @@ import os
 import signal
 import sys
 
-from sandbox import box
-from sandbox.users import USERS, User
+from sandbox.box import bubblewrap
+from sandbox.machine.users import USERS, User
 
 _NO_BOX = 125
 _INTERRUPTED = 130
@@ -32,16 +32,16 @@ def _enter(arguments: list[str]) -> None:
     user = User(options.name or default.name, default.uid if options.uid is None else options.uid)
     env = {name: os.environ[name] for name in options.env if name in os.environ}
     try:
-        box.require()
-    except box.BoxUnavailable as error:
+        bubblewrap.require()
+    except bubblewrap.BoxUnavailable as error:
         print(f"in-box: {error}", file=sys.stderr)
         sys.exit(_NO_BOX)
-    argv = box.command(user, options.command, env)
+    argv = bubblewrap.command(user, options.command, env)
     os.execvp(argv[0], argv)
 
 
 def _run_for_people(verb: str, arguments: list[str]) -> int:
-    from sandbox import outside
+    from sandbox.box import outside
     from sandbox.demo import main as demo
     from sandbox.prompt import main as prompt
     from sandbox.soak import main as soak
@@ -61,7 +61,7 @@ def main() -> int:
     """Entry point."""
     verb, *arguments = sys.argv[1:] or ["run"]
     if verb == "inside":
-        from sandbox import inside  # needs D-Bus, which only the box must have
+        from sandbox.box import inside  # needs D-Bus, which only the box must have
 
         return inside.run(arguments[1:])
     if verb in ("demo", "box", "soak"):

@@ -2,32 +2,38 @@
 
 from __future__ import annotations
 
+import codecs
 import contextlib
 import os
 import signal
 import subprocess
+import threading
 from pathlib import Path
-from typing import Callable, Mapping, Sequence
+from typing import IO, Callable, Mapping, Sequence
 
-from sandbox import layout
-from sandbox.buses import Bus
-from sandbox.clock import Clock, RealTime
+from sandbox import REPOSITORY
+from sandbox.bus.buses import Bus
+from sandbox.bus.senders import Senders
 from sandbox.events import Events
-from sandbox.logreader import PATTERN, LogReader
-from sandbox.senders import Senders
+from sandbox.machine.clock import Clock, RealTime
 
 _STOP_SECONDS = 20.0
 # For instrumented agents: the sanitizer's library need not come before the preloaded clock (preloading both
 # would make the agent's child processes hang), and its leak check, which a stopped clock breaks, stays off.
 _ASAN_WITH_PRELOAD = "verify_asan_link_order=0:detect_leaks=0"
 _NEVER_STARTED = "the agent was never started"
+# A record starts and ends with control characters of its own: a message may hold line breaks, and what is not
+# a record (a sanitizer's report, a crash) must stay apart from the messages.
+_START, _FIELD, _END = "\x1e", "\x1f", "\x1d"
+_PATTERN = _START + _FIELD.join(("%{type}", "%{file}", "%{line}", "%{function}", "%{message}")) + _END
+_FIELDS = 5
 
 
 def default_binary() -> Path:
     """The binary under test: $VELK_AGENT, else that of $VELK_BUILD_DIR, else that of the release build."""
     if "VELK_AGENT" in os.environ:
         return Path(os.environ["VELK_AGENT"])
-    build = Path(os.environ.get("VELK_BUILD_DIR", layout.REPOSITORY / "build" / "release"))
+    build = Path(os.environ.get("VELK_BUILD_DIR", REPOSITORY / "build" / "release"))
     return build / "src" / "velks"
 
 
@@ -50,7 +56,7 @@ class Agent:
     ) -> None:
         """Start the process; returns at once."""
         assert not self.alive, "the agent runs already"
-        env = {**os.environ, "QT_MESSAGE_PATTERN": PATTERN, **(clock or RealTime()).environment()}
+        env = {**os.environ, "QT_MESSAGE_PATTERN": _PATTERN, **(clock or RealTime()).environment()}
         if "LD_PRELOAD" in env:
             env["ASAN_OPTIONS"] = ":".join(filter(None, (os.environ.get("ASAN_OPTIONS"), _ASAN_WITH_PRELOAD)))
         self._ending_wanted = False
@@ -136,3 +142,58 @@ class Agent:
             self._process.kill()
             self.wait()
             raise AssertionError("the agent did not end on SIGTERM") from None
+
+
+class LogReader:
+    """Turns an agent's log into events while it is written, until the writer has gone.
+
+    Messages become events of kind "log" with the level as member, the message as only argument and file, line
+    and function as detail; other lines events of kind "output".
+    """
+
+    def __init__(self, source: str, stream: IO[bytes], events: Events) -> None:
+        self._source = source
+        self._stream = stream
+        self._events = events
+        self._decoder = codecs.getincrementaldecoder("utf-8")(errors="backslashreplace")
+        self._rest = ""
+        self._lines: list[str] = []
+        self._thread = threading.Thread(target=self._read, name=f"log of {source}", daemon=True)
+        self._thread.start()
+
+    @property
+    def text(self) -> str:
+        """The whole log so far, as a person reads it."""
+        return "\n".join(self._lines)
+
+    def finish(self) -> None:
+        """Wait for the end of the log."""
+        self._thread.join()
+
+    def _read(self) -> None:
+        while chunk := os.read(self._stream.fileno(), 65536):
+            self._feed(self._decoder.decode(chunk))
+        self._feed(self._decoder.decode(b"", final=True) + "\n")
+        self._stream.close()
+
+    def _feed(self, text: str) -> None:
+        self._rest += text
+        while True:
+            end = _END + "\n" if self._rest.startswith(_START) else "\n"
+            piece, found, rest = self._rest.partition(end)
+            if not found:
+                return
+            self._rest = rest
+            self._take(piece)
+
+    def _take(self, piece: str) -> None:
+        fields = piece.removeprefix(_START).split(_FIELD, _FIELDS - 1)
+        if not piece.startswith(_START) or len(fields) < _FIELDS:
+            if piece:
+                self._lines.append(piece)
+                self._events.record(self._source, "log", "output", "", (piece,))
+            return
+        level, file, line, function, message = fields
+        self._lines.append(f"{level:8} {file}:{line} {function}: {message}")
+        detail = {"file": file, "line": int(line), "function": function}
+        self._events.record(self._source, "log", "log", level, (message,), detail)

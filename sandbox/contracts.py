@@ -18,10 +18,10 @@ from typing import Any
 from jsonschema import Draft202012Validator, RefResolver
 from jsonschema.exceptions import best_match
 
-from sandbox import layout
+from sandbox import REPOSITORY
 from sandbox.events import Event, Events
 
-FOLDER = layout.REPOSITORY / "contracts" / "json"
+FOLDER = REPOSITORY / "contracts" / "json"
 _SUFFIX = ".schema.json"
 
 _UPLOADS = {

@@ -7,30 +7,30 @@ from types import TracebackType
 from typing import Callable, Collection, Mapping
 from uuid import uuid4
 
-from sandbox import commands
 from sandbox.agent import Agent
-from sandbox.buses import Bus
-from sandbox.busmonitor import BusMonitor
-from sandbox.clock import Clock, ManualClock
+from sandbox.bus.buses import Bus
+from sandbox.bus.monitor import BusMonitor
+from sandbox.bus.senders import Senders
 from sandbox.contracts import Contracts
 from sandbox.events import Events
-from sandbox.fileview import FileView
-from sandbox.network import Network
-from sandbox.packages import Packages
-from sandbox.peers.base import Peer
-from sandbox.peers.daemon import Daemon
-from sandbox.peers.dock import Dock
-from sandbox.peers.identity import Identity
-from sandbox.peers.launcher import Launcher
-from sandbox.peers.logind import Logind
-from sandbox.peers.notifications import Notifications
-from sandbox.peers.policy_service import PolicyService
-from sandbox.peers.screensaver import ScreenSaver
-from sandbox.peers.session_manager import SessionManager
-from sandbox.platform_server import Platform, trust
-from sandbox.senders import Senders
-from sandbox.tools import Tools
-from sandbox.users import User, current_user
+from sandbox.fakes.base import Peer
+from sandbox.fakes.daemon import Daemon
+from sandbox.fakes.dock import Dock
+from sandbox.fakes.identity import Identity
+from sandbox.fakes.launcher import Launcher
+from sandbox.fakes.logind import Logind
+from sandbox.fakes.notifications import Notifications
+from sandbox.fakes.policy_service import PolicyService
+from sandbox.fakes.screensaver import ScreenSaver
+from sandbox.fakes.session_manager import SessionManager
+from sandbox.machine import commands
+from sandbox.machine.clock import Clock, ManualClock
+from sandbox.machine.files import FileView
+from sandbox.machine.network import Network
+from sandbox.machine.package_tools import Tools
+from sandbox.machine.packages import Packages
+from sandbox.machine.users import User, current_user
+from sandbox.platform.server import Platform, trust
 
 
 class Terminal:

@@ -16,8 +16,8 @@ from typing import Any, Generator, Iterator
 
 import pytest
 
-from sandbox import layout
-from sandbox.clock import ManualClock, RealTime
+from sandbox.machine import layout
+from sandbox.machine.clock import ManualClock, RealTime
 from sandbox.terminal import Terminal
 
 

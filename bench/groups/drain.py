@@ -9,7 +9,7 @@ from bench.bed import ADDRESS, Bed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
-from sandbox.clock import ManualClock
+from sandbox.machine.clock import ManualClock
 
 _ROW = 3_000
 _LENGTHS = (100, 10_000, 100_000)

@@ -9,7 +9,7 @@ from bench.bed import ADDRESS, Bed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import agent, floor
-from sandbox.users import current_user
+from sandbox.machine.users import current_user
 
 _CALM = 2.0  # seconds until the start is over for certain
 # The first poll of a domain user may come a minute after the start.

@@ -9,8 +9,8 @@ from bench.bed import Bed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Program, agent, floor
-from sandbox import layout
-from sandbox.packages import Packages
+from sandbox.machine import layout
+from sandbox.machine.packages import Packages
 
 _ITEMS = (10, 100, 300)
 _SECONDS_PER_CHILD = 0.1

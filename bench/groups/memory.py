@@ -8,8 +8,8 @@ from bench.bed import ADDRESS, Bed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
-from sandbox.clock import ManualClock
-from sandbox.users import current_user
+from sandbox.machine.clock import ManualClock
+from sandbox.machine.users import current_user
 
 _MOST_DIRTY = 4096  # KiB
 _PAGES = 64  # KiB by which two runs of one program differ

@@ -11,7 +11,7 @@ from bench.bed import ADDRESS, Bed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Program, agent, floor
-from sandbox.users import current_user
+from sandbox.machine.users import current_user
 
 _CHILD = ["/usr/bin/dpkg-architecture", "-q", "DEB_HOST_ARCH_CPU"]
 

@@ -8,7 +8,7 @@ from bench.bed import Bed
 from bench.figures import Figure
 from bench.plan import Plan
 from bench.programs import agent
-from sandbox.clock import ManualClock
+from sandbox.machine.clock import ManualClock
 
 _POLLS = 16
 _STEP = 20  # seconds

@@ -6,9 +6,10 @@ import argparse
 from pathlib import Path
 from typing import Sequence
 
-from sandbox import layout, outside
+from sandbox.box import outside
 from sandbox.demo.picture import PictureFile
-from sandbox.users import DOMAIN_USER
+from sandbox.machine import layout
+from sandbox.machine.users import DOMAIN_USER
 
 _DEFAULT_SPEED = 30
 _DEFAULT_PATIENCE = 20.0

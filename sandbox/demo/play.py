@@ -8,16 +8,16 @@ from typing import Sequence
 from rich.console import Console
 from rich.text import Text
 
-from sandbox import outside
+from sandbox.box import outside
+from sandbox.box.outside import Trouble
+from sandbox.box.preconditions import clock, require_agent
 from sandbox.demo import picture, result
 from sandbox.demo.scene import Scene
 from sandbox.demo.scenes import SCENES
 from sandbox.demo.tour import Outcome, Tour
-from sandbox.outside import Trouble
 from sandbox.terminal import Terminal
 from sandbox.timeline.agenttime import AgentTime
 from sandbox.timeline.timeline import Timeline, console_for_people, console_for_picture
-from sandbox.workplace import clock, require_agent
 
 
 def play(options: Namespace) -> int:

@@ -5,7 +5,7 @@ from __future__ import annotations
 from rich.table import Table
 from rich.text import Text
 
-from sandbox.peers.dock import Dock
+from sandbox.fakes.dock import Dock
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import command, number
 

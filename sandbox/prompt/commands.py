@@ -7,8 +7,8 @@ from typing import Any, Iterable
 
 from rich.table import Table
 
-from sandbox import layout
-from sandbox.peers.fault import Fault
+from sandbox.fakes.fault import Fault
+from sandbox.machine import layout
 from sandbox.policies import POLICIES
 from sandbox.prompt import application_commands, platform_commands, software_commands
 from sandbox.prompt.desk import Desk, Refused

@@ -5,7 +5,7 @@ from __future__ import annotations
 from rich.console import Console, RenderableType
 
 from sandbox.events import Event
-from sandbox.peers.base import Peer
+from sandbox.fakes.base import Peer
 from sandbox.terminal import Terminal
 from sandbox.timeline.timeline import Timeline
 

@@ -9,7 +9,7 @@ from typing import IO, Any
 
 import dbus
 
-from sandbox.outside import Trouble
+from sandbox.box.outside import Trouble
 
 _NAME = "org.freedesktop.Notifications"
 _PATH = "/org/freedesktop/Notifications"

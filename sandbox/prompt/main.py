@@ -6,9 +6,10 @@ import argparse
 import sys
 from typing import Sequence
 
-from sandbox import layout, outside
-from sandbox.outside import Consumer, Trouble
-from sandbox.users import DOMAIN_USER, LOCAL_USER
+from sandbox.box import outside
+from sandbox.box.outside import Consumer, Trouble
+from sandbox.machine import layout
+from sandbox.machine.users import DOMAIN_USER, LOCAL_USER
 
 
 def run(arguments: Sequence[str]) -> int:

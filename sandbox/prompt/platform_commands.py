@@ -7,7 +7,7 @@ from typing import Iterable
 from rich.table import Table
 from rich.text import Text
 
-from sandbox.platform_server import HttpFault, Platform
+from sandbox.platform.server import HttpFault, Platform
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, command, number
 

@@ -7,15 +7,15 @@ from argparse import Namespace
 
 from rich.text import Text
 
-from sandbox import outside
-from sandbox.outside import Trouble
+from sandbox.box import outside
+from sandbox.box.outside import Trouble
+from sandbox.box.preconditions import clock, require_agent
 from sandbox.prompt import commands, loop
 from sandbox.prompt.desk import Desk
 from sandbox.prompt.mirror import Mirror
 from sandbox.terminal import Terminal
 from sandbox.timeline.agenttime import AgentTime
 from sandbox.timeline.timeline import Timeline, console_for_people
-from sandbox.workplace import clock, require_agent
 
 assert commands, "importing the module makes its commands known"
 

@@ -5,8 +5,8 @@ from __future__ import annotations
 from rich.table import Table
 from rich.text import Text
 
-from sandbox.packages import desktop_file
-from sandbox.peers.launcher import LauncherItem
+from sandbox.fakes.launcher import LauncherItem
+from sandbox.machine.packages import desktop_file
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import command
 

@@ -6,8 +6,8 @@ import json
 from random import Random
 
 from sandbox import policies
-from sandbox.packages import desktop_file
-from sandbox.peers.launcher import LauncherItem
+from sandbox.fakes.launcher import LauncherItem
+from sandbox.machine.packages import desktop_file
 from sandbox.soak import ledger as kinds
 from sandbox.soak.ledger import Ledger
 from sandbox.terminal import Terminal

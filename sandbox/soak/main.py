@@ -5,8 +5,9 @@ from __future__ import annotations
 import argparse
 from typing import Sequence
 
-from sandbox import layout, outside
-from sandbox.users import DOMAIN_USER
+from sandbox.box import outside
+from sandbox.machine import layout
+from sandbox.machine.users import DOMAIN_USER
 
 _HOURS = 24
 _ALLOWANCE = 512

@@ -10,12 +10,12 @@ from rich.console import Console
 from rich.table import Table
 from rich.text import Text
 
-from sandbox.clock import ManualClock
+from sandbox.box.preconditions import require_agent
+from sandbox.machine.clock import ManualClock
 from sandbox.soak.day import BEGIN, Day
 from sandbox.soak.ledger import KINDS, Ledger
 from sandbox.soak.vitals import Vitals, growth, vitals
 from sandbox.terminal import Terminal
-from sandbox.workplace import require_agent
 
 _COLUMNS = ("hour", "resident, KiB", "private dirty, KiB", "descriptors", "threads", "sent", "arrived")
 _SWITCH_SECONDS = 0.0001  # the services' threads share one interpreter and hand over often

@@ -4,7 +4,7 @@ from __future__ import annotations
 
 import pytest
 
-from bench.scale import DAY, Intervals, simulate
+from bench.fleet.simulation import DAY, Intervals, simulate
 
 
 def test_agents_that_start_together_poll_together() -> None:

@@ -8,10 +8,10 @@ from pathlib import Path
 import pytest
 from logcalls import LogLine, log_lines, log_lines_of
 
-from sandbox import contracts, layout
+from sandbox import REPOSITORY, contracts
 from sandbox.policies import POLICIES, Policy
 
-DOCS = layout.REPOSITORY / "docs"
+DOCS = REPOSITORY / "docs"
 PAGES = sorted(DOCS.glob("*.md"))
 AUDIENCES = {
     "EverySession": "every session",
@@ -57,7 +57,7 @@ def test_log_call_is_read_as_the_line_that_it_writes(source: str, text: str) -> 
 
 
 def test_every_log_line_stands_in_the_catalogue_and_no_other() -> None:
-    written = log_lines_of(layout.REPOSITORY / "src", layout.REPOSITORY / "platform")
+    written = log_lines_of(REPOSITORY / "src", REPOSITORY / "platform")
     catalogued = catalogued_lines()
 
     assert (written - set(catalogued), set(catalogued) - written) == (set(), set())
@@ -81,7 +81,7 @@ def test_policy_page_and_diagram_have_each_action() -> None:
 @pytest.mark.parametrize(("file", "name"), sorted(named_tests()))
 def test_test_that_the_failure_matrix_names_exists(file: str, name: str) -> None:
     prefix = "def " if file.endswith(".py") else "void "
-    assert f"{prefix}{name}(" in (layout.REPOSITORY / file).read_text()
+    assert f"{prefix}{name}(" in (REPOSITORY / file).read_text()
 
 
 @pytest.mark.parametrize("path", PAGES + [contracts.FOLDER.parent / "README.md"], ids=lambda path: path.name)

@@ -9,7 +9,7 @@ from pathlib import Path
 import pytest
 from jsonschema import Draft202012Validator
 
-from sandbox import contracts, layout, policies
+from sandbox import REPOSITORY, contracts, policies
 from sandbox.policies import FORWARDED_CODES, POLICIES, Policy
 
 EXAMPLES = contracts.FOLDER / "examples"
@@ -99,7 +99,7 @@ def test_people_can_check_their_own_messages(names: list[str], status: int, said
     files = [str(EXAMPLES / "policy-message" / f"{name}.json") for name in names]
     ended = subprocess.run(
         ["/usr/bin/python3", "-m", "sandbox.contracts", "policy-message", *files],
-        cwd=layout.REPOSITORY,
+        cwd=REPOSITORY,
         capture_output=True,
         text=True,
     )

@@ -7,7 +7,8 @@ import pytest
 from areas import AREAS, Area, area_of, chosen
 from mutants import mutants
 
-from sandbox import layout
+from sandbox import REPOSITORY
+
 
 FUNCTION = "void Thing::act()\n{{\n    {}\n}}\n"
 
@@ -78,8 +79,8 @@ def test_a_mutant_says_where_it_is() -> None:
 
 @pytest.mark.parametrize("area", AREAS, ids=lambda area: f"{area.file}, {area.component}")
 def test_the_table_names_sources_functions_and_tests_that_exist(area: Area) -> None:
-    source = (layout.REPOSITORY / area.file).read_text()
-    tests = layout.REPOSITORY / "tests"
+    source = (REPOSITORY / area.file).read_text()
+    tests = REPOSITORY / "tests"
     assert [name for name in area.functions if f"{name}(" not in source] == []
     assert [name for name in area.unit if not (tests / "unit" / f"{name}.cpp").exists()] == []
     modules = {name: tests / "e2e" / f"test_{name}.py" for name in (*area.e2e, *area.local)}
@@ -111,7 +112,7 @@ def test_every_explanation_is_of_a_mutant_that_still_exists() -> None:
     existing = {
         explanations.key_of(mutant)
         for file in files
-        for mutant in mutants(file, (layout.REPOSITORY / file).read_text())[0]
+        for mutant in mutants(file, (REPOSITORY / file).read_text())[0]
     }
     assert set(known) - existing == set()
     assert all(known.values())

@@ -11,7 +11,7 @@ from typing import Iterator
 
 import pytest
 
-from sandbox import layout
+from sandbox import REPOSITORY
 from sandbox.policies import POLICIES
 
 NOT_COPIED = shutil.ignore_patterns("build", ".*", "__pycache__")
@@ -30,7 +30,7 @@ print('"1305"' in dictionary("policy"))
 
 def recipe() -> str:
     """The section of CONTRIBUTING.md."""
-    text = (layout.REPOSITORY / "CONTRIBUTING.md").read_text()
+    text = (REPOSITORY / "CONTRIBUTING.md").read_text()
     return text.split("## To add a policy code\n")[1].split("\n## ")[0]
 
 
@@ -45,7 +45,7 @@ def snippet(language: str) -> str:
 def tree(tmp_path: Path) -> Path:
     """A copy of the sources."""
     copy = tmp_path / "tree"
-    shutil.copytree(layout.REPOSITORY, copy, ignore=NOT_COPIED)
+    shutil.copytree(REPOSITORY, copy, ignore=NOT_COPIED)
     return copy
 
 
@@ -125,4 +125,4 @@ def test_recipe_names_five_files_at_most() -> None:
     steps = recipe().split("`./dev test` then")[0]
     named = set(re.findall(r"`([\w/.-]+\.(?:json|cpp|h|md|py|dot))`", steps))
     assert 1 <= len(named) <= 5
-    assert [name for name in named if not (layout.REPOSITORY / name).exists()] == []
+    assert [name for name in named if not (REPOSITORY / name).exists()] == []

@@ -14,7 +14,7 @@ from cryptography.hazmat.primitives import hashes, serialization
 from cryptography.hazmat.primitives.asymmetric import ec
 from cryptography.x509.oid import NameOID
 
-from sandbox.commands import Answer
+from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 
 

@@ -5,7 +5,7 @@ from __future__ import annotations
 from typing import Callable
 from uuid import uuid4
 
-from sandbox.peers import dock
+from sandbox.fakes import dock
 from sandbox.terminal import Terminal
 
 OPENED, CLOSED = 1, 2

@@ -5,10 +5,10 @@ from __future__ import annotations
 import json
 from typing import Any
 
-from sandbox import layout
 from sandbox.events import Event
-from sandbox.packages import desktop_file
-from sandbox.peers.launcher import LauncherItem
+from sandbox.fakes.launcher import LauncherItem
+from sandbox.machine import layout
+from sandbox.machine.packages import desktop_file
 from sandbox.terminal import Terminal
 
 INVENTORY = "https://%1:%2/uim/v3/client/upload_info"

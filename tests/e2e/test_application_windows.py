@@ -5,8 +5,8 @@ from __future__ import annotations
 import pytest
 
 from dockwatch import CLOSED, OPENED, follows, settle, start, warnings
-from sandbox.peers import dock
-from sandbox.peers.dock import Announcement
+from sandbox.fakes import dock
+from sandbox.fakes.dock import Announcement
 from sandbox.terminal import Terminal
 
 WAYS: list[tuple[Announcement, ...]] = [

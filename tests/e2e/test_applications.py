@@ -5,8 +5,8 @@ from __future__ import annotations
 import pytest
 
 from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
-from sandbox.peers import dock
-from sandbox.peers.fault import Fault
+from sandbox.fakes import dock
+from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 
 

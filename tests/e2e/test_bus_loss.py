@@ -11,11 +11,11 @@ from typing import Callable
 import pytest
 from gi.repository import Gio
 
-from sandbox.buses import Bus
-from sandbox.clock import ManualClock
+from sandbox.bus.buses import Bus
 from sandbox.events import Predicate
-from sandbox.peers import dock
-from sandbox.peers.fault import Fault
+from sandbox.fakes import dock
+from sandbox.fakes.fault import Fault
+from sandbox.machine.clock import ManualClock
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, carries_out_policies, forced_actions, next_notification, next_status
 

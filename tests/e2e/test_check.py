@@ -8,9 +8,9 @@ import subprocess
 import pytest
 
 from checkreport import binary, make_all_well, report, run
-from sandbox import layout
-from sandbox.commands import Answer
-from sandbox.fileview import DEFAULT_USERINFO
+from sandbox.machine import layout
+from sandbox.machine.commands import Answer
+from sandbox.machine.files import DEFAULT_USERINFO
 from sandbox.terminal import Terminal
 
 

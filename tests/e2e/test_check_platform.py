@@ -5,9 +5,9 @@ from __future__ import annotations
 import pytest
 
 from checkreport import encrypted, make_all_well, pair, report
-from sandbox import layout
-from sandbox.certificates import Authority
-from sandbox.platform_server import HttpFault, Platform
+from sandbox.machine import layout
+from sandbox.platform.certificates import Authority
+from sandbox.platform.server import HttpFault, Platform
 from sandbox.terminal import Terminal
 
 CERTIFICATES = {

@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 from sandbox.events import Event
-from sandbox.peers.fault import Fault
+from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, log_lines, next_notification, next_status
 

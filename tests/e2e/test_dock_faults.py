@@ -7,9 +7,9 @@ from typing import Any
 import pytest
 
 from dockwatch import OPENED, follows, scans, settle, start, told, warnings
-from sandbox.peers import dock
-from sandbox.peers.exported import Reply
-from sandbox.peers.fault import Fault
+from sandbox.fakes import dock
+from sandbox.fakes.exported import Reply
+from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 from wire import carries_out_policies
 

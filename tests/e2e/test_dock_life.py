@@ -7,9 +7,9 @@ from typing import Iterator
 import pytest
 
 from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
-from sandbox.peers import dock
-from sandbox.peers.exported import PROPERTIES
-from sandbox.spoofer import Stranger
+from sandbox.bus.stranger import Stranger
+from sandbox.fakes import dock
+from sandbox.fakes.exported import PROPERTIES
 from sandbox.terminal import Terminal
 from wire import STATE_QUESTIONS, asked_of_the_session_bus, carries_out_policies
 

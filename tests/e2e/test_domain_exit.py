@@ -9,9 +9,9 @@ from pathlib import Path
 
 import pytest
 
-from sandbox import layout
-from sandbox.commands import Answer
-from sandbox.peers.fault import Fault
+from sandbox.fakes.fault import Fault
+from sandbox.machine import layout
+from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 from wire import Notification, forced_actions, log_lines, next_notification, settled
 

@@ -7,11 +7,11 @@ from typing import Callable
 import pytest
 
 from sandbox.events import Event
-from sandbox.peers.base import Peer
-from sandbox.peers.exported import Reply
-from sandbox.peers.fault import Fault
-from sandbox.peers.launcher import LauncherItem
-from sandbox.platform_server import HttpFault
+from sandbox.fakes.base import Peer
+from sandbox.fakes.exported import Reply
+from sandbox.fakes.fault import Fault
+from sandbox.fakes.launcher import LauncherItem
+from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, next_notification, next_status
 

@@ -13,10 +13,10 @@ import pytest
 from gi.repository import GLib
 
 from dockwatch import CLOSED, OPENED, settle, told
-from sandbox.flooder import Flooder, signal
-from sandbox.peers import daemon, dock, launcher
-from sandbox.peers.fault import Fault
-from sandbox.peers.launcher import LauncherItem
+from sandbox.bus.flooder import Flooder, signal
+from sandbox.fakes import daemon, dock, launcher
+from sandbox.fakes.fault import Fault
+from sandbox.fakes.launcher import LauncherItem
 from sandbox.terminal import Terminal
 from wire import carries_out_policies, log_lines
 

@@ -4,7 +4,7 @@ from __future__ import annotations
 
 import pytest
 
-from sandbox.peers.fault import Fault
+from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 from wire import forced_actions, log_lines, next_notification, next_status
 

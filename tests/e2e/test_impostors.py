@@ -7,10 +7,10 @@ from typing import Any, Iterator
 import pytest
 
 from dockwatch import settle, told
-from sandbox.buses import Bus
-from sandbox.peers import daemon, dock, launcher
-from sandbox.peers.base import Peer
-from sandbox.spoofer import Stranger
+from sandbox.bus.buses import Bus
+from sandbox.bus.stranger import Stranger
+from sandbox.fakes import daemon, dock, launcher
+from sandbox.fakes.base import Peer
 from sandbox.terminal import Terminal
 from software import EDITOR, install, uploads
 from wire import carries_out_policies, log_lines, next_notification, next_status, settled

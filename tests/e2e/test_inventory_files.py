@@ -9,9 +9,9 @@ from typing import Any
 
 import pytest
 
-from sandbox import layout
-from sandbox.commands import Answer
-from sandbox.peers.launcher import LauncherItem
+from sandbox.fakes.launcher import LauncherItem
+from sandbox.machine import layout
+from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 from software import EDITOR, PLAYER, announce, install, inventory_at_start, next_inventory, tool_calls
 from wire import log_lines

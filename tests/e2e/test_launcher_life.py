@@ -4,9 +4,9 @@ from __future__ import annotations
 
 import pytest
 
-from sandbox.peers.exported import Reply
-from sandbox.peers.fault import Fault
-from sandbox.peers.launcher import LauncherItem
+from sandbox.fakes.exported import Reply
+from sandbox.fakes.fault import Fault
+from sandbox.fakes.launcher import LauncherItem
 from sandbox.terminal import Terminal
 from software import (
     CHANGE,

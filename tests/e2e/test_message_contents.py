@@ -7,7 +7,7 @@ from typing import Any
 
 import pytest
 
-from sandbox.platform_server import HttpFault
+from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from wire import next_notification
 

@@ -11,7 +11,7 @@ from uuid import uuid4
 import pytest
 
 from sandbox.events import Event
-from sandbox.platform_server import HttpFault
+from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from wire import FORWARDED_CODE, forced_actions, log_lines, next_notification
 

@@ -8,9 +8,9 @@ from typing import Any
 
 import pytest
 
-from sandbox.commands import Answer
-from sandbox.packages import desktop_file, native_architecture
-from sandbox.peers.launcher import LauncherItem
+from sandbox.fakes.launcher import LauncherItem
+from sandbox.machine.commands import Answer
+from sandbox.machine.packages import desktop_file, native_architecture
 from sandbox.terminal import Terminal
 from software import EDITOR, PLAYER, announce, install, inventory_at_start, tool_calls
 from wire import log_lines

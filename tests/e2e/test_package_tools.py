@@ -8,7 +8,7 @@ from typing import Any
 
 import pytest
 
-from sandbox.commands import Answer
+from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 from software import (
     CHANGE,

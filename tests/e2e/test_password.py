@@ -6,9 +6,9 @@ import json
 
 import pytest
 
-from sandbox.platform_server import HttpFault
+from sandbox.machine.users import User
+from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from sandbox.users import User
 from wire import log_lines, next_notification
 
 USER = "zhang.wei"

@@ -9,9 +9,9 @@ from typing import Iterator
 
 import pytest
 
-from sandbox import layout
-from sandbox.certificates import Authority, Identity
-from sandbox.platform_server import HttpFault, Platform, trust
+from sandbox.machine import layout
+from sandbox.platform.certificates import Authority, Identity
+from sandbox.platform.server import HttpFault, Platform, trust
 from sandbox.terminal import Terminal
 from wire import carries_out_policies, log_lines, next_notification
 

@@ -4,8 +4,8 @@ from __future__ import annotations
 
 import pytest
 
+from sandbox.machine.users import User
 from sandbox.terminal import Terminal
-from sandbox.users import User
 from wire import FIVE_MINUTES, log_lines, next_status
 
 

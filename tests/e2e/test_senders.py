@@ -8,7 +8,7 @@ from typing import Iterator
 
 import pytest
 
-from sandbox.spoofer import Stranger
+from sandbox.bus.stranger import Stranger
 from sandbox.terminal import Terminal
 from wire import next_notification, next_status, settled
 

@@ -4,8 +4,8 @@ from __future__ import annotations
 
 import pytest
 
-from sandbox.peers.exported import Reply
-from sandbox.peers.fault import Fault
+from sandbox.fakes.exported import Reply
+from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, forced_actions, next_notification, next_status
 

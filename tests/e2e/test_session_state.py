@@ -6,9 +6,9 @@ from typing import Any
 
 import pytest
 
-from sandbox.peers.exported import Reply
-from sandbox.peers.fault import Fault
-from sandbox.peers.logind import USER
+from sandbox.fakes.exported import Reply
+from sandbox.fakes.fault import Fault
+from sandbox.fakes.logind import USER
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, log_lines, next_status
 

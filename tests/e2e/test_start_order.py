@@ -3,8 +3,8 @@
 from __future__ import annotations
 
 from dockwatch import CLOSED, OPENED, settle, told
-from sandbox.peers import dock
-from sandbox.peers.fault import Fault
+from sandbox.fakes import dock
+from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 from software import CHANGE, EDITOR, INVENTORY, install, next_inventory, uploads
 from wire import log_lines, next_notification

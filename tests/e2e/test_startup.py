@@ -4,8 +4,8 @@ from __future__ import annotations
 
 import pytest
 
+from sandbox.machine.users import DOMAIN_USER, LOCAL_USER
 from sandbox.terminal import Terminal
-from sandbox.users import DOMAIN_USER, LOCAL_USER
 
 
 def reports(terminal: Terminal, after: int = 0) -> list[tuple[object, ...]]:

@@ -9,10 +9,10 @@ from pathlib import Path
 from subprocess import PIPE, CompletedProcess
 from tempfile import TemporaryFile
 
-from sandbox import layout
 from sandbox.agent import default_binary
-from sandbox.peers.daemon import INTERFACE as VELKG
-from sandbox.peers.policy_service import INTERFACE as PRYS
+from sandbox.fakes.daemon import INTERFACE as VELKG
+from sandbox.fakes.policy_service import INTERFACE as PRYS
+from sandbox.machine import layout
 
 _TALK = f"""
 import dbus, ssl

@@ -8,9 +8,10 @@ from pathlib import Path
 
 import pytest
 
-from sandbox import layout
+from sandbox import REPOSITORY
+from sandbox.machine import layout
+from sandbox.machine.users import LOCAL_USER, current_user
 from sandbox.terminal import Terminal
-from sandbox.users import LOCAL_USER, current_user
 
 
 def test_etc_holds_nothing_but_the_terminals_own_files() -> None:
@@ -27,7 +28,7 @@ def test_programs_have_no_power_over_the_box(kind: str) -> None:
     assert int(status[kind], 16) == 0
 
 
-@pytest.mark.parametrize("folder", ["/", "/usr", "/usr/share", str(layout.REPOSITORY)])
+@pytest.mark.parametrize("folder", ["/", "/usr", "/usr/share", str(REPOSITORY)])
 def test_the_system_is_read_only(folder: str) -> None:
     with pytest.raises(OSError, match="Read-only|Permission denied"):
         (Path(folder) / "box-was-here").touch()

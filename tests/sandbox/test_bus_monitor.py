@@ -9,8 +9,8 @@ import dbus
 import pytest
 from people import talking_agent
 
-from sandbox.busmonitor import Overheard
-from sandbox.spoofer import Stranger
+from sandbox.bus.monitor import Overheard
+from sandbox.bus.stranger import Stranger
 from sandbox.terminal import Terminal
 
 SOME_POLICY = '{"type": 5}'

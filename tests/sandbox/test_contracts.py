@@ -10,7 +10,7 @@ import pytest
 from people import talking_agent
 
 from sandbox import contracts
-from sandbox.platform_server import HttpFault
+from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 
 CHANGES = "https://%1:%2/uim/v3/client/upinfo_log"

@@ -7,10 +7,10 @@ from typing import Any, Iterator, Sequence
 import dbus
 import pytest
 
-from sandbox.peers import dock, launcher
-from sandbox.peers.dock import Announcement
-from sandbox.peers.launcher import LauncherItem
-from sandbox.spoofer import Stranger
+from sandbox.bus.stranger import Stranger
+from sandbox.fakes import dock, launcher
+from sandbox.fakes.dock import Announcement
+from sandbox.fakes.launcher import LauncherItem
 from sandbox.terminal import Terminal
 
 PROPERTIES = "org.freedesktop.DBus.Properties"

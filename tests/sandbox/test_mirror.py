@@ -14,7 +14,7 @@ import dbus.bus
 import dbus.service
 import pytest
 
-from sandbox.mainloop import MainLoop
+from sandbox.bus.mainloop import MainLoop
 from sandbox.prompt.mirror import Mirror
 from sandbox.terminal import Terminal
 

@@ -9,7 +9,7 @@ from typing import Any, Iterator
 
 import pytest
 
-from sandbox.network import NetworkTrouble
+from sandbox.machine.network import NetworkTrouble
 from sandbox.terminal import Terminal
 
 RUNNING = (True, True)

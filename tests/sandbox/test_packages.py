@@ -7,7 +7,7 @@ from pathlib import Path
 
 import pytest
 
-from sandbox.packages import desktop_file, native_architecture
+from sandbox.machine.packages import desktop_file, native_architecture
 from sandbox.terminal import Terminal
 
 FOREIGN = "i386" if native_architecture() != "i386" else "amd64"

@@ -9,9 +9,9 @@ from typing import Any, Iterator
 import dbus
 import pytest
 
-from sandbox.buses import Bus
-from sandbox.peers.fault import Fault
-from sandbox.spoofer import Stranger
+from sandbox.bus.buses import Bus
+from sandbox.bus.stranger import Stranger
+from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 
 DAEMON = ("com.norix.velk.velkg", "/com/norix/velk/velkg", "com.norix.velk.velkg")

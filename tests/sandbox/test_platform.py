@@ -9,8 +9,8 @@ from typing import Any
 
 import pytest
 
-from sandbox import layout
-from sandbox.platform_server import HttpFault
+from sandbox.machine import layout
+from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 
 LIST = "/notification/v2/list?uid=zhang&is_not_read=1&limit=1&offset=0&order=create_at&desc=1&timestaps=1"

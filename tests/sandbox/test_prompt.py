@@ -7,7 +7,7 @@ from pathlib import Path
 import pytest
 
 from people import run_program
-from sandbox.users import current_user
+from sandbox.machine.users import current_user
 
 
 def test_piped_commands_are_carried_out_and_the_traffic_is_printed() -> None:

@@ -7,12 +7,12 @@ import json
 import pytest
 
 from paper import Paper
-from sandbox import layout
+from sandbox.machine import layout
+from sandbox.machine.users import DOMAIN_USER
 from sandbox.prompt import commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, run_line
 from sandbox.terminal import Terminal
-from sandbox.users import DOMAIN_USER
 
 assert commands, "importing the module makes its commands known"
 

@@ -7,7 +7,7 @@ import subprocess
 import pytest
 
 from paper import Paper
-from sandbox.packages import desktop_file
+from sandbox.machine.packages import desktop_file
 from sandbox.prompt import commands
 from sandbox.prompt.desk import Refused
 from sandbox.prompt.registry import run_line

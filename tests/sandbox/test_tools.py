@@ -8,8 +8,8 @@ from pathlib import Path
 
 import pytest
 
-from sandbox.commands import Answer
-from sandbox.packages import desktop_file
+from sandbox.machine.commands import Answer
+from sandbox.machine.packages import desktop_file
 from sandbox.terminal import Terminal
 
 QUERY = ("/usr/bin/dpkg-query", "-W", "-f=${Version}", "editor")

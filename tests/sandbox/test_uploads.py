@@ -7,9 +7,9 @@ from typing import Any, Iterator
 
 import pytest
 
-from sandbox.peers import daemon
-from sandbox.platform_server import HttpFault
-from sandbox.spoofer import Stranger
+from sandbox.bus.stranger import Stranger
+from sandbox.fakes import daemon
+from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 
 CHANGES = "https://%1:%2/uim/v3/client/upinfo_log"

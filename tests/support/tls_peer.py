@@ -27,7 +27,7 @@ from tls_scripts import Conversation, Over, answer
 
 sys.path.insert(0, str(Path(__file__).resolve().parents[2]))
 
-from sandbox.certificates import Authority, Identity, write_secret  # noqa: E402
+from sandbox.platform.certificates import Authority, Identity, write_secret  # noqa: E402
 
 _HOST = "127.0.0.1"
 _LISTEN_BACKLOG = 64

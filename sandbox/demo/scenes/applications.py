@@ -5,7 +5,7 @@ from __future__ import annotations
 from typing import Callable
 
 from sandbox.demo.scene import Expectation, Scene, Step, from_agent
-from sandbox.peers.dock import Dock
+from sandbox.fakes.dock import Dock
 from sandbox.terminal import Terminal
 
 _OPENED, _CLOSED = 1, 2

@@ -3,8 +3,8 @@
 from __future__ import annotations
 
 from sandbox.demo.scene import Expectation, Scene, Step, message_comes, notice
+from sandbox.machine.users import DOMAIN_USER as USER
 from sandbox.terminal import Terminal
-from sandbox.users import DOMAIN_USER as USER
 
 _NOTICE_DELAY = 60
 _LATEST_FIRST_POLL = 120

@@ -4,6 +4,7 @@ from __future__ import annotations
 
 from typing import Any, Mapping
 
+from sandbox.bus.stranger import Stranger
 from sandbox.demo.scene import (
     LOGOUT,
     NO_REBOOT,
@@ -16,11 +17,10 @@ from sandbox.demo.scene import (
     from_agent,
     notice,
 )
-from sandbox.peers import daemon
+from sandbox.fakes import daemon
+from sandbox.machine.users import DOMAIN_USER as USER
 from sandbox.policies import POLICIES
-from sandbox.spoofer import Stranger
 from sandbox.terminal import Terminal
-from sandbox.users import DOMAIN_USER as USER
 
 _SOMEBODY_ELSE = USER.uid + 1
 _POLICY = '{"type":2101,"payload":{"wallpaper":"/usr/share/backgrounds/校园.jpg"}}'

@@ -3,8 +3,8 @@
 from __future__ import annotations
 
 from sandbox.demo.scene import NOTHING_ASKED, Expectation, Scene, Step, from_agent, message_comes
+from sandbox.machine.users import DOMAIN_USER as USER
 from sandbox.terminal import Terminal
-from sandbox.users import DOMAIN_USER as USER
 
 _REPORT_PERIOD = 300
 _LONGEST_POLL_INTERVAL = 180

@@ -5,8 +5,8 @@ from __future__ import annotations
 from typing import Any
 
 from sandbox.demo.scene import Expectation, Scene, Step, from_agent
-from sandbox.packages import desktop_file
-from sandbox.peers.launcher import LauncherItem
+from sandbox.fakes.launcher import LauncherItem
+from sandbox.machine.packages import desktop_file
 from sandbox.terminal import Terminal
 
 _CHANGE_ADDRESS = "https://%1:%2/uim/v3/client/upinfo_log"

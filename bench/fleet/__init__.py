@@ -1,0 +1,1 @@
+"""What a fleet of agents means for the platform."""

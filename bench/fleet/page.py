@@ -1,0 +1,106 @@
+"""Writes docs/scale.md and its plot: what fleets of different sizes mean for the platform."""
+
+from __future__ import annotations
+
+from pathlib import Path
+from typing import Any
+
+from matplotlib import pyplot
+
+from bench import plots
+from bench.figures import Report, number
+from bench.fleet.simulation import DAY, LATE, Load, drawn_intervals, simulate
+from bench.programs import bench_program
+from sandbox import REPOSITORY
+
+_FLEETS = (1_000, 10_000, 100_000, 1_000_000)
+# Within how many seconds all terminals of a fleet start.
+_START_SPANS = {"one second": 1, "a minute": 60, "ten minutes": 600, "an hour": 3600}
+_LATE_SHARES = (0.0, 0.01, LATE, 0.2)
+_SETTLED = 2 * 60 * 60  # seconds after which the start is over
+_TEMPLATE = Path(__file__).with_name("scale.md.in")
+_DOCS = REPOSITORY / "docs"
+
+
+def write(report: Report) -> list[Path]:
+    """docs/scale.md and its plot; the bytes on the wire are the report's."""
+    drawn = drawn_intervals(bench_program("intervals"))
+    loads = {title: simulate(drawn, span) for title, span in _START_SPANS.items()}
+    page, plot = _DOCS / "scale.md", _DOCS / "scale.svg"
+    page.write_text(_page(loads, report))
+    _draw(
+        loads, {f"{late:.0%}": simulate(drawn, _START_SPANS["an hour"], late) for late in _LATE_SHARES}, plot
+    )
+    return [page, plot]
+
+
+def _page(loads: dict[str, Load], report: Report) -> str:
+    known = {figure.name: figure.middle for figure in report.figures}
+    kept, fresh = known["wire.kept"], known["wire.fresh"]
+    spread_out = loads["an hour"]
+    polls = _mean(spread_out.polls)
+    reconnects = _mean(spread_out.reconnects)
+    per_second = (polls - reconnects) * kept + reconnects * fresh
+    fleets: list[tuple[str, ...]] = [("agents", "polls", "handshakes", "kB on the wire")]
+    fleets += [
+        (f"{fleet:,}", *(number(fleet * value) for value in (polls, reconnects, per_second / 1000)))
+        for fleet in _FLEETS
+    ]
+    spans: list[tuple[str, ...]] = [
+        ("all start within", "starting requests", "polls, first hour", "polls, after two hours")
+    ]
+    spans += [(title, *_peaks(load)) for title, load in loads.items()]
+    values = {
+        "fleets": _markdown(fleets),
+        "spans": _markdown(spans),
+        "kept": number(kept),
+        "fresh": number(fresh),
+        "interval": number(1 / polls),
+        "reconnects": f"{reconnects / polls:.0%}",
+        "even": number(1e6 * polls),
+        "late": f"{LATE:.0%}",
+    }
+    text = _TEMPLATE.read_text()
+    for name, value in values.items():
+        text = text.replace(f"@{name}@", value)
+    return text
+
+
+def _peaks(load: Load) -> tuple[str, str, str]:
+    """The busiest seconds of a million agents."""
+    parts = max(load.starts), max(load.polls[:3600]), max(load.polls[_SETTLED:])
+    starting, first, settled = (number(1e6 * share) for share in parts)
+    return starting, first, settled
+
+
+def _mean(shares: list[float]) -> float:
+    settled = shares[_SETTLED:]
+    return sum(settled) / len(settled)
+
+
+def _markdown(rows: list[tuple[str, ...]]) -> str:
+    head, *body = rows
+    lines = [head, ("---",) + ("---:",) * (len(head) - 1), *body]
+    return "\n".join("| " + " | ".join(line) + " |" for line in lines)
+
+
+def _draw(by_start: dict[str, Load], by_lateness: dict[str, Load], path: Path) -> None:
+    beside: dict[str, Any] = {"frameon": False, "loc": "upper left", "bbox_to_anchor": (1, 1)}
+    with plots.settings():
+        drawing, (start, day) = pyplot.subplots(1, 2, figsize=(9, 2.8), layout="constrained")
+        for title, load in by_start.items():
+            _draw_busiest(start, load, 30 * 60, 30, 60, title)
+        for title, load in by_lateness.items():
+            _draw_busiest(day, load, DAY, 30 * 60, 3600, title)
+        start.set(title="the first half hour", xlabel="minutes after the first start", yscale="log")
+        day.set(title="a day, all started within an hour", xlabel="hours after the first start", yscale="log")
+        start.set_ylabel("polls in the busiest second")
+        start.legend(title="a million start within", **beside)
+        day.legend(title="late draws", **beside)
+        plots.save(drawing, path)
+
+
+def _draw_busiest(axes: Any, load: Load, seconds: int, step: int, unit: int, title: str) -> None:
+    places = range(0, seconds, step)
+    busiest = [1e6 * max(load.polls[place : place + step]) or float("nan") for place in places]
+    axes.plot([place / unit for place in places], busiest, label=title)

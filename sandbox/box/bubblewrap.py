@@ -1,0 +1,157 @@
+"""Builds the bubblewrap command that a box consists of.
+
+The root is put together from /usr upwards instead of binding the host's root read-only: a read-only bind
+allows no new mount points, and the terminal has its own /etc, /var, /home and /usr/share/velk.
+"""
+
+from __future__ import annotations
+
+import os
+import shutil
+import subprocess
+from pathlib import Path
+from typing import Collection, Iterator, Mapping, Sequence
+
+from sandbox import REPOSITORY
+from sandbox.machine import layout
+from sandbox.machine.users import USERS, User
+
+# Parts of the host's /etc that programs need to run and that say nothing of the host.
+_HOST_ETC = ("alternatives", "ld.so.cache", "ssl/openssl.cnf")
+_WRITABLE = ("/etc", "/home", "/run", "/tmp", "/var", str(layout.SHARE), str(layout.APPLICATIONS))
+_PASSED_ON = ("TERM", "COLORTERM", "CI", "ASAN_OPTIONS", "TSAN_OPTIONS", "VELK_AGENT", "VELK_BUILD_DIR")
+_NAMESPACES = ("user", "pid", "ipc", "uts")
+# The box's network belongs to the box's own user, which one made by bubblewrap would not: the first process
+# makes it, sets it up and gives the powers for that up (see sandbox/machine/network.py).
+_POWERS = ("CAP_SYS_ADMIN", "CAP_NET_ADMIN")
+_OWN_NETWORK = ("/usr/bin/unshare", "--net")
+
+
+class BoxUnavailable(Exception):
+    """This host cannot run a box; the text says what to do."""
+
+
+def command(user: User, argv: Sequence[str], env: Mapping[str, str] | None = None) -> list[str]:
+    """The command line that runs `argv` as `user` in a box, with `env` added to the box's environment.
+
+    It refers to files that are open in this process and that the child must inherit.
+    """
+    return [
+        "bwrap",
+        "--die-with-parent",
+        *(f"--unshare-{namespace}" for namespace in _NAMESPACES),
+        *("--hostname", "terminal"),
+        *("--uid", str(user.uid), "--gid", str(user.uid)),
+        *_powers(),
+        *_file_system(),
+        *_environment(user, env or {}),
+        *("--chdir", _working_folder()),
+        "--",
+        *_OWN_NETWORK,
+        *("/usr/bin/python3", "-P", "-m", "sandbox", "inside", "--"),
+        *argv,
+    ]
+
+
+def require() -> None:
+    """Raise BoxUnavailable when bubblewrap is missing or the kernel forbids user namespaces."""
+    if not shutil.which("bwrap"):
+        raise BoxUnavailable("bubblewrap is missing; install it with: apt-get install bubblewrap")
+    attempt = subprocess.run(
+        ["bwrap", "--unshare-user", *_powers(), "--ro-bind", "/", "/", *_OWN_NETWORK, "/usr/bin/true"],
+        stdin=subprocess.DEVNULL,
+        capture_output=True,
+        text=True,
+    )
+    if attempt.returncode:
+        raise BoxUnavailable(
+            f"this host forbids unprivileged user namespaces ({attempt.stderr.strip()}); "
+            "allow them with: sysctl kernel.unprivileged_userns_clone=1 "
+            "(or kernel.apparmor_restrict_unprivileged_userns=0)"
+        )
+
+
+def _powers() -> Iterator[str]:
+    for power in _POWERS:
+        yield from ("--cap-add", power)
+
+
+def _file_system() -> Iterator[str]:
+    yield from ("--proc", "/proc", "--dev", "/dev")
+    yield from _children(Path("/usr"), without=("share",))
+    yield from _children(layout.SHARE.parent, without=(layout.SHARE.name, layout.APPLICATIONS.name))
+    for link in ("bin", "lib", "lib32", "lib64", "libx32", "sbin"):
+        if Path("/", link).is_symlink():
+            yield from ("--symlink", os.readlink(f"/{link}"), f"/{link}")
+    for folder in _WRITABLE:
+        yield from ("--tmpfs", folder)
+    for name in _HOST_ETC:
+        yield from ("--ro-bind-try", f"/etc/{name}", f"/etc/{name}")
+    yield from _package_tools()
+    yield from _repository()
+    yield from ("--remount-ro", "/")
+
+
+def _children(folder: Path, without: Collection[str]) -> Iterator[str]:
+    for child in sorted(folder.iterdir()):
+        if child.name in without:
+            continue
+        if child.is_symlink():
+            yield from ("--symlink", os.readlink(child), str(child))
+        else:
+            yield from ("--ro-bind", str(child), str(child))
+
+
+def _package_tools() -> Iterator[str]:
+    """Copies that can be written over, in the places of the real ones."""
+    for tool in layout.PACKAGE_TOOLS:
+        if tool.exists():
+            copied = os.open(tool, os.O_RDONLY)
+            os.set_inheritable(copied, True)
+            yield from ("--perms", "0755", "--bind-data", str(copied), str(tool))
+
+
+def _repository() -> Iterator[str]:
+    yield from ("--ro-bind", str(REPOSITORY), str(REPOSITORY))
+    for folder in _build_folders():
+        yield from ("--bind", str(folder), str(folder))
+
+
+def _build_folders() -> list[Path]:
+    """Folders of built programs, which stay writable for coverage counters and test output.
+
+    An installed agent is seen with the rest of /usr, which stays as it is.
+    """
+    chosen = [Path(os.environ[name]) for name in ("VELK_BUILD_DIR",) if os.environ.get(name)]
+    if os.environ.get("VELK_AGENT") and not os.environ["VELK_AGENT"].startswith("/usr/"):
+        chosen.append(Path(os.environ["VELK_AGENT"]).parent)
+    folders = [REPOSITORY / "build", *chosen]
+    return [folder.resolve() for folder in folders if folder.is_dir()]
+
+
+def _environment(user: User, extra: Mapping[str, str]) -> Iterator[str]:
+    session_bus = layout.session_bus_socket(user.uid)
+    own = {
+        "PATH": f"{layout.COMMANDS}:/usr/bin:/bin",
+        "HOME": user.home,
+        "USER": user.name,
+        "LOGNAME": user.name,
+        "LANG": "C.UTF-8",
+        "XDG_RUNTIME_DIR": str(layout.runtime_folder(user.uid)),
+        "DBUS_SYSTEM_BUS_ADDRESS": f"unix:path={layout.SYSTEM_BUS_SOCKET}",
+        "DBUS_SESSION_BUS_ADDRESS": f"unix:path={session_bus}",
+        "PYTHONPATH": str(REPOSITORY),
+        "PYTHONDONTWRITEBYTECODE": "1",
+        "QT_FORCE_STDERR_LOGGING": "1",
+        "VELK_BOX_USER": next((kind for kind, known in USERS.items() if known == user), user.name),
+    }
+    passed_on = {name: os.environ[name] for name in _PASSED_ON if name in os.environ}
+    yield "--clearenv"
+    for name, value in {**own, **passed_on, **extra}.items():
+        yield from ("--setenv", name, value)
+
+
+def _working_folder() -> str:
+    here = Path.cwd()
+    visible = [REPOSITORY, Path("/usr"), *_build_folders()]
+    return str(here if any(here.is_relative_to(folder) for folder in visible) else REPOSITORY)

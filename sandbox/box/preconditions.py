@@ -1,0 +1,29 @@
+"""What the programs for people need in the box before they open a terminal."""
+
+from __future__ import annotations
+
+from sandbox import REPOSITORY, agent
+from sandbox.box.outside import Trouble
+from sandbox.machine.clock import Accelerated, Clock, RealTime
+
+
+def require_agent() -> None:
+    """Trouble when there is no agent to start."""
+    binary = agent.default_binary()
+    if binary.exists():
+        return
+    is_own = binary.is_relative_to(REPOSITORY)
+    shown = binary.relative_to(REPOSITORY) if is_own else binary
+    raise Trouble(f"there is no agent at {shown}; build it with: ./dev build")
+
+
+def clock(speed: int) -> Clock:
+    """A clock that runs `speed` times as fast as the real one; Trouble when the host lacks what it takes."""
+    if speed == 1:
+        return RealTime()
+    chosen = Accelerated(speed)
+    try:
+        chosen.environment()
+    except RuntimeError as error:
+        raise Trouble(str(error)) from error
+    return chosen

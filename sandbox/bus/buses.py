@@ -1,0 +1,234 @@
+"""The system and the session bus: real bus daemons on the sockets where programs look for them."""
+
+from __future__ import annotations
+
+import os
+import select
+import signal
+import subprocess
+from concurrent.futures import Future
+from pathlib import Path
+from typing import Any, Callable, Iterable, Literal
+from xml.etree import ElementTree
+
+import dbus
+import dbus.bus
+
+from sandbox.bus.mainloop import MainLoop
+from sandbox.machine import layout
+from sandbox.machine.users import User
+
+_CONFIG = """<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-Bus Bus Configuration 1.0//EN"
+ "http://www.freedesktop.org/standards/dbus/1.0/busconfig.dtd">
+<busconfig>
+  <type>{kind}</type>
+  <keep_umask/>
+  <listen>unix:path={socket}</listen>
+  <auth>EXTERNAL</auth>
+  <policy context="default">
+    <allow user="*"/>
+    <allow own="*"/>
+    <allow send_type="method_call"/>
+    <allow send_type="method_return"/>
+    <allow send_type="error"/>
+    <allow send_type="signal"/>
+    <allow receive_type="method_call"/>
+    <allow receive_type="method_return"/>
+    <allow receive_type="error"/>
+    <allow receive_type="signal"/>
+  </policy>
+  {limits}
+</busconfig>
+"""
+_SERVICE = ("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus")
+_STOP_SECONDS = 10
+_PING_SECONDS = 60.0
+
+# Never freed: the binding breaks when a connection's end is dispatched after its Python object has gone.
+_every_connection: list[Any] = []
+
+
+class Bus:
+    """One message bus with Debian's limits and no access rules.
+
+    It is known by its socket and its pid file alone, so that any process of the box can stop and restart it.
+    `run` changes whenever all connections are lost.
+    """
+
+    def __init__(self, kind: Literal["system", "session"], user: User) -> None:
+        self.kind = kind
+        self.run = 0
+        is_system = kind == "system"
+        self._socket = layout.SYSTEM_BUS_SOCKET if is_system else layout.session_bus_socket(user.uid)
+        self._pid_file = layout.BOX / f"{kind}-bus.pid"
+        self._daemon: subprocess.Popen[bytes] | None = None
+        self._control: Any = None
+        self._listeners: list[Callable[[], None]] = []
+        # Unique names are never used again while the bus runs.
+        self._processes: dict[str, int] = {}
+
+    @property
+    def address(self) -> str:
+        """Address to connect to."""
+        return f"unix:path={self._socket}"
+
+    @property
+    def pid(self) -> int | None:
+        """Process id of the running bus daemon."""
+        try:
+            return int(self._pid_file.read_text())
+        except (FileNotFoundError, ValueError):
+            return None
+
+    def start(self) -> None:
+        """Start the bus daemon and return once it accepts connections."""
+        for folder in (self._socket.parent, self._pid_file.parent):
+            folder.mkdir(parents=True, exist_ok=True)
+        config = self._pid_file.with_suffix(".conf")
+        config.write_text(_CONFIG.format(kind=self.kind, socket=self._socket, limits=_limits(self.kind)))
+        log = self._pid_file.with_suffix(".log")
+        reading, writing = os.pipe()
+        with log.open("wb") as log_file:
+            self._daemon = subprocess.Popen(
+                [
+                    "dbus-daemon",
+                    f"--config-file={config}",
+                    "--nofork",
+                    "--nosyslog",
+                    f"--print-address={writing}",
+                ],
+                pass_fds=[writing],
+                stdin=subprocess.DEVNULL,
+                stdout=subprocess.DEVNULL,
+                stderr=log_file,
+                # Its own group: Ctrl+C at a prompt must not take the buses away from the fakes.
+                start_new_session=True,
+            )
+        # The daemon would write it only after it has said that it is ready.
+        self._pid_file.write_text(str(self._daemon.pid))
+        os.close(writing)
+        with open(reading) as printed:
+            if not printed.readline():
+                raise RuntimeError(f"the {self.kind} bus did not start: {log.read_text()}")
+        for listener in self._listeners:
+            listener()
+
+    def stop(self) -> None:
+        """End the bus daemon, if it runs, and with it every connection."""
+        pid = self.pid
+        if pid is not None:
+            _end(pid)
+        MainLoop.call(self._forget)
+        if self._daemon:
+            self._daemon.wait(_STOP_SECONDS)
+            self._daemon = None
+        for left in (self._pid_file, self._socket):
+            Path(left).unlink(missing_ok=True)
+
+    def restart(self) -> None:
+        """Replace the bus daemon by a fresh one that nobody is connected to."""
+        self.stop()
+        self.start()
+
+    def when_started(self, listener: Callable[[], None]) -> None:
+        """Call `listener` now, when the bus runs, and again after each start."""
+        self._listeners.append(listener)
+        listener()
+
+    def connect(self) -> Any:
+        """A new private connection with a unique name of its own; to be used on the main loop's thread."""
+        return MainLoop.call(self._connect)
+
+    def owner(self, name: str) -> str | None:
+        """Unique name of the connection that owns `name`."""
+        try:
+            return str(self.ask("GetNameOwner", "s", name))
+        except dbus.DBusException as error:
+            if error.get_dbus_name() != "org.freedesktop.DBus.Error.NameHasNoOwner":
+                raise
+            return None
+
+    def names(self) -> list[str]:
+        """All names on the bus, unique ones included."""
+        return [str(name) for name in self.ask("ListNames", "")]
+
+    def process_of(self, unique_name: str) -> int | None:
+        """Process id behind a connection; None when it had gone before anybody asked."""
+        return self._processes.get(unique_name) or MainLoop.call(self._ask_for_process, unique_name)
+
+    def names_of(self, pid: int) -> list[str]:
+        """Unique names of the connections that a process has open."""
+        return [name for name in self.names() if name.startswith(":") and self.process_of(name) == pid]
+
+    def receive_all_from(self, pid: int) -> None:
+        """Return once everything that a process has sent so far has reached the bus."""
+        names = self.names_of(pid)
+        await_pings(self._control, names)
+
+    def ask(self, member: str, signature: str, *args: Any) -> Any:
+        """Call a method of the bus itself."""
+        return MainLoop.call(self._ask, member, signature, args)
+
+    def _ask_for_process(self, unique_name: str) -> int | None:
+        # The connection may have ended since somebody else has asked.
+        if unique_name not in self._processes:
+            try:
+                process = int(self._ask("GetConnectionUnixProcessID", "s", (unique_name,)))
+            except dbus.DBusException:
+                return None
+            self._processes[unique_name] = process
+        return self._processes[unique_name]
+
+    def _forget(self) -> None:
+        """On the main loop's thread, where no question to the bus that has ended is half asked."""
+        self.run += 1
+        self._control = None
+        self._processes.clear()
+
+    def _ask(self, member: str, signature: str, args: tuple[Any, ...]) -> Any:
+        if self._control is None:
+            self._control = self._connect()
+        return self._control.call_blocking(*_SERVICE, member, signature, args)
+
+    def _connect(self) -> Any:
+        connection = dbus.bus.BusConnection(self.address, mainloop=MainLoop.bus_loop)
+        connection.set_exit_on_disconnect(False)
+        _every_connection.append(connection)
+        return connection
+
+
+def await_pings(connection: Any, unique_names: Iterable[str]) -> None:
+    """Return once `connection` has received what these connections have sent to it so far, and the bus what
+    they have sent to anybody.
+
+    Their answer to a ping goes the same road after it; D-Bus libraries give it even while their program is
+    busy.
+    """
+    pings = [MainLoop.call(_ping, connection, name) for name in unique_names]
+    for ping in pings:
+        ping.result(_PING_SECONDS)
+
+
+def _ping(connection: Any, unique_name: str) -> Future[None]:
+    answered: Future[None] = Future()
+    ping = (unique_name, "/", "org.freedesktop.DBus.Peer", "Ping", "", ())
+    connection.call_async(*ping, lambda: answered.set_result(None), answered.set_exception)
+    return answered
+
+
+def _end(pid: int) -> None:
+    try:
+        process = os.pidfd_open(pid)
+    except ProcessLookupError:
+        return
+    try:
+        signal.pidfd_send_signal(process, signal.SIGTERM)
+        select.select([process], [], [], _STOP_SECONDS)
+    finally:
+        os.close(process)
+
+
+def _limits(kind: str) -> str:
+    """The limits that Debian's own bus of this kind sets."""
+    original = ElementTree.parse(f"/usr/share/dbus-1/{kind}.conf")
+    return "".join(ElementTree.tostring(limit, encoding="unicode") for limit in original.iter("limit"))

@@ -1,0 +1,79 @@
+"""A stranger on a bus, who may send anything and take any name."""
+
+from __future__ import annotations
+
+from concurrent.futures import Future
+from typing import Any
+
+import dbus.bus
+import dbus.lowlevel
+
+from sandbox.bus.buses import Bus
+from sandbox.bus.mainloop import MainLoop
+from sandbox.bus.values import plain
+
+_CALL_SECONDS = 30.0
+
+
+class Stranger:
+    """A connection of its own, for messages that no well-behaved service would send."""
+
+    def __init__(self, bus: Bus) -> None:
+        self._connection = bus.connect()
+        self._names: set[str] = set()
+
+    @property
+    def unique_name(self) -> str:
+        """Unique name of the stranger's connection."""
+        return str(self._connection.get_unique_name())
+
+    def emit(
+        self,
+        path: str,
+        interface: str,
+        member: str,
+        *args: Any,
+        signature: str = "",
+        destination: str | None = None,
+    ) -> None:
+        """Send a signal, to everyone or to one `destination`."""
+        message = dbus.lowlevel.SignalMessage(path, interface, member)
+        if destination:
+            message.set_destination(destination)
+        message.append(*args, signature=signature)
+        MainLoop.call(self._send, message)
+
+    def call(self, name: str, path: str, interface: str, member: str, *args: Any, signature: str = "") -> Any:
+        """Call a method and return its reply; raises dbus.DBusException. Not to be used on the main loop's
+        thread, where the fakes could not answer."""
+        result: Future[Any] = Future()
+
+        def succeed(*values: Any) -> None:
+            result.set_result(plain(values[0]) if len(values) == 1 else plain(list(values)))
+
+        request = (name, path, interface, member, signature, args, succeed, result.set_exception)
+        MainLoop.call(self._connection.call_async, *request)
+        return result.result(_CALL_SECONDS)
+
+    def own(self, name: str, queue: bool = False, replace: bool = False, let_replace: bool = False) -> int:
+        """Ask for a bus name; the result is the bus's answer (1 owner, 2 in the queue, 3 taken)."""
+        flags = 0 if queue else dbus.bus.NAME_FLAG_DO_NOT_QUEUE
+        flags |= dbus.bus.NAME_FLAG_REPLACE_EXISTING if replace else 0
+        flags |= dbus.bus.NAME_FLAG_ALLOW_REPLACEMENT if let_replace else 0
+        self._names.add(name)
+        return int(MainLoop.call(self._connection.request_name, name, flags))
+
+    def release(self, name: str) -> None:
+        """Give a bus name back."""
+        self._names.discard(name)
+        MainLoop.call(self._connection.release_name, name)
+
+    def close(self) -> None:
+        """Leave the bus; the names are free on return."""
+        for name in list(self._names):
+            self.release(name)
+        MainLoop.call(self._connection.close)
+
+    def _send(self, message: Any) -> None:
+        self._connection.send_message(message)
+        self._connection.flush()

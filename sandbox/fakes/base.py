@@ -1,0 +1,236 @@
+"""What all services have in common: a connection of their own, faults, a record, a contract."""
+
+from __future__ import annotations
+
+from typing import Any, Mapping
+
+import dbus
+import dbus.bus
+import dbus.lowlevel
+
+from sandbox.bus.buses import Bus, await_pings
+from sandbox.bus.mainloop import MainLoop
+from sandbox.bus.senders import Senders
+from sandbox.bus.values import plain
+from sandbox.events import Events
+from sandbox.fakes.exported import PROPERTIES, ExportedObject, Refused, Reply
+from sandbox.fakes.fault import Fault
+
+_HANDLED = dbus.lowlevel.HANDLER_RESULT_HANDLED
+_NOT_HANDLED = dbus.lowlevel.HANDLER_RESULT_NOT_YET_HANDLED
+_CALL = dbus.lowlevel.MESSAGE_TYPE_METHOD_CALL
+_FAILED = "org.freedesktop.DBus.Error.Failed"
+
+
+class Peer:
+    """A service on a bus, under a bus name and a connection of its own.
+
+    Every call that reaches it is recorded as an event and checked against the contract of its interface; what
+    breaks the contract is kept in `violations`. `fault` says how it treats all calls, `faults` how it treats
+    those of a member or reads and writes of a property, `answers` replaces a method's reply, which may be of
+    a wrong type. The objects whose paths are in `withdrawn` do not exist for callers.
+    """
+
+    name = ""
+    bus_name = ""
+
+    def __init__(self, bus: Bus, events: Events, senders: Senders) -> None:
+        self.bus = bus
+        self.fault = Fault.none()
+        self.faults: dict[str, Fault] = {}
+        self.answers: dict[str, Reply] = {}
+        self.violations: list[str] = []
+        self.withdrawn: set[str] = set()
+        self.objects = {known.path: known for known in self.exports()}
+        self._events = events
+        self._senders = senders
+        self._connection: Any = None
+        self._bus_run = 0
+        self._held: list[Any] = []
+
+    def exports(self) -> list[ExportedObject]:
+        """The service's objects, the main one first."""
+        raise NotImplementedError
+
+    @property
+    def present(self) -> bool:
+        """Whether the service is on the bus."""
+        return self._connection is not None and self._bus_run == self.bus.run
+
+    @property
+    def unique_name(self) -> str | None:
+        """Unique name of the service's connection, another one after each `appear`."""
+        return str(self._connection.get_unique_name()) if self.present else None
+
+    def appear(self) -> None:
+        """Connect and take the bus name."""
+        MainLoop.call(self._appear)
+
+    def leave(self) -> None:
+        """Close the connection; calls that were not answered end as the bus ends them."""
+        MainLoop.call(self._leave)
+
+    def restart(self) -> None:
+        """Leave and appear again, with a new unique name."""
+        self.leave()
+        self.appear()
+
+    def release(self) -> None:
+        """Answer the calls held so far, in their order, and hold no more."""
+        MainLoop.call(self._release)
+
+    def set(self, name: str, value: Any, signature: str | None = None, path: str | None = None) -> None:
+        """Change a property and announce it; with `signature`, to a value of a wrong type."""
+        MainLoop.call(self._set, self._object(path), name, value, signature)
+
+    def value(self, name: str, path: str | None = None) -> Any:
+        """Plain value of a property."""
+        return MainLoop.call(self._object(path).value, name)
+
+    def emit(self, interface: str, member: str, *args: Any, path: str | None = None) -> None:
+        """Broadcast a signal of one of the service's interfaces."""
+        known = self._object(path)
+        signature = known.contracts[interface].signals[member]
+        MainLoop.call(self._emit, known.path, interface, member, signature, args)
+
+    def receive_all_from(self, pid: int) -> None:
+        """Return once everything that a process has sent to the service so far is recorded."""
+        await_pings(self._connection, self.bus.names_of(pid))
+
+    def _object(self, path: str | None) -> ExportedObject:
+        return self.objects[path] if path else next(iter(self.objects.values()))
+
+    def _appear(self) -> None:
+        assert not self.present, f"{self.name} is on the bus already"
+        connection = self.bus.connect()
+        connection.add_message_filter(self._on_message)
+        self._connection = connection
+        self._bus_run = self.bus.run
+        answer = connection.request_name(self.bus_name, dbus.bus.NAME_FLAG_DO_NOT_QUEUE)
+        assert answer == dbus.bus.REQUEST_NAME_REPLY_PRIMARY_OWNER, f"{self.bus_name} is taken"
+        self._record("life", "appears", (str(connection.get_unique_name()),))
+
+    def _leave(self) -> None:
+        if not self.present:
+            return
+        connection, self._connection = self._connection, None
+        self._held.clear()
+        # The bus notices a closed connection a moment later, but the name must be free at once.
+        connection.release_name(self.bus_name)
+        connection.close()
+        self._record("life", "leaves", ())
+
+    def _release(self) -> None:
+        self.fault = Fault.none()
+        self.faults = {member: fault for member, fault in self.faults.items() if fault.kind != "hold"}
+        held, self._held = self._held, []
+        for message in held:
+            self._answer(message)
+
+    def _set(self, known: ExportedObject, name: str, value: Any, signature: str | None) -> None:
+        known.set(name, value, signature)
+        if self.present:
+            self._announce(known, name)
+
+    def _announce(self, known: ExportedObject, name: str) -> None:
+        """Tell everyone that a property has changed."""
+        self._announce_properties(known, name, {name: known.typed_value(name)}, [])
+
+    def _announce_properties(
+        self, known: ExportedObject, name: str, changed: Mapping[str, Any], invalidated: list[str]
+    ) -> None:
+        args = (known.interface_of(name), dbus.Dictionary(changed, signature="sv"), invalidated)
+        self._emit(known.path, PROPERTIES, "PropertiesChanged", "sa{sv}as", args)
+
+    def _emit(self, path: str, interface: str, member: str, signature: str, args: tuple[Any, ...]) -> None:
+        assert self.present, f"{self.name} is not on the bus"
+        message = dbus.lowlevel.SignalMessage(path, interface, member)
+        message.append(*args, signature=signature)
+        self._record("signal", member, plain(list(args)), interface=interface, path=path, signature=signature)
+        self._connection.send_message(message)
+        self._connection.flush()
+
+    def _record(self, kind: str, member: str, args: Any, **detail: Any) -> None:
+        self._events.record(self.name, "*", kind, member, tuple(args), detail)
+
+    def _on_message(self, _connection: Any, message: Any) -> int:
+        if message.get_type() != _CALL:
+            return int(_NOT_HANDLED)
+        args = self._record_call(message)
+        fault = self._fault_for(message.get_member(), args)
+        if fault.kind == "none":
+            self._answer(message)
+        elif fault.kind == "fail":
+            self._refuse(message, fault.error_name, "told to fail")
+        elif fault.kind == "slow":
+            MainLoop.later(fault.seconds, lambda: self._answer(message))
+        elif fault.kind == "hold":
+            self._held.append(message)
+        return int(_HANDLED)
+
+    def _record_call(self, message: Any) -> tuple[Any, ...]:
+        args = message.get_args_list()
+        detail = {
+            "interface": message.get_interface(),
+            "path": message.get_path(),
+            "signature": message.get_signature(),
+            "sender": message.get_sender(),
+            "serial": message.get_serial(),
+            "arguments": args,
+        }
+        try:
+            self._check(message)
+        except Refused as refused:
+            self.violations.append(f"{self.name}: {refused}")
+        source = self._senders.label(self.bus, message.get_sender())
+        simple = tuple(plain(arg) for arg in args)
+        self._events.record(source, self.name, "call", message.get_member(), simple, detail)
+        return simple
+
+    def _check(self, message: Any) -> None:
+        """Refused if a call breaks the contract of the object that it is for."""
+        known = self.objects.get(message.get_path())
+        if known is None:
+            raise Refused("UnknownObject", f"no object {message.get_path()}")
+        arguments = message.get_args_list()
+        known.check(str(message.get_interface()), message.get_member(), message.get_signature(), arguments)
+
+    def _fault_for(self, member: str, args: tuple[Any, ...]) -> Fault:
+        is_property = member in ("Get", "Set") and len(args) > 1
+        by_property = self.faults.get(args[1]) if is_property else None
+        return by_property or self.faults.get(member) or self.fault
+
+    def _answer(self, message: Any) -> None:
+        if not self.present:
+            return
+        try:
+            reply = self._carry_out(message)
+        except Refused as refused:
+            self._refuse(message, refused.error_name, str(refused))
+        except Exception as error:  # a fake's own mistake must fail the test and not vanish in the loop
+            self.violations.append(f"{self.name}: {message.get_member()} broke: {error!r}")
+            self._refuse(message, _FAILED, repr(error))
+        else:
+            self._reply(message, self.answers.get(message.get_member(), reply))
+
+    def _carry_out(self, message: Any) -> Reply:
+        path = message.get_path()
+        if path in self.withdrawn:
+            raise Refused("UnknownObject", f"no object {path}")
+        self._check(message)
+        args = tuple(plain(arg) for arg in message.get_args_list())
+        return self.objects[path].call(str(message.get_interface()), message.get_member(), args)
+
+    def _reply(self, message: Any, reply: Reply) -> None:
+        answer = dbus.lowlevel.MethodReturnMessage(message)
+        if reply.signature:
+            answer.append(*reply.values, signature=reply.signature)
+        self._send(message, answer)
+
+    def _refuse(self, message: Any, error_name: str, text: str) -> None:
+        self._send(message, dbus.lowlevel.ErrorMessage(message, error_name, text))
+
+    def _send(self, message: Any, answer: Any) -> None:
+        if not message.get_no_reply():
+            self._connection.send_message(answer)
+            self._connection.flush()

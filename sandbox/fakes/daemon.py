@@ -1,0 +1,64 @@
+"""The system daemon, which passes the platform's policies to the sessions and takes their reports."""
+
+from __future__ import annotations
+
+import json
+from typing import Any, Mapping
+
+from sandbox import contracts
+from sandbox.fakes.base import Peer
+from sandbox.fakes.exported import ExportedObject
+from sandbox.machine import layout
+from sandbox.platform.server import Platform
+from sandbox.platform.uploader import Uploader
+
+INTERFACE = "com.norix.velk.velkg"
+PATH = "/com/norix/velk/velkg"
+MACHINE_ID = "box-machine-0001"
+
+
+class Daemon(Peer):
+    """Owns com.norix.velk.velkg on the system bus."""
+
+    name = "daemon"
+    bus_name = INTERFACE
+
+    def exports(self) -> list[ExportedObject]:
+        """The service's only object."""
+        exported = ExportedObject(PATH, INTERFACE)
+        answers: dict[str, Any] = {
+            "GetDomainStatus": 1,
+            "GetMachineID": MACHINE_ID,
+            "GetNetStatus": 1,
+            "GetPolicyPullTime": 60,
+            "GetServerIP": layout.PLATFORM_HOST,
+            "GetServerPort": str(layout.PLATFORM_PORT),
+            "onDomainConfig": 0,
+        }
+        for member, value in answers.items():
+            exported.handlers[member] = lambda *_args, value=value: value
+        return [exported]
+
+    def appear(self, announce: bool = False) -> None:
+        """Appear on the bus; with `announce`, push online as a daemon that has just started does."""
+        super().appear()
+        if announce:
+            self.push_online()
+
+    def uploads_to(self, platform: Platform) -> None:
+        """From now on, upload what the sessions hand over, without letting them wait."""
+        self.objects[PATH].handlers["onUploadFinished"] = Uploader(self._events, platform.port).upload
+
+    def push_online(self) -> None:
+        """Ask the sessions to announce themselves."""
+        self.emit(INTERFACE, "pushOnlineMsg")
+
+    def push_policy(self, payload: str | Mapping[str, Any], app_id: str = "box") -> None:
+        """Broadcast a policy. A mapping keeps to its contract and goes out as JSON with characters outside
+        ASCII as they are; a text may be anything."""
+        if isinstance(payload, str):
+            text = payload
+        else:
+            contracts.require("policy-message", payload)
+            text = json.dumps(payload, ensure_ascii=False)
+        self.emit(INTERFACE, "pushPolicyMsg", app_id, text)

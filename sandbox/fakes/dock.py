@@ -1,0 +1,131 @@
+"""The desktop's dock, which knows the applications that run or are kept on it."""
+
+from __future__ import annotations
+
+from itertools import count
+from typing import Any, Callable, Literal
+
+from dbus.lowlevel import SignalMessage
+
+from sandbox.bus.buses import Bus
+from sandbox.bus.mainloop import MainLoop
+from sandbox.bus.senders import Senders
+from sandbox.events import Events
+from sandbox.fakes.base import Peer
+from sandbox.fakes.exported import ExportedObject
+
+INTERFACE = "com.norix.kpx.daemon.Dock"
+ENTRY = "com.norix.kpx.daemon.Dock.Entry"
+PATH = "/com/norix/kpx/daemon/Dock"
+ENTRIES = f"{PATH}/entries"
+
+Announcement = Literal["values", "invalidated", "signal"]
+
+# What docks of different versions keep of a window, by the type of WindowInfos.
+WINDOW_TYPES: dict[str, Callable[[str], Any]] = {
+    "a{uv}": lambda title: title,
+    "a{us}": lambda title: title,
+    "a{u(sb)}": lambda title: (title, False),
+    "a{ua{sv}}": lambda title: {"Title": title},
+}
+_CHANGE_SIGNALS = {"WindowInfos": "WindowInfosChanged", "Name": "NameChanged"}
+
+
+class Dock(Peer):
+    """Owns com.norix.kpx.daemon.Dock on the session bus; empty at first.
+
+    `announces` says in which ways, one after the other, it tells that an entry has changed: PropertiesChanged
+    with values or with invalidated names, or the entry's own signal. `window_type` is one of WINDOW_TYPES,
+    for the windows set from then on. The objects of entries that have gone do not exist for callers.
+    """
+
+    name = "dock"
+    bus_name = INTERFACE
+
+    def __init__(self, bus: Bus, events: Events, senders: Senders) -> None:
+        super().__init__(bus, events, senders)
+        self.announces: tuple[Announcement, ...] = ("values",)
+        self.window_type = "a{uv}"
+        self._paths = (f"{ENTRIES}/e{number}" for number in count(1))
+        self._window_ids = count(1)
+
+    def exports(self) -> list[ExportedObject]:
+        """The dock itself; its entries come and go."""
+        exported = ExportedObject(PATH, INTERFACE)
+        exported.set("Entries", [])
+        return [exported]
+
+    @property
+    def apps(self) -> dict[str, str]:
+        """The paths of the entries by their identifiers, in the dock's order; the newer one of two with the
+        same identifier."""
+        return {self.value("Id", path): path for path in self.value("Entries")}
+
+    def open_app(self, app: str, name: str, docked: bool = False, windows: int = 1) -> str:
+        """Add an entry for an application and tell so; the result is its object's path."""
+        return MainLoop.call(self._open_app, app, name, docked, windows)
+
+    def close_app(self, app: str) -> None:
+        """Remove an application's entry, whatever windows it has, and tell so."""
+        MainLoop.call(self._close_app, app)
+
+    def set_windows(self, app: str, number: int) -> None:
+        """Let an application have this many windows, none of them one that it had."""
+        self.set("WindowInfos", self._new_windows(number), self.window_type, self.apps[app])
+
+    def windows(self, app: str) -> int:
+        """How many windows an application has."""
+        return len(self.value("WindowInfos", self.apps[app]))
+
+    def rename(self, app: str, name: str) -> None:
+        """Change an application's display name."""
+        self.set("Name", name, path=self.apps[app])
+
+    def pin(self, app: str, docked: bool = True) -> None:
+        """Keep an application on the dock, or no longer."""
+        self.set("IsDocked", docked, path=self.apps[app])
+
+    def is_docked(self, app: str) -> bool:
+        """Whether an application is kept on the dock."""
+        return bool(self.value("IsDocked", self.apps[app]))
+
+    def _open_app(self, app: str, name: str, docked: bool, windows: int) -> str:
+        entry = ExportedObject(next(self._paths), ENTRY)
+        entry.set("Id", app)
+        entry.set("Name", name)
+        entry.set("IsDocked", docked)
+        entry.set("WindowInfos", self._new_windows(windows), self.window_type)
+        self.objects[entry.path] = entry
+        paths = self._change_entries(lambda known: [*known, entry.path])
+        if self.present:
+            self.emit(INTERFACE, "EntryAdded", entry.path, len(paths) - 1)
+        return entry.path
+
+    def _close_app(self, app: str) -> None:
+        gone = self.apps[app]
+        self._change_entries(lambda known: [path for path in known if path != gone])
+        self.withdrawn.add(gone)
+        if self.present:
+            self.emit(INTERFACE, "EntryRemoved", app)
+
+    def _change_entries(self, change: Callable[[list[str]], list[str]]) -> list[str]:
+        main = self.objects[PATH]
+        paths = change(main.value("Entries"))
+        main.set("Entries", paths)
+        return paths
+
+    def _new_windows(self, number: int) -> dict[int, Any]:
+        describe = WINDOW_TYPES[self.window_type]
+        fresh = [next(self._window_ids) for _ in range(number)]
+        return {window: describe(f"window {window}") for window in fresh}
+
+    def _announce(self, known: ExportedObject, name: str) -> None:
+        for way in self.announces:
+            if way == "values":
+                self._announce_properties(known, name, {name: known.typed_value(name)}, [])
+            elif way == "invalidated":
+                self._announce_properties(known, name, {}, [name])
+            elif name in _CHANGE_SIGNALS:
+                value = known.typed_value(name)
+                signature = SignalMessage.guess_signature(value)
+                self._emit(known.path, ENTRY, _CHANGE_SIGNALS[name], signature, (value,))

@@ -1,0 +1,21 @@
+"""The identity service, which is switched off when the terminal leaves the domain."""
+
+from __future__ import annotations
+
+from sandbox.fakes.base import Peer
+from sandbox.fakes.exported import ExportedObject
+
+INTERFACE = "com.norix.velk.iam"
+
+
+class Identity(Peer):
+    """Owns com.norix.velk.iam on the system bus."""
+
+    name = "identity"
+    bus_name = INTERFACE
+
+    def exports(self) -> list[ExportedObject]:
+        """The service's only object."""
+        exported = ExportedObject("/com/norix/velk/iam", INTERFACE)
+        exported.set("Enable", True)
+        return [exported]
