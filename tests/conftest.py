@@ -34,6 +34,13 @@ def terminal(request: pytest.FixtureRequest) -> Iterator[Terminal]:
     opened.close()
 
 
+@pytest.fixture
+def session(terminal: Terminal) -> Terminal:
+    """A terminal whose agent is ready."""
+    terminal.start_agent()
+    return terminal
+
+
 def pytest_configure(config: pytest.Config) -> None:
     """Make room for temporary files: a worker is given a folder of the session's, which its box lacks."""
     basetemp = config.getoption("basetemp")

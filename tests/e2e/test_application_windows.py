@@ -20,13 +20,6 @@ WAYS: list[tuple[Announcement, ...]] = [
 ]
 
 
-@pytest.fixture
-def session(terminal: Terminal) -> Terminal:
-    """A terminal whose agent watches a dock without applications."""
-    start(terminal)
-    return terminal
-
-
 def test_each_window_of_a_docked_application_is_told(session: Terminal) -> None:
     session.dock.open_app("mail", "Mail", docked=True, windows=0)
     settle(session)

@@ -10,13 +10,6 @@ from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 
 
-@pytest.fixture
-def session(terminal: Terminal) -> Terminal:
-    """A terminal whose agent watches a dock without applications."""
-    start(terminal)
-    return terminal
-
-
 def test_running_applications_are_told_once_at_start_in_the_docks_order(terminal: Terminal) -> None:
     for app, docked in (("z", False), ("y", True), ("m", False), ("x", True), ("a", False)):
         terminal.dock.open_app(app, app.upper(), docked=docked)

@@ -12,13 +12,6 @@ from wire import forced_actions, next_notification, next_status, settled
 pytestmark = pytest.mark.local_user
 
 
-@pytest.fixture
-def session(terminal: Terminal) -> Terminal:
-    """A terminal whose agent is ready."""
-    terminal.start_agent()
-    return terminal
-
-
 @pytest.mark.parametrize("policy", policies.for_domain_users(), ids=str)
 def test_policy_for_domain_users_does_nothing(session: Terminal, policy: Policy) -> None:
     mark = session.events.mark()

@@ -19,13 +19,6 @@ def plain(body: str, timeout: int) -> Notification:
     return Notification(REMINDER, 0, "velkw", REMINDER, body, [], {}, timeout)
 
 
-@pytest.fixture
-def session(terminal: Terminal) -> Terminal:
-    """A terminal whose agent is ready."""
-    terminal.start_agent()
-    return terminal
-
-
 @pytest.mark.parametrize("policy", policies.with_action("WarnThenLogOut"), ids=str)
 def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, policy: Policy) -> None:
     mark = session.events.mark()

@@ -18,13 +18,6 @@ POLICY = json.dumps({"type": 1201})
 
 
 @pytest.fixture
-def session(terminal: Terminal) -> Terminal:
-    """A terminal whose agent is ready."""
-    terminal.start_agent()
-    return terminal
-
-
-@pytest.fixture
 def stranger(terminal: Terminal) -> Iterator[Stranger]:
     """Someone else on the system bus."""
     someone = Stranger(terminal.system_bus)
