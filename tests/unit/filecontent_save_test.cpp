@@ -43,6 +43,20 @@ const QByteArray kRecord = R"({
 }
 )";
 
+const char* const kIsTrue = "{\n    \"is_Domain\": true\n}\n";
+const char* const kIsFalse = "{\n    \"is_Domain\": false\n}\n";
+const char* const kAmongOthers = R"({
+    "is_Domain": false,
+    "server_ip": "",
+    "z": {
+        "a": [
+            1,
+            "终"
+        ]
+    }
+}
+)";
+
 } // namespace
 
 void FileContentSaveTest::init()
@@ -69,25 +83,14 @@ void FileContentSaveTest::domainMembershipIsSaved_data()
         QTest::newRow(name) << QByteArray(before) << true << false << QByteArray(before)
                             << QStringLiteral(R"(info: It is not contain in info file, key: "is_Domain")");
     };
-    const char* const isTrue = "{\n    \"is_Domain\": true\n}\n";
-    const char* const isFalse = "{\n    \"is_Domain\": false\n}\n";
 
-    changed("to true", R"({"is_Domain":false})", true, isTrue);
-    changed("to false", R"({"is_Domain":true})", false, isFalse);
-    changed("text is no true", R"({"is_Domain":"true"})", true, isTrue);
-    changed("number is no true", R"({"is_Domain":1})", true, isTrue);
-    changed("byte order mark goes", "\xef\xbb\xbf{\"is_Domain\":true}", false, isFalse);
-    changed("other keys stay", R"({"z":{"a":[1,"终"]},"is_Domain":true,"server_ip":""})", false, R"({
-    "is_Domain": false,
-    "server_ip": "",
-    "z": {
-        "a": [
-            1,
-            "终"
-        ]
-    }
-}
-)");
+    changed("to true", R"({"is_Domain":false})", true, kIsTrue);
+    changed("to false", R"({"is_Domain":true})", false, kIsFalse);
+    changed("text is no true", R"({"is_Domain":"true"})", true, kIsTrue);
+    changed("number is no true", R"({"is_Domain":1})", true, kIsTrue);
+    changed("byte order mark goes", "\xef\xbb\xbf{\"is_Domain\":true}", false, kIsFalse);
+    changed("other keys stay", R"({"z":{"a":[1,"终"]},"is_Domain":true,"server_ip":""})", false,
+            kAmongOthers);
     same("still true", R"( {"is_Domain":true} )", true);
     same("still false", R"({"is_Domain":false})", false);
     same("text counts as false", R"({"is_Domain":"true"})", false);
