@@ -19,6 +19,7 @@ LISTED = "SoftwareGuard::getSoftwareList()--- "
 
 EDITOR = LauncherItem(desktop_file("editor"), "Editor")
 PLAYER = LauncherItem(desktop_file("player"), "播放器")
+TOOLS = ["dpkg", "dpkg-query", "dpkg-architecture"]
 
 
 def install(terminal: Terminal, *items: LauncherItem) -> None:

@@ -1,67 +1,19 @@
-"""The terminal leaves the domain: warning, restore script, restored desktop, reboot."""
+"""The terminal leaves the domain: warning, restored desktop, reboot. Its script has tests of its own."""
 
 from __future__ import annotations
 
-import configparser
-import os
 import shutil
 from pathlib import Path
 
 import pytest
 
+from domainexit import EXIT, ROAD, leave_domain, restrictions, road
 from sandbox.fakes.fault import Fault
 from sandbox.machine import layout
 from sandbox.machine.commands import Answer
+from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
-from wire import Notification, forced_actions, log_lines, next_notification, settled
-
-EXIT = {"type": 1200}
-WARNING = "当前终端已被管理员退域，1分钟后强制重启"
-ON_SYSTEM_BUS = ("daemon", "identity", "logind")
-ROAD = [
-    ("notifications", "Notify"),
-    ("restore_config", "restore_config"),
-    ("systemctl", "systemctl"),
-    ("daemon", "onDomainConfig"),
-    ("identity", "Set"),
-]
-
-
-@pytest.fixture
-def session(terminal: Terminal) -> Terminal:
-    """A terminal whose agent is ready."""
-    terminal.start_agent()
-    return terminal
-
-
-def leave_domain(session: Terminal) -> int:
-    """Push the policy, wait for the sequence's last step; the result is the mark before it."""
-    mark = session.events.mark()
-    session.daemon.push_policy(EXIT)
-    session.events.wait_for(target="identity", member="Set", after=mark)
-    return mark
-
-
-def road(session: Terminal, mark: int) -> list[tuple[str, str]]:
-    """The steps of the exit that were seen from outside, in their order.
-
-    The agent waits for each step but the calls on the system bus, which come last; their serial numbers tell
-    in which order they were sent to different receivers.
-    """
-    steps = settled(session, mark)
-    sent = sorted(
-        (step for step in steps if step.target in ON_SYSTEM_BUS), key=lambda step: step.detail["serial"]
-    )
-    waited_for = [step for step in steps if step not in sent]
-    return [(step.target, step.member) for step in waited_for + sent]
-
-
-def restrictions() -> dict[str, str]:
-    """The user's restriction switches as they stand in the file."""
-    file = configparser.RawConfigParser()
-    file.optionxform = str  # type: ignore[assignment]
-    file.read(Path.home() / ".config" / "norix" / "desktop-control.ini")
-    return dict(file["restrictions"])
+from wire import Notification, forced_actions, next_notification, settled
 
 
 def test_steps_come_in_their_order_and_the_reboot_after_a_minute(session: Terminal) -> None:
@@ -77,7 +29,7 @@ def test_steps_come_in_their_order_and_the_reboot_after_a_minute(session: Termin
 def test_warning_offers_the_reboot(session: Terminal) -> None:
     mark = leave_domain(session)
     assert next_notification(session, mark) == Notification(
-        "提醒", 0, "velkw", "提醒", WARNING, ["_open", "重启"], {"x-norix-action-_open": "reboot"}, -1
+        "提醒", 0, "velkw", "提醒", POLICIES[1200].notice, ["_open", "重启"], {"x-norix-action-_open": "reboot"}, -1
     )
 
 
@@ -158,82 +110,6 @@ def test_backup_file_that_is_no_such_file_restores_an_empty_list(session: Termin
     mark = leave_domain(session)
     assert road(session, mark) == ROAD
     assert restrictions()["ControlCenterList"] == "@Invalid()"
-
-
-def test_script_path_is_logged(session: Terminal) -> None:
-    mark = leave_domain(session)
-    assert 'onPolicyMsg ----strPath: "/usr/share/velk/scripts/restore_config.bash"' in log_lines(
-        session, mark
-    )
-
-
-@pytest.mark.parametrize(
-    "script",
-    [
-        "exit 1\n",
-        "kill -9 $$\n",
-        "syntax error (\n",
-        "cat /nowhere >&2\n",
-        "printf 'a long line\\n%.0s' {1..20000}\n",
-    ],
-)
-def test_failing_or_noisy_script_does_not_stop_the_exit(session: Terminal, script: str) -> None:
-    session.files.write_restore_script(script)
-    mark = leave_domain(session)
-    session.advance(60)
-    assert forced_actions(session, mark) == ["Reboot"]
-
-
-def test_missing_script_does_not_stop_the_exit(session: Terminal) -> None:
-    Path("/usr/share/velk/scripts/restore_config.bash").unlink()
-    mark = leave_domain(session)
-    session.advance(60)
-    assert forced_actions(session, mark) == ["Reboot"]
-
-
-def test_script_that_reads_its_input_finds_its_end_at_once(session: Terminal) -> None:
-    session.files.write_restore_script('read -r line; restore_config "status $?" "$(cat)"\n')
-    mark = leave_domain(session)
-    script = session.events.wait_for(target="restore_config", after=mark)
-    assert script.args == ("status 1", "")
-
-
-def test_script_that_takes_longer_than_the_minute_delays_the_reboot_to_its_end(session: Terminal) -> None:
-    session.commands.hold("restore_config")
-    mark = session.events.mark()
-    session.daemon.push_policy(EXIT)
-    session.events.wait_for(target="restore_config", after=mark)
-
-    session.jump(90)
-    assert session.events.all(target="systemctl", after=mark) == []
-    session.commands.release("restore_config")
-    session.sync()
-    session.sync()
-    assert road(session, mark) == [*ROAD, ("logind", "Reboot")]
-
-
-@pytest.mark.parametrize("stream", [1, 2], ids=["stdout", "stderr"])
-def test_script_writes_where_the_agent_writes(session: Terminal, stream: int) -> None:
-    session.files.write_restore_script(f"restore_config $(readlink /proc/$$/fd/{stream})\n")
-    mark = leave_domain(session)
-    script = session.events.wait_for(target="restore_config", after=mark)
-    assert script.args == (os.readlink(f"/proc/{session.agent.pid}/fd/{stream}"),)
-
-
-@pytest.mark.real_time
-def test_script_is_waited_for_by_the_clock_on_the_wall(session: Terminal) -> None:
-    """Longer than the 30 s after which a child process is given up by default."""
-    session.files.write_restore_script("sleep 31; restore_config\n")
-    mark = session.events.mark()
-    session.daemon.push_policy(EXIT)
-    session.events.wait_for(target="identity", member="Set", after=mark, timeout=120)
-    assert road(session, mark) == ROAD
-
-
-def test_script_leaves_a_child_that_does_not_hold_up_the_exit(session: Terminal) -> None:
-    session.files.write_restore_script("sleep 600 & disown; restore_config\n")
-    mark = leave_domain(session)
-    assert road(session, mark) == ROAD
 
 
 @pytest.mark.parametrize("status", [1, 127])

@@ -44,7 +44,7 @@ AREAS = (
         f"{_FOLDER}message_transfer.cpp",
         "dispatcher",
         ("message_transfer_test", "restore_configuration_test"),
-        ("policies", "domain_exit", "hung_services"),
+        ("policies", "domain_exit", "restore_script", "hung_services"),
         functions=("leaveDomain", "restoreConfiguration", "runScript", "rebootTime"),
     ),
     Area(
@@ -97,9 +97,21 @@ AREAS = (
         f"{_FOLDER}launcher_guard.cpp",
         "uploads",
         ("launcher_guard_test", "desktop_arrival_test"),
-        ("launcher_life", "software_reports", "inventory_files", "package_lookups", "package_tools"),
+        (
+            "launcher_life",
+            "software_reports",
+            "inventory_files",
+            "package_lookups",
+            "package_tools",
+            "package_tool_calls",
+        ),
     ),
-    Area(f"{_FOLDER}package_tool.cpp", "uploads", ("package_tool_test",), ("package_tools",)),
+    Area(
+        f"{_FOLDER}package_tool.cpp",
+        "uploads",
+        ("package_tool_test",),
+        ("package_tools", "package_tool_calls"),
+    ),
     Area(f"{_FOLDER}terminal_address.cpp", "uploads", (), ("terminal_addresses",)),
     Area(
         f"{_FOLDER}handleevent.cpp",
