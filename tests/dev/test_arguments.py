@@ -9,7 +9,7 @@ from pathlib import Path
 
 import pytest
 
-from conftest import REPOSITORY, Tree, commands, refused
+from devtree import REPOSITORY, Tree, commands, refused
 
 
 @pytest.mark.parametrize(
