@@ -8,7 +8,7 @@ from pathlib import Path
 from typing import Sequence
 
 from rich.console import Console
-from rich.progress import BarColumn, MofNCompleteColumn, Progress, TextColumn, TimeElapsedColumn
+from rich.progress import BarColumn, MofNCompleteColumn, Progress, TaskID, TextColumn, TimeElapsedColumn
 
 from bench import comparison, figures, runner, table
 from bench.figures import Figure, Report
@@ -50,24 +50,34 @@ def _options(arguments: argparse.Namespace) -> Options:
 
 def _measure(options: Options, report: Report, path: Path, console: Console) -> tuple[Report, list[str]]:
     """The report with the new figures in the place of those of the same groups, saved after each group."""
-    failures = []
+    failures: list[str] = []
     columns = (TextColumn("{task.description}"), BarColumn(), MofNCompleteColumn(), TimeElapsedColumn())
     with Progress(*columns, console=console) as progress:
         task = progress.add_task("", total=len(options.boxes))
         for group in options.groups:
-            measured: list[Figure] = []
             circumstances = {**report.circumstances, group: runner.circumstances(options)}
-            for user in GROUPS[group]:
-                try:
-                    measured += runner.measure(
-                        options, group, user, lambda step: progress.update(task, description=step)
-                    )
-                except runner.Failure as failure:
-                    failures.append(str(failure))
-                progress.advance(task)
+            measured, failed = _measure_group(options, group, progress, task)
+            failures += failed
             report = _merged(report, Report(circumstances, measured))
             report.save(path)
     return report, failures
+
+
+def _measure_group(
+    options: Options, group: str, progress: Progress, task: TaskID
+) -> tuple[list[Figure], list[str]]:
+    """The group's figures, and what went wrong."""
+    measured: list[Figure] = []
+    failures = []
+    for user in GROUPS[group]:
+        try:
+            measured += runner.measure(
+                options, group, user, lambda step: progress.update(task, description=step)
+            )
+        except runner.Failure as failure:
+            failures.append(str(failure))
+        progress.advance(task)
+    return measured, failures
 
 
 def _merged(known: Report, fresh: Report) -> Report:

@@ -34,26 +34,28 @@ def _after_start(plan: Plan) -> Iterator[Figure]:
     is_domain = current_user().is_domain_user
     who = "domain" if is_domain else "local"
     programs = agent(), floor("drain", ADDRESS) if is_domain else floor("start")
-    taken: dict[str, dict[str, list[float]]] = {line: {"agent": [], "floor": []} for line in _LINES}
+    taken: dict[str, list[dict[str, float]]] = {"agent": [], "floor": []}
     with Bed(platform=is_domain) as bed:
         for _ in plan.times():
             plan.tell(f"memory of a {who} user's agent")
             for program in programs:
-                with bed.start_and_wait(program) as process:
-                    for line, values in taken.items():
-                        values[program.name].append(process.memory(line))
+                taken[program.name].append(_memory_after_start(bed, program))
     goals = {"Rss": Goal("at most", 1.25), "Private_Dirty": Goal("at most", _MOST_DIRTY, "value")}
     for line, title in _LINES.items():
-        values = taken[line]
         yield Figure(
             f"memory.{who}.{line}",
             f"{title} after start, {who} user",
             "memory",
             "KiB",
-            values["agent"],
-            values["floor"],
+            [memory[line] for memory in taken["agent"]],
+            [memory[line] for memory in taken["floor"]],
             goals[line],
         )
+
+
+def _memory_after_start(bed: Bed, program: Program) -> dict[str, float]:
+    with bed.start_and_wait(program) as process:
+        return {line: process.memory(line) for line in _LINES}
 
 
 def _after_polls(plan: Plan) -> Iterator[Figure]:
