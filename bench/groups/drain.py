@@ -10,12 +10,12 @@ from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
 from sandbox.machine.clock import ManualClock
+from sandbox.periods import SURELY_NEXT_POLL
 
 _ROW = 3_000
 _LENGTHS = (100, 10_000, 100_000)
 _FEW, _MANY = 20, 220
 _SECONDS_PER_MESSAGE = 0.05
-_POLL = 181
 _AFTER_BREAK = 50
 _FLAT = Goal("at most", 1.05)
 
@@ -77,7 +77,7 @@ def _connections(bed: Bed) -> Iterator[Figure]:
         drained = _counts(bed)
         bed.platform.tell("close")
         bed.platform.tell(f"messages {_AFTER_BREAK}")
-        bed.move_clock(clock, _POLL)
+        bed.move_clock(clock, SURELY_NEXT_POLL)
         bed.platform.wait_for("drained")
         reconnected = _counts(bed)
     one = Goal("at most", 1, "value")

@@ -10,10 +10,10 @@ from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
 from sandbox.machine.clock import ManualClock
 from sandbox.machine.users import current_user
+from sandbox.periods import SURELY_NEXT_POLL
 
 _MOST_DIRTY = 4096  # KiB
 _PAGES = 64  # KiB by which two runs of one program differ
-_POLL = 181  # seconds within which the next poll surely comes
 _WARM_POLLS, _POLLS = 500, 1_500
 _BETWEEN_POLLS = 0.01  # seconds without work; a clock moved in the middle of a poll would end its request
 _PATIENCE = 0.5
@@ -65,10 +65,10 @@ def _after_polls(plan: Plan) -> Iterator[Figure]:
         def poll(process: Process, times: int) -> None:
             for _ in range(times):
                 process.await_calm(_BETWEEN_POLLS)
-                bed.move_clock(clock, _POLL)
+                bed.move_clock(clock, SURELY_NEXT_POLL)
                 # A program that was not calm yet has armed its timer only after the move.
                 while bed.platform.await_line("listed", _PATIENCE) is None:
-                    bed.move_clock(clock, _POLL)
+                    bed.move_clock(clock, SURELY_NEXT_POLL)
 
         plan.tell(f"memory after {_POLLS:,} polls")
         yield from _growth(

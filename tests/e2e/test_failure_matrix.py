@@ -11,13 +11,13 @@ from sandbox.fakes.base import Peer
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
+from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, next_notification, next_status
 
 DBUS_LIMIT = 25
 TRANSFER_LIMIT = 30
-SURELY_NEXT_POLL = 181
 NONSENSE = Reply("(isa{sv})", ((1, "x", {}),))
 PEERS = (
     "policy_service",

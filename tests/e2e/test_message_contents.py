@@ -7,11 +7,11 @@ from typing import Any
 
 import pytest
 
+from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from wire import next_notification
 
-SURELY_NEXT_POLL = 181
 READ = "2026-01-01 00:00:00"
 
 

@@ -10,12 +10,12 @@ from typing import Iterator
 import pytest
 
 from sandbox.machine import layout
+from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.certificates import Authority, Identity
 from sandbox.platform.server import HttpFault, Platform, trust
 from sandbox.terminal import Terminal
 from wire import carries_out_policies, log_lines, next_notification
 
-SURELY_NEXT_POLL = 181
 USER = "zhang.wei"
 TRANSFER_LIMIT = 30
 

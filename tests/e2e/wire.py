@@ -7,11 +7,12 @@ from typing import Any, Callable
 from uuid import uuid4
 
 from sandbox.events import Event
+from sandbox.periods import STATE_REPORT
 from sandbox.terminal import Terminal
 
 FORWARDED_CODE = 5
 # The agent's five-minute timer is coarse: half a second more or less.
-FIVE_MINUTES = 301
+FIVE_MINUTES = STATE_REPORT + 1
 # What the agent asks the session bus itself each time that it reports the session's state.
 STATE_QUESTIONS = [
     ("NameHasOwner", "com.norix.ScreenSaver"),

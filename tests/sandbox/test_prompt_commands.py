@@ -9,6 +9,7 @@ import pytest
 from paper import Paper
 from sandbox.machine import layout
 from sandbox.machine.users import DOMAIN_USER
+from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.prompt import commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, run_line
@@ -16,7 +17,6 @@ from sandbox.terminal import Terminal
 
 assert commands, "importing the module makes its commands known"
 
-_SURELY_NEXT_POLL = 181
 # The notice's timer is coarse: half a second more or less.
 _PASSWORD_NOTICE_DELAY = 61
 
@@ -124,7 +124,7 @@ def test_a_message_reaches_the_user_and_is_then_read(desk: Paper) -> None:
     desk.terminal.start_agent()
     run_line(desk, """message "停机, 今晚" 'save "all"' li.na""")
     run_line(desk, "messages")
-    desk.terminal.advance(_SURELY_NEXT_POLL)
+    desk.terminal.advance(SURELY_NEXT_POLL)
     run_line(desk, "messages")
 
     shown = desk.terminal.events.wait_for(source="velks", member="Notify")
@@ -188,13 +188,13 @@ def test_a_platform_that_is_down_gets_no_request_until_it_is_up(desk: Paper) -> 
     for _ in range(2):
         run_line(desk, "platform down")
     run_line(desk, "state")
-    desk.terminal.advance(_SURELY_NEXT_POLL)
+    desk.terminal.advance(SURELY_NEXT_POLL)
     (row,) = desk.lines_with(f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}")
     assert " no " in row
     assert not desk.terminal.events.all(kind="http", after=mark)
 
     run_line(desk, "platform up")
-    desk.terminal.advance(_SURELY_NEXT_POLL)
+    desk.terminal.advance(SURELY_NEXT_POLL)
 
     assert desk.terminal.events.wait_for(kind="http", after=mark).member == "list"
 

@@ -4,10 +4,10 @@ from __future__ import annotations
 
 from sandbox.demo.scene import Expectation, Scene, Step, message_comes, notice
 from sandbox.machine.users import DOMAIN_USER as USER
+from sandbox.periods import LONGEST_FIRST_POLL
 from sandbox.terminal import Terminal
 
 _NOTICE_DELAY = 60
-_LATEST_FIRST_POLL = 120
 _TIP = "您的密码将在3天后过期，请及时修改"
 _MESSAGES = (
     ("停机维护", "今晚22:00停机，请保存文件"),
@@ -32,7 +32,7 @@ def _look_at_inbox(terminal: Terminal) -> None:
 
 
 _ONE_AFTER_THE_OTHER = tuple(
-    expectation for message in _MESSAGES for expectation in message_comes(*message, within=_LATEST_FIRST_POLL)
+    expectation for message in _MESSAGES for expectation in message_comes(*message, within=LONGEST_FIRST_POLL)
 )
 _ALL_READ = tuple(
     Expectation(f"“{title}” is read on the platform", "platform", "inbox", title, ("read",))

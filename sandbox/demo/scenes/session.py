@@ -4,10 +4,9 @@ from __future__ import annotations
 
 from sandbox.demo.scene import NOTHING_ASKED, Expectation, Scene, Step, from_agent, message_comes
 from sandbox.machine.users import DOMAIN_USER as USER
+from sandbox.periods import LONGEST_POLL, STATE_REPORT
 from sandbox.terminal import Terminal
 
-_REPORT_PERIOD = 300
-_LONGEST_POLL_INTERVAL = 180
 _MESSAGE = ("打印机", "三楼打印机已修好")
 
 _IDENTITY = from_agent("the user's name and uid", "daemon", "UpdateUserInfo", USER.plain_name, USER.uid)
@@ -51,12 +50,12 @@ STATES = Scene(
     "Every five minutes the agent looks at the screen and reports what it finds. The platform's messages "
     "wait until somebody is there.",
     (
-        Step(lambda terminal: terminal.session_manager.lock(), (_status(2, "locked", _REPORT_PERIOD),)),
+        Step(lambda terminal: terminal.session_manager.lock(), (_status(2, "locked", STATE_REPORT),)),
         # Longer than any poll interval, and locked all the time.
-        Step(_walk_away, (_status(3, "screen saver", _REPORT_PERIOD), NOTHING_ASKED)),
+        Step(_walk_away, (_status(3, "screen saver", STATE_REPORT), NOTHING_ASKED)),
         Step(
             _unlock,
-            (_status(1, "active", _REPORT_PERIOD), *message_comes(*_MESSAGE, within=_LONGEST_POLL_INTERVAL)),
+            (_status(1, "active", STATE_REPORT), *message_comes(*_MESSAGE, within=LONGEST_POLL)),
         ),
     ),
 )
