@@ -177,7 +177,7 @@ Protocols h2 http/1.1
 SSLEngine on
 SSLCertificateFile {server.certificate}
 SSLCertificateKeyFile {server.key}
-SSLCACertificateFile {authority}
+SSLCACertificateFile "{authority}"
 SSLVerifyClient require
 SSLProxyEngine on
 SSLProxyMachineCertificateFile {folder}/terminal.pem
