@@ -4,14 +4,29 @@
 #include <QDBusMessage>
 #include <QDBusPendingCallWatcher>
 #include <QDBusPendingReply>
+#include <QDBusReply>
 #include <QDBusVariant>
-
-#include "entry_signals.h"
 
 namespace {
 
+const QString kId = QStringLiteral("Id");
 const QString kName = QStringLiteral("Name");
 const QString kWindowInfos = QStringLiteral("WindowInfos");
+
+/// Whether a reading failed because no such entry exists. Any other error comes from an entry that does.
+bool saysThatNothingIsThere(const QDBusError& error)
+{
+    switch (error.type()) {
+    case QDBusError::ServiceUnknown:
+    case QDBusError::UnknownObject:
+    case QDBusError::UnknownInterface:
+    case QDBusError::UnknownMethod: // what older D-Bus libraries say of a missing object
+    case QDBusError::Disconnected:
+        return true;
+    default:
+        return false;
+    }
+}
 
 /// A text as it is; other types are not converted.
 QString textOf(const QVariant& value)
@@ -46,35 +61,46 @@ __Entry::__Entry(const QString& service, const QString& path, const QDBusConnect
                  QObject* parent)
     : QObject(parent)
     , m_object{connection, service, path, QString::fromLatin1(staticInterfaceName())}
-    , m_signals(EntrySignals::of(connection, service))
 {
-    // Listened to before anything is read, so that no change falls between.
-    m_signals->add(path, this);
-    const QVariant id = m_object.read(QStringLiteral("Id"));
-    if (id.isValid()) {
-        m_id = textOf(id);
+    // Before anything is read, so that no change falls between.
+    subscribe();
+    const QDBusReply<QDBusVariant> reply = m_object.get(kId);
+    if (reply.isValid()) {
+        m_id = textOf(reply.value().variant());
+    } else {
+        m_isValid = !saysThatNothingIsThere(reply.error());
     }
 }
 
-__Entry::~__Entry()
+void __Entry::subscribe()
 {
-    m_signals->remove(m_object.path, this);
+    QDBusConnection bus = m_object.bus;
+    const QString anyMember;
+    bus.connect(m_object.service, m_object.path, kPropertiesInterface, QStringLiteral("PropertiesChanged"),
+                {m_object.interface}, QString(), this, SLOT(onPropertiesChanged(QDBusMessage)));
+    bus.connect(m_object.service, m_object.path, m_object.interface, anyMember, this,
+                SLOT(onOwnSignal(QDBusMessage)));
 }
 
 bool __Entry::isValid() const
 {
-    return m_id.has_value();
+    return m_isValid;
 }
 
 QString __Entry::id() const
 {
+    if (m_isValid && !m_id) {
+        const QVariant id = m_object.read(kId);
+        if (id.isValid()) {
+            m_id = textOf(id);
+        }
+    }
     return m_id.value_or(QString());
 }
 
 QString __Entry::name() const
 {
     m_knownName = textOf(m_object.read(kName));
-    m_signals->catchUp();
     return *m_knownName;
 }
 
@@ -87,15 +113,16 @@ WindowInfoMap __Entry::windowInfos() const
 {
     const auto infos = windowInfosOf(m_object.read(kWindowInfos)).value_or(WindowInfoMap());
     m_knownWindows = infos.keys();
-    m_signals->catchUp();
     return infos;
 }
 
-void __Entry::onPropertiesChanged(const QVariantMap& changed, const QStringList& invalidated)
+void __Entry::onPropertiesChanged(const QDBusMessage& signal)
 {
+    const auto changed = qdbus_cast<QVariantMap>(signal.arguments().value(1));
     for (auto property = changed.cbegin(); property != changed.cend(); ++property) {
-        announce(property.key(), property.value());
+        notice(property.key(), property.value());
     }
+    const QStringList invalidated = signal.arguments().value(2).toStringList();
     for (const QString& property : {kName, kWindowInfos}) {
         if (invalidated.contains(property)) {
             readAgain(property);
@@ -107,16 +134,7 @@ void __Entry::onOwnSignal(const QDBusMessage& signal)
 {
     const QString suffix = QStringLiteral("Changed");
     if (signal.member().endsWith(suffix)) {
-        announce(signal.member().chopped(suffix.size()), signal.arguments().value(0));
-    }
-}
-
-void __Entry::announce(const QString& property, const QVariant& value)
-{
-    if (!m_signals->isCatchingUp()) {
-        tellOf(property, value);
-    } else if (property == kName || property == kWindowInfos) {
-        readAgain(property);
+        notice(signal.member().chopped(suffix.size()), signal.arguments().value(0));
     }
 }
 
@@ -132,7 +150,7 @@ void __Entry::readAgain(const QString& property)
         watcher->deleteLater();
         const QDBusPendingReply<QDBusVariant> reply = *watcher;
         if (!reply.isError()) {
-            tellOf(property, reply.value().variant());
+            notice(property, reply.value().variant());
         }
         if (m_reads.take(property)) {
             readAgain(property);
@@ -140,18 +158,18 @@ void __Entry::readAgain(const QString& property)
     });
 }
 
-void __Entry::tellOf(const QString& property, const QVariant& value)
+void __Entry::notice(const QString& property, const QVariant& value)
 {
     if (property == kName && value.type() == QVariant::String) {
-        tellOfName(value.toString());
+        noticeName(value.toString());
     } else if (property == kWindowInfos) {
         if (const auto infos = windowInfosOf(value)) {
-            tellOfWindowInfos(*infos);
+            noticeWindowInfos(*infos);
         }
     }
 }
 
-void __Entry::tellOfName(const QString& name)
+void __Entry::noticeName(const QString& name)
 {
     if (m_knownName != name) {
         m_knownName = name;
@@ -159,7 +177,7 @@ void __Entry::tellOfName(const QString& name)
     }
 }
 
-void __Entry::tellOfWindowInfos(const WindowInfoMap& infos)
+void __Entry::noticeWindowInfos(const WindowInfoMap& infos)
 {
     if (m_knownWindows != infos.keys()) {
         m_knownWindows = infos.keys();

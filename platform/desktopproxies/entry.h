@@ -1,23 +1,26 @@
 #pragma once
 
+#include <QDBusMessage>
 #include <QHash>
 #include <QObject>
 #include <QVariant>
 
-#include <memory>
 #include <optional>
 
 #include "remote_interface.h"
 #include "types.h"
 
-class EntrySignals;
-
 /// Proxy of one entry of the desktop's dock. The desktop's library gives its proxies names with underscores.
 ///
 /// Docks announce changes in different ways: by the standard signal of properties, with the value or without
-/// it, or by signals of the entry's own. All are listened to from the start, and each change is told once. A
-/// value that a dock only declares invalid is read without waiting; so is one that it announces while older
-/// announcements may still be under way (see EntrySignals::isCatchingUp()).
+/// it, or by signals of the entry's own. Each change is signalled once, with the value that was announced; a
+/// value that a dock only declares invalid is read without waiting.
+///
+/// Each proxy has subscriptions of its own, made when it is built. What was announced about the entry before
+/// that never reaches it, however long the program was busy; what is announced from then on always does, in
+/// the dock's order. What falls between the subscription and a reading, a few milliseconds, may be signalled
+/// although the value read includes it. The same holds for a further proxy of the same entry where Qt has
+/// held signals back because the event loop has not run yet.
 // NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 class __Entry : public QObject
 {
@@ -26,19 +29,19 @@ class __Entry : public QObject
 public:
     static const char* staticInterfaceName() { return "com.norix.kpx.daemon.Dock.Entry"; }
 
-    /// Waits for the entry's identifier, which never changes, for the D-Bus time limit at most.
+    /// Asks the dock for the entry's identifier, for the D-Bus time limit at most.
     __Entry(const QString& service, const QString& path, const QDBusConnection& connection,
             QObject* parent = nullptr);
-    ~__Entry() override;
-    Q_DISABLE_COPY_MOVE(__Entry)
 
-    /// Whether the dock is there and answered for this entry when the proxy was built.
+    /// Whether the entry was there when the proxy was built. A dock that refused to answer, or was too slow,
+    /// has the entry all the same.
     bool isValid() const;
 
+    /// The identifier never changes, so it is read again only if the dock did not tell it before.
     QString id() const;
 
-    /// These read the dock's value now, for the D-Bus time limit at most; empty or false if it does not
-    /// answer.
+    /// These read the dock's value now. They and id() wait for the D-Bus time limit at most and are empty or
+    /// false if the dock does not answer.
     QString name() const;
     bool isDocked() const;
     WindowInfoMap windowInfos() const;
@@ -47,21 +50,21 @@ Q_SIGNALS:
     void WindowInfosChanged(const QMap<uint, WindowInfo>& infos);
     void NameChanged(const QString& name);
 
-private:
-    friend class EntrySignals;
-    void onPropertiesChanged(const QVariantMap& changed, const QStringList& invalidated);
+private Q_SLOTS:
+    void onPropertiesChanged(const QDBusMessage& signal);
     void onOwnSignal(const QDBusMessage& signal);
 
-    void announce(const QString& property, const QVariant& value);
+private:
+    void subscribe();
     void readAgain(const QString& property);
-    void tellOf(const QString& property, const QVariant& value);
-    void tellOfWindowInfos(const WindowInfoMap& infos);
-    void tellOfName(const QString& name);
+    void notice(const QString& property, const QVariant& value);
+    void noticeWindowInfos(const WindowInfoMap& infos);
+    void noticeName(const QString& name);
 
     RemoteInterface m_object;
-    std::shared_ptr<EntrySignals> m_signals;
-    std::optional<QString> m_id; ///< unset if the entry did not answer
-    // What the other side knows already, read or told.
+    bool m_isValid = true;
+    mutable std::optional<QString> m_id; ///< unset until the dock has told it
+    // What has been read or signalled already.
     mutable std::optional<QString> m_knownName;
     mutable std::optional<QList<uint>> m_knownWindows;
     /// Properties that are being read, and whether they have changed once more meanwhile. One read at a time

@@ -1,8 +1,5 @@
 #include "remote_interface.h"
 
-#include <QDBusReply>
-#include <QDBusVariant>
-
 QDBusMessage RemoteInterface::readCall(const QString& property) const
 {
     auto call = QDBusMessage::createMethodCall(service, path, kPropertiesInterface, QStringLiteral("Get"));
@@ -10,8 +7,13 @@ QDBusMessage RemoteInterface::readCall(const QString& property) const
     return call;
 }
 
+QDBusReply<QDBusVariant> RemoteInterface::get(const QString& property) const
+{
+    return bus.call(readCall(property));
+}
+
 QVariant RemoteInterface::read(const QString& property) const
 {
-    const QDBusReply<QDBusVariant> reply = bus.call(readCall(property));
+    const QDBusReply<QDBusVariant> reply = get(property);
     return reply.isValid() ? reply.value().variant() : QVariant();
 }

@@ -2,6 +2,8 @@
 
 #include <QDBusConnection>
 #include <QDBusMessage>
+#include <QDBusReply>
+#include <QDBusVariant>
 #include <QString>
 #include <QVariant>
 
@@ -19,7 +21,10 @@ struct RemoteInterface
     /// The call that reads a property.
     QDBusMessage readCall(const QString& property) const;
 
-    /// Waits for a property's value, for the D-Bus time limit at most. Invalid if the service is absent,
+    /// Waits for a property's value, for the D-Bus time limit at most; an error if the service is absent,
     /// hangs or has no such object or property.
+    QDBusReply<QDBusVariant> get(const QString& property) const;
+
+    /// The same, with an invalid value in place of the error.
     QVariant read(const QString& property) const;
 };

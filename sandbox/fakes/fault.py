@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 from dataclasses import dataclass
-from typing import Literal
+from typing import Any, Literal
 
 Kind = Literal["none", "hang", "fail", "slow", "hold"]
 
@@ -40,3 +40,11 @@ class Fault:
     def hold() -> Fault:
         """Keep the calls until `Peer.release`."""
         return Fault("hold")
+
+
+class FirstCalls(dict[str, Fault]):
+    """Faults for the first call of each member, or of each property, alone."""
+
+    def get(self, name: str, default: Any = None) -> Any:
+        """The fault of a call, which is used up."""
+        return self.pop(name, default)

@@ -240,3 +240,17 @@ def test_what_an_application_did_before_it_was_read_is_no_change(session: Termin
     session.dock.set_windows("mail", 1)
     settle(session)
     assert told(session, mark) == [(CLOSED, "Post")]
+
+
+def test_changes_right_after_a_new_entry_are_all_reported(session: Terminal) -> None:
+    session.dock.open_app("mail", "Mail", docked=True, windows=0)
+    settle(session)
+    mark = session.events.mark()
+
+    for number in range(40):
+        session.dock.open_app(f"new {number}", "New", docked=True)
+        session.dock.set_windows("mail", 1)
+        session.dock.set_windows("mail", 0)
+    settle(session)
+
+    assert told(session, mark) == [(OPENED, "Mail"), (CLOSED, "Mail")] * 40

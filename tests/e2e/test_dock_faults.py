@@ -6,10 +6,10 @@ from typing import Any
 
 import pytest
 
-from dockwatch import OPENED, follows, scans, settle, start, told, warnings
+from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
 from sandbox.fakes import dock
 from sandbox.fakes.exported import Reply
-from sandbox.fakes.fault import Fault
+from sandbox.fakes.fault import Fault, FirstCalls
 from sandbox.terminal import Terminal
 from wire import carries_out_policies
 
@@ -54,18 +54,47 @@ def test_a_dock_that_hangs_later_holds_the_agent_up_by_the_limit_for_each_questi
     start(terminal)
     terminal.dock.fault = Fault.hang()
     mark = terminal.events.mark()
-    path = terminal.dock.open_app("a", "A")
+    terminal.dock.open_app("a", "A")
 
-    # The identifier and, of an entry that did not tell it, whether it is docked.
-    for count in (1, 2):
+    # The identifier twice, the name, the windows, and whether it is docked.
+    for count in range(1, 6):
         terminal.events.wait_for(target="dock", member="Get", after=mark, count=count)
         terminal.jump(DBUS_LIMIT)
 
     carries_out_policies(terminal)
     terminal.dock.fault = Fault.none()
     settle(terminal)
-    assert warnings(terminal, mark) == [f'entry is invalid, path: "{path}"']
+    assert warnings(terminal, mark) == []
     assert told(terminal, mark) == [(OPENED, "")]
+
+
+@pytest.mark.parametrize("name", ["Id", "IsDocked"])
+@pytest.mark.parametrize("fault", [Fault.hang(), Fault.fail()], ids=lambda fault: fault.kind)
+def test_an_entry_that_once_fails_to_answer_keeps_its_windows_and_signals(
+    terminal: Terminal, fault: Fault, name: str
+) -> None:
+    start(terminal)
+    mark = terminal.events.mark()
+    terminal.dock.faults = FirstCalls({name: fault})
+    terminal.dock.open_app("a", "A", windows=2)
+    terminal.events.wait_for(lambda event: event.args[1] == name, target="dock", member="Get", after=mark)
+    terminal.jump(DBUS_LIMIT)
+    settle(terminal)
+
+    assert (told(terminal, mark), warnings(terminal, mark)) == ([(OPENED, "A")], [])
+    events = follows(
+        terminal, lambda: terminal.dock.set_windows("a", 1), lambda: terminal.dock.close_app("a")
+    )
+    assert events == [(CLOSED, "A"), (CLOSED, "A")]
+
+
+def test_an_entry_that_never_tells_its_identifier_is_followed_all_the_same(terminal: Terminal) -> None:
+    terminal.dock.faults["Id"] = Fault.fail()
+    terminal.dock.open_app("a", "A", windows=2)
+    start(terminal)
+
+    assert (told(terminal), warnings(terminal)) == ([(OPENED, "A")], [])
+    assert follows(terminal, lambda: terminal.dock.set_windows("a", 1)) == [(CLOSED, "A")]
 
 
 def test_a_dock_that_is_slow_to_tell_what_it_declared_invalid_holds_nothing_up(terminal: Terminal) -> None:
@@ -154,9 +183,9 @@ def test_a_change_to_a_value_of_another_type_is_passed_over(
 def test_replies_of_another_form_do_not_stop_the_agent(terminal: Terminal, reply: Reply) -> None:
     start(terminal)
     terminal.dock.answers["Get"] = reply
-    path = terminal.dock.open_app("a", "A")
+    terminal.dock.open_app("a", "A")
     settle(terminal)
     del terminal.dock.answers["Get"]
 
-    assert warnings(terminal) == [f'entry is invalid, path: "{path}"']
+    assert (told(terminal), warnings(terminal)) == ([(OPENED, "")], [])
     assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]

@@ -3,7 +3,9 @@
 #include <QDBusConnection>
 #include <QDBusObjectPath>
 #include <QDebug>
+#include <QStringList>
 
+#include <memory>
 #include <utility>
 
 #include "dock.h"
@@ -33,23 +35,28 @@ AppOpenSpy* AppOpenSpy::instance()
 AppOpenSpy::AppOpenSpy()
 {
     // Queued before the dock is listened to, so that it also runs before any of the dock's signals.
-    QMetaObject::invokeMethod(this, &AppOpenSpy::tellFirstOpened, Qt::QueuedConnection);
+    const auto alreadyOpen = std::make_shared<QStringList>();
+    const auto reportAlreadyOpen = [this, alreadyOpen] {
+        for (const QString& appName : *alreadyOpen) {
+            reportOpened(appName);
+        }
+    };
+    QMetaObject::invokeMethod(this, reportAlreadyOpen, Qt::QueuedConnection);
 
     m_dock = newDock(this);
     if (m_dock->isValid()) {
-        initAll();
-    } else {
-        delete std::exchange(m_dock, nullptr);
-        qWarning() << "dock service is not registered, wait..";
-        connect(new ServiceArrival(kDockService, this), &ServiceArrival::arrived, this, [this] {
-            m_dock = newDock(this);
-            initAll();
-        });
+        initAll([alreadyOpen](const QString& appName) { alreadyOpen->append(appName); });
+        return;
     }
-    m_isBuilt = true;
+    delete std::exchange(m_dock, nullptr);
+    qWarning() << "dock service is not registered, wait..";
+    connect(new ServiceArrival(kDockService, this), &ServiceArrival::arrived, this, [this] {
+        m_dock = newDock(this);
+        initAll([this](const QString& appName) { reportOpened(appName); });
+    });
 }
 
-void AppOpenSpy::initAll()
+void AppOpenSpy::initAll(const ReportOpened& report)
 {
     connect(m_dock, &__Dock::EntryAdded, this, &AppOpenSpy::onEntryAdded);
     connect(m_dock, &__Dock::EntryRemoved, this, &AppOpenSpy::onEntryRemoved);
@@ -57,11 +64,16 @@ void AppOpenSpy::initAll()
     const QList<QDBusObjectPath> paths = m_dock->entries();
     qInfo() << "dock entry size:" << paths.size();
     for (const QDBusObjectPath& path : paths) {
-        onEntryAdded(path);
+        addEntry(path, report);
     }
 }
 
 void AppOpenSpy::onEntryAdded(const QDBusObjectPath& path)
+{
+    addEntry(path, [this](const QString& appName) { reportOpened(appName); });
+}
+
+void AppOpenSpy::addEntry(const QDBusObjectPath& path, const ReportOpened& report)
 {
     const auto entry = QSharedPointer<EntryInfo>::create(path);
     if (m_entries.contains(entry->entryId())) {
@@ -70,9 +82,14 @@ void AppOpenSpy::onEntryAdded(const QDBusObjectPath& path)
     m_entries.insert(entry->entryId(), entry);
     // A docked entry stands on the dock whether or not its application runs.
     if (!entry->isDocked()) {
-        tellOpened(entry);
+        report(entry->appName());
     }
     connect(entry.data(), &EntryInfo::windowSizeChanged, this, &AppOpenSpy::appStateChange);
+}
+
+void AppOpenSpy::reportOpened(const QString& appName)
+{
+    Q_EMIT appStateChange(AppOpened, appName);
 }
 
 void AppOpenSpy::onEntryRemoved(const QString& id)
@@ -87,22 +104,6 @@ void AppOpenSpy::onEntryRemoved(const QString& id)
         Q_EMIT appStateChange(AppClosed, entry->appName());
     }
     m_entries.remove(id);
-}
-
-void AppOpenSpy::tellOpened(const QSharedPointer<EntryInfo>& entry)
-{
-    if (m_isBuilt) {
-        Q_EMIT appStateChange(AppOpened, entry->appName());
-    } else {
-        m_firstOpened.append(entry);
-    }
-}
-
-void AppOpenSpy::tellFirstOpened()
-{
-    for (const auto& entry : std::exchange(m_firstOpened, {})) {
-        Q_EMIT appStateChange(AppOpened, entry->appName());
-    }
 }
 
 } // namespace velk::module::software

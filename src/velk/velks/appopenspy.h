@@ -1,9 +1,10 @@
 #pragma once
 
-#include <QList>
 #include <QMap>
 #include <QObject>
 #include <QSharedPointer>
+
+#include <functional>
 
 class QDBusObjectPath;
 class __Dock; // NOLINT(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
@@ -12,11 +13,11 @@ namespace velk::module::software {
 
 class EntryInfo;
 
-/// Follows the dock's entries and tells of every application opened (1) or closed (2). A dock that is absent
+/// Follows the dock's entries and reports every application opened (1) or closed (2). A dock that is absent
 /// at the start is waited for; one that goes away later is not.
 ///
-/// What is open already when the spy is built is told of when the event loop first runs, before anything that
-/// happens later, so that whoever asked for the instance can connect to it.
+/// Applications already open at construction are reported when the event loop first runs, before any later
+/// change, so that callers of instance() can connect first.
 class AppOpenSpy : public QObject
 {
     Q_OBJECT
@@ -34,15 +35,14 @@ public Q_SLOTS:
 private:
     AppOpenSpy();
 
-    void initAll();
-    void tellOpened(const QSharedPointer<EntryInfo>& entry);
-    void tellFirstOpened();
+    using ReportOpened = std::function<void(const QString& appName)>;
+
+    void initAll(const ReportOpened& report);
+    void addEntry(const QDBusObjectPath& path, const ReportOpened& report);
+    void reportOpened(const QString& appName);
 
     __Dock* m_dock = nullptr;
-    QMap<QString, QSharedPointer<EntryInfo>> m_entries;
-    bool m_isBuilt = false;
-    QList<QSharedPointer<EntryInfo>>
-        m_firstOpened; ///< found before anybody could listen, in the dock's order
+    QMap<QString, QSharedPointer<EntryInfo>> m_entries; ///< by the entries' identifiers
 };
 
 } // namespace velk::module::software
