@@ -37,6 +37,7 @@ _CONFIG = """<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-Bus Bus Configura
     <allow receive_type="error"/>
     <allow receive_type="signal"/>
   </policy>
+  <servicedir>{services}</servicedir>
   {limits}
 </busconfig>
 """
@@ -61,6 +62,7 @@ class Bus:
         is_system = kind == "system"
         self._socket = layout.SYSTEM_BUS_SOCKET if is_system else layout.session_bus_socket(user.uid)
         self._pid_file = layout.BOX / f"{kind}-bus.pid"
+        self._services = layout.BOX / f"{kind}-bus-services"
         self._daemon: subprocess.Popen[bytes] | None = None
         self._control: Any = None
         self._listeners: list[Callable[[], None]] = []
@@ -82,10 +84,14 @@ class Bus:
 
     def start(self) -> None:
         """Start the bus daemon and return once it accepts connections."""
-        for folder in (self._socket.parent, self._pid_file.parent):
+        for folder in (self._socket.parent, self._pid_file.parent, self._services):
             folder.mkdir(parents=True, exist_ok=True)
         config = self._pid_file.with_suffix(".conf")
-        config.write_text(_CONFIG.format(kind=self.kind, socket=self._socket, limits=_limits(self.kind)))
+        config.write_text(
+            _CONFIG.format(
+                kind=self.kind, socket=self._socket, services=self._services, limits=_limits(self.kind)
+            )
+        )
         log = self._pid_file.with_suffix(".log")
         reading, writing = os.pipe()
         with log.open("wb") as log_file:
@@ -126,9 +132,17 @@ class Bus:
             Path(left).unlink(missing_ok=True)
 
     def restart(self) -> None:
-        """Replace the bus daemon by a fresh one that nobody is connected to."""
+        """Replace the bus daemon by a fresh one that nobody is connected to, and that can start nothing."""
         self.stop()
+        for service in self._services.glob("*.service"):
+            service.unlink()
         self.start()
+
+    def offer(self, bus_name: str, command: str) -> None:
+        """Let the bus run a command when `bus_name` is called and nobody owns it."""
+        service = self._services / f"{bus_name}.service"
+        service.write_text(f"[D-BUS Service]\nName={bus_name}\nExec={command}\n")
+        self.ask("ReloadConfig", "")
 
     def when_started(self, listener: Callable[[], None]) -> None:
         """Call `listener` now, when the bus runs, and again after each start."""

@@ -11,7 +11,7 @@ from sandbox.bus.stranger import Stranger
 from sandbox.fakes import dock
 from sandbox.fakes.exported import PROPERTIES
 from sandbox.terminal import Terminal
-from wire import STATE_QUESTIONS, asked_of_the_session_bus, carries_out_policies
+from wire import asked_of_the_session_bus, carries_out_policies
 
 WAITING = "dock service is not registered, wait.."
 
@@ -59,7 +59,7 @@ def test_an_absent_dock_is_warned_of_once_and_nothing_is_told(terminal: Terminal
 def test_a_late_dock_is_waited_for_without_asking(terminal: Terminal) -> None:
     start_without_dock(terminal)
 
-    assert asked_of_the_session_bus(terminal, lambda: terminal.advance(3600)) == STATE_QUESTIONS
+    assert asked_of_the_session_bus(terminal, lambda: terminal.advance(3600)) == []
 
 
 def test_a_late_dock_is_read_whole_and_then_followed(terminal: Terminal) -> None:

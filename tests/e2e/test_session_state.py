@@ -9,6 +9,7 @@ import pytest
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.logind import USER
+from sandbox.machine import layout
 from sandbox.terminal import Terminal
 from wire import FIVE_MINUTES, log_lines, next_status
 
@@ -58,6 +59,40 @@ def test_absent_service_counts_as_no(terminal: Terminal, absent: tuple[str, ...]
         terminal.peers[name].leave()
     terminal.start_agent()
     assert five_minute_report(terminal)[0] == status
+
+
+@pytest.mark.parametrize("name", ["screensaver", "session_manager"])
+@pytest.mark.parametrize("yes", [True, False])
+def test_service_that_the_bus_can_start_is_started_and_read(terminal: Terminal, name: str, yes: bool) -> None:
+    show(terminal, running=yes and name == "screensaver", locked=yes and name == "session_manager")
+    service = terminal.peers[name]
+    service.leave()
+    terminal.start_agent()
+    terminal.commands.hold("start-service")
+    terminal.session_bus.offer(service.bus_name, str(layout.COMMANDS / "start-service"))
+    mark = terminal.events.mark()
+    terminal.sync()
+    terminal.jump(FIVE_MINUTES)
+    terminal.events.wait_for(kind="command", member="start-service", after=mark)
+    service.appear()
+    terminal.commands.release("start-service")
+    no = ACTIVE
+    started = SCREEN_SAVER if name == "screensaver" else LOCKED
+
+    assert next_status(terminal, mark)[0] == (started if yes else no)
+    assert len([line for line in log_lines(terminal, mark) if line.startswith("get screen")]) == 2
+
+
+def test_service_that_the_bus_cannot_start_counts_as_no_and_is_not_logged(terminal: Terminal) -> None:
+    show(terminal, running=True, locked=True)
+    terminal.screensaver.leave()
+    terminal.start_agent()
+    terminal.session_bus.offer(terminal.screensaver.bus_name, "/bin/false")
+    mark = terminal.events.mark()
+
+    assert five_minute_report(terminal)[0] == LOCKED
+    states = [line for line in log_lines(terminal, mark) if line.startswith("get screen")]
+    assert states == ["get screenLocked state  true"]
 
 
 def test_each_present_service_is_logged(terminal: Terminal) -> None:

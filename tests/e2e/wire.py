@@ -13,11 +13,6 @@ from sandbox.terminal import Terminal
 FORWARDED_CODE = 5
 # The agent's five-minute timer is coarse: half a second more or less.
 FIVE_MINUTES = STATE_REPORT + 1
-# What the agent asks the session bus itself each time that it reports the session's state.
-STATE_QUESTIONS = [
-    ("NameHasOwner", "com.norix.ScreenSaver"),
-    ("NameHasOwner", "com.norix.SessionManager"),
-]
 
 
 @dataclass(frozen=True)

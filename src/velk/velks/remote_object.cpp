@@ -2,10 +2,19 @@
 
 #include <QDBusConnectionInterface>
 #include <QDBusMessage>
-#include <QDBusPendingReply>
 #include <QDBusReply>
-#include <QDBusVariant>
 #include <QVector>
+
+namespace {
+
+/// Waits for a reply; its value is invalid if it is an error.
+QVariant valueOf(QDBusPendingReply<QDBusVariant> reply)
+{
+    reply.waitForFinished();
+    return reply.isError() ? QVariant() : reply.value().variant();
+}
+
+} // namespace
 
 bool isOnBus(const QDBusConnection& bus, const QString& service)
 {
@@ -22,29 +31,37 @@ RemoteObject::RemoteObject(const QDBusConnection& bus, const QString& service, c
     , m_interface(interface)
 { }
 
-bool RemoteObject::isPresent() const
-{
-    return isOnBus(m_bus, m_service);
-}
-
 QVariant RemoteObject::property(const QString& name) const
 {
-    return properties({name}).constFirst();
+    return valueOf(ask(name));
+}
+
+std::optional<QVariant> RemoteObject::propertyIfPresent(const QString& name) const
+{
+    QVariant value = property(name);
+    if (!value.isValid() && !isOnBus(m_bus, m_service)) {
+        return {};
+    }
+    return value;
 }
 
 QVariantList RemoteObject::properties(const QStringList& names) const
 {
     QVector<QDBusPendingReply<QDBusVariant>> replies;
     for (const QString& name : names) {
-        replies.append(m_bus.asyncCall(propertiesCall(QStringLiteral("Get"), {m_interface, name})));
+        replies.append(ask(name));
     }
 
     QVariantList values;
-    for (auto& reply : replies) {
-        reply.waitForFinished();
-        values.append(reply.isError() ? QVariant() : reply.value().variant());
+    for (const auto& reply : replies) {
+        values.append(valueOf(reply));
     }
     return values;
+}
+
+QDBusPendingReply<QDBusVariant> RemoteObject::ask(const QString& name) const
+{
+    return m_bus.asyncCall(propertiesCall(QStringLiteral("Get"), {m_interface, name}));
 }
 
 void RemoteObject::setProperty(const QString& name, const QVariant& value) const

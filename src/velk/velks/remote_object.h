@@ -1,9 +1,13 @@
 #pragma once
 
 #include <QDBusConnection>
+#include <QDBusPendingReply>
+#include <QDBusVariant>
 #include <QString>
 #include <QStringList>
 #include <QVariant>
+
+#include <optional>
 
 /// Whether a name has an owner now. Asks only the bus, never the service.
 bool isOnBus(const QDBusConnection& bus, const QString& service);
@@ -17,11 +21,12 @@ public:
     RemoteObject(const QDBusConnection& bus, const QString& service, const QString& path,
                  const QString& interface);
 
-    /// Whether the service is on the bus now.
-    bool isPresent() const;
-
     /// Waits for the value. Invalid if the service is absent, hangs, fails or has no such property.
     QVariant property(const QString& name) const;
+
+    /// As property(), but nothing if no such service is on the bus and none could be started. A service that
+    /// D-Bus knows how to start is started by the reading.
+    std::optional<QVariant> propertyIfPresent(const QString& name) const;
 
     /// The values of several properties, in the order of the names. They are asked for together, so that
     /// a service that hangs costs the time limit once for all of them.
@@ -31,6 +36,7 @@ public:
     void setProperty(const QString& name, const QVariant& value) const;
 
 private:
+    QDBusPendingReply<QDBusVariant> ask(const QString& name) const;
     QDBusMessage propertiesCall(const QString& method, const QVariantList& arguments) const;
 
     QDBusConnection m_bus;

@@ -39,12 +39,12 @@ bool isScreenSaverRunning()
     const RemoteObject screenSaver(QDBusConnection::sessionBus(), QStringLiteral("com.norix.ScreenSaver"),
                                    QStringLiteral("/com/norix/ScreenSaver"),
                                    QStringLiteral("com.norix.ScreenSaver"));
-    if (!screenSaver.isPresent()) {
+    const std::optional<QVariant> running = screenSaver.propertyIfPresent(QStringLiteral("isRunning"));
+    if (!running) {
         return false;
     }
-    const bool running = screenSaver.property(QStringLiteral("isRunning")).toBool();
-    qDebug() << "get screenSaver state " << running;
-    return running;
+    qDebug() << "get screenSaver state " << running->toBool();
+    return running->toBool();
 }
 
 bool isScreenLocked()
@@ -52,10 +52,10 @@ bool isScreenLocked()
     const RemoteObject sessionManager(
         QDBusConnection::sessionBus(), QStringLiteral("com.norix.SessionManager"),
         QStringLiteral("/com/norix/SessionManager"), QStringLiteral("com.norix.SessionManager"));
-    if (!sessionManager.isPresent()) {
+    const std::optional<QVariant> locked = sessionManager.propertyIfPresent(QStringLiteral("Locked"));
+    if (!locked) {
         return false;
     }
-    const bool locked = sessionManager.property(QStringLiteral("Locked")).toBool();
-    qDebug() << "get screenLocked state " << locked;
-    return locked;
+    qDebug() << "get screenLocked state " << locked->toBool();
+    return locked->toBool();
 }

@@ -13,6 +13,6 @@ struct LoginUser
 LoginUser loginUser();
 QString loginUserName();
 
-/// A service that is absent or does not answer counts as "no".
+/// A service that D-Bus can start is started. One that is absent or does not answer counts as "no".
 bool isScreenSaverRunning();
 bool isScreenLocked();
