@@ -29,7 +29,7 @@ run_mutate() {
     require_git
     require_space 1000
     need_packages build terminal tests
-    narrate "trying mutants" "$PYTHON" tests/mutation/mutate.py "$@"
+    narrate "trying mutants" "$PYTHON" -m tests.mutation.mutate "$@"
 }
 
 run_fuzz() {

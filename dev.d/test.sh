@@ -47,8 +47,8 @@ run_unit_tests() {
 
 # ./dev itself, in copies of its parts and with stand-ins for the programs that it calls.
 run_dev_tests() {
-    PYTHONPATH=tests/dev narrate "testing ./dev" "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" \
-        -n "$TEST_JOBS" -p devtree --confcutdir tests/dev tests/dev "$@"
+    narrate "testing ./dev" "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" \
+        -n "$TEST_JOBS" -p tests.dev.devtree --confcutdir tests/dev tests/dev "$@"
 }
 
 # Each worker is a box of its own, with its own file view, buses and user.

@@ -6,10 +6,10 @@ import re
 from pathlib import Path
 
 import pytest
-from logcalls import LogLine, log_lines, log_lines_of
 
 from sandbox import REPOSITORY, contracts
 from sandbox.policies import POLICIES, Policy
+from tests.contracts.logcalls import LogLine, log_lines, log_lines_of
 
 DOCS = REPOSITORY / "docs"
 PAGES = sorted(DOCS.glob("*.md"))

@@ -3,7 +3,8 @@
 from __future__ import annotations
 
 import pytest
-from limits import too_large
+
+from tests.lint.limits import too_large
 
 
 def function(*lines: str) -> str:

@@ -2,13 +2,12 @@
 
 from __future__ import annotations
 
-import explanations
 import pytest
-from areas import AREAS, Area, area_of, chosen
-from mutants import mutants
 
 from sandbox import REPOSITORY
-
+from tests.mutation import explanations
+from tests.mutation.areas import AREAS, Area, area_of, chosen
+from tests.mutation.mutants import mutants
 
 FUNCTION = "void Thing::act()\n{{\n    {}\n}}\n"
 

@@ -9,7 +9,7 @@ from pathlib import Path
 
 import pytest
 
-from devtree import REPOSITORY, Tree, commands, refused
+from tests.dev.devtree import REPOSITORY, Tree, commands, refused
 
 
 @pytest.mark.parametrize(

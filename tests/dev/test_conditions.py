@@ -6,7 +6,7 @@ from pathlib import Path
 
 import pytest
 
-from devtree import Tree, refused
+from tests.dev.devtree import Tree, refused
 
 NEEDS_BOXES = ("demo", "box", "soak", "picture", "test", "bench", "mutate", "fuzz", "coverage")
 NEEDS_GIT = ("lint", "format", "package", "mutate")

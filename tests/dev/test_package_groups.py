@@ -6,7 +6,7 @@ from pathlib import Path
 
 import pytest
 
-from devtree import Tree, refused
+from tests.dev.devtree import Tree, refused
 
 PLAN = """Reading package lists...
 0 upgraded, 226 newly installed, 0 to remove and 4 not upgraded.

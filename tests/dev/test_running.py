@@ -9,7 +9,7 @@ from pathlib import Path
 
 import pytest
 
-from devtree import Tree, have_all_packages, refused
+from tests.dev.devtree import Tree, have_all_packages, refused
 
 CHECKS = ("clang-format", "black", "flake8", "mypy", "shellcheck", "xmllint", "clang-tidy")
 

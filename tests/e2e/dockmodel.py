@@ -8,9 +8,9 @@ from typing import Callable, Literal
 
 from hypothesis import strategies
 
-from dockwatch import CLOSED, OPENED
 from sandbox.fakes import dock
 from sandbox.fakes.dock import Dock
+from tests.e2e.dockwatch import CLOSED, OPENED
 
 APPS = ("editor", "mail", "files")
 NAMES = ("Mail", "Post", "邮件", "")

@@ -6,7 +6,7 @@ import configparser
 from pathlib import Path
 
 from sandbox.terminal import Terminal
-from wire import settled
+from tests.e2e.wire import settled
 
 EXIT = {"type": 1200}
 ON_SYSTEM_BUS = ("daemon", "identity", "logind")

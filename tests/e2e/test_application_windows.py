@@ -4,10 +4,10 @@ from __future__ import annotations
 
 import pytest
 
-from dockwatch import CLOSED, OPENED, follows, settle, start, warnings
 from sandbox.fakes import dock
 from sandbox.fakes.dock import Announcement
 from sandbox.terminal import Terminal
+from tests.e2e.dockwatch import CLOSED, OPENED, follows, settle, start, warnings
 
 WAYS: list[tuple[Announcement, ...]] = [
     ("values",),

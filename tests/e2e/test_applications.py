@@ -4,10 +4,10 @@ from __future__ import annotations
 
 import pytest
 
-from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
 from sandbox.fakes import dock
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
+from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
 
 
 def test_running_applications_are_told_once_at_start_in_the_docks_order(terminal: Terminal) -> None:

@@ -17,7 +17,7 @@ from sandbox.fakes import dock
 from sandbox.fakes.fault import Fault
 from sandbox.machine.clock import ManualClock
 from sandbox.terminal import Terminal
-from wire import FIVE_MINUTES, carries_out_policies, forced_actions, next_notification, next_status
+from tests.e2e.wire import FIVE_MINUTES, carries_out_policies, forced_actions, next_notification, next_status
 
 DBUS_LIMIT = 25
 ADDRESSES = {"system": "DBUS_SYSTEM_BUS_ADDRESS", "session": "DBUS_SESSION_BUS_ADDRESS"}

@@ -7,11 +7,11 @@ import subprocess
 
 import pytest
 
-from checkreport import binary, make_all_well, report, run
 from sandbox.machine import layout
 from sandbox.machine.commands import Answer
 from sandbox.machine.files import DEFAULT_USERINFO
 from sandbox.terminal import Terminal
+from tests.e2e.checkreport import binary, make_all_well, report, run
 
 
 def test_session_that_lacks_nothing_is_good(terminal: Terminal) -> None:

@@ -4,11 +4,11 @@ from __future__ import annotations
 
 import pytest
 
-from checkreport import encrypted, make_all_well, pair, report
 from sandbox.machine import layout
 from sandbox.platform.certificates import Authority
 from sandbox.platform.server import HttpFault, Platform
 from sandbox.terminal import Terminal
+from tests.e2e.checkreport import encrypted, make_all_well, pair, report
 
 CERTIFICATES = {
     "platform authority": layout.SERVER_CERTIFICATE,

@@ -5,7 +5,7 @@ from __future__ import annotations
 from sandbox.events import Event
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from wire import FIVE_MINUTES, log_lines, next_notification, next_status
+from tests.e2e.wire import FIVE_MINUTES, log_lines, next_notification, next_status
 
 
 def announcements(terminal: Terminal, after: int) -> list[tuple[str, tuple[object, ...]]]:

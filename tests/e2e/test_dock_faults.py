@@ -6,12 +6,12 @@ from typing import Any
 
 import pytest
 
-from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
 from sandbox.fakes import dock
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault, FirstCalls
 from sandbox.terminal import Terminal
-from wire import carries_out_policies
+from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
+from tests.e2e.wire import carries_out_policies
 
 DBUS_LIMIT = 25
 

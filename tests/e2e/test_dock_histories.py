@@ -7,13 +7,13 @@ from typing import Literal
 from hypothesis import HealthCheck, given, settings
 from hypothesis.strategies import lists, sampled_from, tuples
 
-from dockmodel import Act, DockModel, acts
-from dockwatch import settle, start, told
 from sandbox.fakes.dock import Announcement
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
+from tests.e2e.dockmodel import Act, DockModel, acts
+from tests.e2e.dockwatch import settle, start, told
 
 Pace = Literal["one by one", "at once", "during a notification", "during an inventory"]
 PACES: tuple[Pace, ...] = ("one by one", "at once", "during a notification", "during an inventory")

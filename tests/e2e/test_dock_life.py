@@ -6,12 +6,12 @@ from typing import Iterator
 
 import pytest
 
-from dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
 from sandbox.bus.stranger import Stranger
 from sandbox.fakes import dock
 from sandbox.fakes.exported import PROPERTIES
 from sandbox.terminal import Terminal
-from wire import asked_of_the_session_bus, carries_out_policies
+from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
+from tests.e2e.wire import asked_of_the_session_bus, carries_out_policies
 
 WAITING = "dock service is not registered, wait.."
 

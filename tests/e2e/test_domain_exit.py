@@ -7,13 +7,13 @@ from pathlib import Path
 
 import pytest
 
-from domainexit import EXIT, ROAD, leave_domain, restrictions, road
 from sandbox.fakes.fault import Fault
 from sandbox.machine import layout
 from sandbox.machine.commands import Answer
 from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
-from wire import Notification, forced_actions, next_notification, settled
+from tests.e2e.domainexit import EXIT, ROAD, leave_domain, restrictions, road
+from tests.e2e.wire import Notification, forced_actions, next_notification, settled
 
 
 def test_steps_come_in_their_order_and_the_reboot_after_a_minute(session: Terminal) -> None:

@@ -14,7 +14,7 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from wire import FIVE_MINUTES, next_notification, next_status
+from tests.e2e.wire import FIVE_MINUTES, next_notification, next_status
 
 DBUS_LIMIT = 25
 TRANSFER_LIMIT = 30

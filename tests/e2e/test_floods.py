@@ -12,13 +12,13 @@ import pytest
 
 from gi.repository import GLib
 
-from dockwatch import CLOSED, OPENED, settle, told
 from sandbox.bus.flooder import Flooder, signal
 from sandbox.fakes import daemon, dock, launcher
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.terminal import Terminal
-from wire import carries_out_policies, log_lines
+from tests.e2e.dockwatch import CLOSED, OPENED, settle, told
+from tests.e2e.wire import carries_out_policies, log_lines
 
 MIB = 1 << 20
 # What a flood may leave behind: the memory of a program is not given back to its last page, and that of an

@@ -6,7 +6,7 @@ import pytest
 
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from wire import forced_actions, log_lines, next_notification, next_status
+from tests.e2e.wire import forced_actions, log_lines, next_notification, next_status
 
 DBUS_LIMIT = 25
 

@@ -6,14 +6,14 @@ from typing import Any, Iterator
 
 import pytest
 
-from dockwatch import settle, told
 from sandbox.bus.buses import Bus
 from sandbox.bus.stranger import Stranger
 from sandbox.fakes import daemon, dock, launcher
 from sandbox.fakes.base import Peer
 from sandbox.terminal import Terminal
-from software import EDITOR, install, uploads
-from wire import carries_out_policies, log_lines, next_notification, next_status, settled
+from tests.e2e.dockwatch import settle, told
+from tests.e2e.software import EDITOR, install, uploads
+from tests.e2e.wire import carries_out_policies, log_lines, next_notification, next_status, settled
 
 BUS = "org.freedesktop.DBus"
 BUS_PATH = "/org/freedesktop/DBus"

@@ -13,8 +13,16 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.machine import layout
 from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
-from software import EDITOR, PLAYER, announce, install, inventory_at_start, next_inventory, tool_calls
-from wire import log_lines
+from tests.e2e.software import (
+    EDITOR,
+    PLAYER,
+    announce,
+    install,
+    inventory_at_start,
+    next_inventory,
+    tool_calls,
+)
+from tests.e2e.wire import log_lines
 
 FILES = {"daemon": layout.SOFTWARE_LIST, "policy service": layout.PRYG_SOFTWARE_LIST}
 LOGGED = " SoftwareGuard::getSoftwareList---------"

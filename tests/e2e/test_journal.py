@@ -7,9 +7,9 @@ from typing import Iterator
 
 import pytest
 
-from journal import Journal, service
 from sandbox.terminal import Terminal
-from wire import carries_out_policies
+from tests.e2e.journal import Journal, service
+from tests.e2e.wire import carries_out_policies
 
 PLAIN = {"QT_MESSAGE_PATTERN": "%{if-category}%{category}: %{endif}%{message}"}
 

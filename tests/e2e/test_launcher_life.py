@@ -8,7 +8,7 @@ from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.terminal import Terminal
-from software import (
+from tests.e2e.software import (
     CHANGE,
     EDITOR,
     INVENTORY,
@@ -19,7 +19,7 @@ from software import (
     next_upload,
     uploads,
 )
-from wire import asked_of_the_session_bus, log_lines
+from tests.e2e.wire import asked_of_the_session_bus, log_lines
 
 DBUS_LIMIT = 25
 WAITING = "launcher service is not registered, wait.."

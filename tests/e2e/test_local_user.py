@@ -7,7 +7,7 @@ import pytest
 from sandbox import policies
 from sandbox.policies import Policy
 from sandbox.terminal import Terminal
-from wire import forced_actions, next_notification, next_status, settled
+from tests.e2e.wire import forced_actions, next_notification, next_status, settled
 
 pytestmark = pytest.mark.local_user
 

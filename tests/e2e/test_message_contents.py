@@ -10,7 +10,7 @@ import pytest
 from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from wire import next_notification
+from tests.e2e.wire import next_notification
 
 READ = "2026-01-01 00:00:00"
 

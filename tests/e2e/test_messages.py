@@ -13,7 +13,7 @@ import pytest
 from sandbox.events import Event
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from wire import FORWARDED_CODE, forced_actions, log_lines, next_notification
+from tests.e2e.wire import FORWARDED_CODE, forced_actions, log_lines, next_notification
 
 # The first poll comes 60 to 120 s after the start, a later one 60 to 180 s after the one before.
 SURELY_FIRST_POLL, SURELY_NEXT_POLL = 121, 181

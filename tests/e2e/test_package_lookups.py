@@ -12,8 +12,8 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.machine.commands import Answer
 from sandbox.machine.packages import desktop_file, native_architecture
 from sandbox.terminal import Terminal
-from software import EDITOR, PLAYER, announce, install, inventory_at_start, tool_calls
-from wire import log_lines
+from tests.e2e.software import EDITOR, PLAYER, announce, install, inventory_at_start, tool_calls
+from tests.e2e.wire import log_lines
 
 FOREIGN = "i386" if native_architecture() != "i386" else "amd64"
 NO_NAME = "get version failed, empty packageName"

@@ -7,7 +7,7 @@ from typing import Any
 import pytest
 
 from sandbox.terminal import Terminal
-from software import EDITOR, PLAYER, TOOLS, announce, install
+from tests.e2e.software import EDITOR, PLAYER, TOOLS, announce, install
 
 
 def languages(terminal: Terminal, tool: str) -> list[str | None]:

@@ -9,7 +9,7 @@ import pytest
 
 from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
-from software import (
+from tests.e2e.software import (
     CHANGE,
     EDITOR,
     PLAYER,
@@ -21,7 +21,7 @@ from software import (
     next_upload,
     tool_calls,
 )
-from wire import log_lines
+from tests.e2e.wire import log_lines
 
 TOOL_LIMIT = 30
 # What a record says when that tool failed, by the key that it is about.

@@ -9,7 +9,7 @@ import pytest
 from sandbox.machine.users import User
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from wire import log_lines, next_notification
+from tests.e2e.wire import log_lines, next_notification
 
 USER = "zhang.wei"
 NOTICE = "用户密码快过期了！！"

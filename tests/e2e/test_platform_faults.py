@@ -14,7 +14,7 @@ from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.certificates import Authority, Identity
 from sandbox.platform.server import HttpFault, Platform, trust
 from sandbox.terminal import Terminal
-from wire import carries_out_policies, log_lines, next_notification
+from tests.e2e.wire import carries_out_policies, log_lines, next_notification
 
 USER = "zhang.wei"
 TRANSFER_LIMIT = 30

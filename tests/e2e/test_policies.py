@@ -9,7 +9,7 @@ import pytest
 from sandbox import policies
 from sandbox.policies import FORWARDED_CODES, Policy
 from sandbox.terminal import Terminal
-from wire import Notification, forced_actions, log_lines, next_notification, settled
+from tests.e2e.wire import Notification, forced_actions, log_lines, next_notification, settled
 
 REMINDER = "提醒"
 

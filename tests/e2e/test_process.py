@@ -6,7 +6,7 @@ import pytest
 
 from sandbox.machine.users import User
 from sandbox.terminal import Terminal
-from wire import FIVE_MINUTES, log_lines, next_status
+from tests.e2e.wire import FIVE_MINUTES, log_lines, next_status
 
 
 def test_log_calls_carry_file_line_and_function(terminal: Terminal) -> None:

@@ -7,9 +7,9 @@ from pathlib import Path
 
 import pytest
 
-from domainexit import EXIT, ROAD, leave_domain, road
 from sandbox.terminal import Terminal
-from wire import forced_actions, log_lines
+from tests.e2e.domainexit import EXIT, ROAD, leave_domain, road
+from tests.e2e.wire import forced_actions, log_lines
 
 
 def test_script_path_is_logged(session: Terminal) -> None:

@@ -10,7 +10,7 @@ import pytest
 
 from sandbox.bus.stranger import Stranger
 from sandbox.terminal import Terminal
-from wire import next_notification, next_status, settled
+from tests.e2e.wire import next_notification, next_status, settled
 
 NAME = "com.norix.velk.velkg"
 PATH = "/com/norix/velk/velkg"

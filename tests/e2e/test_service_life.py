@@ -7,7 +7,7 @@ import pytest
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from wire import FIVE_MINUTES, forced_actions, next_notification, next_status
+from tests.e2e.wire import FIVE_MINUTES, forced_actions, next_notification, next_status
 
 ACTIVE, LOCKED, SCREEN_SAVER = 1, 2, 3
 NOTICE = {"type": 1300}

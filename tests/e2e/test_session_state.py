@@ -11,7 +11,7 @@ from sandbox.fakes.fault import Fault
 from sandbox.fakes.logind import USER
 from sandbox.machine import layout
 from sandbox.terminal import Terminal
-from wire import FIVE_MINUTES, log_lines, next_status
+from tests.e2e.wire import FIVE_MINUTES, log_lines, next_status
 
 ACTIVE, LOCKED, SCREEN_SAVER = 1, 2, 3
 

@@ -10,7 +10,7 @@ from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.terminal import Terminal
-from software import (
+from tests.e2e.software import (
     CHANGE,
     EDITOR,
     INVENTORY,
@@ -24,7 +24,7 @@ from software import (
     now,
     uploads,
 )
-from wire import log_lines
+from tests.e2e.wire import log_lines
 
 DBUS_LIMIT = 25
 

@@ -2,12 +2,12 @@
 
 from __future__ import annotations
 
-from dockwatch import CLOSED, OPENED, settle, told
 from sandbox.fakes import dock
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from software import CHANGE, EDITOR, INVENTORY, install, next_inventory, uploads
-from wire import log_lines, next_notification
+from tests.e2e.dockwatch import CLOSED, OPENED, settle, told
+from tests.e2e.software import CHANGE, EDITOR, INVENTORY, install, next_inventory, uploads
+from tests.e2e.wire import log_lines, next_notification
 
 SHUTDOWN_NOTICE = "该终端1分钟后进行关机"
 

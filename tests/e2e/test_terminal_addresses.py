@@ -5,7 +5,7 @@ from __future__ import annotations
 import pytest
 
 from sandbox.terminal import Terminal
-from software import EDITOR, next_change
+from tests.e2e.software import EDITOR, next_change
 
 REMOVE_IPV4 = ("addr del 10.0.0.5/24 dev eth0", "addr del 192.168.1.7/24 dev eth1")
 

@@ -5,7 +5,7 @@ from __future__ import annotations
 from pathlib import Path
 from typing import NamedTuple
 
-from mutants import Mutant
+from tests.mutation.mutants import Mutant
 
 FILE = Path(__file__).with_name("explained.txt")
 

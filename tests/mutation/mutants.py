@@ -6,7 +6,7 @@ import re
 from dataclasses import dataclass
 from typing import Iterator
 
-from tokens import Statement, Token, rows, tokens
+from tests.mutation.tokens import Statement, Token, rows, tokens
 
 _SWAPPED_TEXTS = {
     "==": ("!=",),

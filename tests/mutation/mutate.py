@@ -17,10 +17,10 @@ from queue import SimpleQueue
 from random import Random
 from typing import Literal, Sequence
 
-import explanations
-from areas import Area, area_of, chosen
-from mutants import Mutant, mutants
-from workshop import FOLDER, REPOSITORY, Trouble, Verdict, Workshop
+from tests.mutation import explanations
+from tests.mutation.areas import Area, area_of, chosen
+from tests.mutation.mutants import Mutant, mutants
+from tests.mutation.workshop import FOLDER, REPOSITORY, Trouble, Verdict, Workshop
 
 _LEAST_CAUGHT = 90  # per cent of a component's mutants that are not explained
 _VERDICTS = FOLDER / "verdicts.txt"  # of the last run, a line each

@@ -8,8 +8,8 @@ import subprocess
 from pathlib import Path
 from typing import Callable, Literal, Sequence
 
-from areas import Area
-from mutants import Mutant
+from tests.mutation.areas import Area
+from tests.mutation.mutants import Mutant
 
 REPOSITORY = Path(__file__).resolve().parents[2]
 FOLDER = REPOSITORY / "build" / "mutate"

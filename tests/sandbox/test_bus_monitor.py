@@ -7,11 +7,11 @@ from typing import Literal
 
 import dbus
 import pytest
-from people import talking_agent
 
 from sandbox.bus.monitor import Overheard
 from sandbox.bus.stranger import Stranger
 from sandbox.terminal import Terminal
+from tests.sandbox.people import talking_agent
 
 SOME_POLICY = '{"type": 5}'
 

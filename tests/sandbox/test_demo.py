@@ -7,7 +7,6 @@ from pathlib import Path
 from typing import Any, Callable
 
 import pytest
-from people import idle_agent, rude_agent, run_program
 from rich.console import Console
 
 from sandbox.demo.scene import NOTHING_ASKED, NOTHING_SHOWN, Scene, Step, from_agent, never
@@ -17,6 +16,7 @@ from sandbox.events import Event
 from sandbox.terminal import Terminal
 from sandbox.timeline.agenttime import AgentTime
 from sandbox.timeline.timeline import Timeline
+from tests.sandbox.people import idle_agent, rude_agent, run_program
 
 _PATIENCE = 20.0
 _NO_PATIENCE = 0.01

@@ -6,7 +6,6 @@ import json
 
 import pytest
 
-from paper import Paper
 from sandbox.machine import layout
 from sandbox.machine.users import DOMAIN_USER
 from sandbox.periods import SURELY_NEXT_POLL
@@ -14,6 +13,7 @@ from sandbox.prompt import commands
 from sandbox.prompt.desk import Desk, Refused
 from sandbox.prompt.registry import COMMANDS, run_line
 from sandbox.terminal import Terminal
+from tests.sandbox.paper import Paper
 
 assert commands, "importing the module makes its commands known"
 

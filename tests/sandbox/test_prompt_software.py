@@ -6,12 +6,12 @@ import subprocess
 
 import pytest
 
-from paper import Paper
 from sandbox.machine.packages import desktop_file
 from sandbox.prompt import commands
 from sandbox.prompt.desk import Refused
 from sandbox.prompt.registry import run_line
 from sandbox.terminal import Terminal
+from tests.sandbox.paper import Paper
 
 assert commands, "importing the module makes its commands known"
 

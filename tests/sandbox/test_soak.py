@@ -9,13 +9,13 @@ from pathlib import Path
 from random import Random
 
 import pytest
-from people import run_program, talking_agent
 
 from sandbox.agent import default_binary
 from sandbox.soak.deeds import Deeds
 from sandbox.soak.ledger import FORWARDED, KINDS, RECEIPTS, Ledger
 from sandbox.soak.vitals import Vitals, growth, vitals
 from sandbox.terminal import Terminal
+from tests.sandbox.people import run_program, talking_agent
 
 FIRST = Vitals(resident=20_000, private_dirty=3_000, descriptors=13, threads=2)
 ALLOWANCE = 100

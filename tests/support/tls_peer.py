@@ -23,11 +23,11 @@ from itertools import count
 from pathlib import Path
 
 from cryptography.hazmat.primitives import serialization
-from tls_scripts import Conversation, Over, answer
 
 sys.path.insert(0, str(Path(__file__).resolve().parents[2]))
 
 from sandbox.platform.certificates import Authority, Identity, write_secret  # noqa: E402
+from tests.support.tls_scripts import Conversation, Over, answer  # noqa: E402
 
 _HOST = "127.0.0.1"
 _LISTEN_BACKLOG = 64
