@@ -45,7 +45,20 @@ AREAS = (
         "dispatcher",
         ("message_transfer_test", "restore_configuration_test"),
         ("policies", "domain_exit", "restore_script", "hung_services"),
-        functions=("leaveDomain", "restoreConfiguration", "runScript", "rebootTime"),
+        functions=("leaveDomain", "restoreConfiguration", "rebootTime"),
+    ),
+    Area(
+        f"{_FOLDER}domain_exit.cpp",
+        "dispatcher",
+        ("restore_configuration_test",),
+        ("domain_exit", "restore_script", "hung_services"),
+    ),
+    Area(
+        f"{_FOLDER}session_user.cpp",
+        "state report",
+        ("message_transfer_test",),
+        ("startup", "session_state", "messages"),
+        ("local_user",),
     ),
     Area(
         f"{_FOLDER}message_transfer.cpp",

@@ -9,6 +9,7 @@
 
 #include "package_tool.h"
 #include "remote_object.h"
+#include "services.h"
 
 namespace velk::check {
 
@@ -16,34 +17,33 @@ namespace {
 
 struct Service
 {
-    const char* name;
+    QString name;
     Grade whenAbsent;
     const char* purpose; ///< what does not work without it
 };
 
 const QList<Service> kSystemServices{
-    {"com.norix.velk.velkg", Grade::Bad, "no policy arrives, nothing is reported"},
-    {"org.freedesktop.login1", Grade::Bad, "the user's name is not known, nobody can be logged out"},
-    {"com.norix.velk.iam", Grade::Warning, "leaving the domain does not switch it off"},
+    {service::kDaemon, Grade::Bad, "no policy arrives, nothing is reported"},
+    {service::kLoginManager, Grade::Bad, "the user's name is not known, nobody can be logged out"},
+    {service::kIdentityService, Grade::Warning, "leaving the domain does not switch it off"},
 };
 
 const QList<Service> kSessionServices{
-    {"com.norix.velk.prys", Grade::Warning, "forwarded policies are lost"},
-    {"com.norix.kpx.Notification", Grade::Bad, "the user sees no warning and no message"},
-    {"com.norix.ScreenSaver", Grade::Warning, "the session never counts as behind the screen saver"},
-    {"com.norix.SessionManager", Grade::Warning, "the session never counts as locked"},
-    {"com.norix.kpx.daemon.Dock", Grade::Warning, "opened applications are not reported"},
-    {"com.norix.kpx.daemon.Launcher", Grade::Warning, "software is not reported"},
+    {service::kPolicyService, Grade::Warning, "forwarded policies are lost"},
+    {service::kNotifications, Grade::Bad, "the user sees no warning and no message"},
+    {service::kScreenSaver, Grade::Warning, "the session never counts as behind the screen saver"},
+    {service::kSessionManager, Grade::Warning, "the session never counts as locked"},
+    {service::kDock, Grade::Warning, "opened applications are not reported"},
+    {service::kLauncher, Grade::Warning, "software is not reported"},
 };
 
 Finding checkService(const QDBusConnection& bus, const Service& service)
 {
-    const QString name = QString::fromLatin1(service.name);
-    if (isOnBus(bus, name)) {
-        return {Grade::Good, QStringLiteral("service"), name + QStringLiteral(" is there")};
+    if (isOnBus(bus, service.name)) {
+        return {Grade::Good, QStringLiteral("service"), service.name + QStringLiteral(" is there")};
     }
     return {service.whenAbsent, QStringLiteral("service"),
-            QStringLiteral("%1 is not there: %2").arg(name, QString::fromLatin1(service.purpose))};
+            QStringLiteral("%1 is not there: %2").arg(service.name, QString::fromLatin1(service.purpose))};
 }
 
 Findings checkBus(const QDBusConnection& bus, const QString& kind, const QList<Service>& services)

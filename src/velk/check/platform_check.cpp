@@ -6,6 +6,7 @@
 #include "constants.h"
 #include "filecontent.h"
 #include "handleevent.h"
+#include "session_user.h"
 
 namespace velk::check {
 
@@ -31,12 +32,6 @@ Answer ask(const QString& url)
     return answer;
 }
 
-/// The platform knows users by their login name without one leading "@".
-QString platformName(const SessionUser& user)
-{
-    return user.loginName.startsWith(QLatin1Char('@')) ? user.loginName.mid(1) : user.loginName;
-}
-
 } // namespace
 
 Finding checkPlatform(const SessionUser& user)
@@ -50,7 +45,8 @@ Finding checkPlatform(const SessionUser& user)
     }
 
     const QString url = kUrlHead.arg(host, port)
-        + QStringLiteral("notification/v2/list?uid=%1&is_not_read=1&limit=1").arg(platformName(user));
+        + QStringLiteral("notification/v2/list?uid=%1&is_not_read=1&limit=1")
+              .arg(platformUserName(user.loginName));
     const Answer answer = ask(url);
     if (answer.status == 0) {
         return {Grade::Bad, subject, QStringLiteral("does not answer: ") + CapturedLog::lastWarning()};

@@ -1,7 +1,7 @@
 #pragma once
 
 #include "finding.h"
-#include "session_user.h"
+#include "user_check.h"
 
 namespace velk::check {
 

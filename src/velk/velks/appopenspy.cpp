@@ -11,16 +11,15 @@
 #include "dock.h"
 #include "entryinfo.h"
 #include "service_arrival.h"
+#include "services.h"
 
 namespace velk::module::software {
 
 namespace {
 
-const QString kDockService = QStringLiteral("com.norix.kpx.daemon.Dock");
-
 __Dock* newDock(QObject* parent)
 {
-    return new __Dock(kDockService, QStringLiteral("/com/norix/kpx/daemon/Dock"),
+    return new __Dock(service::kDock, QStringLiteral("/com/norix/kpx/daemon/Dock"),
                       QDBusConnection::sessionBus(), parent);
 }
 
@@ -50,7 +49,7 @@ AppOpenSpy::AppOpenSpy()
     }
     delete std::exchange(m_dock, nullptr);
     qWarning() << "dock service is not registered, wait..";
-    connect(new ServiceArrival(kDockService, this), &ServiceArrival::arrived, this, [this] {
+    connect(new ServiceArrival(service::kDock, this), &ServiceArrival::arrived, this, [this] {
         m_dock = newDock(this);
         initAll([this](const QString& appName) { reportOpened(appName); });
     });

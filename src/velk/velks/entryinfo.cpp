@@ -4,10 +4,12 @@
 #include <QDBusObjectPath>
 #include <QDebug>
 
+#include "services.h"
+
 namespace velk::module::software {
 
 EntryInfo::EntryInfo(const QDBusObjectPath& path)
-    : m_entry(QStringLiteral("com.norix.kpx.daemon.Dock"), path.path(), QDBusConnection::sessionBus())
+    : m_entry(service::kDock, path.path(), QDBusConnection::sessionBus())
 {
     if (!m_entry.isValid()) {
         qWarning() << "entry is invalid, path:" << path.path();

@@ -11,6 +11,7 @@
 
 #include "constants.h"
 #include "httpclientapi.h"
+#include "services.h"
 
 namespace {
 
@@ -23,7 +24,7 @@ const QString kOpenAction = QStringLiteral("_open");
 QDBusMessage notify(const QString& title, const QString& body, const QStringList& actions,
                     const QVariantMap& hints, int timeout)
 {
-    const QString service = QStringLiteral("com.norix.kpx.Notification");
+    const QString& service = velk::service::kNotifications;
     auto call = QDBusMessage::createMethodCall(service, QStringLiteral("/com/norix/kpx/Notification"),
                                                service, QStringLiteral("Notify"));
     constexpr uint replacesNothing = 0;

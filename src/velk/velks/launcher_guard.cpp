@@ -8,8 +8,6 @@
 #include <QJsonObject>
 #include <QProcess>
 
-#include <malloc.h>
-
 #include <algorithm>
 #include <optional>
 #include <utility>
@@ -17,12 +15,13 @@
 #include "constants.h"
 #include "file_manager.h"
 #include "launcherd.h"
+#include "memory.h"
 #include "package_tool.h"
 #include "service_arrival.h"
+#include "services.h"
 
 namespace {
 
-const QString kLauncherService = QStringLiteral("com.norix.kpx.daemon.Launcher");
 const QString kFailed = QStringLiteral("failed");
 
 // For software that is known only from the launcher.
@@ -31,7 +30,7 @@ constexpr int kInstalledByUser = 2;
 
 __Launcherd* newLauncher(QObject* parent)
 {
-    return new __Launcherd(kLauncherService, QStringLiteral("/com/norix/kpx/daemon/Launcher"),
+    return new __Launcherd(velk::service::kLauncher, QStringLiteral("/com/norix/kpx/daemon/Launcher"),
                            QDBusConnection::sessionBus(), parent);
 }
 
@@ -81,7 +80,7 @@ LauncherGuard::LauncherGuard(QObject* parent)
     }
     delete launcher;
     qWarning() << "launcher service is not registered, wait..";
-    connect(new ServiceArrival(kLauncherService, this), &ServiceArrival::arrived, this, [this] {
+    connect(new ServiceArrival(velk::service::kLauncher, this), &ServiceArrival::arrived, this, [this] {
         watchLauncher(newLauncher(this));
         Q_EMIT softwareInited();
     });
@@ -167,7 +166,7 @@ bool LauncherGuard::getSoftwareList(const QString& path)
     }
     // Each child is forked, which takes the longer the more memory there is: the text of the file and its
     // document, many times as large as the records, must be gone before the first one.
-    malloc_trim(0);
+    giveMemoryBack();
     for (SoftwareInfo info : *records) {
         info.version = getCurVersion(info.packageName);
         qInfo() << " SoftwareGuard::getSoftwareList---------" << info.id;

@@ -8,16 +8,13 @@
 #include <QScopedValueRollback>
 #include <QTime>
 
-#include <unistd.h>
-
 #include "constants.h"
 #include "filecontent.h"
 #include "handleevent.h"
 #include "message_transfer.h"
+#include "session_user.h"
 
 namespace {
-
-constexpr uid_t kLastLocalUid = 10000;
 
 // Poll intervals in milliseconds; each is drawn anew.
 constexpr int kShortestInterval = 60000;
@@ -95,7 +92,7 @@ MessagePlatform::MessagePlatform(QObject* parent, const QString& userName, Messa
 
 bool MessagePlatform::isLdapUser()
 {
-    return getuid() > kLastLocalUid;
+    return isDomainUser();
 }
 
 bool MessagePlatform::loadCfg()

@@ -3,23 +3,21 @@
 #include <QDBusConnection>
 #include <QDateTime>
 #include <QDebug>
-#include <QProcess>
-#include <QSettings>
 #include <QTimer>
 
 #include <unistd.h>
 
-#include <cstdlib>
-
 #include "appopenspy.h"
 #include "constants.h"
+#include "domain_exit.h"
 #include "filecontent.h"
 #include "handleevent.h"
 #include "launcher_guard.h"
 #include "libvelkkpx.h"
 #include "prys_interface.h"
-#include "remote_object.h"
+#include "services.h"
 #include "session_state.h"
+#include "session_user.h"
 #include "software_report.h"
 #include "terminal_address.h"
 #include "velkg_interface.h"
@@ -30,7 +28,6 @@ namespace {
 
 constexpr int kActionDelay = 60000; // ms between a warning and its forced action
 constexpr int kStatePeriod = 300000; // ms between two reports of the session's state
-constexpr uid_t kLastLocalUid = 10000;
 
 /// The status codes of SendUserStatus; they are not the values of Screen_State.
 enum UserStatus {
@@ -52,29 +49,16 @@ UserStatus statusOf(MessageTransfer::Screen_State state)
     return UserActive;
 }
 
-/// Runs a script and waits for its end, however long it takes. Its standard input is at its end from the
-/// start: a script that reads it goes on instead of waiting for ever, so the reboot after it is not lost.
-void runScript(const QString& path)
-{
-    QProcess bash;
-    bash.setProcessChannelMode(QProcess::ForwardedChannels);
-    bash.setStandardInputFile(QProcess::nullDevice());
-    bash.start(QStringLiteral("bash"), {path});
-    bash.waitForFinished(-1);
-}
-
 } // namespace
 
 MessageTransfer::MessageTransfer(QObject* parent)
     : QObject(parent)
     , m_machineId(velk::base::FileContent::instace()->getMachineID())
 {
-    m_velkgInterface =
-        new velkgInterface(QStringLiteral("com.norix.velk.velkg"), QStringLiteral("/com/norix/velk/velkg"),
-                           QDBusConnection::systemBus(), this);
-    m_prysInterface =
-        new prysInterface(QStringLiteral("com.norix.velk.prys"), QStringLiteral("/com/norix/velk/prys"),
-                          QDBusConnection::sessionBus(), this);
+    m_velkgInterface = new velkgInterface(velk::service::kDaemon, QStringLiteral("/com/norix/velk/velkg"),
+                                          QDBusConnection::systemBus(), this);
+    m_prysInterface = new prysInterface(velk::service::kPolicyService, QStringLiteral("/com/norix/velk/prys"),
+                                        QDBusConnection::sessionBus(), this);
     connectDaemon();
     startSoftwareReports();
 
@@ -180,42 +164,15 @@ bool MessageTransfer::isMeantForThisSession(SessionPolicy::Audience audience, QJ
 void MessageTransfer::leaveDomain(const QString& warning, int code)
 {
     rebootTime(warning, code);
-
-    const QString strPath = velk::kScriptsPath + QStringLiteral("restore_config.bash");
-    qInfo() << "onPolicyMsg"
-            << "----strPath:" << strPath;
-    runScript(strPath);
+    runRestoreScript();
     restoreConfiguration();
     m_velkgInterface->onDomainConfig(QStringLiteral("remove"));
-
-    const QString identityService = QStringLiteral("com.norix.velk.iam");
-    RemoteObject(QDBusConnection::systemBus(), identityService, QStringLiteral("/com/norix/velk/iam"),
-                 identityService)
-        .setProperty(QStringLiteral("Enable"), false);
+    switchIdentityServiceOff();
 }
 
 void MessageTransfer::restoreConfiguration()
 {
-    QSettings backup(velk::kBackupConfigPath, QSettings::IniFormat);
-    Libvelkkpx desktop;
-
-    backup.beginGroup(QStringLiteral("config"));
-    // The second list holds one empty string, as the library expects it.
-    desktop.SetControlConfig(backup.value(QStringLiteral("ControlCenterList")).toStringList(), {QString()});
-    backup.endGroup();
-
-    desktop.SetHotspotEnable(1);
-    desktop.SetShortcutKeyEnable(true);
-    desktop.SetLauncherDisplayable(true);
-    desktop.SetTaskbarRightclickMenuEnable(true);
-    desktop.SetResidentTaskbarAppDisplayable(true);
-    desktop.SetRecycleBinDisplayable(true);
-    desktop.SetWebTrayIconClickable(true);
-    desktop.SetUsbTrayIconClickable(true);
-
-    // The exit status is not looked at: the reboot that follows stops what systemctl could not. The fixed
-    // command holds nothing that a shell could misread.
-    [[maybe_unused]] const int status = std::system("systemctl --global stop prys"); // NOLINT(cert-env33-c)
+    restoreDesktop();
 }
 
 void MessageTransfer::onSoftwareChanged(const QString& action, const QStringList& info)
@@ -294,7 +251,7 @@ MessageTransfer::Screen_State MessageTransfer::getScreenState()
 
 bool MessageTransfer::isLdapUser()
 {
-    return getuid() > kLastLocalUid;
+    return isDomainUser();
 }
 
 bool MessageTransfer::isExecPolicyByUID(QJsonObject& obj)

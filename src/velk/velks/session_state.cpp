@@ -4,20 +4,16 @@
 #include <QDebug>
 
 #include "remote_object.h"
+#include "services.h"
+#include "session_user.h"
 
 namespace {
 
 RemoteObject loginManagersUser()
 {
-    return {QDBusConnection::systemBus(), QStringLiteral("org.freedesktop.login1"),
+    return {QDBusConnection::systemBus(), velk::service::kLoginManager,
             QStringLiteral("/org/freedesktop/login1/user/self"),
             QStringLiteral("org.freedesktop.login1.User")};
-}
-
-/// A domain login name may carry "@" anywhere; the daemon knows users without it.
-QString daemonUserName(const QVariant& loginName)
-{
-    return loginName.toString().remove(QLatin1Char('@'));
 }
 
 } // namespace
@@ -26,19 +22,18 @@ LoginUser loginUser()
 {
     const QVariantList values =
         loginManagersUser().properties({QStringLiteral("Name"), QStringLiteral("UID")});
-    return {daemonUserName(values.at(0)), values.at(1).toInt()};
+    return {daemonUserName(values.at(0).toString()), values.at(1).toInt()};
 }
 
 QString loginUserName()
 {
-    return daemonUserName(loginManagersUser().property(QStringLiteral("Name")));
+    return daemonUserName(loginManagersUser().property(QStringLiteral("Name")).toString());
 }
 
 bool isScreenSaverRunning()
 {
-    const RemoteObject screenSaver(QDBusConnection::sessionBus(), QStringLiteral("com.norix.ScreenSaver"),
-                                   QStringLiteral("/com/norix/ScreenSaver"),
-                                   QStringLiteral("com.norix.ScreenSaver"));
+    const RemoteObject screenSaver(QDBusConnection::sessionBus(), velk::service::kScreenSaver,
+                                   QStringLiteral("/com/norix/ScreenSaver"), velk::service::kScreenSaver);
     const std::optional<QVariant> running = screenSaver.propertyIfPresent(QStringLiteral("isRunning"));
     if (!running) {
         return false;
@@ -49,9 +44,9 @@ bool isScreenSaverRunning()
 
 bool isScreenLocked()
 {
-    const RemoteObject sessionManager(
-        QDBusConnection::sessionBus(), QStringLiteral("com.norix.SessionManager"),
-        QStringLiteral("/com/norix/SessionManager"), QStringLiteral("com.norix.SessionManager"));
+    const RemoteObject sessionManager(QDBusConnection::sessionBus(), velk::service::kSessionManager,
+                                      QStringLiteral("/com/norix/SessionManager"),
+                                      velk::service::kSessionManager);
     const std::optional<QVariant> locked = sessionManager.propertyIfPresent(QStringLiteral("Locked"));
     if (!locked) {
         return false;

@@ -1,22 +1,14 @@
-#include "session_user.h"
+#include "user_check.h"
 
-#include <pwd.h>
 #include <unistd.h>
+
+#include "session_user.h"
 
 namespace velk::check {
 
-namespace {
-
-constexpr uid_t kLastLocalUid = 10000;
-
-} // namespace
-
 SessionUser SessionUser::current()
 {
-    const uid_t uid = getuid();
-    const auto* entry = getpwuid(uid);
-    const QString name = entry == nullptr ? QString() : QString::fromLocal8Bit(entry->pw_name);
-    return {name, uid, uid > kLastLocalUid};
+    return {::loginName(), getuid(), ::isDomainUser()};
 }
 
 Finding checkUser(const SessionUser& user)

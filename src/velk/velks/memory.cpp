@@ -1,0 +1,31 @@
+#include "memory.h"
+
+#include <QAbstractEventDispatcher>
+
+#include <malloc.h>
+
+#include <ctime>
+
+void keepNoLargeBlocks()
+{
+    constexpr int kLargeBytes = 128 * 1024; // what the C library starts with
+    mallopt(M_MMAP_THRESHOLD, kLargeBytes);
+}
+
+void giveMemoryBackAfterWork()
+{
+    constexpr std::clock_t kMuchWork = CLOCKS_PER_SEC / 5;
+    QObject::connect(QAbstractEventDispatcher::instance(), &QAbstractEventDispatcher::aboutToBlock,
+                     [last = std::clock()]() mutable {
+                         const std::clock_t now = std::clock();
+                         if (now - last > kMuchWork) {
+                             giveMemoryBack();
+                             last = now;
+                         }
+                     });
+}
+
+void giveMemoryBack()
+{
+    malloc_trim(0);
+}
