@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 from pathlib import Path
-from typing import NamedTuple
+from typing import Iterable, NamedTuple, Sequence
 
 from tests.mutation.mutants import Mutant
 
@@ -21,6 +21,13 @@ class Key(NamedTuple):
 def key_of(mutant: Mutant) -> Key:
     """The key of a mutant."""
     return Key(f"{mutant.file} {mutant.function}".rstrip(), mutant.before, mutant.after)
+
+
+def stale(known: Iterable[Key], mutants: Sequence[Mutant]) -> list[Key]:
+    """The keys that fit none of the mutants, though these are all of the key's file."""
+    files = {mutant.file for mutant in mutants}
+    existing = {key_of(mutant) for mutant in mutants}
+    return [key for key in known if key.place.split()[0] in files and key not in existing]
 
 
 def read(text: str) -> dict[Key, str]:

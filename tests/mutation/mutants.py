@@ -1,4 +1,4 @@
-"""Single changes to a C++ source: conditions, constants, orders."""
+"""Single changes to a C++ source: conditions and constants."""
 
 from __future__ import annotations
 
@@ -6,7 +6,7 @@ import re
 from dataclasses import dataclass
 from typing import Iterator
 
-from tests.mutation.tokens import Statement, Token, rows, tokens
+from tests.mutation.tokens import Token, tokens
 
 _SWAPPED_TEXTS = {
     "==": ("!=",),
@@ -25,8 +25,6 @@ _SWAPPED_TEXTS = {
 _BETWEEN_BLANKS = ("<", ">", "&&", "?")
 _COMPARISONS = ("==", "!=", "<", "<=", ">", ">=")
 _REMARK = re.compile(r"(?<!:)//[^\n]*")
-_RECORD_FIELD = re.compile(r"(\w+)\.(\w+) = ")
-_FIXED = re.compile(r"(return|break|continue|using|throw|(QObject::)?connect)\b")
 _FUNCTION = re.compile(
     r"^(?!namespace|using|struct|class|enum|const|inline)[^\s#/{}][^;]*?(\w+)\(", re.MULTILINE
 )
@@ -59,11 +57,7 @@ def mutants(file: str, source: str) -> tuple[list[Mutant], int]:
     """All changes of a source that make sense, and the number of those left out because they only concern a
     log statement: those texts are held against the log catalogue."""
     all_tokens = tokens(source)
-    changes = [
-        *_token_changes(source, all_tokens),
-        *_negations(source, all_tokens),
-        *_swaps(source, all_tokens),
-    ]
+    changes = [*_token_changes(source, all_tokens), *_negations(source, all_tokens)]
     changes.sort(key=lambda change: (change.start, change.end, change.text))
     chosen = [_mutant(file, source, change) for change in changes if not change.log]
     return chosen, len(changes) - len(chosen)
@@ -133,43 +127,3 @@ def _in_parentheses(all_tokens: list[Token], opening: int) -> list[Token]:
         if depth == 0:
             return all_tokens[opening + 1 : place]
     raise ValueError("a parenthesis is never closed")
-
-
-def _swaps(source: str, all_tokens: list[Token]) -> Iterator[_Change]:
-    for row in rows(all_tokens):
-        for first, second in zip(row, row[1:]):
-            if _may_swap(source, first, second):
-                between = source[first.end : second.start]
-                text = source[second.start : second.end] + between + source[first.start : first.end]
-                yield _Change(first.start, second.end, text, first.first.log or second.first.log)
-
-
-def _may_swap(source: str, first: Statement, second: Statement) -> bool:
-    """Whether it means something that one of two statements comes first. Values that are made ready a moment
-    sooner or later and connections, which serve nobody before the event loop does, are left where they are.
-    """
-    pair = (first, second)
-    if any(_FIXED.match(source, statement.start) or _declares(statement) for statement in pair):
-        return False
-    return not _fill_a_record(source, first, second)
-
-
-def _declares(statement: Statement) -> bool:
-    """Whether it is the declaration of a variable."""
-    pairs = zip(statement.tokens, statement.tokens[1:], statement.tokens[2:])
-    return any(
-        name.kind == "word"
-        and (before.kind == "word" or before.text in ("*", "&", ">"))
-        and after.text in ("=", ";", "(", "{")
-        for before, name, after in pairs
-    )
-
-
-def _fill_a_record(source: str, first: Statement, second: Statement) -> bool:
-    """Whether two statements set different fields of one record, in whatever order."""
-    one = _RECORD_FIELD.match(source, first.start)
-    other = _RECORD_FIELD.match(source, second.start)
-    if one is None or other is None or one[1] != other[1] or one[2] == other[2]:
-        return False
-    uses = [token for token in (*first.tokens, *second.tokens) if token.text == one[1]]
-    return len(uses) == 2  # neither is set from the record itself

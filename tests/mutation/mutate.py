@@ -15,7 +15,7 @@ from concurrent.futures import ThreadPoolExecutor
 from dataclasses import dataclass
 from queue import SimpleQueue
 from random import Random
-from typing import Literal, Sequence
+from typing import Container, Iterable, Literal, Sequence
 
 from tests.mutation import explanations
 from tests.mutation.areas import Area, area_of, chosen
@@ -52,15 +52,16 @@ def tasks_for(areas: Sequence[Area]) -> tuple[list[Task], int]:
     return tasks, left_out
 
 
-def judge_all(tasks: Sequence[Task], jobs: int, quick: bool) -> list[Outcome]:
-    """What becomes of each mutant; survivors are told of at once."""
+def judge_all(
+    tasks: Sequence[Task], known: Container[explanations.Key], jobs: int, quick: bool
+) -> list[Outcome]:
+    """What becomes of each mutant that is not `known` to survive; other survivors are printed at once."""
     FOLDER.mkdir(parents=True, exist_ok=True)
     workshops: SimpleQueue[Workshop] = SimpleQueue()
     for number in range(jobs):
         workshop = Workshop(f"tree-{number}")
         workshop.prepare(list(dict.fromkeys(task.area for task in tasks)))
         workshops.put(workshop)
-    known = explanations.read(explanations.FILE.read_text())
 
     def judge(task: Task) -> Outcome:
         if explanations.key_of(task.mutant) in known:
@@ -105,14 +106,23 @@ def main() -> int:
     try:
         areas = chosen(options.file)
         tasks, left_out = tasks_for(areas)
+        known = explanations.read(explanations.FILE.read_text())
+        _require_fresh(known, tasks)
         tasks = _selected(tasks, options)
         print(f"{len(tasks)} mutants", flush=True)
-        outcomes = judge_all(tasks, options.jobs, options.quick)
+        outcomes = judge_all(tasks, known, options.jobs, options.quick)
     except (Trouble, ValueError) as trouble:
         print(f"mutate: {trouble}", file=sys.stderr)
         return 1
     _VERDICTS.write_text("".join(f"{outcome} {task.mutant}\n" for task, outcome in zip(tasks, outcomes)))
     return report(tasks, outcomes, left_out)
+
+
+def _require_fresh(known: Iterable[explanations.Key], tasks: Sequence[Task]) -> None:
+    stale = explanations.stale(known, [task.mutant for task in tasks])
+    if stale:
+        lines = "".join(f"\n{key.place}: {key.before} → {key.after}" for key in stale)
+        raise Trouble(f"{explanations.FILE.name} explains mutants that are gone:{lines}")
 
 
 def _selected(tasks: list[Task], options: argparse.Namespace) -> list[Task]:

@@ -1,9 +1,9 @@
-"""C++ sources cut into tokens and statements, as far as single changes to them need it."""
+"""C++ sources cut into tokens, as far as single changes to them need it."""
 
 from __future__ import annotations
 
 import re
-from dataclasses import dataclass, field
+from dataclasses import dataclass
 
 _TOKEN = re.compile(
     r"""(?P<blank>\s+)
@@ -17,8 +17,6 @@ _TOKEN = re.compile(
     re.VERBOSE | re.MULTILINE | re.DOTALL,
 )
 _UNSEEN = ("comment", "directive", "blank")
-_SCOPES = ("namespace", "struct", "class", "enum", "union")
-_LABELS = ("case", "default", "public", "private", "protected", "Q_SIGNALS")
 _LOG = ("qDebug", "qInfo", "qWarning", "qCritical")
 
 
@@ -37,28 +35,6 @@ class Token:
         return self.start + len(self.text)
 
 
-@dataclass(frozen=True)
-class Statement:
-    """A simple statement of a function, up to its semicolon."""
-
-    tokens: tuple[Token, ...]
-
-    @property
-    def start(self) -> int:
-        """Place of its first character."""
-        return self.tokens[0].start
-
-    @property
-    def end(self) -> int:
-        """Place behind its semicolon."""
-        return self.tokens[-1].end
-
-    @property
-    def first(self) -> Token:
-        """Its first token."""
-        return self.tokens[0]
-
-
 def tokens(source: str) -> list[Token]:
     """All tokens but blanks, comments and directives."""
     found = []
@@ -72,60 +48,3 @@ def tokens(source: str) -> list[Token]:
         found.append(Token(kind, text, match.start(), log))
         log = log and text != ";"
     return found
-
-
-@dataclass
-class _Block:
-    """What stands between two braces: code, a scope of declarations, or values."""
-
-    kind: str
-    parentheses: int = 0
-    statement: list[Token] = field(default_factory=list)
-    row: list[Statement] = field(default_factory=list)
-
-
-def rows(all_tokens: list[Token]) -> list[list[Statement]]:
-    """The rows of simple statements that follow each other directly in the code of functions."""
-    found: list[list[Statement]] = []
-    blocks = [_Block("scope")]
-    for token in all_tokens:
-        block = blocks[-1]
-        block.statement.append(token)
-        if token.text in ("(", "["):
-            block.parentheses += 1
-        elif token.text in (")", "]"):
-            block.parentheses -= 1
-        elif token.text == "{":
-            blocks.append(_Block(_kind(block)))
-        elif token.text == "}":
-            ended = blocks.pop()
-            found.append(ended.row)
-            blocks[-1].statement += [*ended.statement]
-            if ended.kind != "values" and not blocks[-1].parentheses:
-                _break_row(blocks[-1], found)
-        elif not block.parentheses:
-            _end_statement(block, token, found)
-    return [row for row in found if row]
-
-
-def _end_statement(block: _Block, token: Token, found: list[list[Statement]]) -> None:
-    if token.text == ";" and block.kind == "code":
-        block.row.append(Statement(tuple(block.statement)))
-        block.statement = []
-    elif token.text == ";" or (token.text == ":" and block.statement[0].text in _LABELS):
-        _break_row(block, found)
-
-
-def _break_row(block: _Block, found: list[list[Statement]]) -> None:
-    found.append(block.row)
-    block.row, block.statement = [], []
-
-
-def _kind(block: _Block) -> str:
-    """Kind of the block that the statement so far, which ends with a brace, opens."""
-    words = [token.text for token in block.statement]
-    if words[0] in _SCOPES:
-        return "scope"
-    before = words[-2] if len(words) > 1 else ""
-    is_code = before in (")", "]", "else", "do", "try", "const", "noexcept", "mutable", "override", "")
-    return "code" if is_code else "values"
