@@ -61,9 +61,10 @@ __Entry::__Entry(const QString& service, const QString& path, const QDBusConnect
                  QObject* parent)
     : QObject(parent)
     , m_object{connection, service, path, QString::fromLatin1(staticInterfaceName())}
+    , m_signals(EntrySignals::of(connection, service, m_object.interface))
 {
     // Before anything is read, so that no change falls between.
-    subscribe();
+    m_signals->add(path, this);
     const QDBusReply<QDBusVariant> reply = m_object.get(kId);
     if (reply.isValid()) {
         m_id = textOf(reply.value().variant());
@@ -72,14 +73,9 @@ __Entry::__Entry(const QString& service, const QString& path, const QDBusConnect
     }
 }
 
-void __Entry::subscribe()
+__Entry::~__Entry()
 {
-    QDBusConnection bus = m_object.bus;
-    const QString anyMember;
-    bus.connect(m_object.service, m_object.path, kPropertiesInterface, QStringLiteral("PropertiesChanged"),
-                {m_object.interface}, QString(), this, SLOT(onPropertiesChanged(QDBusMessage)));
-    bus.connect(m_object.service, m_object.path, m_object.interface, anyMember, this,
-                SLOT(onOwnSignal(QDBusMessage)));
+    m_signals->remove(m_object.path, this);
 }
 
 bool __Entry::isValid() const
@@ -87,7 +83,7 @@ bool __Entry::isValid() const
     return m_isValid;
 }
 
-QString __Entry::id() const
+QString __Entry::id()
 {
     if (m_isValid && !m_id) {
         const QVariant id = m_object.read(kId);
@@ -98,9 +94,9 @@ QString __Entry::id() const
     return m_id.value_or(QString());
 }
 
-QString __Entry::name() const
+QString __Entry::name()
 {
-    m_knownName = textOf(m_object.read(kName));
+    m_knownName = textOf(readNow(kName));
     return *m_knownName;
 }
 
@@ -109,22 +105,33 @@ bool __Entry::isDocked() const
     return m_object.read(QStringLiteral("IsDocked")).toBool();
 }
 
-WindowInfoMap __Entry::windowInfos() const
+WindowInfoMap __Entry::windowInfos()
 {
-    const auto infos = windowInfosOf(m_object.read(kWindowInfos)).value_or(WindowInfoMap());
+    const auto infos = windowInfosOf(readNow(kWindowInfos)).value_or(WindowInfoMap());
     m_knownWindows = infos.keys();
     return infos;
+}
+
+/// What the dock announced before its answer waits in this thread's queue now, and is older than the answer.
+/// A call that is queued behind it says when it is through.
+QVariant __Entry::readNow(const QString& property)
+{
+    QVariant value = m_object.read(property);
+    ++m_queuedBefore[property];
+    const auto passed = [this, property] { --m_queuedBefore[property]; };
+    QMetaObject::invokeMethod(this, passed, Qt::QueuedConnection);
+    return value;
 }
 
 void __Entry::onPropertiesChanged(const QDBusMessage& signal)
 {
     const auto changed = qdbus_cast<QVariantMap>(signal.arguments().value(1));
     for (auto property = changed.cbegin(); property != changed.cend(); ++property) {
-        notice(property.key(), property.value());
+        hear(property.key(), property.value());
     }
     const QStringList invalidated = signal.arguments().value(2).toStringList();
     for (const QString& property : {kName, kWindowInfos}) {
-        if (invalidated.contains(property)) {
+        if (invalidated.contains(property) && m_queuedBefore.value(property) == 0) {
             readAgain(property);
         }
     }
@@ -134,7 +141,14 @@ void __Entry::onOwnSignal(const QDBusMessage& signal)
 {
     const QString suffix = QStringLiteral("Changed");
     if (signal.member().endsWith(suffix)) {
-        notice(signal.member().chopped(suffix.size()), signal.arguments().value(0));
+        hear(signal.member().chopped(suffix.size()), signal.arguments().value(0));
+    }
+}
+
+void __Entry::hear(const QString& property, const QVariant& value)
+{
+    if (m_queuedBefore.value(property) == 0) {
+        notice(property, value);
     }
 }
 

@@ -58,8 +58,8 @@ void DesktopProxiesEntriesTest::initTestCase()
 void DesktopProxiesEntriesTest::entriesOfOtherPathsAreNotTold()
 {
     const PropertyService dock(service);
-    const __Entry entry(service, path, m_agent.bus());
-    const __Entry other(service, otherPath, m_agent.bus());
+    __Entry entry(service, path, m_agent.bus());
+    __Entry other(service, otherPath, m_agent.bus());
     QSignalSpy told(&entry, &__Entry::NameChanged);
     QSignalSpy othersTold(&other, &__Entry::NameChanged);
 
@@ -72,8 +72,8 @@ void DesktopProxiesEntriesTest::entriesOfOtherPathsAreNotTold()
 void DesktopProxiesEntriesTest::entriesOfOnePathAreAllTold()
 {
     const PropertyService dock(service);
-    const __Entry older(service, path, m_agent.bus());
-    const __Entry newer(service, path, m_agent.bus());
+    __Entry older(service, path, m_agent.bus());
+    __Entry newer(service, path, m_agent.bus());
     QSignalSpy olderTold(&older, &__Entry::NameChanged);
     QSignalSpy newerTold(&newer, &__Entry::NameChanged);
 
@@ -87,7 +87,7 @@ void DesktopProxiesEntriesTest::entryThatHasGoneLeavesTheOthersOfItsPath()
 {
     const PropertyService dock(service);
     auto older = std::make_unique<__Entry>(service, path, m_agent.bus());
-    const __Entry newer(service, path, m_agent.bus());
+    __Entry newer(service, path, m_agent.bus());
     QSignalSpy newerTold(&newer, &__Entry::NameChanged);
 
     older.reset();
@@ -120,8 +120,8 @@ void DesktopProxiesEntriesTest::entriesOfTwoDocksAreKeptApart()
 {
     const PropertyService dock(service);
     const PropertyService otherDock(otherService);
-    const __Entry entry(service, path, m_agent.bus());
-    const __Entry other(otherService, path, m_agent.bus());
+    __Entry entry(service, path, m_agent.bus());
+    __Entry other(otherService, path, m_agent.bus());
     QSignalSpy told(&entry, &__Entry::NameChanged);
     QSignalSpy othersTold(&other, &__Entry::NameChanged);
 
@@ -134,7 +134,7 @@ void DesktopProxiesEntriesTest::entriesOfTwoDocksAreKeptApart()
 void DesktopProxiesEntriesTest::otherWindowsAreAChangeThoughTheyAreAsMany()
 {
     const PropertyService dock(service);
-    const __Entry entry(service, path, m_agent.bus());
+    __Entry entry(service, path, m_agent.bus());
     QSignalSpy told(&entry, &__Entry::WindowInfosChanged);
 
     for (const uint window : {1U, 2U, 2U}) {

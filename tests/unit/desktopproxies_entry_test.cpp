@@ -158,7 +158,7 @@ void DesktopProxiesEntryTest::otherTypesReadAsEmpty()
         for (const char* property : {"Id", "Name", "WindowInfos"}) {
             m_dock->set(path, QString::fromLatin1(property), value);
         }
-        const __Entry entry(service, path, m_agent->bus());
+        __Entry entry(service, path, m_agent->bus());
         QVERIFY(entry.isValid());
         QVERIFY(entry.windowInfos().isEmpty());
         QCOMPARE(entry.id() + entry.name(), QString());
@@ -167,7 +167,7 @@ void DesktopProxiesEntryTest::otherTypesReadAsEmpty()
 
 void DesktopProxiesEntryTest::entryThatIsNotThereIsInvalid()
 {
-    const __Entry entry(service, path + QStringLiteral("x"), m_agent->bus());
+    __Entry entry(service, path + QStringLiteral("x"), m_agent->bus());
     QVERIFY(!entry.isValid());
     QCOMPARE(entry.id(), QString());
     QCOMPARE(entry.name(), QString());
