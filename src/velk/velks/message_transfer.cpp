@@ -15,6 +15,7 @@
 #include "launcher_guard.h"
 #include "libvelkkpx.h"
 #include "prys_interface.h"
+#include "service_status.h"
 #include "services.h"
 #include "session_state.h"
 #include "session_user.h"
@@ -219,6 +220,7 @@ void MessageTransfer::uploadSoftwareChange(int change, const QStringList& info)
 void MessageTransfer::onTimeout()
 {
     m_actionTimer->stop();
+    showServiceStatus("");
     Libvelkkpx desktop;
     switch (sessionPolicy(m_pendingAction).action) {
     case SessionPolicy::Action::LeaveDomain:
@@ -288,6 +290,9 @@ void MessageTransfer::rebootTime(const QString& msg, int code)
 
 void MessageTransfer::startCountdown(int code)
 {
+    if (!m_actionTimer->isActive()) {
+        showServiceStatus("within a minute the session is ended by a policy");
+    }
     m_actionTimer->start(kActionDelay);
     m_pendingAction = code;
 }
