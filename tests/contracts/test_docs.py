@@ -13,6 +13,7 @@ from tests.contracts.logcalls import LogLine, log_lines, log_lines_of
 
 DOCS = REPOSITORY / "docs"
 PAGES = sorted(DOCS.glob("*.md"))
+CONTRACTS_PAGE = contracts.FOLDER.parent / "README.md"
 AUDIENCES = {
     "EverySession": "every session",
     "DomainUsers": "domain users",
@@ -41,6 +42,11 @@ def policy_row(policy: Policy) -> str:
 def named_tests() -> set[tuple[str, str]]:
     """The tests that the failure matrix names, with their files."""
     return set(re.findall(r"`(tests/[\w/]+\.(?:py|cpp))::(\w+)`", page("failures.md")))
+
+
+def links(path: Path) -> list[str]:
+    """The files that a page links to, as it names them."""
+    return re.findall(r"\]\((?!https?:)([^)#]+)[^)]*\)", path.read_text())
 
 
 @pytest.mark.parametrize(
@@ -84,7 +90,23 @@ def test_test_that_the_failure_matrix_names_exists(file: str, name: str) -> None
     assert f"{prefix}{name}(" in (REPOSITORY / file).read_text()
 
 
-@pytest.mark.parametrize("path", PAGES + [contracts.FOLDER.parent / "README.md"], ids=lambda path: path.name)
+def installed_places() -> set[str]:
+    """What the package has in its folder of documentation: files and folders, named as in the tree."""
+    linked = re.findall(r" usr/share/doc/velk-session-agent/(.*)", (REPOSITORY / "debian/links").read_text())
+    return {*(REPOSITORY / "debian/docs").read_text().split(), *linked, "contracts/README.md"}
+
+
+def test_links_of_installed_pages_lead_to_installed_pages() -> None:
+    places = installed_places()
+    lost = []
+    for path in [*(REPOSITORY / name for name in places if name.endswith(".md")), *PAGES, CONTRACTS_PAGE]:
+        for target in links(path):
+            place = (path.parent / target).resolve().relative_to(REPOSITORY)
+            if places.isdisjoint(map(str, [place, *place.parents])):
+                lost.append(f"{path.name}: {target}")
+    assert lost == []
+
+
+@pytest.mark.parametrize("path", [*PAGES, CONTRACTS_PAGE], ids=lambda path: path.name)
 def test_links_lead_somewhere(path: Path) -> None:
-    targets = re.findall(r"\]\((?!https?:)([^)#]+)[^)]*\)", path.read_text())
-    assert [target for target in targets if not (path.parent / target).exists()] == []
+    assert [target for target in links(path) if not (path.parent / target).exists()] == []

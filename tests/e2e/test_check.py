@@ -3,7 +3,10 @@
 from __future__ import annotations
 
 import json
+import os
+import shutil
 import subprocess
+from pathlib import Path
 
 import pytest
 
@@ -11,7 +14,7 @@ from sandbox.machine import layout
 from sandbox.machine.commands import Answer
 from sandbox.machine.files import DEFAULT_USERINFO
 from sandbox.terminal import Terminal
-from tests.e2e.checkreport import binary, make_all_well, report, run
+from tests.e2e.checkreport import Line, binary, make_all_well, report, run
 
 
 def test_session_that_lacks_nothing_is_good(terminal: Terminal) -> None:
@@ -214,6 +217,27 @@ def test_second_agent_is_bad(terminal: Terminal) -> None:
         line = report(terminal).line("agent")
         second.terminate()
     assert (line.result, line.text) == ("bad", "runs 2 times; there must be one")
+
+
+def test_agent_whose_program_was_replaced_is_a_warning(terminal: Terminal, tmp_path: Path) -> None:
+    installed = terminal.agent.binary
+    terminal.agent.binary = Path(shutil.copy(installed, tmp_path / "velks"))
+    terminal.start_agent()
+    assert agent_line(terminal, installed).text == "runs"
+    os.replace(shutil.copy(installed, tmp_path / "newer"), tmp_path / "velks")
+    line = agent_line(terminal, installed)
+    assert line.result == "warning"
+    assert line.text.startswith(
+        "runs an older program than the one installed; systemctl --user restart velks"
+    )
+
+
+def agent_line(terminal: Terminal, installed: Path) -> Line:
+    """What the installed check program says of an agent that was started elsewhere."""
+    started, terminal.agent.binary = terminal.agent.binary, installed
+    found = report(terminal).line("agent")
+    terminal.agent.binary = started
+    return found
 
 
 def test_changes_nothing(terminal: Terminal) -> None:

@@ -97,30 +97,43 @@ QByteArray processName(const QString& folder)
     return file.open(QIODevice::ReadOnly) ? file.readAll().trimmed() : QByteArray();
 }
 
-int runningAgents()
+QFileInfoList runningAgents()
 {
-    int count = 0;
+    QFileInfoList agents;
     const QFileInfoList processes =
         QDir(QStringLiteral("/proc")).entryInfoList({QStringLiteral("[1-9]*")}, QDir::Dirs);
     for (const QFileInfo& process : processes) {
         if (process.ownerId() == getuid() && processName(process.filePath()) == "velks") {
-            ++count;
+            agents.append(process);
         }
     }
-    return count;
+    return agents;
+}
+
+/// Whether another program has taken the place of the one that a process runs, as in an upgrade.
+bool runsReplacedProgram(const QFileInfo& process)
+{
+    return QFile::symLinkTarget(process.filePath() + QStringLiteral("/exe"))
+        .endsWith(QStringLiteral(" (deleted)"));
 }
 
 Finding checkProcess()
 {
     const QString subject = QStringLiteral("agent");
-    const int count = runningAgents();
-    if (count == 1) {
-        return {Grade::Good, subject, QStringLiteral("runs")};
-    }
-    if (count == 0) {
+    const QFileInfoList agents = runningAgents();
+    if (agents.isEmpty()) {
         return {Grade::Bad, subject, QStringLiteral("does not run")};
     }
-    return {Grade::Bad, subject, QStringLiteral("runs %1 times; there must be one").arg(count)};
+    if (agents.size() > 1) {
+        return {Grade::Bad, subject,
+                QStringLiteral("runs %1 times; there must be one").arg(agents.size())};
+    }
+    if (runsReplacedProgram(agents.first())) {
+        return {Grade::Warning, subject,
+                QStringLiteral("runs an older program than the one installed; "
+                               "systemctl --user restart velks changes that")};
+    }
+    return {Grade::Good, subject, QStringLiteral("runs")};
 }
 
 } // namespace
