@@ -125,8 +125,7 @@ Finding checkProcess()
         return {Grade::Bad, subject, QStringLiteral("does not run")};
     }
     if (agents.size() > 1) {
-        return {Grade::Bad, subject,
-                QStringLiteral("runs %1 times; there must be one").arg(agents.size())};
+        return {Grade::Bad, subject, QStringLiteral("runs %1 times; there must be one").arg(agents.size())};
     }
     if (runsReplacedProgram(agents.first())) {
         return {Grade::Warning, subject,
