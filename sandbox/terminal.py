@@ -4,7 +4,7 @@ from __future__ import annotations
 
 from functools import cached_property
 from types import TracebackType
-from typing import Callable, Collection, Mapping
+from typing import Callable, Collection, Mapping, get_type_hints
 from uuid import uuid4
 
 from sandbox.agent import Agent
@@ -40,6 +40,16 @@ class Terminal:
     A Terminal must be made inside a box and by one program at a time.
     """
 
+    daemon: Daemon
+    logind: Logind
+    identity: Identity
+    policy_service: PolicyService
+    notifications: Notifications
+    screensaver: ScreenSaver
+    session_manager: SessionManager
+    dock: Dock
+    launcher: Launcher
+
     def __init__(
         self, user: User | None = None, clock: Clock | None = None, absent: Collection[str] = ()
     ) -> None:
@@ -72,29 +82,11 @@ class Terminal:
                 peer.appear()
 
     def _add_peers(self) -> None:
-        on_system = (self.system_bus, self.events, self.senders)
-        on_session = (self.session_bus, self.events, self.senders)
-        self.daemon = Daemon(*on_system)
-        self.logind = Logind(*on_system)
-        self.identity = Identity(*on_system)
-        self.policy_service = PolicyService(*on_session)
-        self.notifications = Notifications(*on_session)
-        self.screensaver = ScreenSaver(*on_session)
-        self.session_manager = SessionManager(*on_session)
-        self.dock = Dock(*on_session)
-        self.launcher = Launcher(*on_session)
-        peers: tuple[Peer, ...] = (
-            self.daemon,
-            self.logind,
-            self.identity,
-            self.policy_service,
-            self.notifications,
-            self.screensaver,
-            self.session_manager,
-            self.dock,
-            self.launcher,
-        )
-        self.peers = {peer.name: peer for peer in peers}
+        self.peers: dict[str, Peer] = {}
+        for name, fake in FAKES.items():
+            bus = self.system_bus if fake.bus_kind == "system" else self.session_bus
+            self.peers[name] = fake(bus, self.events, self.senders)
+            setattr(self, name, self.peers[name])
 
     def _monitor(self, bus: Bus) -> BusMonitor:
         served = [peer.bus_name for peer in self.peers.values() if peer.bus is bus]
@@ -223,3 +215,7 @@ class Terminal:
 
     def _complaint(self, problems: list[str]) -> str:
         return "\n".join([*problems, self.report()])
+
+
+FAKES: dict[str, type[Peer]] = get_type_hints(Terminal)
+"""The services of a terminal, which are its declared attributes."""

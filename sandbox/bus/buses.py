@@ -49,6 +49,9 @@ _PING_SECONDS = 60.0
 _every_connection: list[Any] = []
 
 
+BusKind = Literal["system", "session"]
+
+
 class Bus:
     """One message bus with Debian's limits and no access rules.
 
@@ -56,7 +59,7 @@ class Bus:
     `run` changes whenever all connections are lost.
     """
 
-    def __init__(self, kind: Literal["system", "session"], user: User) -> None:
+    def __init__(self, kind: BusKind, user: User) -> None:
         self.kind = kind
         self.run = 0
         is_system = kind == "system"

@@ -8,7 +8,7 @@ import dbus
 import dbus.bus
 import dbus.lowlevel
 
-from sandbox.bus.buses import Bus, await_pings
+from sandbox.bus.buses import Bus, BusKind, await_pings
 from sandbox.bus.mainloop import MainLoop
 from sandbox.bus.senders import Senders
 from sandbox.bus.values import plain
@@ -33,6 +33,7 @@ class Peer:
 
     name = ""
     bus_name = ""
+    bus_kind: BusKind = "session"
 
     def __init__(self, bus: Bus, events: Events, senders: Senders) -> None:
         self.bus = bus

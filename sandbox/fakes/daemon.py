@@ -22,6 +22,7 @@ class Daemon(Peer):
 
     name = "daemon"
     bus_name = INTERFACE
+    bus_kind = "system"
 
     def exports(self) -> list[ExportedObject]:
         """The service's only object."""

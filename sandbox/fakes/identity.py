@@ -13,6 +13,7 @@ class Identity(Peer):
 
     name = "identity"
     bus_name = INTERFACE
+    bus_kind = "system"
 
     def exports(self) -> list[ExportedObject]:
         """The service's only object."""

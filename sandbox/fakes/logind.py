@@ -16,6 +16,7 @@ class Logind(Peer):
 
     name = "logind"
     bus_name = "org.freedesktop.login1"
+    bus_kind = "system"
 
     def exports(self) -> list[ExportedObject]:
         """The manager, the caller's user object and the caller's session."""
