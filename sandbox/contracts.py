@@ -23,6 +23,7 @@ from sandbox.events import Event, Events
 
 FOLDER = REPOSITORY / "contracts" / "json"
 _SUFFIX = ".schema.json"
+_BYTE_ORDER_MARK = "\ufeff"  # at the beginning of a text it does not reach the agent
 
 _UPLOADS = {
     "https://%1:%2/uim/v3/client/upinfo_log": "software-change-report",
@@ -91,7 +92,7 @@ class Contracts:
         # What fits none of these in the number or type of its arguments breaks the D-Bus contract already.
         match event.kind, event.source, event.target, event.member, event.args:
             case "signal", "daemon", _, "pushPolicyMsg", (_, text):
-                self._pushed[text] += 1
+                self._pushed[text.removeprefix(_BYTE_ORDER_MARK)] += 1
             case "call", "velks", "policy_service", "onPolicyMsg", (str(text),):
                 self._look_at_forwarded(text)
             case "call", "velks", "daemon", "onUploadFinished", (str(address), str(text)):

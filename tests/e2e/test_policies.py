@@ -152,6 +152,26 @@ def test_characters_outside_latin1_do_not_hide_a_policy(session: Terminal) -> No
     assert next_notification(session, mark).body == "该终端1分钟后进行关机"
 
 
+BYTE_ORDER_MARK = "\ufeff"
+
+
+def test_leading_byte_order_mark_is_lost_on_the_bus(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy(BYTE_ORDER_MARK + '{"type":1300}')
+    assert next_notification(session, mark).body == "该终端1分钟后进行关机"
+
+    mark = session.events.mark()
+    text = f'{{"type":5,"text":"{BYTE_ORDER_MARK}"}}'
+    session.daemon.push_policy(BYTE_ORDER_MARK + text)
+    assert [event.args for event in settled(session, mark)] == [(text,)]
+
+
+def test_second_byte_order_mark_makes_a_policy_unreadable(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.push_policy(2 * BYTE_ORDER_MARK + '{"type":1300}')
+    assert settled(session, mark) == []
+
+
 def test_second_policy_restarts_the_minute_and_its_kind_wins(session: Terminal) -> None:
     mark = session.events.mark()
     session.daemon.push_policy({"type": 1200})
