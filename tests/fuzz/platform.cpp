@@ -48,7 +48,7 @@ void tryInput(const QByteArray& input)
 {
     static const bool prepared = (writePlatformAddress("localhost", "1"), true);
     static MessageTransfer transfer;
-    static const MessagePlatform platform(nullptr, QStringLiteral("zhang.wei"), &transfer);
+    static MessagePlatform platform(nullptr, QStringLiteral("zhang.wei"), &transfer);
     if (!prepared || input.count(',') > kMostCommas) {
         return;
     }

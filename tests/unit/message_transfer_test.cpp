@@ -279,7 +279,7 @@ void MessageTransferTest::expiryKeepsThePendingCode()
 
 void MessageTransferTest::stateIsReportedEveryFiveMinutes()
 {
-    const MessageTransfer transfer;
+    MessageTransfer transfer;
     QVERIFY(timerOf(transfer,
                     [](const QTimer* timer) {
                         return timer->isActive() && timer->interval() == 300000 && !timer->isSingleShot();

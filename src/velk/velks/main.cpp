@@ -31,8 +31,8 @@ int main(int argc, char* argv[])
     sendLogToJournal();
     QCoreApplication application(argc, argv);
     giveMemoryBackAfterWork();
-    const BusWatch systemBus(QDBusConnection::systemBus(), QStringLiteral("system"));
-    const BusWatch sessionBus(QDBusConnection::sessionBus(), QStringLiteral("session"));
+    BusWatch systemBus(QDBusConnection::systemBus(), QStringLiteral("system"));
+    BusWatch sessionBus(QDBusConnection::sessionBus(), QStringLiteral("session"));
     registerLauncherItemInfoMetaType();
     registerLauncherItemInfoListMetaType();
 
@@ -41,7 +41,7 @@ int main(int argc, char* argv[])
     MessageTransfer messageTransfer;
     userName = platformUserName(userName);
     qInfo() << "---getusername:" << userName;
-    const MessagePlatform messagePlatform(nullptr, userName, &messageTransfer);
+    MessagePlatform messagePlatform(nullptr, userName, &messageTransfer);
 
     return QCoreApplication::exec();
 }

@@ -77,7 +77,9 @@ MessageTransfer::MessageTransfer(QObject* parent)
 void MessageTransfer::connectDaemon()
 {
     connect(m_velkgInterface, &velkgInterface::pushPolicyMsg, this, &MessageTransfer::onPolicyMsg);
-    connect(m_velkgInterface, &velkgInterface::pushOnlineMsg, [this] { announceAgain(); });
+    connect(
+        m_velkgInterface, &velkgInterface::pushOnlineMsg, m_velkgInterface, [this] { announceAgain(); },
+        Qt::DirectConnection);
 }
 
 void MessageTransfer::startSoftwareReports()
