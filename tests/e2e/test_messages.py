@@ -3,23 +3,25 @@
 from __future__ import annotations
 
 import json
-import re
-from pathlib import Path
-from typing import Any, Iterator
-from uuid import uuid4
+from typing import Any
 
 import pytest
 
-from sandbox.events import Event
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.e2e.wire import FORWARDED_CODE, forced_actions, log_lines, next_notification
+from tests.e2e.messages import (
+    SURELY_FIRST_POLL,
+    SURELY_NEXT_POLL,
+    USER,
+    answer_always,
+    as_reply,
+    message,
+    poll,
+    requests,
+)
+from tests.e2e.wire import log_lines, next_notification
 
-# The first poll comes 60 to 120 s after the start, a later one 60 to 180 s after the one before.
-SURELY_FIRST_POLL, SURELY_NEXT_POLL = 121, 181
 BEFORE_ANY_POLL = 58
-LESS_THAN_A_REQUEST_MAY_TAKE = 20
-USER = "zhang.wei"
 
 
 @pytest.fixture
@@ -28,36 +30,6 @@ def session(terminal: Terminal) -> Terminal:
     assert terminal.platform
     terminal.start_agent()
     return terminal
-
-
-def requests(terminal: Terminal, route: str, after: int = 0) -> list[Event]:
-    """The agent's requests of one route at the platform since a mark."""
-    return terminal.events.all(kind="http", member=route, after=after)
-
-
-def poll(terminal: Terminal) -> int:
-    """Let the next poll come, with all that follows from it; the result is the mark before it."""
-    mark = terminal.events.mark()
-    terminal.advance(SURELY_NEXT_POLL)
-    return mark
-
-
-def answer_always(
-    terminal: Terminal, body: bytes, headers: dict[str, str] | None = None, status: int = 200
-) -> None:
-    """Let the platform give this reply to every list request from now on."""
-    terminal.platform.faults["list"] = HttpFault.reply(status, body, headers or {})
-
-
-def message(**fields: Any) -> dict[str, Any]:
-    """A message as the platform sends it, with some fields changed."""
-    whole = {"uuid": "u1", "uid": USER, "send_uid": "admin", "title": "T", "content": "C"}
-    return {**whole, "created_at": "2026-01-02 03:04:05", "read_at": "", **fields}
-
-
-def as_reply(*messages: Any) -> bytes:
-    """The body of a list reply."""
-    return json.dumps(messages, ensure_ascii=False).encode()
 
 
 def test_message_is_shown_with_its_action_and_marked_read(session: Terminal) -> None:
@@ -293,100 +265,3 @@ def test_count_is_logged(session: Terminal) -> None:
     mark = poll(session)
     lines = log_lines(session, mark)
     assert lines[lines.index("OnRecvMsg") + 1] == "msg----count: 1"
-
-
-def test_count_that_never_falls_does_not_keep_a_log_out_waiting(session: Terminal) -> None:
-    answer_always(session, as_reply(message()), {"X-Total-Count": "1000"})
-    mark = session.events.mark()
-    session.sync()
-    session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark, count=60)
-
-    session.daemon.push_policy({"type": 1201})
-    session.events.wait_for(
-        lambda event: "强制注销" in event.args[4], target="notifications", member="Notify", after=mark
-    )
-    session.sync()
-    session.jump(60)
-    session.events.wait_for(target="logind", member="Terminate", after=mark)
-    answer_always(session, b"[]")
-    session.sync()
-
-
-COUNT_NEVER_FALLS = HttpFault.reply(200, b"[]", {"X-Total-Count": "1000"})
-
-
-def policy_goes_before_the_51st_message(terminal: Terminal) -> None:
-    """Assert it of a policy that comes now, while the platform holds a list request."""
-    marker = str(uuid4())
-    terminal.daemon.push_policy({"type": FORWARDED_CODE, "marker": marker})
-    terminal.daemon.receive_all_from(terminal.agent.pid)  # its answer comes after it has got the policy
-    mark = terminal.events.mark()
-
-    def hold_the_51st(event: Event) -> None:
-        if event.member == "list" and len(requests(terminal, "list", mark)) == 50:
-            terminal.platform.fault = HttpFault.hang()
-
-    terminal.events.subscribe(hold_the_51st)
-    terminal.platform.release(then=COUNT_NEVER_FALLS)
-    terminal.events.wait_for(kind="http", member="list", count=51, after=mark)
-    terminal.events.wait_for(
-        lambda event: marker in event.args[0], target="policy_service", member="onPolicyMsg", after=mark
-    )
-
-
-@pytest.fixture
-def held(session: Terminal) -> Iterator[Terminal]:
-    """A terminal whose agent waits for the reply to its first list request."""
-    session.platform.fault = HttpFault.hang()
-    mark = session.events.mark()
-    session.sync()
-    session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark)
-    yield session
-    session.platform.release()
-
-
-def test_policies_have_their_turn_after_every_fifty_messages(held: Terminal) -> None:
-    policy_goes_before_the_51st_message(held)
-    policy_goes_before_the_51st_message(held)
-
-
-def test_poll_that_falls_into_a_drain_does_not_start_a_second_one_beside_it(held: Terminal) -> None:
-    mark = held.events.mark()
-    for _ in range(SURELY_NEXT_POLL // LESS_THAN_A_REQUEST_MAY_TAKE + 1):
-        held.jump(LESS_THAN_A_REQUEST_MAY_TAKE)
-        policy_goes_before_the_51st_message(held)
-    held.events.wait_for(lambda event: "screen state-----" in event.args[0], kind="log", after=mark)
-    policy_goes_before_the_51st_message(held)
-
-
-def test_long_drain_needs_no_more_stack_than_a_short_one(session: Terminal) -> None:
-    def stack() -> int:
-        status = (Path("/proc") / str(session.agent.pid) / "status").read_text()
-        return int(re.findall(r"VmStk:\s*(\d+) kB", status)[0])
-
-    for number in range(5):
-        session.platform.post_message(USER, f"message {number}", "text")
-    poll(session)
-    short = stack()
-    for number in range(600):
-        session.platform.post_message(USER, f"message {number}", "text")
-    poll(session)
-    session.events.wait_for(kind="http", member="read", count=605, timeout=60)
-    assert stack() - short <= 64
-
-
-def test_policy_that_waits_during_a_drain_is_carried_out_after_it(session: Terminal) -> None:
-    session.platform.post_message(USER, "T", "C")
-    session.platform.faults["list"] = HttpFault.hang()
-    mark = session.events.mark()
-    session.sync()
-    session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark)
-    session.daemon.push_policy({"type": 1201})
-    session.platform.release()
-    session.sync()
-    assert [event.args[3] for event in session.events.all(member="Notify", after=mark)] == ["T", "提醒"]
-    session.advance(60)
-    assert forced_actions(session, mark) == ["Terminate"]

@@ -96,8 +96,14 @@ AREAS = (
         f"{_FOLDER}message_platform.cpp",
         "message client",
         ("message_platform_test", "message_platform_drain_test"),
-        ("messages", "message_contents", "password", "platform_faults", "startup"),
+        ("messages", "message_drain", "message_contents", "password", "platform_faults", "startup"),
         ("local_user", "startup", "platform_faults"),
+    ),
+    Area(
+        f"{_FOLDER}follow_ups.cpp",
+        "message client",
+        ("follow_ups_test", "message_platform_drain_test"),
+        ("message_drain",),
     ),
     Area(
         f"{_FOLDER}remote_object.cpp",

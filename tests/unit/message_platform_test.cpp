@@ -22,6 +22,15 @@
 
 namespace {
 
+QTimer* pollTimerOf(const MessagePlatform& platform);
+
+/// An explicit instantiation may name what is private. The timer has no parent, so nothing else leads to it.
+template <QTimer* MessagePlatform::*Member> struct PollTimer
+{
+    friend QTimer* pollTimerOf(const MessagePlatform& platform) { return platform.*Member; }
+};
+template struct PollTimer<&MessagePlatform::m_timer>;
+
 /// What getuid() answers instead of the program's own uid.
 std::optional<uid_t> pretendedUid;
 
@@ -72,6 +81,7 @@ private Q_SLOTS:
     void userAboveTheLocalRangeIsDomainUser_data();
     void userAboveTheLocalRangeIsDomainUser();
     void startIsLogged();
+    void pollTimerOutlivesTheClientAndPollsNoMore();
     void unusualAddressIsUsedAsItIs();
     void firstPollComesInOneToTwoMinutes();
     void activePollPutsTheNextOffByOneToThreeMinutes();
@@ -152,12 +162,26 @@ void MessagePlatformTest::userAboveTheLocalRangeIsDomainUser()
 void MessagePlatformTest::startIsLogged()
 {
     const LogRecorder log;
-    const MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
+    MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
     const QString tips = m_peer->url("demanding", "/uim/v3/client/password/tips");
     const QStringList expected{QStringLiteral("info: ---------load cfg"),
                                QStringLiteral(R"(info: MessagePlatform app path "/usr/bin/velkm")"),
                                QStringLiteral("info: url  \"%1\"").arg(tips)};
     QCOMPARE(log.lines().mid(0, 3), expected);
+}
+
+void MessagePlatformTest::pollTimerOutlivesTheClientAndPollsNoMore()
+{
+    auto platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("a"), m_transfer.get());
+    const QPointer<QTimer> timer = pollTimerOf(*platform);
+    QVERIFY(timer->parent() == nullptr);
+    platform.reset();
+    QVERIFY(!timer.isNull());
+    timer->start(0);
+    const LogRecorder log;
+    QVERIFY(QSignalSpy(timer, &QTimer::timeout).wait());
+    QCOMPARE(log.lines(), QStringList());
+    timer->stop();
 }
 
 void MessagePlatformTest::unusualAddressIsUsedAsItIs()
@@ -181,8 +205,8 @@ void MessagePlatformTest::firstPollComesInOneToTwoMinutes()
 {
     for (const time_t moment : kMoments) {
         pretendedTime = moment;
-        const MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
-        const auto* timer = platform.findChild<QTimer*>();
+        MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
+        const QTimer* timer = pollTimerOf(platform);
         QVERIFY(timer->isActive() && !timer->isSingleShot());
         QCOMPARE(timer->interval(), intervalNow(120000, 60000));
     }
@@ -190,7 +214,7 @@ void MessagePlatformTest::firstPollComesInOneToTwoMinutes()
 
 void MessagePlatformTest::activePollPutsTheNextOffByOneToThreeMinutes()
 {
-    const auto* timer = m_platform->findChild<QTimer*>();
+    const QTimer* timer = pollTimerOf(*m_platform);
     for (const time_t moment : kMoments) {
         pretendedTime = moment;
         QTest::ignoreMessage(QtInfoMsg, "screen state-----: 2");
@@ -208,7 +232,7 @@ void MessagePlatformTest::intervalIsDrawnWhenThePollIsOver()
             [] { pretendedTime = kMoments[2]; });
     m_platform->onUnReadMessages();
     pretendedTime = kMoments[2];
-    QCOMPARE(m_platform->findChild<QTimer*>()->interval(), intervalNow(180000, 60000));
+    QCOMPARE(pollTimerOf(*m_platform)->interval(), intervalNow(180000, 60000));
 }
 
 void MessagePlatformTest::idleSessionKeepsTheInterval()
@@ -216,7 +240,7 @@ void MessagePlatformTest::idleSessionKeepsTheInterval()
     const RecordedService screenSaver(
         QDBusConnection::SessionBus, QStringLiteral("com.norix.ScreenSaver"),
         [](const QDBusMessage& call) { return call.createReply(QVariant::fromValue(QDBusVariant(true))); });
-    const auto* timer = m_platform->findChild<QTimer*>();
+    const QTimer* timer = pollTimerOf(*m_platform);
     const int before = timer->interval();
     for (const time_t moment : kMoments) {
         pretendedTime = moment;

@@ -5,11 +5,12 @@
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
-#include <QScopedValueRollback>
 #include <QTime>
+#include <QTimer>
 
 #include "constants.h"
 #include "filecontent.h"
+#include "follow_ups.h"
 #include "handleevent.h"
 #include "message_transfer.h"
 #include "session_user.h"
@@ -20,10 +21,6 @@ namespace {
 constexpr int kShortestInterval = 60000;
 constexpr int kLongestFirstInterval = 120000;
 constexpr int kLongestInterval = 180000;
-
-// Follow-ups in a row before the event loop has its turn: a platform whose count never falls must not keep
-// a forced log-out waiting.
-constexpr int kFollowUpsInARow = 50;
 
 /// Seconds since the epoch; the platform knows them as 32 bits.
 quint32 currentSeconds()
@@ -60,6 +57,11 @@ NotifyMessageResponse responseOf(const QList<QPair<QByteArray, QByteArray>>& raw
     return response;
 }
 
+FollowUps& followUpsOf(const MessagePlatform& platform)
+{
+    return *platform.findChild<FollowUps*>(QString(), Qt::FindDirectChildrenOnly);
+}
+
 } // namespace
 
 MessagePlatform::MessagePlatform(QObject* parent, const QString& userName, MessageTransfer* transfer)
@@ -67,8 +69,7 @@ MessagePlatform::MessagePlatform(QObject* parent, const QString& userName, Messa
     , m_userName(userName)
     , m_transfer(transfer)
 {
-    m_nextRow.setSingleShot(true);
-    connect(&m_nextRow, &QTimer::timeout, this, &MessagePlatform::askForFollowUps);
+    new FollowUps([this] { unreadMessages(m_userName, 1, 1); }, this);
     if (!isLdapUser()) {
         qInfo() << "is not ldap user:" << m_userName;
         return;
@@ -100,7 +101,7 @@ bool MessagePlatform::loadCfg()
     return velk::base::FileContent::getHostAndPort(m_host, m_port);
 }
 
-void MessagePlatform::initHttpApi() const
+void MessagePlatform::initHttpApi()
 {
     HandleEvent::GetInstance()->initHttpApi();
     connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, this, &MessagePlatform::OnRecvMsg);
@@ -108,7 +109,7 @@ void MessagePlatform::initHttpApi() const
 
 void MessagePlatform::initPlatformMessage()
 {
-    m_timer = new QTimer(this);
+    m_timer = new QTimer;
     connect(m_timer, &QTimer::timeout, this, &MessagePlatform::onUnReadMessages);
     m_timer->start(generateRandnum(kLongestFirstInterval, kShortestInterval));
 }
@@ -157,10 +158,7 @@ int MessagePlatform::getNotifyMessageList(const QString& uid, bool isNotRead, in
 int MessagePlatform::getNotifyMessageList(const NotifyMessageOption& option,
                                           const list_message_callback& /*callback*/)
 {
-    requestList(option);
-    if (!m_nextRow.isActive()) { // else a drain is on its way, and a row of its own would keep others waiting
-        askForFollowUps();
-    }
+    followUpsOf(*this).after([this, &option] { requestList(option); });
     return 0;
 }
 
@@ -174,23 +172,7 @@ void MessagePlatform::requestList(const NotifyMessageOption& option)
                             option.desc, QString::number(currentSeconds()));
     qInfo() << "Rquest[GET]: " << m_requestUrl;
 
-    const QScopedValueRollback<bool> asking(m_asking, true);
     HandleEvent::GetInstance()->getPlatformMsg(m_requestUrl);
-}
-
-void MessagePlatform::askForFollowUps()
-{
-    if (m_asking) {
-        return;
-    }
-    const QScopedValueRollback<bool> asking(m_asking, true);
-    for (int asked = 0; m_followUpDue && asked < kFollowUpsInARow; ++asked) {
-        m_followUpDue = false;
-        unreadMessages(m_userName, 1, 1);
-    }
-    if (m_followUpDue) {
-        m_nextRow.start();
-    }
 }
 
 void MessagePlatform::OnRecvMsg(const int& /*statusCode*/, const QString& body,
@@ -208,10 +190,7 @@ void MessagePlatform::OnRecvMsg(const int& /*statusCode*/, const QString& body,
         }
     }
 
-    if (response.total > 1) {
-        m_followUpDue = true;
-        askForFollowUps();
-    }
+    followUpsOf(*this).count(response.total);
 }
 
 void MessagePlatform::show(const NotifyMessage& message)

@@ -5,12 +5,12 @@
 #include <QObject>
 #include <QPair>
 #include <QString>
-#include <QTimer>
 #include <QVector>
 
 #include <functional>
 
 class MessageTransfer;
+class QTimer;
 
 /// The parameters of one list request.
 struct NotifyMessageOption
@@ -58,7 +58,7 @@ public:
 
     bool isLdapUser();
     bool loadCfg();
-    void initHttpApi() const;
+    void initHttpApi();
     void initPlatformMessage();
 
     /// A poll interval in milliseconds, at least min and below max (min where both are equal). It depends on
@@ -86,23 +86,17 @@ public Q_SLOTS:
 private:
     void show(const NotifyMessage& message);
     void requestList(const NotifyMessageOption& option);
-    void askForFollowUps();
 
-    QTimer* m_timer = nullptr;
+    // Other code is compiled against these members as they are, in this order: none may come or go. What the
+    // client needs besides lives in a child object.
+    QTimer* m_timer = nullptr; ///< without a parent, kept until the process ends
     QString m_userName;
     QString m_appPath;
+    QVector<NotifyMessage> m_messages; ///< never filled
     QString m_host;
     QString m_port;
     QString m_requestUrl;
     QString m_listUrl;
     QString m_readUrl;
     MessageTransfer* m_transfer;
-
-    // One reply's follow-up is asked for by the outermost caller, in a loop, so that a long row of messages
-    // needs no more stack than one.
-    bool m_asking = false;
-    bool m_followUpDue = false;
-    // Begins the next row of follow-ups from the event loop. Not a queued call: those go before timers, and
-    // a forced log-out that is due is one.
-    QTimer m_nextRow;
 };

@@ -1,0 +1,148 @@
+#include "follow_ups.h"
+#include "manual_clock.h"
+
+#include <QtTest>
+
+#include <memory>
+
+namespace {
+
+constexpr int kAtFullSpeed = 1000;
+constexpr int kMostInASecond = 50;
+
+} // namespace
+
+/// How a platform is asked that counts further messages with so many of its replies.
+class FollowUpsTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void init();
+
+    void backlogOfAThousandIsDrainedAtFullSpeed();
+    void platformWhoseCountNeverFallsIsAskedFiftyTimesInASecond();
+    void longerBacklogIsDrainedToItsEnd();
+    void pollDuringThePauseIsNotFollowedUpBeforeItsEnd();
+    void replyDuringThePauseIsNotFollowedUpBeforeItsEnd();
+    void rowEndsWhenTheCountHasFallen();
+
+private:
+    /// Handles all that is due by now.
+    static void settle();
+    void moveClock(int seconds);
+    void answer();
+    void poll();
+
+    std::unique_ptr<FollowUps> m_followUps;
+    int m_unread = 0; ///< the platform's count before the next reply
+    int m_asked = 0; ///< follow-ups since the start of the test
+    int m_clock = 0;
+};
+
+void FollowUpsTest::init()
+{
+    m_asked = 0;
+    m_followUps = std::make_unique<FollowUps>(
+        [this] {
+            ++m_asked;
+            answer();
+        },
+        nullptr);
+}
+
+void FollowUpsTest::settle()
+{
+    const int moreThanRows = 2 * kAtFullSpeed / kMostInASecond;
+    for (int turn = 0; turn < moreThanRows; ++turn) {
+        QCoreApplication::processEvents();
+    }
+}
+
+void FollowUpsTest::moveClock(int seconds)
+{
+    m_clock += seconds;
+    setClockAhead(m_clock);
+    settle();
+}
+
+void FollowUpsTest::answer()
+{
+    m_followUps->count(m_unread--);
+}
+
+void FollowUpsTest::poll()
+{
+    m_followUps->after([this] { answer(); });
+}
+
+void FollowUpsTest::backlogOfAThousandIsDrainedAtFullSpeed()
+{
+    m_unread = kAtFullSpeed + 1;
+    poll();
+    settle();
+    QCOMPARE(m_asked, kAtFullSpeed);
+    moveClock(10);
+    QCOMPARE(m_asked, kAtFullSpeed);
+}
+
+void FollowUpsTest::platformWhoseCountNeverFallsIsAskedFiftyTimesInASecond()
+{
+    m_unread = 1'000'000;
+    poll();
+    settle();
+    QCOMPARE(m_asked, kAtFullSpeed);
+    for (int second = 0; second < 20; ++second) {
+        const int before = m_asked;
+        moveClock(1);
+        QVERIFY(m_asked > before);
+        QVERIFY(m_asked < before + kMostInASecond); // a poll may come besides
+    }
+}
+
+void FollowUpsTest::longerBacklogIsDrainedToItsEnd()
+{
+    m_unread = 1201;
+    poll();
+    settle();
+    for (int second = 0; second < 5; ++second) {
+        moveClock(1);
+    }
+    QCOMPARE(m_asked, 1200);
+    QCOMPARE(m_unread, 0);
+}
+
+void FollowUpsTest::pollDuringThePauseIsNotFollowedUpBeforeItsEnd()
+{
+    m_unread = 1'000'000;
+    poll();
+    settle();
+    poll();
+    settle();
+    QCOMPARE(m_asked, kAtFullSpeed);
+    moveClock(1);
+    QVERIFY(m_asked > kAtFullSpeed);
+}
+
+void FollowUpsTest::replyDuringThePauseIsNotFollowedUpBeforeItsEnd()
+{
+    m_unread = 1'000'000;
+    poll();
+    settle();
+    answer();
+    settle();
+    QCOMPARE(m_asked, kAtFullSpeed);
+}
+
+void FollowUpsTest::rowEndsWhenTheCountHasFallen()
+{
+    for (int round = 1; round <= 3; ++round) {
+        m_unread = 800;
+        poll();
+        settle();
+        QCOMPARE(m_asked, round * 799);
+    }
+}
+
+QTEST_GUILESS_MAIN(FollowUpsTest)
+#include "follow_ups_test.moc"
