@@ -1,0 +1,181 @@
+#include <QtTest>
+
+#include <QProcess>
+
+#include <algorithm>
+
+#include "entryinfo.h"
+#include "handleevent.h"
+#include "launcher_guard.h"
+#include "message_platform.h"
+#include "message_transfer.h"
+
+using velk::module::software::EntryInfo;
+
+namespace {
+
+constexpr size_t aligned(size_t size, size_t alignment)
+{
+    return (size + alignment - 1) / alignment * alignment;
+}
+
+/// The size of a class that holds these, its base among them, and nothing else.
+template <typename... Parts> constexpr size_t sizeWith()
+{
+    size_t size = 0;
+    // Pointers are meant. NOLINTNEXTLINE(bugprone-sizeof-expression)
+    ((size = aligned(size, alignof(Parts)) + sizeof(Parts)), ...);
+    return aligned(size, std::max({alignof(Parts)...}));
+}
+
+/// What this program's own debug information says of the types of a name, one text for each type and part.
+QStringList debugInformation(const QString& typeName)
+{
+    QProcess reader;
+    reader.setProcessChannelMode(QProcess::ForwardedErrorChannel);
+    reader.start(QStringLiteral("llvm-dwarfdump"),
+                 {QStringLiteral("--name=") + typeName, QStringLiteral("--show-children"),
+                  QCoreApplication::applicationFilePath()});
+    reader.waitForFinished();
+    return QString::fromUtf8(reader.readAll()).split(QStringLiteral("\n\n"));
+}
+
+/// A text or number in what debugInformation() gave; empty if it is not there.
+QString attribute(const QString& entry, const char* name)
+{
+    const QRegularExpression pattern(
+        QStringLiteral(R"-(DW_AT_%1\s+\((?:0x\w+ )?"?(.*?)"?\)\n)-").arg(QString::fromLatin1(name)));
+    return pattern.match(entry + QLatin1Char('\n'))
+        .captured(1)
+        .replace(QLatin1String("> >"), QLatin1String(">>"));
+}
+
+/// The bases and members of a class, each as "type name", or the values of an enumeration, as "name = value".
+QStringList partsOf(const QString& typeName)
+{
+    // Parts of parts stand further to the right.
+    static const QRegularExpression head(QStringLiteral("^0x[0-9a-f]+:( |   )DW_TAG_(\\w+)"));
+    QStringList parts;
+    bool isDefinition = false;
+    const QStringList entries = debugInformation(typeName);
+    for (const QString& entry : entries) {
+        const auto found = head.match(entry);
+        const QString kind = found.captured(2);
+        if (found.captured(1) == QLatin1String(" ")) {
+            if (isDefinition) {
+                break; // the same type once more, from another source file
+            }
+            isDefinition = !attribute(entry, "byte_size").isEmpty();
+        } else if (kind == QLatin1String("inheritance") || kind == QLatin1String("member")) {
+            const QString part = attribute(entry, "type") + QLatin1Char(' ') + attribute(entry, "name");
+            parts << part.trimmed();
+        } else if (kind == QLatin1String("enumerator")) {
+            const int value = attribute(entry, "const_value").toInt(nullptr, 0);
+            parts << attribute(entry, "name") + QStringLiteral(" = ") + QString::number(value);
+        }
+    }
+    return parts;
+}
+
+} // namespace
+
+/// Other code is compiled against these classes: base and members are those listed here, of these types and
+/// names, in this order, and no others. What is private counts too.
+class ClassLayoutTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void classHoldsExactlyTheseParts_data();
+    void classHoldsExactlyTheseParts();
+    void screenStatesAreExactlyThese();
+};
+
+namespace {
+
+template <typename Class, typename... Parts> void row(const char* name, const QStringList& parts)
+{
+    QTest::newRow(name) << parts << quint64(sizeof(Class)) << quint64(sizeWith<Parts...>());
+}
+
+void messageRows()
+{
+    row<NotifyMessageOption, QString, bool, int, int, QString, QString>(
+        "NotifyMessageOption",
+        {QStringLiteral("QString uid"), QStringLiteral("bool is_not_read"), QStringLiteral("int limit"),
+         QStringLiteral("int offset"), QStringLiteral("QString order"), QStringLiteral("QString desc")});
+    row<NotifyMessage, QString, QString, QString, QString, QString, QString, QString>(
+        "NotifyMessage",
+        {QStringLiteral("QString uuid"), QStringLiteral("QString uid"), QStringLiteral("QString send_uid"),
+         QStringLiteral("QString title"), QStringLiteral("QString content"),
+         QStringLiteral("QString created_at"), QStringLiteral("QString read_at")});
+    row<NotifyMessageResponse, int, int, int, QVector<NotifyMessage>>(
+        "NotifyMessageResponse",
+        {QStringLiteral("int total"), QStringLiteral("int offset"), QStringLiteral("int limit"),
+         QStringLiteral("QVector<NotifyMessage> messages")});
+    row<MessagePlatform, QObject, QTimer*, QString, QString, QVector<NotifyMessage>, QString, QString,
+        QString, QString, QString, MessageTransfer*>(
+        "MessagePlatform",
+        {QStringLiteral("QObject"), QStringLiteral("QTimer * m_timer"), QStringLiteral("QString m_userName"),
+         QStringLiteral("QString m_appPath"), QStringLiteral("QVector<NotifyMessage> m_messages"),
+         QStringLiteral("QString m_host"), QStringLiteral("QString m_port"),
+         QStringLiteral("QString m_requestUrl"), QStringLiteral("QString m_listUrl"),
+         QStringLiteral("QString m_readUrl"), QStringLiteral("MessageTransfer * m_transfer")});
+    row<HandleEvent, QObject, HttpClientApi*>(
+        "HandleEvent", {QStringLiteral("QObject"), QStringLiteral("HttpClientApi * m_http")});
+}
+
+void desktopRows()
+{
+    row<EntryInfo, QObject, __Entry, QString, QString, qint32>(
+        "EntryInfo",
+        {QStringLiteral("QObject"), QStringLiteral("__Entry m_entry"), QStringLiteral("QString m_entryId"),
+         QStringLiteral("QString m_appName"), QStringLiteral("qint32 m_winSize")});
+    row<SoftwareInfo, QString, QString, qint32, QString, QString, qint32>(
+        "SoftwareInfo",
+        {QStringLiteral("QString packageName"), QStringLiteral("QString name"), QStringLiteral("qint32 id"),
+         QStringLiteral("QString version"), QStringLiteral("QString architecture"),
+         QStringLiteral("qint32 installedType")});
+    row<LauncherGuard, QObject, QList<SoftwareInfo>, __Launcherd*>(
+        "LauncherGuard",
+        {QStringLiteral("QObject"), QStringLiteral("QList<SoftwareInfo> m_softwareList"),
+         QStringLiteral("__Launcherd * m_launcher")});
+}
+
+} // namespace
+
+void ClassLayoutTest::classHoldsExactlyTheseParts_data()
+{
+    QTest::addColumn<QStringList>("parts");
+    QTest::addColumn<quint64>("size");
+    QTest::addColumn<quint64>("sizeOfParts");
+    messageRows();
+    desktopRows();
+    row<MessageTransfer, QObject, velkgInterface*, prysInterface*, LauncherGuard*, QTimer*, QTimer*, QString,
+        QString, qint32, qint32>(
+        "MessageTransfer",
+        {QStringLiteral("QObject"), QStringLiteral("velkgInterface * m_velkgInterface"),
+         QStringLiteral("prysInterface * m_prysInterface"), QStringLiteral("LauncherGuard * m_launcherGuard"),
+         QStringLiteral("QTimer * m_actionTimer"), QStringLiteral("QTimer * m_stateTimer"),
+         QStringLiteral("QString m_machineId"), QStringLiteral("QString m_userName"),
+         QStringLiteral("qint32 m_uid"), QStringLiteral("qint32 m_pendingAction")});
+}
+
+void ClassLayoutTest::classHoldsExactlyTheseParts()
+{
+    QFETCH(quint64, size);
+    QTEST(partsOf(QString::fromLatin1(QTest::currentDataTag())), "parts");
+    QTEST(size, "sizeOfParts");
+}
+
+void ClassLayoutTest::screenStatesAreExactlyThese()
+{
+    const QStringList expected{QStringLiteral("ScreenSaverRunning = 0"), QStringLiteral("ScreenLocked = 1"),
+                               QStringLiteral("ScreenActive = 2")};
+    QCOMPARE(partsOf(QStringLiteral("Screen_State")), expected);
+    static_assert(std::is_same_v<decltype(&MessageTransfer::getScreenState),
+                                 MessageTransfer::Screen_State (MessageTransfer::*)()>);
+}
+
+QTEST_GUILESS_MAIN(ClassLayoutTest)
+#include "class_layout_test.moc"
