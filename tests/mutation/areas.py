@@ -95,7 +95,7 @@ AREAS = (
     Area(
         f"{_FOLDER}message_platform.cpp",
         "message client",
-        ("message_platform_test", "message_platform_drain_test"),
+        ("message_platform_test", "message_platform_poll_test", "message_platform_drain_test"),
         ("messages", "message_drain", "message_contents", "password", "platform_faults", "startup"),
         ("local_user", "startup", "platform_faults"),
     ),

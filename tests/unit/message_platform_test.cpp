@@ -1,14 +1,9 @@
 #include <QtTest>
 
-#include <QDBusVariant>
 #include <QTextCodec>
-#include <QUrl>
 
-#include <sys/time.h>
 #include <unistd.h>
 
-#include <array>
-#include <ctime>
 #include <memory>
 #include <optional>
 
@@ -17,55 +12,20 @@
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "platform_files.h"
-#include "recorded_service.h"
+#include "pretended_time.h"
 #include "tls_peer.h"
 
 namespace {
 
-QTimer* pollTimerOf(const MessagePlatform& platform);
-
-/// An explicit instantiation may name what is private. The timer has no parent, so nothing else leads to it.
-template <QTimer* MessagePlatform::*Member> struct PollTimer
-{
-    friend QTimer* pollTimerOf(const MessagePlatform& platform) { return platform.*Member; }
-};
-template struct PollTimer<&MessagePlatform::m_timer>;
-
 /// What getuid() answers instead of the program's own uid.
 std::optional<uid_t> pretendedUid;
 
-/// The time of day that Qt reads instead of the clock's, in seconds since the epoch.
-std::optional<time_t> pretendedTime;
-
-// Seconds of different days, up to the last that the platform can be told.
-constexpr std::array<time_t, 6> kMoments = {0, 1234567890, 1800000000, 1900012345, 2147483648, 4294967295};
-
-/// The interval that the generator gives at the pretended time.
-int intervalNow(int max, int min)
-{
-    QT_WARNING_PUSH
-    QT_WARNING_DISABLE_DEPRECATED
-    qsrand(static_cast<uint>(QTime::currentTime().msecsSinceStartOfDay() / 1000));
-    return qrand() % (max - min) + min;
-    QT_WARNING_POP
-}
-
 } // namespace
 
-/// Both go before the C library's own.
+/// Goes before the C library's own.
 uid_t getuid() noexcept
 {
     return pretendedUid.value_or(geteuid());
-}
-
-// The header's names of the parameters are reserved.
-// NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name)
-int gettimeofday(timeval* now, void* /*zone*/) noexcept
-{
-    timespec clock{};
-    clock_gettime(CLOCK_REALTIME, &clock);
-    *now = {pretendedTime.value_or(clock.tv_sec), clock.tv_nsec / 1000};
-    return 0;
 }
 
 /// The message client on its own, as a domain user, with a platform that has no messages.
@@ -81,15 +41,7 @@ private Q_SLOTS:
     void userAboveTheLocalRangeIsDomainUser_data();
     void userAboveTheLocalRangeIsDomainUser();
     void startIsLogged();
-    void pollTimerOutlivesTheClientAndPollsNoMore();
     void unusualAddressIsUsedAsItIs();
-    void firstPollComesInOneToTwoMinutes();
-    void activePollPutsTheNextOffByOneToThreeMinutes();
-    void intervalIsDrawnWhenThePollIsOver();
-    void idleSessionKeepsTheInterval();
-    void intervalIsAtLeastTheShortestAndBelowTheLongest();
-    void intervalBetweenEqualBoundsIsTheBound();
-    void intervalDependsOnTheSecondOfTheDay();
     void pageGivesTheOffset_data();
     void pageGivesTheOffset();
     void optionsAreSentInTheirOrder();
@@ -129,7 +81,7 @@ void MessagePlatformTest::init()
 void MessagePlatformTest::cleanup()
 {
     pretendedUid.reset();
-    pretendedTime.reset();
+    pretendedTime().reset();
 }
 
 QString MessagePlatformTest::requestTarget()
@@ -170,20 +122,6 @@ void MessagePlatformTest::startIsLogged()
     QCOMPARE(log.lines().mid(0, 3), expected);
 }
 
-void MessagePlatformTest::pollTimerOutlivesTheClientAndPollsNoMore()
-{
-    auto platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("a"), m_transfer.get());
-    const QPointer<QTimer> timer = pollTimerOf(*platform);
-    QVERIFY(timer->parent() == nullptr);
-    platform.reset();
-    QVERIFY(!timer.isNull());
-    timer->start(0);
-    const LogRecorder log;
-    QVERIFY(QSignalSpy(timer, &QTimer::timeout).wait());
-    QCOMPARE(log.lines(), QStringList());
-    timer->stop();
-}
-
 void MessagePlatformTest::unusualAddressIsUsedAsItIs()
 {
     writePlatformAddress("%2.box", "%1");
@@ -199,76 +137,6 @@ void MessagePlatformTest::unusualAddressIsUsedAsItIs()
     QVERIFY(addresses.at(0).endsWith(base + QStringLiteral("uim/v3/client/password/tips\"")));
     QVERIFY(addresses.at(1).contains(base + QStringLiteral("notification/v2/list?uid=a&")));
     QVERIFY(addresses.at(2).contains(base + QStringLiteral("notification/v2/read?timestaps=")));
-}
-
-void MessagePlatformTest::firstPollComesInOneToTwoMinutes()
-{
-    for (const time_t moment : kMoments) {
-        pretendedTime = moment;
-        MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
-        const QTimer* timer = pollTimerOf(platform);
-        QVERIFY(timer->isActive() && !timer->isSingleShot());
-        QCOMPARE(timer->interval(), intervalNow(120000, 60000));
-    }
-}
-
-void MessagePlatformTest::activePollPutsTheNextOffByOneToThreeMinutes()
-{
-    const QTimer* timer = pollTimerOf(*m_platform);
-    for (const time_t moment : kMoments) {
-        pretendedTime = moment;
-        QTest::ignoreMessage(QtInfoMsg, "screen state-----: 2");
-        m_platform->onUnReadMessages();
-        QVERIFY(timer->isActive() && !timer->isSingleShot());
-        QCOMPARE(timer->interval(), intervalNow(180000, 60000));
-    }
-}
-
-void MessagePlatformTest::intervalIsDrawnWhenThePollIsOver()
-{
-    pretendedTime = kMoments[1];
-    const QObject receiver;
-    connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
-            [] { pretendedTime = kMoments[2]; });
-    m_platform->onUnReadMessages();
-    pretendedTime = kMoments[2];
-    QCOMPARE(pollTimerOf(*m_platform)->interval(), intervalNow(180000, 60000));
-}
-
-void MessagePlatformTest::idleSessionKeepsTheInterval()
-{
-    const RecordedService screenSaver(
-        QDBusConnection::SessionBus, QStringLiteral("com.norix.ScreenSaver"),
-        [](const QDBusMessage& call) { return call.createReply(QVariant::fromValue(QDBusVariant(true))); });
-    const QTimer* timer = pollTimerOf(*m_platform);
-    const int before = timer->interval();
-    for (const time_t moment : kMoments) {
-        pretendedTime = moment;
-        m_platform->onUnReadMessages();
-        QVERIFY(timer->isActive());
-        QCOMPARE(timer->interval(), before);
-    }
-}
-
-void MessagePlatformTest::intervalIsAtLeastTheShortestAndBelowTheLongest()
-{
-    for (int max = 60001; max < 180000; max += 37) {
-        const int interval = m_platform->generateRandnum(max, 60000);
-        QVERIFY2(interval >= 60000 && interval < max, qPrintable(QString::number(interval)));
-    }
-}
-
-void MessagePlatformTest::intervalBetweenEqualBoundsIsTheBound()
-{
-    QCOMPARE(m_platform->generateRandnum(60000, 60000), 60000);
-}
-
-void MessagePlatformTest::intervalDependsOnTheSecondOfTheDay()
-{
-    for (const time_t moment : kMoments) {
-        pretendedTime = moment;
-        QCOMPARE(m_platform->generateRandnum(99999, 7), intervalNow(99999, 7));
-    }
 }
 
 void MessagePlatformTest::pageGivesTheOffset_data()
@@ -353,7 +221,7 @@ void MessagePlatformTest::timeIsUnsignedInListsAndSignedInReceipts_data()
 void MessagePlatformTest::timeIsUnsignedInListsAndSignedInReceipts()
 {
     QFETCH(qint64, now);
-    pretendedTime = now;
+    pretendedTime() = now;
     m_platform->unreadMessages(QStringLiteral("a"), 1, 1);
     QTEST(requestTarget().section(QStringLiteral("&timestaps="), 1), "inList");
     m_platform->messageRespond(QStringLiteral("u"));

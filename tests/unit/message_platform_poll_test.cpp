@@ -1,0 +1,167 @@
+#include <QtTest>
+
+#include <QDBusVariant>
+
+#include <array>
+#include <memory>
+
+#include "handleevent.h"
+#include "log_recorder.h"
+#include "message_platform.h"
+#include "message_transfer.h"
+#include "platform_files.h"
+#include "pretended_time.h"
+#include "recorded_service.h"
+#include "tls_peer.h"
+
+namespace {
+
+QTimer* pollTimerOf(const MessagePlatform& platform);
+
+/// An explicit instantiation may name what is private. The timer has no parent, so nothing else leads to it.
+template <QTimer* MessagePlatform::*Member> struct PollTimer
+{
+    friend QTimer* pollTimerOf(const MessagePlatform& platform) { return platform.*Member; }
+};
+template struct PollTimer<&MessagePlatform::m_timer>;
+
+// Seconds of different days, up to the last that the platform can be told.
+constexpr std::array<time_t, 6> kMoments = {0, 1234567890, 1800000000, 1900012345, 2147483648, 4294967295};
+
+/// The interval that the generator gives at the pretended time.
+int intervalNow(int max, int min)
+{
+    QT_WARNING_PUSH
+    QT_WARNING_DISABLE_DEPRECATED
+    qsrand(static_cast<uint>(QTime::currentTime().msecsSinceStartOfDay() / 1000));
+    return qrand() % (max - min) + min;
+    QT_WARNING_POP
+}
+
+} // namespace
+
+/// When the message client polls a platform that has no messages.
+class MessagePlatformPollTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void initTestCase();
+    void cleanup();
+
+    void firstPollComesInOneToTwoMinutes();
+    void activePollPutsTheNextOffByOneToThreeMinutes();
+    void intervalIsDrawnWhenThePollIsOver();
+    void idleSessionKeepsTheInterval();
+    void intervalIsAtLeastTheShortestAndBelowTheLongest();
+    void intervalBetweenEqualBoundsIsTheBound();
+    void intervalDependsOnTheSecondOfTheDay();
+    void pollTimerOutlivesTheClientAndPollsNoMore();
+
+private:
+    std::unique_ptr<TlsPeer> m_peer;
+    std::unique_ptr<MessageTransfer> m_transfer;
+    std::unique_ptr<MessagePlatform> m_platform;
+};
+
+void MessagePlatformPollTest::initTestCase()
+{
+    m_peer = std::make_unique<TlsPeer>();
+    installCertificates(*m_peer);
+    writePlatformAddress(*m_peer);
+
+    m_transfer = std::make_unique<MessageTransfer>();
+    m_platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("zhang.wei"), m_transfer.get());
+}
+
+void MessagePlatformPollTest::cleanup()
+{
+    pretendedTime().reset();
+}
+
+void MessagePlatformPollTest::pollTimerOutlivesTheClientAndPollsNoMore()
+{
+    auto platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("a"), m_transfer.get());
+    const QPointer<QTimer> timer = pollTimerOf(*platform);
+    QVERIFY(timer->parent() == nullptr);
+    platform.reset();
+    QVERIFY(!timer.isNull());
+    timer->start(0);
+    const LogRecorder log;
+    QVERIFY(QSignalSpy(timer, &QTimer::timeout).wait());
+    QCOMPARE(log.lines(), QStringList());
+    timer->stop();
+}
+
+void MessagePlatformPollTest::firstPollComesInOneToTwoMinutes()
+{
+    for (const time_t moment : kMoments) {
+        pretendedTime() = moment;
+        MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
+        const QTimer* timer = pollTimerOf(platform);
+        QVERIFY(timer->isActive() && !timer->isSingleShot());
+        QCOMPARE(timer->interval(), intervalNow(120000, 60000));
+    }
+}
+
+void MessagePlatformPollTest::activePollPutsTheNextOffByOneToThreeMinutes()
+{
+    const QTimer* timer = pollTimerOf(*m_platform);
+    for (const time_t moment : kMoments) {
+        pretendedTime() = moment;
+        QTest::ignoreMessage(QtInfoMsg, "screen state-----: 2");
+        m_platform->onUnReadMessages();
+        QVERIFY(timer->isActive() && !timer->isSingleShot());
+        QCOMPARE(timer->interval(), intervalNow(180000, 60000));
+    }
+}
+
+void MessagePlatformPollTest::intervalIsDrawnWhenThePollIsOver()
+{
+    pretendedTime() = kMoments[1];
+    const QObject receiver;
+    connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
+            [] { pretendedTime() = kMoments[2]; });
+    m_platform->onUnReadMessages();
+    pretendedTime() = kMoments[2];
+    QCOMPARE(pollTimerOf(*m_platform)->interval(), intervalNow(180000, 60000));
+}
+
+void MessagePlatformPollTest::idleSessionKeepsTheInterval()
+{
+    const RecordedService screenSaver(
+        QDBusConnection::SessionBus, QStringLiteral("com.norix.ScreenSaver"),
+        [](const QDBusMessage& call) { return call.createReply(QVariant::fromValue(QDBusVariant(true))); });
+    const QTimer* timer = pollTimerOf(*m_platform);
+    const int before = timer->interval();
+    for (const time_t moment : kMoments) {
+        pretendedTime() = moment;
+        m_platform->onUnReadMessages();
+        QVERIFY(timer->isActive());
+        QCOMPARE(timer->interval(), before);
+    }
+}
+
+void MessagePlatformPollTest::intervalIsAtLeastTheShortestAndBelowTheLongest()
+{
+    for (int max = 60001; max < 180000; max += 37) {
+        const int interval = m_platform->generateRandnum(max, 60000);
+        QVERIFY2(interval >= 60000 && interval < max, qPrintable(QString::number(interval)));
+    }
+}
+
+void MessagePlatformPollTest::intervalBetweenEqualBoundsIsTheBound()
+{
+    QCOMPARE(m_platform->generateRandnum(60000, 60000), 60000);
+}
+
+void MessagePlatformPollTest::intervalDependsOnTheSecondOfTheDay()
+{
+    for (const time_t moment : kMoments) {
+        pretendedTime() = moment;
+        QCOMPARE(m_platform->generateRandnum(99999, 7), intervalNow(99999, 7));
+    }
+}
+
+QTEST_GUILESS_MAIN(MessagePlatformPollTest)
+#include "message_platform_poll_test.moc"
