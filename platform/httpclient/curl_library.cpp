@@ -15,10 +15,22 @@ template <typename Function> Function resolve(QLibrary& library, const char* nam
     return reinterpret_cast<Function>(function);
 }
 
+/// Must come before anything else of libcurl, and once.
+void initialise(QLibrary& library)
+{
+    const CURLcode result =
+        resolve<decltype(&curl_global_init)>(library, "curl_global_init")(CURL_GLOBAL_DEFAULT);
+    if (result != CURLE_OK) {
+        const auto describe = resolve<decltype(&curl_easy_strerror)>(library, "curl_easy_strerror");
+        qFatal("libcurl: %s", describe(result));
+    }
+}
+
 CurlLibrary load()
 {
     constexpr int abi = 4;
     QLibrary library(QStringLiteral("curl"), abi);
+    initialise(library);
     return {
         resolve<decltype(&curl_easy_init)>(library, "curl_easy_init"),
         resolve<decltype(&curl_easy_cleanup)>(library, "curl_easy_cleanup"),

@@ -3,17 +3,29 @@
 #include <QFile>
 #include <QtDebug>
 
+#include <netinet/in.h>
+#include <netinet/tcp.h>
 #include <sys/socket.h>
 
 #include <array>
+#include <limits>
+#include <optional>
 
 #include "curl_library.h"
+#include "private_descriptors.h"
 #include "reception.h"
 
 namespace {
 
 constexpr long kConnectLimitMs = 10'000;
 constexpr long kTotalLimitMs = 30'000;
+
+// The kernel asks an idle peer whether it is there, and gives the connection up when nothing comes back for
+// 10 s, be it a probe or a request that is on its way. So a path that died is mostly known as dead before the
+// next request, and otherwise leaves time for a new connection.
+constexpr long kProbeAfterSeconds = 40;
+constexpr long kProbeEverySeconds = 10;
+constexpr unsigned int kUnansweredLimitMs = 10'000;
 
 template <bool (Reception::*add)(const QByteArray&)>
 size_t receive(char* data, size_t, size_t size, void* reception)
@@ -25,7 +37,16 @@ size_t receive(char* data, size_t, size_t size, void* reception)
 // libcurl's own sockets would be inherited by every child process of the program.
 curl_socket_t openSocket(void*, curlsocktype, curl_sockaddr* address)
 {
-    return socket(address->family, address->socktype | SOCK_CLOEXEC, address->protocol);
+    const int opened = socket(address->family, address->socktype | SOCK_CLOEXEC, address->protocol);
+    setsockopt(opened, IPPROTO_TCP, TCP_USER_TIMEOUT, &kUnansweredLimitMs, sizeof kUnansweredLimitMs);
+    return opened;
+}
+
+/// A lookup that hangs is left behind with a descriptor of its own.
+int beginLookup(void*, void*, void* lookup)
+{
+    static_cast<std::optional<PrivateDescriptors>*>(lookup)->emplace();
+    return 0;
 }
 
 /// Percent-encodes, as UTF-8, the characters that a request line cannot carry. QUrl would also alter others.
@@ -68,7 +89,10 @@ public:
         set(CURLOPT_TIMEOUT_MS, kTotalLimitMs);
         set(CURLOPT_NOSIGNAL, 1L);
         set(CURLOPT_QUICK_EXIT, 1L); // a hanging name lookup is left behind at the time limit
+        set(CURLOPT_RESOLVER_START_FUNCTION, beginLookup);
+        set(CURLOPT_RESOLVER_START_DATA, &m_lookup);
         set(CURLOPT_OPENSOCKETFUNCTION, openSocket);
+        setKeeping();
     }
 
     void setTls(const QByteArray& caCert, const QByteArray& clientCert, const QByteArray& clientKey)
@@ -133,6 +157,16 @@ public:
     }
 
 private:
+    /// A connection is used for as long as the server keeps it, however long it was idle: libcurl alone would
+    /// drop it after 118 s.
+    void setKeeping()
+    {
+        set(CURLOPT_MAXAGE_CONN, static_cast<long>(std::numeric_limits<int>::max()));
+        set(CURLOPT_TCP_KEEPALIVE, 1L);
+        set(CURLOPT_TCP_KEEPIDLE, kProbeAfterSeconds);
+        set(CURLOPT_TCP_KEEPINTVL, kProbeEverySeconds);
+    }
+
     CURLcode perform()
     {
         curl().multiAddHandle(m_multi, m_curl.get());
@@ -168,16 +202,23 @@ private:
     std::array<char, CURL_ERROR_SIZE> m_error{};
     std::unique_ptr<curl_slist, decltype(&curl_slist_free_all)> m_headerLines{nullptr, curl().slistFreeAll};
     Reception m_reception;
+    std::optional<PrivateDescriptors> m_lookup; ///< from the beginning of a name lookup
     // The last member, so the first to go: it points to the others.
     std::unique_ptr<CURL, decltype(&curl_easy_cleanup)> m_curl{curl().easyInit(), curl().easyCleanup};
 };
+
+CURLM* newMulti()
+{
+    const PrivateDescriptors withItsPipe;
+    return curl().multiInit();
+}
 
 } // namespace
 
 HttpClientApi::HttpClientApi(QObject* parent, bool)
     : QObject(parent)
     , m_share(curl().shareInit())
-    , m_multi(curl().multiInit())
+    , m_multi(newMulti())
 {
     Q_CHECK_PTR(m_share);
     Q_CHECK_PTR(m_multi);

@@ -11,7 +11,10 @@
 /// Blocking HTTPS client (HTTP/1.1, TLS 1.2 or newer) with a client certificate.
 ///
 /// A request returns when the whole reply is in; no event loop runs meanwhile. Connections and TLS sessions
-/// are kept for the life of the object and reused. Redirects are not followed and no proxy is used.
+/// are kept for the life of the object and reused: a connection for as long as the server keeps it, however
+/// long it was idle. The kernel notices within 50 s that the path of an idle one is dead; a request over one
+/// that died just now is sent again on a new connection after 10 s. Redirects are not followed and no proxy
+/// is used. Child processes inherit nothing of it.
 ///
 /// A request without a response (refused, TLS failure, time limit, truncated or oversized reply) returns 0,
 /// empties the reply and the raw headers, and logs one warning. Limits: 10 s to connect, 30 s in all; 8 MiB

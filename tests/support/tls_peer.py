@@ -69,6 +69,12 @@ def _context(identity: Identity, clients: Authority, demand: ssl.VerifyMode) -> 
     return context
 
 
+def _older_context(identity: Identity, clients: Authority) -> ssl.SSLContext:
+    context = _context(identity, clients, ssl.CERT_REQUIRED)
+    context.maximum_version = ssl.TLSVersion.TLSv1_2
+    return context
+
+
 def _outdated_context(identity: Identity, clients: Authority) -> ssl.SSLContext:
     context = _context(identity, clients, ssl.CERT_OPTIONAL)
     with warnings.catch_warnings():
@@ -83,6 +89,7 @@ def _doors(platform: Authority, stranger: Authority, proper: Identity) -> dict[s
     return {
         "proper": _context(proper, platform, ssl.CERT_OPTIONAL),
         "demanding": _context(proper, platform, ssl.CERT_REQUIRED),
+        "demanding older": _older_context(proper, platform),
         "stranger": _context(stranger.issue_server(_HOST), platform, ssl.CERT_OPTIONAL),
         "misnamed": _context(platform.issue_server("elsewhere.invalid"), platform, ssl.CERT_OPTIONAL),
         "expired": _context(platform.issue_server(_HOST, expired=True), platform, ssl.CERT_OPTIONAL),

@@ -14,6 +14,7 @@ from urllib.parse import SplitResult, parse_qsl, urlsplit
 _REPORTED_BODY = 16 * 1024  # bytes; the reader of the reports may be waiting for the answer just now
 _CLOSE_SECONDS = 5.0
 _DRIP_SECONDS = 0.2
+_IP_MINTTL, _MORE_THAN_USUAL = 21, 255  # what comes with a lower time to live is dropped
 
 
 class Over(Exception):
@@ -73,6 +74,7 @@ class Conversation:
             "body": request.body[:_REPORTED_BODY].decode(errors="backslashreplace"),
             "handshake": self._handshake,
             "resumed": self._tls.session_reused,
+            "tls": self._tls.version(),
             "protocol": self._tls.selected_alpn_protocol(),
             "client": dict(chain.from_iterable(subject)).get("commonName", ""),
         }
@@ -86,6 +88,12 @@ class Conversation:
         while self._tls.recv(4096):
             pass
         raise Over
+
+    def die(self) -> None:
+        """Answers; from then on nothing that the client sends arrives, as if its path was dead."""
+        self._tls.setsockopt(socket.IPPROTO_IP, _IP_MINTTL, _MORE_THAN_USUAL)
+        self.send(_reply())
+        self.wait_until_client_leaves()
 
     def close(self) -> None:
         """Ends the connection in order, with TLS's own good-bye."""
@@ -178,6 +186,7 @@ _ENDINGS: dict[str, tuple[bytes, Callable[[Conversation], None]]] = {
     "/announced-close": (_reply(b"{}", b"Connection: close"), Conversation.close),
     "/idle-close": (_reply(), Conversation.close),
     "/idle-reset": (_reply(), Conversation.reset),
+    "/idle-death": (b"", Conversation.die),
 }
 
 

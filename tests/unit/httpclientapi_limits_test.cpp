@@ -6,10 +6,13 @@
 #include <QRegularExpression>
 #include <QtTest>
 
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
 #include <chrono>
 #include <future>
 #include <map>
-#include <sys/stat.h>
 #include <thread>
 
 namespace {
@@ -38,6 +41,7 @@ private Q_SLOTS:
     void gives_up();
     void each_request_given_up_is_one_warning();
     void connecting_is_given_up_before_the_rest();
+    void lookup_left_behind_reaches_no_child_process();
     void cleanupTestCase() { m_warnings.reset(); }
 
 private:
@@ -111,6 +115,18 @@ void HttpClientApiLimitsTest::connecting_is_given_up_before_the_rest()
     const QStringList warnings = m_warnings->texts();
     const QRegularExpression connecting(QStringLiteral("Resolving|SSL connection|Connection timed out"));
     QCOMPARE(warnings.mid(0, 2).filter(connecting).size(), 2);
+}
+
+void HttpClientApiLimitsTest::lookup_left_behind_reaches_no_child_process()
+{
+    for (int descriptor = STDERR_FILENO + 1; descriptor < FD_SETSIZE; ++descriptor) {
+        struct stat found
+        {
+        };
+        if (fstat(descriptor, &found) == 0 && S_ISSOCK(found.st_mode)) {
+            QVERIFY((fcntl(descriptor, F_GETFD) & FD_CLOEXEC) != 0);
+        }
+    }
 }
 
 QTEST_GUILESS_MAIN(HttpClientApiLimitsTest)

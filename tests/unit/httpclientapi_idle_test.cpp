@@ -1,0 +1,29 @@
+#include "http_outcome.h"
+#include "manual_clock.h"
+#include "tls_peer.h"
+
+#include <QtTest>
+
+/// A connection that the server keeps, as the time goes by.
+class HttpClientApiIdleTest : public QObject
+{
+    Q_OBJECT
+
+private Q_SLOTS:
+    void connection_is_used_again_however_long_it_was_idle();
+};
+
+void HttpClientApiIdleTest::connection_is_used_again_however_long_it_was_idle()
+{
+    TlsPeer peer;
+    HttpClientApi client(nullptr, false);
+    client.setSSLConfig(peer.file("ca"), {}, {});
+    for (const int seconds : {0, 119, 1'000, 100'000, 1'000'000}) {
+        setClockAhead(seconds);
+        QCOMPARE(get(client, peer.url("proper", "/plain")).status, 200);
+        QCOMPARE(peer.nextRequest()[QStringLiteral("handshake")].toInt(), 1);
+    }
+}
+
+QTEST_GUILESS_MAIN(HttpClientApiIdleTest)
+#include "httpclientapi_idle_test.moc"
