@@ -4,12 +4,14 @@
 
 #include <algorithm>
 
+#include "appopenspy.h"
 #include "entryinfo.h"
 #include "handleevent.h"
 #include "launcher_guard.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 
+using velk::module::software::AppOpenSpy;
 using velk::module::software::EntryInfo;
 
 namespace {
@@ -127,6 +129,10 @@ void messageRows()
 
 void desktopRows()
 {
+    row<AppOpenSpy, QObject, __Dock*, QMap<QString, QSharedPointer<EntryInfo>>>(
+        "AppOpenSpy",
+        {QStringLiteral("QObject"), QStringLiteral("__Dock * m_dock"),
+         QStringLiteral("QMap<QString, QSharedPointer<velk::module::software::EntryInfo>> m_entries")});
     row<EntryInfo, QObject, __Entry, QString, QString, qint32>(
         "EntryInfo",
         {QStringLiteral("QObject"), QStringLiteral("__Entry m_entry"), QStringLiteral("QString m_entryId"),
