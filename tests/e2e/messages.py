@@ -6,11 +6,10 @@ import json
 from typing import Any
 
 from sandbox.events import Event
+from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 
-# The first poll comes 60 to 120 s after the start, a later one 60 to 180 s after the one before.
-SURELY_FIRST_POLL, SURELY_NEXT_POLL = 121, 181
 USER = "zhang.wei"
 
 

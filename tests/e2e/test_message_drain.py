@@ -10,9 +10,10 @@ from uuid import uuid4
 import pytest
 
 from sandbox.events import Event
+from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.e2e.messages import SURELY_NEXT_POLL, USER, answer_always, as_reply, message, poll, requests
+from tests.e2e.messages import USER, answer_always, as_reply, message, poll, requests
 from tests.e2e.wire import FORWARDED_CODE, forced_actions
 
 LESS_THAN_A_REQUEST_MAY_TAKE = 20

@@ -7,11 +7,10 @@ from typing import Any
 
 import pytest
 
+from sandbox.periods import BEFORE_ANY_POLL, SURELY_FIRST_POLL, SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from tests.e2e.messages import (
-    SURELY_FIRST_POLL,
-    SURELY_NEXT_POLL,
     USER,
     answer_always,
     as_reply,
@@ -20,8 +19,6 @@ from tests.e2e.messages import (
     requests,
 )
 from tests.e2e.wire import log_lines, next_notification
-
-BEFORE_ANY_POLL = 58
 
 
 @pytest.fixture
