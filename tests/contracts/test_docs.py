@@ -90,6 +90,14 @@ def test_test_that_the_failure_matrix_names_exists(file: str, name: str) -> None
     assert f"{prefix}{name}(" in (REPOSITORY / file).read_text()
 
 
+def test_recipes_lead_to_places_that_exist() -> None:
+    sections = (REPOSITORY / "CONTRIBUTING.md").read_text().split("\n## ")
+    recipes = "".join(section for section in sections if section.startswith("To add "))
+    named = set(re.findall(r"`((?:[a-z]\w*/)+[\w.-]*)`", recipes)) - {"contracts/dbus/INTERFACE.xml"}
+    assert len(named) > 10
+    assert [place for place in named if not (REPOSITORY / place).exists()] == []
+
+
 def installed_places() -> set[str]:
     """What the package has in its folder of documentation: files and folders, named as in the tree."""
     linked = re.findall(r" usr/share/doc/velk-session-agent/(.*)", (REPOSITORY / "debian/links").read_text())
