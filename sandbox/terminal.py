@@ -26,7 +26,6 @@ from sandbox.fakes.session_manager import SessionManager
 from sandbox.machine import commands
 from sandbox.machine.clock import Clock, ManualClock
 from sandbox.machine.files import FileView
-from sandbox.machine.network import Network
 from sandbox.machine.package_tools import Tools
 from sandbox.machine.packages import Packages
 from sandbox.machine.users import User, current_user
@@ -68,7 +67,6 @@ class Terminal:
         self.commands = commands.Commands(self.events)
         self.packages = Packages()
         self.tools = Tools(self.commands)
-        self.network = Network()
         self.senders = Senders()
         self._add_peers()
         self.system_monitor = self._monitor(self.system_bus)

@@ -29,7 +29,6 @@ COMMANDS = BOX / "bin"
 COMMAND_SOCKET = BOX / "commands.sock"
 COMMAND_RECORD = BOX / "commands.jsonl"
 REAL_TOOLS = BOX / "real"
-NETWORK_SOCKET = BOX / "network.sock"
 CLOCK = BOX / "clock"
 SYSTEM_BUS_SOCKET = Path("/run/dbus/system_bus_socket")
 

@@ -131,7 +131,7 @@ AREAS = (
         ("package_tool_test",),
         ("package_tools", "package_tool_calls"),
     ),
-    Area(f"{_FOLDER}terminal_address.cpp", "uploads", (), ("terminal_addresses",)),
+    Area(f"{_FOLDER}terminal_address.cpp", "uploads", ("terminal_address_test",), ("software_reports",)),
     Area(
         f"{_FOLDER}handleevent.cpp",
         "gateway",

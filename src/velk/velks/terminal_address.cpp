@@ -1,14 +1,10 @@
 #include "terminal_address.h"
 
-#include <QHostAddress>
-#include <QNetworkInterface>
-
 #include <algorithm>
 
-QString terminalAddress()
+QString lastIpv4Address(const QList<QHostAddress>& addresses)
 {
     QString result;
-    const QList<QHostAddress> addresses = QNetworkInterface::allAddresses();
     for (const QHostAddress& address : addresses) {
         if (address.protocol() == QAbstractSocket::IPv4Protocol && address != QHostAddress::LocalHost) {
             result = address.toString();
@@ -17,15 +13,29 @@ QString terminalAddress()
     return result;
 }
 
-QString terminalHardwareAddress()
+QString greatestHardwareAddress(const QList<InterfaceState>& interfaces)
 {
     constexpr auto upAndRunning = QNetworkInterface::IsUp | QNetworkInterface::IsRunning;
     QString result;
-    const QList<QNetworkInterface> interfaces = QNetworkInterface::allInterfaces();
-    for (const QNetworkInterface& interface : interfaces) {
-        if ((interface.flags() & upAndRunning) == upAndRunning) {
-            result = std::max(result, interface.hardwareAddress());
+    for (const InterfaceState& interface : interfaces) {
+        if ((interface.flags & upAndRunning) == upAndRunning) {
+            result = std::max(result, interface.hardwareAddress);
         }
     }
     return result;
+}
+
+QString terminalAddress()
+{
+    return lastIpv4Address(QNetworkInterface::allAddresses());
+}
+
+QString terminalHardwareAddress()
+{
+    QList<InterfaceState> interfaces;
+    const QList<QNetworkInterface> known = QNetworkInterface::allInterfaces();
+    for (const QNetworkInterface& interface : known) {
+        interfaces.append({interface.flags(), interface.hardwareAddress()});
+    }
+    return greatestHardwareAddress(interfaces);
 }
