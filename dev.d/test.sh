@@ -88,6 +88,7 @@ run_sanitize() {
             # Giving memory back asks for the time, which locks up under the tests' preloaded clock; a full
             # quarantine must not look like a leak.
             export ASAN_OPTIONS=allocator_release_to_os_interval_ms=-1:quarantine_size_mb=16
+            export LSAN_OPTIONS="print_suppressions=0 suppressions=$PWD/tests/sanitizers/leak.supp"
             VELK_PRESET=asan-ubsan exec ./dev test "$@"
             ;;
         thread)

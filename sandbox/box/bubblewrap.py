@@ -19,7 +19,16 @@ from sandbox.machine.users import USERS, User
 # Parts of the host's /etc that programs need to run and that say nothing of the host.
 _HOST_ETC = ("alternatives", "ld.so.cache", "ssl/openssl.cnf")
 _WRITABLE = ("/etc", "/home", "/run", "/tmp", "/var", str(layout.SHARE), str(layout.APPLICATIONS))
-_PASSED_ON = ("TERM", "COLORTERM", "CI", "ASAN_OPTIONS", "TSAN_OPTIONS", "VELK_AGENT", "VELK_BUILD_DIR")
+_PASSED_ON = (
+    "TERM",
+    "COLORTERM",
+    "CI",
+    "ASAN_OPTIONS",
+    "LSAN_OPTIONS",
+    "TSAN_OPTIONS",
+    "VELK_AGENT",
+    "VELK_BUILD_DIR",
+)
 _NAMESPACES = ("user", "pid", "ipc", "uts")
 # The box's network belongs to the box's own user, which one made by bubblewrap would not: the first process
 # makes it, sets it up and gives the powers for that up (see sandbox/machine/network.py).
