@@ -9,7 +9,7 @@ from matplotlib import pyplot
 
 from bench import plots
 from bench.figures import Report, number
-from bench.fleet.simulation import DAY, LATE, Load, drawn_intervals, simulate
+from bench.fleet.simulation import DAY, KEPT, LATE, Intervals, Load, drawn_intervals, simulate
 from bench.programs import bench_program
 from sandbox import REPOSITORY
 
@@ -27,36 +27,28 @@ def write(report: Report) -> list[Path]:
     drawn = drawn_intervals(bench_program("intervals"))
     loads = {title: simulate(drawn, span) for title, span in _START_SPANS.items()}
     page, plot = _DOCS / "scale.md", _DOCS / "scale.svg"
-    page.write_text(_page(loads, report))
+    page.write_text(_page(drawn, loads, report))
     _draw(
         loads, {f"{late:.0%}": simulate(drawn, _START_SPANS["an hour"], late) for late in _LATE_SHARES}, plot
     )
     return [page, plot]
 
 
-def _page(loads: dict[str, Load], report: Report) -> str:
+def _page(drawn: Intervals, loads: dict[str, Load], report: Report) -> str:
     known = {figure.name: figure.middle for figure in report.figures}
-    kept, fresh = known["wire.kept"], known["wire.fresh"]
-    spread_out = loads["an hour"]
-    polls = _mean(spread_out.polls)
-    reconnects = _mean(spread_out.reconnects)
-    per_second = (polls - reconnects) * kept + reconnects * fresh
-    fleets: list[tuple[str, ...]] = [("agents", "polls", "handshakes", "kB on the wire")]
-    fleets += [
-        (f"{fleet:,}", *(number(fleet * value) for value in (polls, reconnects, per_second / 1000)))
-        for fleet in _FLEETS
-    ]
+    polls = _mean(loads["an hour"].polls)
     spans: list[tuple[str, ...]] = [
         ("all start within", "starting requests", "polls, first hour", "polls, after two hours")
     ]
     spans += [(title, *_peaks(load)) for title, load in loads.items()]
     values = {
-        "fleets": _markdown(fleets),
+        "fleets": _markdown([("agents", "polls"), *((f"{n:,}", number(n * polls)) for n in _FLEETS)]),
+        "handshakes": _markdown(_handshakes(drawn, known)),
         "spans": _markdown(spans),
-        "kept": number(kept),
-        "fresh": number(fresh),
+        "kept": number(known["wire.kept"]),
+        "resumed": number(known["wire.resumed"]),
+        "full": number(known["wire.full"]),
         "interval": number(1 / polls),
-        "reconnects": f"{reconnects / polls:.0%}",
         "even": number(1e6 * polls),
         "late": f"{LATE:.0%}",
     }
@@ -64,6 +56,20 @@ def _page(loads: dict[str, Load], report: Report) -> str:
     for name, value in values.items():
         text = text.replace(f"@{name}@", value)
     return text
+
+
+def _handshakes(drawn: Intervals, known: dict[str, float]) -> list[tuple[str, ...]]:
+    """By how long a platform keeps connections: what a million agents mean for it in a second."""
+    rows: list[tuple[str, ...]] = [
+        ("connections are kept", "polls with a handshake", "measured", "handshakes", "kB on the wire")
+    ]
+    for name, kept in KEPT.items():
+        load = simulate(drawn, _START_SPANS["an hour"], kept=kept)
+        polls, anew = 1e6 * _mean(load.polls), 1e6 * _mean(load.reconnects)
+        sent = (polls - anew) * known["wire.kept"] + anew * known["wire.resumed"]
+        measured = f"{known[f'wire.handshakes {name}']:.0f}%"
+        rows.append((name, f"{anew / polls:.0%}", measured, number(anew), number(sent / 1000)))
+    return rows
 
 
 def _peaks(load: Load) -> tuple[str, str, str]:

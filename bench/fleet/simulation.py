@@ -10,12 +10,14 @@ from __future__ import annotations
 
 import subprocess
 from dataclasses import dataclass
+from math import inf
 
 DAY = 24 * 60 * 60
 # Share of the draws that fall into the second after the poll's.
 LATE = 0.05
 _MORNING = 8 * 60 * 60  # second of the day at which the first one starts
-_KEPT = 118  # seconds after which libcurl does not use an idle connection again
+# For how many seconds platforms keep an idle connection; the agent itself drops none.
+KEPT = {"60 s": 60.0, "200 s": 200.0, "for ever": inf}
 
 
 @dataclass(frozen=True)
@@ -45,8 +47,9 @@ def drawn_intervals(program: str) -> Intervals:
     return Intervals(first, later)
 
 
-def simulate(drawn: Intervals, span: int, late: float = LATE, seconds: int = DAY) -> Load:
-    """A fleet whose terminals start spread evenly over `span` seconds, all with an active session."""
+def simulate(drawn: Intervals, span: int, late: float = LATE, seconds: int = DAY, kept: float = inf) -> Load:
+    """A fleet whose terminals start spread evenly over `span` seconds, all with an active session. The platform
+    closes connections that have been idle for `kept` seconds."""
     load = Load([0.0] * seconds, [0.0] * seconds, [0.0] * seconds)
 
     def go_on(now: int, table: list[int], share: float) -> None:
@@ -55,7 +58,7 @@ def simulate(drawn: Intervals, span: int, late: float = LATE, seconds: int = DAY
             due = now + delay + interval
             if due < seconds:
                 load.polls[due] += share * part
-                load.reconnects[due] += share * part if interval > _KEPT else 0.0
+                load.reconnects[due] += share * part if interval >= kept else 0.0
 
     for now in range(seconds):
         if now < span:

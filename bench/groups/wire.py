@@ -1,44 +1,84 @@
-"""What a poll without messages costs on the wire, with and without a new connection."""
+"""What polls without messages cost on the wire, by how long the platform keeps an idle connection."""
 
 from __future__ import annotations
 
-from typing import Iterator
+from collections import defaultdict
+from typing import Iterator, NamedTuple
 
 from bench.bed import Bed
 from bench.figures import Figure
+from bench.fleet.simulation import KEPT
 from bench.plan import Plan
-from bench.programs import agent
+from bench.programs import Process, agent
 from sandbox.machine.clock import ManualClock
 
-_POLLS = 16
+_POLLS = 12
 _STEP = 20  # seconds
 _BETWEEN_STEPS = 0.05
 _PATIENCE = 0.2
+_TITLES = {
+    "kept": "poll over a kept connection",
+    "resumed": "poll over a new connection, TLS session resumed",
+    "full": "request over a new connection, full handshake",
+}
+
+
+class _Counts(NamedTuple):
+    handshakes: int
+    resumed: int
+    transferred: int
 
 
 def measure(plan: Plan) -> Iterator[Figure]:
-    """Bytes of TCP payload in both directions. A connection that was idle for too long is not used again."""
+    """Bytes of TCP payload in both directions, and the share of the polls that need a handshake."""
     if plan.quick:
         return
-    plan.tell(f"{_POLLS} polls on the wire")
-    kept: list[float] = []
-    fresh: list[float] = []
+    costs: dict[str, list[float]] = defaultdict(list)
+    for name, seconds in KEPT.items():
+        plan.tell(f"{_POLLS} polls of a platform that keeps connections {name}")
+        polls = _polls(seconds)
+        for way, cost in polls:
+            costs[way].append(cost)
+        connected = 100 * sum(way != "kept" for way, _ in polls[1:]) / _POLLS
+        title = f"polls with a handshake, connections kept {name}"
+        yield Figure(f"wire.handshakes {name}", title, "count", "%", [connected])
+    for way, title in _TITLES.items():
+        if costs[way]:
+            yield Figure(f"wire.{way}", title, "count", "B", costs[way])
+
+
+def _polls(kept: float) -> list[tuple[str, float]]:
+    """How an agent's start and its first polls reach the platform, and the bytes that each takes."""
     clock = ManualClock()
     with Bed(platform=True) as bed, bed.start_and_wait(agent(), clock.environment()) as process:
-
-        def counts() -> tuple[int, int]:
-            bed.platform.tell("counts")
-            handshakes, *_, transferred = bed.platform.wait_for("counts")
-            return handshakes, transferred
-
-        handshakes, transferred = counts()
+        found = [("full", float(_counts(bed).transferred))]
         for _ in range(_POLLS):
-            bed.move_clock(clock, _STEP)
-            while bed.platform.await_line("listed", _PATIENCE) is None:
-                bed.move_clock(clock, _STEP)
-            process.await_calm(_BETWEEN_STEPS)
-            handshakes_before, before = handshakes, transferred
-            handshakes, transferred = counts()
-            (kept if handshakes == handshakes_before else fresh).append(transferred - before)
-    yield Figure("wire.kept", "poll over a kept connection", "count", "B", kept)
-    yield Figure("wire.fresh", "poll with a new handshake", "count", "B", fresh)
+            before = _counts(bed)
+            _let_poll(bed, clock, process, kept)
+            after = _counts(bed)
+            found.append((_way(before, after), after.transferred - before.transferred))
+    return found
+
+
+def _let_poll(bed: Bed, clock: ManualClock, process: Process, kept: float) -> None:
+    """Move the clock to the next poll; the platform closes a connection that has been idle for so long."""
+    idle = 0
+    while idle == 0 or bed.platform.await_line("listed", _PATIENCE) is None:
+        idle += _STEP
+        if idle >= kept:
+            bed.platform.tell("close")
+            _counts(bed)  # comes after it
+        bed.move_clock(clock, _STEP)
+    process.await_calm(_BETWEEN_STEPS)
+
+
+def _way(before: _Counts, after: _Counts) -> str:
+    if after.handshakes == before.handshakes:
+        return "kept"
+    return "resumed" if after.resumed > before.resumed else "full"
+
+
+def _counts(bed: Bed) -> _Counts:
+    bed.platform.tell("counts")
+    handshakes, _lists, _reads, transferred, resumed = bed.platform.wait_for("counts")
+    return _Counts(handshakes, resumed, transferred)

@@ -6,7 +6,8 @@
 ///   messages COUNT  so many are unread from now on; the reply to the password tips tells so too, which other
 ///                   platforms' do not: an agent that is just starting begins to read at once
 ///   close           shut all connections
-///   counts          asks for: counts HANDSHAKES LISTS READS BYTES (both ways, TLS included)
+///   counts          asks for: counts HANDSHAKES LISTS READS BYTES (both ways, TLS included) RESUMED (of the
+///                   handshakes, those that resumed a TLS session)
 /// On the standard output, with the monotonic clock in nanoseconds:
 ///   ready | tips TIME (answered) | listed TIME (no message was unread) | drained BEGIN END (the first list
 ///   request and the reply to the last mark)
@@ -93,10 +94,11 @@ public:
         std::cout << "drained " << m_begin << ' ' << now() << std::endl;
     }
 
-    void tellCounts(int handshakes, uint64_t bytes)
+    void tellCounts(int handshakes, uint64_t bytes, int resumed)
     {
         const std::lock_guard lock(m_mutex);
-        std::cout << "counts " << handshakes << ' ' << m_lists << ' ' << m_reads << ' ' << bytes << std::endl;
+        std::cout << "counts " << handshakes << ' ' << m_lists << ' ' << m_reads << ' ' << bytes << ' '
+                  << resumed << std::endl;
     }
 
 private:
@@ -152,7 +154,7 @@ public:
             closeAll();
         } else if (verb == "counts") {
             const std::lock_guard lock(m_mutex);
-            m_store.tellCounts(m_handshakes, m_bytes);
+            m_store.tellCounts(m_handshakes, m_bytes, m_resumed);
         }
     }
 
@@ -166,6 +168,7 @@ private:
             {
                 const std::lock_guard lock(m_mutex);
                 ++m_handshakes;
+                m_resumed += stream.isResumed() ? 1 : 0;
                 m_connections.insert(connection);
             }
             serve(stream);
@@ -213,6 +216,7 @@ private:
     std::mutex m_mutex;
     std::set<int> m_connections;
     int m_handshakes = 0;
+    int m_resumed = 0;
     uint64_t m_bytes = 0;
 };
 

@@ -26,6 +26,8 @@ public:
     TlsStream(const TlsContext& context, int socket);
 
     [[nodiscard]] bool isOpen() const { return m_isOpen; }
+    /// Whether the handshake resumed the TLS session of an earlier connection.
+    [[nodiscard]] bool isResumed() const { return SSL_session_reused(m_ssl.get()) == 1; }
 
     /// One HTTP request: its first line and its body; false at the end of the connection.
     bool readRequest(std::string& line, std::string& body);

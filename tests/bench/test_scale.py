@@ -35,8 +35,14 @@ def test_late_draw_comes_a_second_later() -> None:
     assert (load.polls[100], load.polls[101]) == (0.75, 0.25)
 
 
-def test_only_polls_after_a_long_pause_connect_anew() -> None:
-    load = simulate(Intervals([118] * DAY, [119] * DAY), span=1, late=0, seconds=400)
+def test_only_polls_after_the_platform_has_closed_connect_anew() -> None:
+    load = simulate(Intervals([118] * DAY, [119] * DAY), span=1, late=0, seconds=400, kept=119)
 
     assert sum(load.polls) == pytest.approx(3)
     assert sum(load.reconnects) == pytest.approx(2)
+
+
+def test_agents_connect_once_to_a_platform_that_keeps_connections() -> None:
+    load = simulate(Intervals([118] * DAY, [100_000] * DAY), span=1, late=0, seconds=DAY)
+
+    assert sum(load.reconnects) == 0
