@@ -36,7 +36,7 @@ def draw_ratios(figures: Sequence[Figure], path: Path) -> None:
     with settings():
         drawing, axes = pyplot.subplots(figsize=(7, 0.22 * len(shown) + 0.8))
         places = range(len(shown))
-        axes.barh(places, [figure.ratio for figure in shown], color=_AGENT, height=0.6)
+        axes.barh(places, [figure.ratio or 0 for figure in shown], color=_AGENT, height=0.6)
         for place, figure in zip(places, shown):
             assert figure.goal
             axes.plot([figure.goal.limit] * 2, [place - 0.45, place + 0.45], color=_GOAL, linewidth=2)

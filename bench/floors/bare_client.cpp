@@ -1,11 +1,17 @@
 #include "bare_client.h"
 
+namespace {
+
+constexpr long kHttpVersion = CURL_HTTP_VERSION_1_1; // an enumerator or a long, by the library's version
+
+} // namespace
+
 BareClient::BareClient()
     : m_curl(curl_easy_init(), curl_easy_cleanup)
     , m_headers(curl_slist_append(nullptr, "Content-Type: application/json"), curl_slist_free_all)
 {
     auto* curl = m_curl.get();
-    curl_easy_setopt(curl, CURLOPT_HTTP_VERSION, static_cast<long>(CURL_HTTP_VERSION_1_1));
+    curl_easy_setopt(curl, CURLOPT_HTTP_VERSION, kHttpVersion);
     curl_easy_setopt(curl, CURLOPT_SSLVERSION, static_cast<long>(CURL_SSLVERSION_TLSv1_2));
     curl_easy_setopt(curl, CURLOPT_CAINFO, "/etc/velk/clientapi_ca.crt");
     curl_easy_setopt(curl, CURLOPT_CAPATH, nullptr);

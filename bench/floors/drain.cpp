@@ -105,7 +105,7 @@ int main(int argc, char* argv[])
     QTimer timer;
     QObject::connect(&timer, &QTimer::timeout, [&reader] { reader.poll(); });
     // A wake-up by a signal of the daemon's lets the timer look at a clock that was moved.
-    QObject::connect(&daemon, &BareDaemon::pushPolicyMsg, [] {});
+    QObject::connect(&daemon, &BareDaemon::pushPolicyMsg, &timer, &QTimer::isActive);
     timer.start(std::chrono::minutes(3));
     reader.readTips();
     startEnds();

@@ -19,6 +19,7 @@ namespace {
 
 constexpr long kConnectLimitMs = 10'000;
 constexpr long kTotalLimitMs = 30'000;
+constexpr long kHttpVersion = CURL_HTTP_VERSION_1_1; // an enumerator or a long, by the library's version
 
 // The kernel asks an idle peer whether it is there, and gives the connection up when nothing comes back for
 // 10 s, be it a probe or a request that is on its way. So a path that died is mostly known as dead before the
@@ -82,7 +83,7 @@ public:
     {
         set(CURLOPT_PROTOCOLS_STR, "https");
         // HTTP/2 would lower-case the header names, which callers compare with their case.
-        set(CURLOPT_HTTP_VERSION, static_cast<long>(CURL_HTTP_VERSION_1_1));
+        set(CURLOPT_HTTP_VERSION, kHttpVersion);
         set(CURLOPT_FOLLOWLOCATION, 0L);
         set(CURLOPT_PROXY, ""); // not even one from the environment
         set(CURLOPT_CONNECTTIMEOUT_MS, kConnectLimitMs);

@@ -140,20 +140,15 @@ void FileContentMachineIdTest::unopenableFileLeavesWhatWasKept_data()
     QTest::addColumn<FileChange>("spoil");
     QTest::addColumn<bool>("exists");
 
-    const auto row = [](const char* name, FileChange spoil, bool exists) {
+    const auto row = [](const char* name, bool exists, FileChange spoil) {
         QTest::newRow(name) << spoil << exists;
     };
-    row(
-        "missing", [] { removeAny(kMachineId); }, false);
-    row(
-        "unreadable", [] { setPermissions(kMachineId, kNoAccess); }, true);
-    row(
-        "folder",
-        [] {
-            removeAny(kMachineId);
-            QDir().mkdir(kMachineId);
-        },
-        true);
+    row("missing", false, [] { removeAny(kMachineId); });
+    row("unreadable", true, [] { setPermissions(kMachineId, kNoAccess); });
+    row("folder", true, [] {
+        removeAny(kMachineId);
+        QDir().mkdir(kMachineId);
+    });
 }
 
 void FileContentMachineIdTest::unopenableFileLeavesWhatWasKept()

@@ -172,20 +172,15 @@ void FileContentValuesTest::unopenableFileIsLoggedAndCountsAsRead_data()
     QTest::addColumn<FileChange>("prepare");
     QTest::addColumn<bool>("exists");
 
-    const auto row = [](const char* name, FileChange prepare, bool exists) {
+    const auto row = [](const char* name, bool exists, FileChange prepare) {
         QTest::newRow(name) << prepare << exists;
     };
-    row(
-        "missing", [] {}, false);
-    row(
-        "unreadable",
-        [] {
-            writeBytes(kUserInfo, R"({"is_Domain":true,"server_host":"a","server_port":"1"})");
-            setPermissions(kUserInfo, kNoAccess);
-        },
-        true);
-    row(
-        "folder", [] { QDir().mkdir(kUserInfo); }, true);
+    row("missing", false, [] { removeAny(kUserInfo); });
+    row("unreadable", true, [] {
+        writeBytes(kUserInfo, R"({"is_Domain":true,"server_host":"a","server_port":"1"})");
+        setPermissions(kUserInfo, kNoAccess);
+    });
+    row("folder", true, [] { QDir().mkdir(kUserInfo); });
 }
 
 void FileContentValuesTest::unopenableFileIsLoggedAndCountsAsRead()

@@ -143,7 +143,8 @@ void HandleEventNotificationTest::unusualValuesAreJoinedAsTheyAre()
 {
     const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerWithId);
     HandleEvent::GetInstance()->sendMessage(QStringLiteral("Reboot"), QStringLiteral("a,%5"),
-                                            QStringLiteral("%1\n\"😀\""), QString(), QStringLiteral("%%2"), 0);
+                                            QStringLiteral("%1\n\"\U0001F600\""), QString(),
+                                            QStringLiteral("%%2"), 0);
     QCOMPARE(actionHint(sentTo(service)), QStringLiteral("Reboot,a,%5,%1\n\"😀\",,%%2"));
 }
 

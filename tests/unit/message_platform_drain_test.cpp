@@ -59,14 +59,16 @@ void MessagePlatformDrainTest::init()
     m_platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("zhang.wei"), m_transfer.get());
     m_replies = 0;
     m_countingReplies = 0;
-    m_afterReply = [] {};
+    m_afterReply = nullptr;
     m_peer->forgetRequests();
     // Adds a count to the replies, while the client waits for them.
     connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, m_platform.get(), [this] {
         if (++m_replies <= m_countingReplies) {
             m_platform->OnRecvMsg(200, QString(), {{"X-Total-Count", "2"}});
         }
-        m_afterReply();
+        if (m_afterReply) {
+            m_afterReply();
+        }
     });
 }
 

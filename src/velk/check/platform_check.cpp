@@ -23,10 +23,8 @@ Answer ask(const QString& url)
     auto* gateway = HandleEvent::GetInstance();
     gateway->initHttpApi();
     Answer answer;
-    const auto connection = QObject::connect(gateway, &HandleEvent::recvPlatformMsg, gateway,
-                                             [&answer](int status, const QString& body) {
-                                                 answer = {status, body};
-                                             });
+    const auto take = [&answer](int status, const QString& body) { answer = {status, body}; };
+    const auto connection = QObject::connect(gateway, &HandleEvent::recvPlatformMsg, gateway, take);
     gateway->getPlatformMsg(url);
     QObject::disconnect(connection);
     return answer;

@@ -18,9 +18,7 @@ QtMessageHandler writeToStandardError = nullptr;
 /// process inherits the variable even where its standard error has been led elsewhere since.
 bool isStandardErrorTheJournal()
 {
-    struct stat stream
-    {
-    };
+    struct stat stream = {};
     if (fstat(STDERR_FILENO, &stream) != 0) {
         return false;
     }
