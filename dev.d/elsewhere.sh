@@ -17,6 +17,7 @@ run_elsewhere() {
     [[ -e /usr/share/debootstrap/scripts/$release ]] || fail "debootstrap knows no release '$release'"
     make_base
     make_root
+    copy_tree
     enter_root "$@"
 }
 
@@ -35,23 +36,28 @@ make_base() {
     "${as_root[@]}" rm -rf "$fresh"
 }
 
-# Unpacks the archive and puts the tree into it, unless the root of the last run was kept.
+# Unpacks the archive, unless the root of the last run was kept.
 make_root() {
     root=$ELSEWHERE/$release.root
-    home=$root/home/guest
-    [[ -z $keeps || ! -d $home ]] || return 0
+    [[ -z $keeps || ! -d $root/home/guest ]] || return 0
     "${as_root[@]}" rm -rf "$root"
     "${as_root[@]}" mkdir -p "$root"
     "${as_root[@]}" tar -C "$root" -x <"$ELSEWHERE/$release.tar"
     "${as_root[@]}" chroot "$root" sh -c '
         useradd --create-home --shell /bin/bash guest
         echo "guest ALL=(ALL) NOPASSWD: ALL" >/etc/sudoers.d/guest'
-    local copy
+}
+
+# As a clone of somebody's who has changed the same files; what was built in a root that was kept stays.
+copy_tree() {
+    local copy home=$root/home/guest
     copy=$(mktemp -d)
     git clone --quiet --no-hardlinks . "$copy/velks"
     git ls-files -z | (cd "$copy/velks" && xargs -0 rm -f)
     export_tree "$copy/velks"
-    "${as_root[@]}" cp -r "$copy/velks" "$home/velks"
+    "${as_root[@]}" mkdir -p "$home/velks"
+    "${as_root[@]}" find "$home/velks" -mindepth 1 -maxdepth 1 ! -name build -exec rm -rf {} +
+    "${as_root[@]}" cp -a "$copy/velks/." "$home/velks"
     "${as_root[@]}" chroot "$root" chown -R guest: /home/guest
     rm -rf "$copy"
 }

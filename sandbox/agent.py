@@ -14,10 +14,9 @@ from typing import IO, Callable, Mapping, Sequence
 from sandbox import REPOSITORY
 from sandbox.bus.buses import Bus
 from sandbox.bus.senders import Senders
-from sandbox.events import Events
+from sandbox.events import PATIENCE, Events
 from sandbox.machine.clock import Clock, RealTime
 
-_STOP_SECONDS = 20.0
 # For instrumented agents: the sanitizer's library need not come before the preloaded clock (preloading both
 # would make the agent's child processes hang), and its leak check, which a stopped clock breaks, stays off.
 _ASAN_WITH_PRELOAD = "verify_asan_link_order=0:detect_leaks=0"
@@ -108,7 +107,7 @@ class Agent:
         """End the agent at once."""
         self._end(lambda process: process.kill())
 
-    def wait(self, timeout: float = _STOP_SECONDS) -> int:
+    def wait(self, timeout: float = PATIENCE) -> int:
         """Wait for the agent to end by itself, which is then no surprise; the result is its exit status."""
         assert self._process and self._log, _NEVER_STARTED
         self._ending_wanted = True

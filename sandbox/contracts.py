@@ -15,7 +15,7 @@ from functools import cache
 from pathlib import Path
 from typing import Any
 
-from jsonschema import Draft202012Validator, RefResolver
+from jsonschema import Draft202012Validator
 from jsonschema.exceptions import best_match
 
 from sandbox import REPOSITORY
@@ -136,9 +136,21 @@ def _schemas() -> dict[str, Any]:
 @cache
 def _validator(name: str) -> Any:
     """Made once: reading and checking the schemas takes longer than checking a message."""
-    store = {schema["$id"]: schema for schema in _schemas().values()}
     schema = _schemas()[name]
-    return Draft202012Validator(schema, resolver=RefResolver(schema["$id"], schema, store))
+    return Draft202012Validator(schema, **_references(schema))
+
+
+def _references(schema: dict[str, Any]) -> dict[str, Any]:
+    """The argument that lets a validator find the other schemas: older libraries know no registry, newer ones
+    are about to know nothing else."""
+    known = {each["$id"]: each for each in _schemas().values()}
+    try:
+        from referencing import Registry
+    except ImportError:
+        from jsonschema import RefResolver
+
+        return {"resolver": RefResolver(schema["$id"], schema, known)}
+    return {"registry": Registry().with_contents(known.items())}
 
 
 def _no_number(constant: str) -> None:
@@ -151,7 +163,10 @@ def main() -> int:
     parser.add_argument("contract", choices=names())
     parser.add_argument("file", nargs="+", type=Path)
     arguments = parser.parse_args()
-    broken = {file: violation_of_text(arguments.contract, file.read_text()) for file in arguments.file}
+    try:
+        broken = {file: violation_of_text(arguments.contract, file.read_text()) for file in arguments.file}
+    except (OSError, UnicodeDecodeError) as error:
+        parser.error(f"cannot read what is to be checked: {error}")
     for file, complaint in broken.items():
         print(f"{file}: {complaint or 'keeps to the contract'}")
     return 1 if any(broken.values()) else 0

@@ -9,6 +9,11 @@ from typing import Any, Callable, Mapping
 
 Predicate = Callable[["Event"], bool]
 _SHOWN_CHARACTERS = 300
+# Seconds until something that does not come counts as missing: far more than even a busy machine takes.
+PATIENCE = 120.0
+# How the texts begin that the terminal has the daemon push for its own sake: no policies, so that the agent
+# does nothing about them.
+SYNC, WAKE_UP = "sync ", "wake up"
 
 
 @dataclass(frozen=True)
@@ -89,7 +94,7 @@ class Events:
         *,
         after: int = 0,
         count: int = 1,
-        timeout: float = 20.0,
+        timeout: float = PATIENCE,
         **fields: Any,
     ) -> Event:
         """The `count`th event after mark `after` that has these field values and satisfies `predicate`.

@@ -34,14 +34,22 @@ _NAMESPACES = ("user", "pid", "ipc", "uts")
 # makes it, sets it up and gives the powers for that up (see sandbox/machine/network.py).
 _POWERS = ("CAP_SYS_ADMIN", "CAP_NET_ADMIN")
 _OWN_NETWORK = ("/usr/bin/unshare", "--net")
+# Tries these powers and that network, and names the cause where they are refused.
+_CAN_BOX = REPOSITORY / "sandbox" / "can-box"
 
 
 class BoxUnavailable(Exception):
     """This host cannot run a box; the text says what to do."""
 
 
-def command(user: User, argv: Sequence[str], env: Mapping[str, str] | None = None) -> list[str]:
-    """The command line that runs `argv` as `user` in a box, with `env` added to the box's environment.
+def command(
+    user: User,
+    argv: Sequence[str],
+    env: Mapping[str, str] | None = None,
+    shown: Mapping[Path, Path] | None = None,
+) -> list[str]:
+    """The command line that runs `argv` as `user` in a box, with `env` added to the box's environment and
+    files of the host's `shown` at other places.
 
     It refers to files that are open in this process and that the child must inherit.
     """
@@ -53,6 +61,7 @@ def command(user: User, argv: Sequence[str], env: Mapping[str, str] | None = Non
         *("--uid", str(user.uid), "--gid", str(user.uid)),
         *_powers(),
         *_file_system(),
+        *(word for place, file in (shown or {}).items() for word in ("--bind", str(file), str(place))),
         *_environment(user, env or {}),
         *("--chdir", _working_folder()),
         "--",
@@ -63,20 +72,19 @@ def command(user: User, argv: Sequence[str], env: Mapping[str, str] | None = Non
 
 
 def require() -> None:
-    """Raise BoxUnavailable when bubblewrap is missing or the kernel forbids user namespaces."""
+    """Raise BoxUnavailable when bubblewrap is missing, the kernel forbids user namespaces, or the box would
+    lack the agent that is to run."""
     if not shutil.which("bwrap"):
         raise BoxUnavailable("bubblewrap is missing; install it with: apt-get install bubblewrap")
-    attempt = subprocess.run(
-        ["bwrap", "--unshare-user", *_powers(), "--ro-bind", "/", "/", *_OWN_NETWORK, "/usr/bin/true"],
-        stdin=subprocess.DEVNULL,
-        capture_output=True,
-        text=True,
-    )
+    attempt = subprocess.run([_CAN_BOX], stdin=subprocess.DEVNULL, capture_output=True, text=True)
     if attempt.returncode:
+        raise BoxUnavailable(attempt.stdout.strip())
+    agent = os.environ.get("VELK_AGENT")
+    if agent and not os.access(agent, os.X_OK):
+        raise BoxUnavailable(f"VELK_AGENT names no program: {agent}")
+    if agent and str(Path(agent).resolve().parent) in ("/", *_WRITABLE):
         raise BoxUnavailable(
-            f"this host forbids unprivileged user namespaces ({attempt.stderr.strip()}); "
-            "allow them with: sysctl kernel.unprivileged_userns_clone=1 "
-            "(or kernel.apparmor_restrict_unprivileged_userns=0)"
+            f"the box has a {Path(agent).parent} of its own; put the agent into another folder"
         )
 
 

@@ -10,10 +10,10 @@ from typing import Iterator
 from gi.repository import Gio, GLib
 
 from sandbox.bus.buses import Bus
+from sandbox.events import PATIENCE
 
 BUS = "org.freedesktop.DBus"
 _BUS_PATH = "/org/freedesktop/DBus"
-_SECONDS = 20.0
 _CHUNK = 1 << 16
 _HEAD = 16  # the first bytes of a message, which tell how long it is
 
@@ -23,7 +23,7 @@ class BareConnection:
 
     def __init__(self, bus: Bus) -> None:
         self._socket = socket.socket(socket.AF_UNIX)
-        self._socket.settimeout(_SECONDS)
+        self._socket.settimeout(PATIENCE)
         self._socket.connect(bus.address.removeprefix("unix:path="))
         self._socket.sendall(b"\0AUTH EXTERNAL " + str(os.getuid()).encode().hex().encode() + b"\r\n")
         assert self._socket.recv(_CHUNK).startswith(b"OK")

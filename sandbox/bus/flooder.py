@@ -9,8 +9,7 @@ from gi.repository import Gio, GLib
 
 from sandbox.bus.bareconnection import BUS, BareConnection, as_bytes, call_of_bus
 from sandbox.bus.buses import Bus
-
-_SECONDS = 20.0
+from sandbox.events import PATIENCE
 
 
 class Flooder:
@@ -37,12 +36,12 @@ class Flooder:
     def close(self) -> None:
         """Leave the bus, once it has taken everything that was sent."""
         self._connection.end()
-        assert self._has_ended.wait(_SECONDS), "the bus did not take everything"
+        assert self._has_ended.wait(PATIENCE), "the bus did not take everything"
         self._connection.close()
 
     def is_shown_out(self) -> bool:
         """Whether the bus has closed the connection by itself; waits for it."""
-        return self._has_ended.wait(_SECONDS)
+        return self._has_ended.wait(PATIENCE)
 
     def _take_all(self) -> None:
         for _ in self._connection.received():

@@ -14,12 +14,12 @@ from gi.repository import Gio, GLib
 from sandbox.bus.bareconnection import BUS, BareConnection, call_of_bus
 from sandbox.bus.buses import Bus
 from sandbox.bus.senders import Senders
+from sandbox.events import PATIENCE
 
 # Signals and replies, the bulk of a flood, are none of its business.
 _RULES = ["type='method_call'"]
 _MONITORING = f"{BUS}.Monitoring"
 _SERIAL = 2
-_SECONDS = 20.0
 
 
 @dataclass(frozen=True, slots=True)
@@ -54,7 +54,7 @@ class BusMonitor:
         token = next(self._tokens)
         heard = self._awaited[token] = threading.Event()
         self._bus.ask("NameHasOwner", "s", token)
-        assert heard.wait(_SECONDS), f"the monitor of the {self._bus.kind} bus has stopped"
+        assert heard.wait(PATIENCE), f"the monitor of the {self._bus.kind} bus has stopped"
 
     def close(self) -> None:
         """Overhear what has been sent so far, and then no more."""
@@ -69,7 +69,7 @@ class BusMonitor:
         ready = threading.Event()
         arguments = (line, self._bus.run, ready)
         threading.Thread(target=self._overhear, args=arguments, name="bus-monitor", daemon=True).start()
-        assert ready.wait(_SECONDS), f"the {self._bus.kind} bus allows no monitor"
+        assert ready.wait(PATIENCE), f"the {self._bus.kind} bus allows no monitor"
 
     def _overhear(self, line: BareConnection, run: int, ready: threading.Event) -> None:
         labels: dict[str, str | None] = {}

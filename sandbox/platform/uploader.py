@@ -7,11 +7,10 @@ from concurrent.futures import ThreadPoolExecutor
 from http.client import HTTPException, HTTPSConnection
 from urllib.parse import urlsplit
 
-from sandbox.events import Events
+from sandbox.events import PATIENCE, Events
 from sandbox.machine import layout
 from sandbox.platform.server import DAEMON_AGENT
 
-_SECONDS = 20.0
 _HEADERS = {"Content-Type": "application/json", "User-Agent": DAEMON_AGENT}
 
 
@@ -42,7 +41,7 @@ class Uploader:
         parts = urlsplit(address)
         context = ssl.create_default_context(cafile=str(layout.SERVER_CERTIFICATE))
         context.load_cert_chain(layout.CLIENT_CERTIFICATE, layout.CLIENT_KEY)
-        connection = HTTPSConnection(parts.hostname or "", parts.port, context=context, timeout=_SECONDS)
+        connection = HTTPSConnection(parts.hostname or "", parts.port, context=context, timeout=PATIENCE)
         try:
             connection.request("POST", parts.path, body, _HEADERS)
             connection.getresponse().read()

@@ -8,8 +8,9 @@ import struct
 from pathlib import Path
 from typing import Mapping
 
+from sandbox.events import PATIENCE
+
 SOCKET = Path("/run/systemd/journal/socket")
-_WAIT_SECONDS = 20.0
 _LARGEST = 1 << 20
 
 
@@ -21,7 +22,7 @@ class Journal:
         SOCKET.unlink(missing_ok=True)
         self._socket = socket.socket(socket.AF_UNIX, socket.SOCK_DGRAM)
         self._socket.bind(str(SOCKET))
-        self._socket.settimeout(_WAIT_SECONDS)
+        self._socket.settimeout(PATIENCE)
 
     def wait_for(self, text: str) -> Mapping[str, str]:
         """The next entry whose message contains `text`."""
