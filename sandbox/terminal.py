@@ -12,7 +12,7 @@ from sandbox.bus.buses import Bus
 from sandbox.bus.monitor import BusMonitor
 from sandbox.bus.senders import Senders
 from sandbox.contracts import Contracts
-from sandbox.events import Events
+from sandbox.events import PATIENCE, SYNC, WAKE_UP, Events
 from sandbox.fakes.base import Peer
 from sandbox.fakes.daemon import Daemon
 from sandbox.fakes.dock import Dock
@@ -24,7 +24,7 @@ from sandbox.fakes.policy_service import PolicyService
 from sandbox.fakes.screensaver import ScreenSaver
 from sandbox.fakes.session_manager import SessionManager
 from sandbox.machine import commands
-from sandbox.machine.clock import Clock, ManualClock
+from sandbox.machine.clock import Clock, ManualClock, MovableClock
 from sandbox.machine.files import FileView
 from sandbox.machine.package_tools import Tools
 from sandbox.machine.packages import Packages
@@ -133,16 +133,16 @@ class Terminal:
             )
             self.receive_all()
 
-    def sync(self) -> None:
+    def sync(self, timeout: float = PATIENCE) -> None:
         """Return once the agent has handled everything that was sent to it so far, and what it sent to the
         services because of that is recorded.
 
         The daemon pushes a policy that is no JSON, which the agent logs and ignores.
         """
-        token = f"sync {uuid4()}"
+        token = f"{SYNC}{uuid4()}"
         mark = self.events.mark()
         self.daemon.push_policy(token)
-        self.events.wait_for(lambda event: token in event.args[0], kind="log", after=mark)
+        self.events.wait_for(lambda event: token in event.args[0], kind="log", after=mark, timeout=timeout)
         self.receive_all()
 
     def receive_all(self) -> None:
@@ -169,9 +169,9 @@ class Terminal:
 
     def jump(self, seconds: int) -> None:
         """Move the agent's clock ahead and wake the agent up, but do not wait for it: it may be blocked."""
-        assert isinstance(self.clock, ManualClock), "only a ManualClock can be moved"
+        assert isinstance(self.clock, MovableClock), "this clock cannot be moved"
         self.clock.jump(seconds)
-        self.daemon.push_policy("wake up")
+        self.daemon.push_policy(WAKE_UP)
 
     def violations(self) -> list[str]:
         """In what contracts were broken so far: interfaces by a caller, JSON by the agent or the platform, or

@@ -7,6 +7,7 @@ import os
 import signal
 import subprocess
 import sys
+from pathlib import Path
 from typing import IO, Callable, Mapping, Sequence
 
 from sandbox.box import bubblewrap
@@ -30,8 +31,14 @@ def positive(text: str) -> int:
     return number
 
 
-def enter(user: User, arguments: Sequence[str], consumer: Consumer | None = None) -> int:
-    """Run this program with `arguments` in a box of `user`; the result is its exit status.
+def enter(
+    user: User,
+    arguments: Sequence[str],
+    consumer: Consumer | None = None,
+    shown: Mapping[Path, Path] | None = None,
+) -> int:
+    """Run this program with `arguments` in a box of `user`, which shows these files of the person's at places
+    of its own; the result is its exit status.
 
     With a `consumer` the program has a result stream (see `result_stream`), which the consumer reads to its
     end; without one this process becomes the box and nothing is returned.
@@ -44,7 +51,7 @@ def enter(user: User, arguments: Sequence[str], consumer: Consumer | None = None
     signal.signal(signal.SIGINT, signal.SIG_IGN)
     sys.stdout.flush()
     env: Mapping[str, str] = {_MARK: "1"} if consumer else {}
-    argv = bubblewrap.command(user, [*_PYTHON, *arguments], env)
+    argv = bubblewrap.command(user, [*_PYTHON, *arguments], env, shown or {})
     if consumer is None:
         os.execvp(argv[0], argv)
     # The box inherits the files that its command line refers to.

@@ -4,7 +4,7 @@ from __future__ import annotations
 
 from sandbox import REPOSITORY, agent
 from sandbox.box.outside import Trouble
-from sandbox.machine.clock import Accelerated, Clock, RealTime
+from sandbox.machine.clock import Accelerated, ManualClock, MovableClock
 
 
 def require_agent() -> None:
@@ -17,11 +17,10 @@ def require_agent() -> None:
     raise Trouble(f"there is no agent at {shown}; build it with: ./dev build")
 
 
-def clock(speed: int) -> Clock:
-    """A clock that runs `speed` times as fast as the real one; Trouble when the host lacks what it takes."""
-    if speed == 1:
-        return RealTime()
-    chosen = Accelerated(speed)
+def clock(speed: int) -> MovableClock:
+    """A clock that runs `speed` times as fast as the real one, or stands still with a speed of 0; Trouble
+    when the host lacks what it takes."""
+    chosen = Accelerated(speed) if speed else ManualClock()
     try:
         chosen.environment()
     except RuntimeError as error:

@@ -45,6 +45,9 @@ def _parser() -> argparse.ArgumentParser:
     )
     parser.add_argument("--log", action="store_true", help="show the agent's own log lines too")
     parser.add_argument(
+        "--table", action="store_true", help="end with what was expected and seen, one by one"
+    )
+    parser.add_argument(
         "--svg", type=Path, metavar="FILE", help="draw the timeline of the chosen scenes into this file too"
     )
     parser.add_argument(

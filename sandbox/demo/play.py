@@ -19,6 +19,11 @@ from sandbox.terminal import Terminal
 from sandbox.timeline.agenttime import AgentTime
 from sandbox.timeline.timeline import Timeline, console_for_people, console_for_picture
 
+_WHAT_NEXT = (
+    "Try it yourself: ./dev box. What was expected and seen, one by one: ./dev demo --table. "
+    "How it works: docs/architecture.md."
+)
+
 
 def play(options: Namespace) -> int:
     """Play the scenes that the options ask for; the result is the exit status."""
@@ -50,16 +55,24 @@ def _chosen(numbers: set[int] | None) -> dict[int, Scene]:
 def _tour(
     options: Namespace, scenes: dict[int, Scene], consoles: Sequence[Console]
 ) -> tuple[list[Outcome], list[str]]:
-    time = AgentTime(options.speed)
-    terminal = Terminal(clock=clock(options.speed))
+    # In a picture time passes only where something is waited for: the same code gives the same picture.
+    speed = 0 if options.svg else options.speed
+    time = AgentTime(speed)
+    terminal = Terminal(clock=clock(speed))
     timeline = Timeline(terminal.events, time, consoles, options.log)
     try:
         outcomes = Tour(terminal, timeline, options.patience).play(scenes, options.only or scenes)
     finally:
         timeline.end()
         problems = terminal.shut_down()
-    consoles[0].print(result.table(outcomes, time))
+    is_good = not problems and all(outcome.verdict == "as expected" for outcome in outcomes)
+    consoles[0].print()
+    consoles[0].print(result.scenes(outcomes))
+    if options.table or not is_good:
+        consoles[0].print(result.table(outcomes, time))
     for problem in problems:
         consoles[0].print(Text(problem, "bold red"))
     consoles[0].print(result.summary(outcomes))
+    if is_good:
+        consoles[0].print(Text(_WHAT_NEXT, "dim"))
     return outcomes, problems

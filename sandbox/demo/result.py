@@ -35,6 +35,18 @@ def table(outcomes: Sequence[Outcome], time: AgentTime) -> Table:
     return shown
 
 
+def scenes(outcomes: Sequence[Outcome]) -> Table:
+    """One line for each scene."""
+    shown = Table.grid(padding=(0, 2, 0, 0))
+    for scene in dict.fromkeys(outcome.scene for outcome in outcomes):
+        verdicts = [outcome.verdict for outcome in outcomes if outcome.scene == scene]
+        good = verdicts.count("as expected")
+        is_good = good == len(verdicts)
+        mark = Text("good" if is_good else "BAD", "green" if is_good else "bold red")
+        shown.add_row(mark, Text(scene), Text(f"{good} of {len(verdicts)}", "dim"))
+    return shown
+
+
 def summary(outcomes: Sequence[Outcome]) -> Text:
     """The tour's result in a line."""
     good = sum(outcome.verdict == "as expected" for outcome in outcomes)

@@ -10,7 +10,7 @@ from rich.padding import Padding
 from rich.rule import Rule
 from rich.text import Text
 
-from sandbox.demo.scene import Expectation, Scene, Step
+from sandbox.demo.scene import REBOOT, Expectation, Scene, Step
 from sandbox.events import Event
 from sandbox.terminal import Terminal
 from sandbox.timeline.timeline import Timeline
@@ -51,22 +51,31 @@ class Tour:
     def play(self, scenes: Mapping[int, Scene], drawn: Container[int]) -> list[Outcome]:
         """Play the scenes, which are given by number, and draw some; one outcome for each expectation of each
         scene."""
+        self._terminal.events.subscribe(self._end_at_reboot)
         for scene in scenes.values():
             scene.beforehand(self._terminal)
-        for number, scene in scenes.items():
+        for place, (number, scene) in enumerate(scenes.items(), 1):
             self._timeline.draw(number in drawn)
+            if self._goes_well:
+                self._announce(f"{number}. {scene.title}", f"  {place} of {len(scenes)}", scene.sentence)
             self._play_scene(f"{number}. {scene.title}", scene)
         return self._outcomes
+
+    def _end_at_reboot(self, event: Event) -> None:
+        """On a real terminal nobody would see what comes after it."""
+        if REBOOT.matches(event):
+            self._timeline.end()
 
     @property
     def _goes_well(self) -> bool:
         return all(outcome.verdict == "as expected" for outcome in self._outcomes)
 
+    def _announce(self, title: str, place: str, sentence: str) -> None:
+        self._timeline.print()
+        self._timeline.print(Rule(Text.assemble((title, "bold"), (place, "dim")), align="left", style="dim"))
+        self._timeline.print(Text(sentence))
+
     def _play_scene(self, title: str, scene: Scene) -> None:
-        if self._goes_well:
-            self._timeline.print()
-            self._timeline.print(Rule(Text(title, "bold"), align="left", style="dim"))
-            self._timeline.print(Text(scene.sentence))
         for step in scene.steps:
             if self._goes_well:
                 self._outcomes += self._play_step(title, step)
@@ -98,13 +107,24 @@ class Tour:
         return True
 
     def _wait_for(self, expectation: Expectation, place: int) -> Event | None:
-        due = self._cue + expectation.within / self._timeline.time.speed + self._patience
+        speed = self._timeline.time.speed
+        due = self._cue + (expectation.within / speed if speed else 0) + self._patience
         timeout = max(0.0, due - time.monotonic())
         with self._timeline.waiting(expectation.words):
+            if not speed:
+                self._let_pass(expectation, place)
             try:
                 return self._terminal.events.wait_for(expectation.matches, after=place, timeout=timeout)
             except AssertionError:
                 return None
+
+    def _let_pass(self, expectation: Expectation, place: int) -> None:
+        """Move a clock that stands still, second by second, until what is expected has come or is overdue."""
+        for _ in range(expectation.within):
+            if self._first(expectation, place):
+                return
+            self._timeline.time.move(1)
+            self._terminal.advance(1)
 
     def _next_place(self, step: Step, event: Event) -> int:
         """Where to look for what comes next."""
@@ -138,7 +158,8 @@ class Tour:
             verdict: Verdict = "as expected"
         else:
             verdict = "forbidden" if expectation.forbidden else "missing"
-        delay = (event.time - self._cue) * self._timeline.time.speed if event else 0.0
+        time_of = self._timeline.time.at
+        delay = time_of(event.time) - time_of(self._cue) if event else 0.0
         return Outcome(title, expectation, verdict, event, delay)
 
     def _first(self, expectation: Expectation, place: int) -> Event | None:

@@ -30,6 +30,7 @@ COMMAND_SOCKET = BOX / "commands.sock"
 COMMAND_RECORD = BOX / "commands.jsonl"
 REAL_TOOLS = BOX / "real"
 CLOCK = BOX / "clock"
+HISTORY = Path("/run/history")  # of the prompt; only a person's box has it
 SYSTEM_BUS_SOCKET = Path("/run/dbus/system_bus_socket")
 
 PLATFORM_HOST = "platform.box"

@@ -11,47 +11,53 @@ from sandbox.prompt.registry import command, number
 
 
 @command("open", "APPLICATION", "the user opens an application, or one more window of it")
-def open_application(desk: Desk, app: str) -> None:
+def open_application(desk: Desk, app: str) -> str:
     """Without the dock nobody will see it."""
     dock = desk.terminal.dock
     if app in dock.apps:
         dock.set_windows(app, dock.windows(app) + 1)
     else:
         dock.open_app(app, app)
+    return f"{app} has {_count(dock, app)}."
 
 
 @command("close", "APPLICATION", "the user closes an application with all its windows")
-def close_application(desk: Desk, app: str) -> None:
+def close_application(desk: Desk, app: str) -> str:
     """It must be on the dock."""
     _have_windows(_dock_with(desk, app), app, 0)
+    return f"{app} is closed."
 
 
 @command("windows", "APPLICATION COUNT", "the user opens or closes windows until there are so many")
-def windows(desk: Desk, app: str, count: str) -> None:
+def windows(desk: Desk, app: str, count: str) -> str:
     """The application must be on the dock."""
     wanted = int(number(count, int))
     if wanted < 0:
         raise Refused(f"{wanted} is no number of windows")
-    _have_windows(_dock_with(desk, app), app, wanted)
+    dock = _dock_with(desk, app)
+    _have_windows(dock, app, wanted)
+    return f"{app} has {_count(dock, app)}."
 
 
 @command("dock", "APPLICATION", "the user keeps an application on the dock, whether or not it runs")
-def dock_application(desk: Desk, app: str) -> None:
+def dock_application(desk: Desk, app: str) -> str:
     """One that is not there yet comes without a window."""
     dock = desk.terminal.dock
     if app in dock.apps:
         dock.pin(app)
     else:
         dock.open_app(app, app, docked=True, windows=0)
+    return f"{app} is kept on the dock."
 
 
 @command("undock", "APPLICATION", "the user takes an application off the dock, where it stays while it runs")
-def undock_application(desk: Desk, app: str) -> None:
+def undock_application(desk: Desk, app: str) -> str:
     """It must be on the dock."""
     dock = _dock_with(desk, app)
     dock.pin(app, False)
     if not dock.windows(app):
         dock.close_app(app)
+    return f"{app} is no longer kept on the dock."
 
 
 @command("apps", "", "the applications on the dock")
@@ -69,6 +75,11 @@ def _dock_with(desk: Desk, app: str) -> Dock:
     if app not in dock.apps:
         raise Refused(f"there is no application '{app}' on the dock; see: apps")
     return dock
+
+
+def _count(dock: Dock, app: str) -> str:
+    number = dock.windows(app) if app in dock.apps else 0
+    return "1 window" if number == 1 else f"{number} windows"
 
 
 def _have_windows(dock: Dock, app: str, number: int) -> None:

@@ -5,24 +5,30 @@ from __future__ import annotations
 from typing import Iterable
 
 from prompt_toolkit import PromptSession
-from prompt_toolkit.completion import NestedCompleter
-from prompt_toolkit.history import InMemoryHistory
+from prompt_toolkit.history import FileHistory, History, InMemoryHistory
 from prompt_toolkit.patch_stdout import patch_stdout
 from rich.text import Text
 
+from sandbox.machine import layout
+from sandbox.prompt.completion import CommandCompleter
 from sandbox.prompt.desk import Desk, Refused
-from sandbox.prompt.registry import COMMANDS, run_line
+from sandbox.prompt.registry import run_line
 from sandbox.timeline.agenttime import minutes
+
+_WELCOME = (
+    "A simulated terminal with the real agent; above goes what it says to others and they to it.",
+    "Try: policy 1201, then: advance 60. Type help for the commands, Ctrl+D to end.",
+)
 
 
 def run_prompt(desk: Desk) -> int:
     """Ask for commands while the traffic scrolls by above; Ctrl+C drops the line, Ctrl+D ends."""
-    desk.show(Text("Type help for the commands, Ctrl+D to end.", "dim"))
-    offered = {name: dict.fromkeys(known.choices(desk)) for name, known in COMMANDS.items()}
+    for line in _WELCOME:
+        desk.show(Text(line, "bold"))
     session: PromptSession[str] = PromptSession(
         "box> ",
-        history=InMemoryHistory(),
-        completer=NestedCompleter.from_nested_dict(offered),
+        history=_history(),
+        completer=CommandCompleter(desk),
         complete_while_typing=False,
         bottom_toolbar=lambda: _status_line(desk),
         refresh_interval=1,
@@ -35,6 +41,11 @@ def run_prompt(desk: Desk) -> int:
                 continue
             except EOFError:
                 return 0
+
+
+def _history() -> History:
+    """That of the runs before, where the person's own folder is shown in the box."""
+    return FileHistory(str(layout.HISTORY)) if layout.HISTORY.exists() else InMemoryHistory()
 
 
 def run_script(desk: Desk, lines: Iterable[str]) -> int:

@@ -3,7 +3,9 @@
 from __future__ import annotations
 
 import argparse
+import os
 import sys
+from pathlib import Path
 from typing import Sequence
 
 from sandbox.box import outside
@@ -20,7 +22,8 @@ def run(arguments: Sequence[str]) -> int:
 
         return session.run(options)
     user = LOCAL_USER if options.local else DOMAIN_USER
-    return outside.enter(user, ["box", *arguments], desktop_relay() if options.mirror else None)
+    relay = desktop_relay() if options.mirror else None
+    return outside.enter(user, ["box", *arguments], relay, _history())
 
 
 def _parser() -> argparse.ArgumentParser:
@@ -36,6 +39,18 @@ def _parser() -> argparse.ArgumentParser:
         "--mirror", action="store_true", help="show each notification on your own desktop as well"
     )
     return parser
+
+
+def _history() -> dict[Path, Path]:
+    """Where the box shows the file that keeps what was typed; nowhere if there is none or nobody types."""
+    state = Path(os.environ.get("XDG_STATE_HOME") or Path.home() / ".local" / "state")
+    kept = state / "velks" / "box-history"
+    try:
+        kept.parent.mkdir(parents=True, exist_ok=True)
+        kept.touch()
+    except OSError:
+        return {}
+    return {layout.HISTORY: kept} if sys.stdin.isatty() else {}
 
 
 def desktop_relay() -> Consumer | None:

@@ -2,7 +2,7 @@
 
 from __future__ import annotations
 
-from typing import Iterable
+from typing import Mapping
 
 from rich.table import Table
 from rich.text import Text
@@ -15,20 +15,31 @@ _FIRST_ERROR, _LAST_ERROR = 400, 599
 _FAULTS = {"hang": HttpFault.hang(), "garbage": HttpFault.reply(body=b"garbage"), "cut": HttpFault.cut()}
 
 
-def _off(_desk: Desk) -> Iterable[str]:
-    return ("off",)
+_MANNERS = {
+    "up": "answers",
+    "down": "refuses connections",
+    "error": "answers with this status",
+    "hang": "never answers",
+    "garbage": "answers with nonsense",
+    "cut": "breaks off in its answers",
+}
 
 
-def _manners(_desk: Desk) -> Iterable[str]:
-    return ("up", "down", "error", *_FAULTS)
+def _off(_desk: Desk) -> Mapping[str, str]:
+    return {"off": "no tip any more"}
+
+
+def _manners(_desk: Desk) -> Mapping[str, str]:
+    return _MANNERS
 
 
 @command(
     "message", "TITLE CONTENT [SENDER]", "the platform has a message, which the agent's next poll brings"
 )
-def message(desk: Desk, title: str, content: str, sender: str = "admin") -> None:
+def message(desk: Desk, title: str, content: str, sender: str = "admin") -> str:
     """For the user of the session."""
     desk.terminal.platform.post_message(desk.terminal.user.plain_name, title, content, sender)
+    return "The platform has the message; the agent asks every three minutes at the latest: advance 180"
 
 
 @command("messages", "", "the user's messages on the platform, and when they were read")
@@ -41,20 +52,22 @@ def messages(desk: Desk) -> None:
 
 
 @command("tip", "TEXT|off", "the platform warns of the password's end (asked once, at login)", _off)
-def tip(desk: Desk, text: str) -> None:
+def tip(desk: Desk, text: str) -> str:
     """Until `off`."""
     desk.terminal.platform.password_tip(desk.terminal.user.plain_name, None if text == "off" else text)
+    return "No tip is left." if text == "off" else "The agent asks for the tip when a session begins: login"
 
 
 @command("platform", "up|down|hang|error STATUS|garbage|cut", "how the platform treats requests", _manners)
-def platform(desk: Desk, manner: str, status: str | None = None) -> None:
+def platform(desk: Desk, manner: str, status: str | None = None) -> str:
     """Until `up`, which also answers what hangs."""
     if manner not in _manners(desk) or (manner == "error") != (status is not None):
         raise Refused(f"usage: {COMMANDS['platform'].usage}")
     known = desk.terminal.platform
+    told = f"The platform {_MANNERS[manner]}{f': {status}' if status else ''}."
     if manner == "down":
         known.leave()
-        return
+        return told
     if status is not None:
         known.fault = HttpFault.reply(_error(status))
     elif manner != "up":
@@ -63,6 +76,7 @@ def platform(desk: Desk, manner: str, status: str | None = None) -> None:
         known.release()
     if not known.present:
         known.appear()
+    return told
 
 
 def behaviour(platform: Platform) -> str:

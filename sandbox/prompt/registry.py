@@ -5,23 +5,24 @@ from __future__ import annotations
 import inspect
 import shlex
 from dataclasses import dataclass
-from typing import Any, Callable, Iterable
+from typing import Any, Callable, Mapping
 
-from sandbox.prompt.desk import Desk, Refused
+from sandbox.prompt.desk import Desk, Refused, guess
 
-Choices = Callable[[Desk], Iterable[str]]
+# What may be offered for an argument, each word with its meaning.
+Choices = Callable[[Desk], Mapping[str, str]]
 
 
 @dataclass(frozen=True)
 class Command:
     """One command: its name, the arguments it takes, what it does, and what may be offered for its first
-    argument. `run` gets the desk and the words after the name."""
+    argument. `run` gets the desk and the words after the name; it may return a line on what it did."""
 
     name: str
     arguments: str
     help: str
     choices: Choices
-    run: Callable[..., object]
+    run: Callable[..., str | None]
 
     @property
     def usage(self) -> str:
@@ -33,11 +34,11 @@ COMMANDS: dict[str, Command] = {}
 
 
 def command(
-    name: str, arguments: str, help: str, choices: Choices = lambda desk: ()
-) -> Callable[[Callable[..., object]], Callable[..., object]]:
+    name: str, arguments: str, help: str, choices: Choices = lambda desk: {}
+) -> Callable[[Callable[..., str | None]], Callable[..., str | None]]:
     """Make a function of the desk and some words a command of the prompt."""
 
-    def register(run: Callable[..., object]) -> Callable[..., object]:
+    def register(run: Callable[..., str | None]) -> Callable[..., str | None]:
         COMMANDS[name] = Command(name, arguments, help, choices, run)
         return run
 
@@ -50,14 +51,16 @@ def run_line(desk: Desk, line: str) -> None:
     if not name or name.startswith("#"):
         return
     if name not in COMMANDS:
-        raise Refused(f"there is no command '{name}'; see: help")
+        raise Refused(f"there is no command '{name}'; {guess(name, COMMANDS) or 'see: help'}")
     known = COMMANDS[name]
     words = _words(rest.strip())
     try:
         call = inspect.signature(known.run).bind(desk, *words)
     except TypeError:
         raise Refused(f"usage: {known.usage}") from None
-    known.run(*call.args)
+    told = known.run(*call.args)
+    if told:
+        desk.tell(told)
 
 
 def number(text: str, kind: Callable[[str], Any]) -> Any:

@@ -10,7 +10,7 @@ from rich.text import Text
 from sandbox.box import outside
 from sandbox.box.outside import Trouble
 from sandbox.box.preconditions import clock, require_agent
-from sandbox.prompt import commands, loop
+from sandbox.prompt import commands, loop, session_end
 from sandbox.prompt.desk import Desk
 from sandbox.prompt.mirror import Mirror
 from sandbox.terminal import Terminal
@@ -31,7 +31,7 @@ def run(options: Namespace) -> int:
     if result_stream:
         Mirror(terminal.events, result_stream)
     try:
-        status = _serve(Desk(terminal, timeline, console))
+        status = _serve(Desk(terminal, timeline))
     finally:
         timeline.end()
         problems = terminal.shut_down()
@@ -41,6 +41,7 @@ def run(options: Namespace) -> int:
 
 
 def _serve(desk: Desk) -> int:
+    session_end.watch(desk)
     try:
         desk.terminal.start_agent()
     except AssertionError:

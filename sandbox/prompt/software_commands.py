@@ -12,28 +12,31 @@ from sandbox.prompt.registry import command
 
 
 @command("install", "PACKAGE VERSION", "a package with an application is installed")
-def install(desk: Desk, package: str, version: str) -> None:
+def install(desk: Desk, package: str, version: str) -> str:
     """The launcher then lists the application under the package's name."""
     if _item(package) in desk.terminal.launcher.items:
         raise Refused(f"{package} is installed already; a new version comes with: update {package} VERSION")
     _put_in_place(desk, package, version)
     desk.terminal.launcher.install(_item(package))
+    return f"{package} {version} is installed."
 
 
 @command("update", "PACKAGE VERSION", "a package is updated")
-def update(desk: Desk, package: str, version: str) -> None:
+def update(desk: Desk, package: str, version: str) -> str:
     """It must be installed."""
     _require_installed(desk, package)
     _put_in_place(desk, package, version)
     desk.terminal.launcher.update(_item(package))
+    return f"{package} is {version} now."
 
 
 @command("uninstall", "PACKAGE", "a package is removed, and its application with it")
-def uninstall(desk: Desk, package: str) -> None:
+def uninstall(desk: Desk, package: str) -> str:
     """It must be installed."""
     _require_installed(desk, package)
     desk.terminal.packages.remove(package)
     desk.terminal.launcher.remove(_item(package))
+    return f"{package} is removed."
 
 
 @command("software", "", "the terminal's software as the platform knows it")

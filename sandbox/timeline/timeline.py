@@ -3,18 +3,20 @@
 from __future__ import annotations
 
 import io
+import re
 import sys
 import threading
 from contextlib import contextmanager
-from typing import Iterator, Sequence
+from typing import IO, Iterator, Sequence, cast
 
 from rich.console import Console, RenderableType
 from rich.table import Table
 from rich.text import Text
 
-from sandbox.events import Event, Events
+from sandbox.events import SYNC, WAKE_UP, Event, Events
 from sandbox.timeline import wording
 from sandbox.timeline.agenttime import AgentTime, minutes
+from sandbox.timeline.breaking import breakable
 
 _PLAIN_WIDTH = 136
 _PICTURE_WIDTH = 115  # still read where a page shows it at two thirds of its size
@@ -26,7 +28,11 @@ _LOG_KINDS = ("log", "output")
 
 def console_for_people() -> Console:
     """Standard output: as wide as the terminal, or plain text of a readable width where there is none."""
-    return Console(width=None if sys.stdout.isatty() else _PLAIN_WIDTH, highlight=False, soft_wrap=False)
+    if sys.stdout.isatty():
+        return Console(highlight=False)
+    return Console(
+        width=_PLAIN_WIDTH, highlight=False, file=cast(IO[str], _WithoutTrailingBlanks(sys.stdout))
+    )
 
 
 def console_for_picture() -> Console:
@@ -34,6 +40,21 @@ def console_for_picture() -> Console:
     return Console(
         width=_PICTURE_WIDTH, highlight=False, record=True, file=io.StringIO(), force_terminal=True
     )
+
+
+class _WithoutTrailingBlanks(io.TextIOBase):
+    """Hands on what is printed but for the blanks that fill lines up."""
+
+    def __init__(self, stream: IO[str]) -> None:
+        self._stream = stream
+
+    def write(self, text: str) -> int:
+        """Whole lines come at once."""
+        return self._stream.write(re.sub(r" +$", "", text, flags=re.MULTILINE))
+
+    def flush(self) -> None:
+        """As that of the stream."""
+        self._stream.flush()
 
 
 class Timeline:
@@ -103,21 +124,23 @@ class Timeline:
         cells = [Text(minutes(self.time.of(event)), "dim"), _route(event)]
         if width < _WIDE or event.kind in _LOG_KINDS:
             line.add_column(max_width=rest, overflow="fold")
-            cells.append(_stacked(event))
+            cells.append(_stacked(event, rest))
         else:
             half = rest * 9 // 16
             line.add_column(width=half - _GAP, overflow="fold")
             line.add_column(max_width=rest - half, overflow="fold")
-            cells += [Text(wording.what(event)), Text(wording.meaning(event), _REMARK)]
+            words = breakable(wording.what(event), half - _GAP)
+            cells += [Text(words), Text(wording.meaning(event), _REMARK)]
         line.add_row(*cells)
         return line
 
 
-def _stacked(event: Event) -> Text:
+def _stacked(event: Event, width: int) -> Text:
     """What was said and, under it, what it means."""
     style = "dim" if event.kind in _LOG_KINDS else ""
     means = wording.meaning(event)
-    return Text.assemble((wording.what(event), style), ("\n" + means if means else "", _REMARK))
+    words = breakable(wording.what(event), width)
+    return Text.assemble((words, style), ("\n" + means if means else "", _REMARK))
 
 
 class _Waiting:
@@ -144,5 +167,5 @@ def _participant(name: str) -> Text:
 
 
 def _is_probe(event: Event) -> bool:
-    """Whether this is the terminal's own question whether the agent has handled all that was sent so far."""
-    return event.member == "pushPolicyMsg" and event.args[1].startswith("sync ")
+    """Whether this is a push for the terminal's own sake."""
+    return event.member == "pushPolicyMsg" and event.args[1].startswith((SYNC, WAKE_UP))

@@ -52,6 +52,7 @@ def test_an_agent_that_does_nothing_fails_the_tour(tmp_path: Path) -> None:
 
     assert ended.returncode == 1
     assert "missing" in ended.stdout and "0 of 3 expectations" in ended.stdout
+    assert "Expected and seen" in ended.stdout and "Try it yourself" not in ended.stdout
 
 
 def test_an_agent_that_breaks_a_contract_fails_the_tour_even_if_all_else_is_well(tmp_path: Path) -> None:
@@ -83,6 +84,41 @@ def test_waiting_messages_and_the_password_warning_are_told_with_what_they_mean(
     assert counts == [["3", "unread"], ["2", "unread"], ["1", "unread"]]
     assert any("your password will expire in 3 days" in line for line in lines)
     assert any("are there unread messages?" in line for line in lines)
+
+
+def test_the_end_tells_what_came_of_each_scene_and_what_to_try_next() -> None:
+    ended = run_program("demo", "--only", "8")
+
+    assert f"8. {SCENES[7].title}  2 of 2 ──" in ended.stdout
+    *_, first, eighth, summary, next_steps = ended.stdout.splitlines()
+    assert first.split() == ["good", "1.", *SCENES[0].title.split(), "3", "of", "3"]
+    assert eighth.startswith(f"good  8. {SCENES[7].title}")
+    assert summary.endswith("expectations came out as they should.")
+    assert next_steps.startswith("Try it yourself: ./dev box.")
+    assert "Expected and seen" not in ended.stdout
+
+
+def test_what_was_expected_and_seen_is_shown_on_request() -> None:
+    assert "Expected and seen" in run_program("demo", "--only", "1", "--table").stdout
+
+
+def test_nothing_is_shown_after_the_reboot() -> None:
+    ended = run_program("demo", "--only", "14")
+
+    lines = [line for line in ended.stdout.splitlines() if line[2:3] == ":"]
+    assert "forced reboot" in lines[-1] and any("HotspotEnable" in line for line in lines)
+
+
+def test_lines_in_a_file_do_not_end_with_blanks() -> None:
+    assert not [line for line in run_program("demo", "--only", "1").stdout.splitlines() if line.endswith(" ")]
+
+
+def test_the_same_code_gives_the_same_picture(tmp_path: Path) -> None:
+    pictures = [tmp_path / name for name in ("one.svg", "two.svg")]
+    for picture in pictures:
+        assert run_program("demo", "--only", "10", "--svg", str(picture)).returncode == 0
+
+    assert pictures[0].read_text() == pictures[1].read_text()
 
 
 def test_a_scene_that_does_not_exist_is_one_line() -> None:

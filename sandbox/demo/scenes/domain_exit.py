@@ -34,8 +34,6 @@ _UNDONE = (
     from_agent("the policy service is stopped", "systemctl", "systemctl", "--global", "stop", "prys"),
     from_agent("the daemon is told", "daemon", "onDomainConfig", "remove"),
     from_agent("the identity service is off", "identity", "Set", ..., "Enable", False),
-    REBOOT,
-    NO_LOGOUT,
 )
 
 _SWITCHES = (
@@ -48,6 +46,11 @@ _SWITCHES = (
 DOMAIN_EXIT = Scene(
     "The terminal leaves the domain",
     "A warning; then everything that the domain had changed is undone; after the minute, the reboot.",
-    (Step(_remove_from_domain, _UNDONE), Step(look_at_switches, _SWITCHES)),
+    # What there is to see comes before the reboot, since nobody sees anything after it.
+    (
+        Step(_remove_from_domain, _UNDONE),
+        Step(look_at_switches, _SWITCHES),
+        Step(None, (REBOOT, NO_LOGOUT)),
+    ),
     f"The desktop's switches stand in the user's file ~/{FILE}. {NOT_REALLY}",
 )

@@ -1,0 +1,32 @@
+"""What Tab offers at the prompt: commands and what may be given to them, each with its meaning beside it."""
+
+from __future__ import annotations
+
+from typing import Iterator, Mapping
+
+from prompt_toolkit.completion import CompleteEvent, Completer, Completion
+from prompt_toolkit.document import Document
+
+from sandbox.prompt.desk import Desk
+from sandbox.prompt.registry import COMMANDS
+
+
+class CommandCompleter(Completer):
+    """Completes the first word to a command and the second one to one of the command's choices."""
+
+    def __init__(self, desk: Desk) -> None:
+        self._desk = desk
+
+    def get_completions(self, document: Document, _event: CompleteEvent) -> Iterator[Completion]:
+        """The words that go on as the line ends."""
+        *before, begun = document.text_before_cursor.split(" ")
+        for word, meaning in self._offered(before).items():
+            if word.startswith(begun):
+                yield Completion(word, -len(begun), display_meta=meaning)
+
+    def _offered(self, before: list[str]) -> Mapping[str, str]:
+        if not before:
+            return {name: known.help for name, known in COMMANDS.items()}
+        if len(before) == 1 and before[0] in COMMANDS:
+            return COMMANDS[before[0]].choices(self._desk)
+        return {}

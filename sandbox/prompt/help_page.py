@@ -1,0 +1,66 @@
+"""What `help` shows: the commands by groups, or one of them with what may be given to it."""
+
+from __future__ import annotations
+
+from typing import Mapping, Sequence
+
+from rich.console import Group, RenderableType
+from rich.table import Table
+from rich.text import Text
+
+from sandbox.prompt.desk import Desk
+from sandbox.prompt.registry import COMMANDS, Command
+
+GROUPS = {
+    "The daemon": ("policy", "online"),
+    "The user": ("lock", "unlock", "saver", "login"),
+    "Applications": ("open", "close", "windows", "dock", "undock", "apps"),
+    "Software": ("install", "update", "uninstall", "software"),
+    "The platform": ("message", "messages", "tip", "platform"),
+    "Services": ("leave", "appear", "restart", "hang", "slow", "fail", "well", "state"),
+    "The prompt": ("advance", "wait", "log", "help", "quit"),
+}
+_WIDTH = 64  # beside the groups, on a terminal of 80 columns
+_EXAMPLES = {
+    "policy 1201": "disable the terminal, then: advance 60",
+    "message Hello Lunch": "a message, which comes with: advance 180",
+    "hang notifications": "see how long the agent waits for a service",
+}
+
+
+def topics(_desk: Desk) -> Mapping[str, str]:
+    """What there is help for."""
+    return {name: known.help for name, known in COMMANDS.items()}
+
+
+def overview() -> RenderableType:
+    """All commands, and some to begin with."""
+    table = Table.grid(padding=(0, 2, 0, 0))
+    for group, names in GROUPS.items():
+        table.add_row(Text(group, "bold"), Text(_filled([COMMANDS[name].usage for name in names])))
+    examples = Table.grid(padding=(0, 2, 0, 0))
+    for line, words in _EXAMPLES.items():
+        examples.add_row(Text(f"  {line}", "cyan"), Text(words, "dim"))
+    more = Text("help COMMAND says more; Tab completes; Ctrl+D ends.", "dim")
+    return Group(table, Text("For example:"), examples, more)
+
+
+def _filled(usages: Sequence[str]) -> str:
+    """As many of them in a line as find room; none is broken."""
+    lines = [""]
+    for usage in usages:
+        if lines[-1] and len(lines[-1] + usage) > _WIDTH:
+            lines.append("")
+        lines[-1] += f"{usage}   "
+    return "\n".join(lines)
+
+
+def about(desk: Desk, known: Command) -> RenderableType:
+    """One command: how it is typed, what happens, and what may be given to it."""
+    lines = [Text.assemble((known.usage, "bold"), f"\n  {known.help}.")]
+    if known.run.__doc__:
+        lines.append(Text(f"  {known.run.__doc__}", "dim"))
+    choices = Table.grid(padding=(0, 2, 0, 2))
+    for word, meaning in known.choices(desk).items():
+        choices.add_row(word, Text(meaning, "dim"))
+    return Group(*lines, choices)

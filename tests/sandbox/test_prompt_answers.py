@@ -1,0 +1,162 @@
+"""What the prompt says to a person: an answer to every command, help, and what Tab offers."""
+
+from __future__ import annotations
+
+import pytest
+from prompt_toolkit.completion import CompleteEvent
+from prompt_toolkit.document import Document
+
+from paper import Paper
+from sandbox.policies import POLICIES
+from sandbox.prompt import commands, help_page, session_end
+from sandbox.prompt.completion import CommandCompleter
+from sandbox.prompt.desk import Refused
+from sandbox.prompt.registry import COMMANDS, run_line
+from sandbox.terminal import Terminal
+
+assert commands, "importing the module makes its commands known"
+
+_SHOW_SOMETHING_ELSE = {"apps", "messages", "software", "state", "help", "wait", "quit"}
+
+
+@pytest.fixture
+def desk(terminal: Terminal) -> Paper:
+    """A desk at a terminal with a platform, whose agent is not started."""
+    assert terminal.platform
+    return Paper(terminal)
+
+
+_ANSWERS = {
+    "policy 1300": "The daemon has pushed it.",
+    "online": "The daemon has asked who is there.",
+    "lock": "The screen is locked",
+    "unlock": "The screen is unlocked",
+    "saver on": "The screen saver is on",
+    "leave logind": "logind has left its bus; it comes back with: appear logind",
+    "restart logind": "logind is another connection now.",
+    "hang logind": "logind no longer answers; it does again with: well logind",
+    "slow logind 2": "logind answers 2 s late",
+    "fail logind": "logind answers with errors",
+    "well logind": "logind does its work.",
+    "log on": "The agent's log lines are shown.",
+    "open editor": "editor has 1 window.",
+    "dock editor": "editor is kept on the dock.",
+    "install editor 1": "editor 1 is installed.",
+    "message Title Text": "The platform has the message",
+    "tip off": "No tip is left.",
+    "platform hang": "The platform never answers.",
+    "platform error 503": "The platform answers with this status: 503.",
+}
+_AFTER = {
+    "open editor": {
+        "windows editor 2": "editor has 2 windows.",
+        "undock editor": "editor is no longer kept on the dock.",
+        "close editor": "editor is closed.",
+    },
+    "install editor 1": {"update editor 2": "editor is 2 now.", "uninstall editor": "editor is removed."},
+    "leave logind": {"appear logind": "logind is on its bus."},
+}
+
+
+@pytest.mark.parametrize("line", _ANSWERS)
+def test_a_command_is_answered_with_a_line(desk: Paper, line: str) -> None:
+    for typed, answer in {line: _ANSWERS[line], **_AFTER.get(line, {})}.items():
+        run_line(desk, typed)
+        assert desk.lines_with(answer), typed
+
+
+def test_no_command_is_left_without_an_answer() -> None:
+    answered = {line.split()[0] for line in (*_ANSWERS, *(line for more in _AFTER.values() for line in more))}
+
+    assert COMMANDS.keys() - answered == {"advance", "login", *_SHOW_SOMETHING_ELSE}
+
+
+def test_time_passes_at_once_and_the_end_of_the_session_is_told(desk: Paper) -> None:
+    session_end.watch(desk)
+    desk.terminal.start_agent()
+    run_line(desk, "policy 1201")
+
+    run_line(desk, "advance 60")
+
+    assert desk.terminal.events.wait_for(source="velks", member="Terminate")
+    run_line(desk, "advance 1")
+    assert desk.lines_with("60 s of the agent's time have passed.")
+    assert desk.lines_with("The session would end here. The next one begins with: login")
+    (ended,) = desk.lines_with("Terminate()")
+    assert ended.startswith("01:00")
+
+
+def test_timers_that_come_again_keep_their_turns(desk: Paper) -> None:
+    desk.terminal.start_agent()
+    mark = desk.terminal.events.mark()
+
+    run_line(desk, "advance 900")
+
+    assert desk.terminal.events.wait_for(member="SendUserStatus", after=mark, count=3)
+
+
+def test_time_cannot_pass_without_the_daemon_that_wakes_the_agent_up(desk: Paper) -> None:
+    run_line(desk, "leave daemon")
+
+    with pytest.raises(Refused, match="daemon is not on the bus"):
+        run_line(desk, "advance 60")
+
+
+@pytest.mark.parametrize("seconds", ["0", "-1", "86401"])
+def test_no_more_than_a_day_passes_at_once(desk: Paper, seconds: str) -> None:
+    with pytest.raises(Refused, match="is no time to pass at once"):
+        run_line(desk, f"advance {seconds}")
+
+
+@pytest.mark.parametrize("lines", [["leave daemon", "appear daemon"], ["restart daemon"]])
+def test_a_fresh_daemon_asks_who_is_there(desk: Paper, lines: list[str]) -> None:
+    for line in lines:
+        run_line(desk, line)
+
+    assert desk.terminal.events.wait_for(source="daemon", member="pushOnlineMsg")
+
+
+def test_each_command_stands_in_one_group() -> None:
+    listed = [name for names in help_page.GROUPS.values() for name in names]
+
+    assert sorted(listed) == sorted(COMMANDS)
+
+
+def test_help_for_a_command_tells_what_may_be_given_to_it(desk: Paper) -> None:
+    run_line(desk, "help policy")
+
+    assert desk.lines_with("policy CODE [UID] | {JSON}")
+    for policy in POLICIES.values():
+        (line,) = desk.lines_with(f"{policy.code} ")
+        assert policy.meaning in line
+
+
+@pytest.mark.parametrize(
+    ("line", "guess"),
+    [
+        ("polcy 1300", "there is no command 'polcy'; did you mean policy?"),
+        ("help instal", "there is no command 'instal'; did you mean install?"),
+        ("hang damon", "there is no service 'damon'; did you mean daemon?"),
+    ],
+)
+def test_a_slip_is_met_with_a_guess(desk: Paper, line: str, guess: str) -> None:
+    with pytest.raises(Refused) as refused:
+        run_line(desk, line)
+
+    assert str(refused.value) == guess
+
+
+@pytest.mark.parametrize(
+    ("typed", "offered"),
+    [
+        ("pol", {"policy": COMMANDS["policy"].help}),
+        ("policy 130", {str(code): POLICIES[code].meaning for code in POLICIES if 1300 <= code < 1310}),
+        ("policy 1300 ", {}),
+        ("hang d", {"daemon": "com.norix.velk.velkg", "dock": "com.norix.kpx.daemon.Dock"}),
+        ("dance ", {}),
+    ],
+)
+def test_tab_offers_words_with_their_meaning(desk: Paper, typed: str, offered: dict[str, str]) -> None:
+    found = CommandCompleter(desk).get_completions(Document(typed), CompleteEvent())
+
+    assert {each.text: each.display_meta_text for each in found} == offered
