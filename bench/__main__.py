@@ -3,7 +3,6 @@
 from __future__ import annotations
 
 import argparse
-import sys
 from pathlib import Path
 from typing import Sequence
 
@@ -14,6 +13,7 @@ from bench import comparison, figures, runner, table
 from bench.figures import Figure, Report
 from bench.runner import GROUPS, Options
 from sandbox import REPOSITORY
+from sandbox.ending import exit_with
 
 _BASELINE = Path(__file__).with_name("baseline.json")
 _REPORT = REPOSITORY / "build" / "bench" / "report.json"
@@ -31,11 +31,18 @@ def _parser() -> argparse.ArgumentParser:
         "--quick", action="store_true", help="only instructions and memory, judged by bench/baseline.json"
     )
     parser.add_argument("--json", type=Path, metavar="FILE", help="where the figures go; others there stay")
-    parser.add_argument("--compare", type=Path, metavar="FILE", help="show what changed since this run")
+    parser.add_argument("--compare", type=_report, metavar="FILE", help="show what changed since this run")
     parser.add_argument("--no-measure", action="store_true", help="show the figures of the last run again")
     parser.add_argument("--write-docs", action="store_true", help="write docs/performance.md, docs/scale.md")
     parser.add_argument("--write-baseline", action="store_true", help="let CI judge by this quick run")
     return parser
+
+
+def _report(name: str) -> Report:
+    try:
+        return figures.load(Path(name))
+    except (OSError, ValueError, KeyError, TypeError) as error:
+        raise argparse.ArgumentTypeError(f"{name} is no report of a run ({error})") from error
 
 
 def _options(arguments: argparse.Namespace) -> Options:
@@ -143,8 +150,7 @@ def _after(arguments: argparse.Namespace, report: Report, console: Console) -> i
         written = [*document.write(report), *page.write(report)]
         console.print("written: " + ", ".join(str(path.relative_to(REPOSITORY)) for path in written))
     if arguments.compare:
-        earlier = figures.load(arguments.compare).figures
-        console.print(table.comparison_table(comparison.changes(report.figures, earlier)))
+        console.print(table.comparison_table(comparison.changes(report.figures, arguments.compare.figures)))
     if arguments.write_baseline:
         _steady(report).save(_BASELINE)
         return 0
@@ -152,4 +158,4 @@ def _after(arguments: argparse.Namespace, report: Report, console: Console) -> i
 
 
 if __name__ == "__main__":
-    sys.exit(main())
+    exit_with(main)

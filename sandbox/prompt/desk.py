@@ -13,7 +13,7 @@ from sandbox.fakes.base import Peer
 from sandbox.terminal import Terminal
 from sandbox.timeline.timeline import Timeline
 
-_ANSWER_SECONDS = 2.0
+_ANSWER_SECONDS = 5.0
 _STEP = 10
 
 

@@ -11,9 +11,9 @@ import os
 import re
 import shutil
 import subprocess
-import sys
 from pathlib import Path
 
+from sandbox.ending import exit_with
 from sandbox.policies import POLICIES
 
 _HERE = Path(__file__).resolve().parent
@@ -116,4 +116,4 @@ def main() -> int:
 
 
 if __name__ == "__main__":
-    sys.exit(main())
+    exit_with(main)

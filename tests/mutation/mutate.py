@@ -17,6 +17,7 @@ from queue import SimpleQueue
 from random import Random
 from typing import Container, Iterable, Literal, Sequence
 
+from sandbox.ending import exit_with
 from tests.mutation import explanations
 from tests.mutation.areas import Area, area_of, chosen
 from tests.mutation.mutants import Mutant, mutants
@@ -79,9 +80,9 @@ def judge_all(
         return list(workers.map(judge, tasks))
 
 
-def report(tasks: Sequence[Task], outcomes: Sequence[Outcome], left_out: int) -> int:
+def report(tasks: Sequence[Task], outcomes: Sequence[Outcome], left_out: int, is_sample: bool) -> int:
     """Say what came of each component; the result is the exit status. The share is that of the mutants that
-    are not explained."""
+    are not explained; a sample is too small to be judged by it."""
     weak = []
     print(f"\n{'component':16}{'mutants':>9}{'explained':>11}{'caught':>9}{'survived':>10}")
     for component in sorted({task.component for task in tasks}):
@@ -91,7 +92,7 @@ def report(tasks: Sequence[Task], outcomes: Sequence[Outcome], left_out: int) ->
         share = 100 * caught / (caught + survived) if caught + survived else 100.0
         whole = count.total() - count["invalid"]
         print(f"{component:16}{whole:>9}{count['explained']:>11}{caught:>9}{survived:>10}{share:>8.1f} %")
-        if share < _LEAST_CAUGHT:
+        if share < _LEAST_CAUGHT and not is_sample:
             weak.append(component)
     invalid = outcomes.count("invalid")
     print(f"not counted: {invalid} that do not compile, {left_out} that change no more than a log text")
@@ -115,7 +116,7 @@ def main() -> int:
         print(f"mutate: {trouble}", file=sys.stderr)
         return 1
     _VERDICTS.write_text("".join(f"{outcome} {task.mutant}\n" for task, outcome in zip(tasks, outcomes)))
-    return report(tasks, outcomes, left_out)
+    return report(tasks, outcomes, left_out, options.limit is not None)
 
 
 def _require_fresh(known: Iterable[explanations.Key], tasks: Sequence[Task]) -> None:
@@ -147,4 +148,4 @@ def _parser() -> argparse.ArgumentParser:
 
 
 if __name__ == "__main__":
-    sys.exit(main())
+    exit_with(main)

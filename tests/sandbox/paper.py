@@ -18,7 +18,7 @@ class Paper(Desk):
     def __init__(self, terminal: Terminal) -> None:
         self.paper = io.StringIO()
         console = Console(file=self.paper, width=130)
-        super().__init__(terminal, Timeline(terminal.events, AgentTime(1), [console]))
+        super().__init__(terminal, Timeline(terminal.events, AgentTime(0), [console]))
 
     def lines_with(self, text: str) -> list[str]:
         """The printed lines that hold a text."""
