@@ -14,6 +14,9 @@ from tests.e2e.wire import carries_out_policies
 PLAIN = {"QT_MESSAGE_PATTERN": "%{if-category}%{category}: %{endif}%{message}"}
 
 
+MORE_THAN_A_JOURNAL_QUEUES = 1500
+
+
 @pytest.fixture
 def journal() -> Iterator[Journal]:
     """A journal that takes entries."""
@@ -93,3 +96,34 @@ def test_journal_that_has_gone_does_not_stop_the_agent(
     start_as_service(terminal, journal, tmp_path)
     journal.close()
     carries_out_policies(terminal)
+
+
+def test_journal_that_comes_back_takes_lines_again(
+    terminal: Terminal, journal: Journal, tmp_path: Path
+) -> None:
+    start_as_service(terminal, journal, tmp_path)
+    journal.close()
+    back = Journal()
+    terminal.daemon.push_policy("to the new journal")
+    assert "to the new journal" in back.wait_for("onPolicyMsg")["MESSAGE"]
+    back.close()
+
+
+def test_journal_that_hangs_holds_nothing_up_and_is_told_what_it_missed(
+    terminal: Terminal, journal: Journal, tmp_path: Path
+) -> None:
+    start_as_service(terminal, journal, tmp_path)
+    mark = terminal.events.mark()
+    for _ in range(MORE_THAN_A_JOURNAL_QUEUES):
+        terminal.daemon.push_policy("no JSON")
+    terminal.daemon.push_policy({"type": 1300})
+    terminal.events.wait_for(member="Notify", after=mark)
+
+    journal.wait_for("getCurrentLoginUser")  # makes room
+    terminal.daemon.push_policy("no JSON")
+    lost = journal.wait_for("log lines are lost")
+    assert 0 < int(lost["MESSAGE"].split()[0]) <= MORE_THAN_A_JOURNAL_QUEUES + 10
+    assert lost["MESSAGE"].endswith("log lines are lost, the journal did not take them")
+    assert lost["PRIORITY"] == "4"
+    assert "no JSON" in journal.wait_for("onPolicyMsg")["MESSAGE"]
+    assert terminal.agent.log == ""

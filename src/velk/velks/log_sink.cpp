@@ -1,14 +1,17 @@
 #include "log_sink.h"
 
 #include <QMessageLogContext>
+#include <QMutex>
 #include <QString>
+#include <QtEndian>
 
 #include <sys/stat.h>
 #include <syslog.h>
 #include <unistd.h>
 
-#define SD_JOURNAL_SUPPRESS_LOCATION // the place of the log call is told, not that of this file
-#include <systemd/sd-journal.h>
+#include <cerrno>
+
+#include "journal_socket.h"
 
 namespace {
 
@@ -44,18 +47,69 @@ int priorityOf(QtMsgType type)
     return LOG_INFO;
 }
 
-void writeToJournal(QtMsgType type, const QMessageLogContext& context, const QString& text)
+/// A field in the form that lets its value hold line breaks.
+QByteArray field(const char* name, const QByteArray& value)
+{
+    QByteArray length(sizeof(quint64), Qt::Uninitialized);
+    qToLittleEndian(static_cast<quint64>(value.size()), length.data());
+    return QByteArray(name) + '\n' + length + value + '\n';
+}
+
+QByteArray entry(QtMsgType type, const QMessageLogContext& context, const QByteArray& line)
+{
+    return field("MESSAGE", line) + field("PRIORITY", QByteArray::number(priorityOf(type)))
+        + field("CODE_FILE", context.file) + field("CODE_LINE", QByteArray::number(context.line))
+        + field("CODE_FUNC", functionName(context.function))
+        + field("SYSLOG_IDENTIFIER", program_invocation_short_name);
+}
+
+QByteArray lineOf(QtMsgType type, const QMessageLogContext& context, const QString& text)
 {
     const QByteArray line = qFormatLogMessage(type, context, text).toUtf8();
-    const QByteArray function = functionName(context.function);
-    // libsystemd's own format function cuts a text at a NUL byte, as Qt does on standard error.
-    const int result =
-        sd_journal_send("MESSAGE=%s", line.constData(), "PRIORITY=%i", priorityOf(type), "CODE_FILE=%s",
-                        context.file != nullptr ? context.file : "", "CODE_LINE=%i", context.line,
-                        "CODE_FUNC=%s", function.constData(), nullptr);
-    if (result < 0) {
-        writeToStandardError(type, context, text);
+    return line.constData(); // a text ends at a NUL byte, as Qt ends it on standard error
+}
+
+/// The journal and what it did not take. Qt logs from any thread.
+class Journal
+{
+public:
+    void write(QtMsgType type, const QMessageLogContext& context, const QString& text)
+    {
+        const QMutexLocker locker(&m_mutex);
+        tellDropped();
+        switch (m_socket.send(entry(type, context, lineOf(type, context, text)))) {
+        case JournalSocket::Result::Taken:
+            break;
+        case JournalSocket::Result::Dropped:
+            ++m_dropped;
+            break;
+        case JournalSocket::Result::Gone:
+            writeToStandardError(type, context, text);
+            break;
+        }
     }
+
+private:
+    void tellDropped()
+    {
+        const QByteArray line =
+            QByteArray::number(m_dropped) + " log lines are lost, the journal did not take them";
+        if (m_dropped > 0
+            && m_socket.send(entry(QtWarningMsg, QMessageLogContext(), line))
+                == JournalSocket::Result::Taken) {
+            m_dropped = 0;
+        }
+    }
+
+    QMutex m_mutex;
+    JournalSocket m_socket;
+    int m_dropped = 0;
+};
+
+void writeToJournal(QtMsgType type, const QMessageLogContext& context, const QString& text)
+{
+    static Journal& journal = *new Journal; // lines may still come when all else is gone
+    journal.write(type, context, text);
 }
 
 } // namespace
