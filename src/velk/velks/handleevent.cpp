@@ -11,6 +11,7 @@
 
 #include "constants.h"
 #include "httpclientapi.h"
+#include "log_text.h"
 #include "services.h"
 
 namespace {
@@ -75,7 +76,7 @@ HandleEvent::PlatformReply HandleEvent::requestPlatform(const char* operation, c
     QString body;
     const int status = m_http->getRequest(body, url, content, true);
     const auto headers = m_http->getRawHeader();
-    qInfo() << operation << "----nCode:" << status << ":" << body << ":" << headers.size();
+    qInfo().noquote() << operation << "----nCode:" << status << ":" << quoted(body) << ":" << headers.size();
     Q_EMIT recvPlatformMsg(status, body, headers);
     return {status, body};
 }

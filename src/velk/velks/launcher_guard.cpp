@@ -15,6 +15,7 @@
 #include "constants.h"
 #include "file_manager.h"
 #include "launcherd.h"
+#include "log_text.h"
 #include "memory.h"
 #include "package_tool.h"
 #include "service_arrival.h"
@@ -46,7 +47,7 @@ PackageToolRun runCommandLine(const QString& commandLine, const QProcessEnvironm
 std::optional<QList<SoftwareInfo>> recordsOf(const QString& path)
 {
     const QString text = FileManager::GetInstance()->readFile(path);
-    qInfo() << " SoftwareGuard::getSoftwareList---------" << path << ":" << text;
+    qInfo().noquote() << " SoftwareGuard::getSoftwareList---------" << quoted(path) << ":" << quoted(text);
 
     QJsonParseError error{};
     const QJsonDocument document = QJsonDocument::fromJson(text.toLocal8Bit(), &error);

@@ -14,6 +14,7 @@
 #include "handleevent.h"
 #include "launcher_guard.h"
 #include "libvelkkpx.h"
+#include "log_text.h"
 #include "prys_interface.h"
 #include "service_status.h"
 #include "services.h"
@@ -120,8 +121,8 @@ void MessageTransfer::announceAgain()
 
 void MessageTransfer::onPolicyMsg(const QString& /*appID*/, const QString& payload)
 {
-    qInfo() << "onPolicyMsg"
-            << "---------payload:" << payload;
+    qInfo().noquote() << "onPolicyMsg"
+                      << "---------payload:" << quoted(payload);
     std::optional<QJsonObject> message = parsePolicyMessage(payload);
     if (!message) {
         return;
@@ -214,8 +215,8 @@ void MessageTransfer::uploadSoftwareChange(int change, const QStringList& info)
     report.time = QDateTime::currentDateTime();
 
     const QString text = softwareChangeReport(report);
-    qInfo() << "uploadSoftware"
-            << "---------" << text;
+    qInfo().noquote() << "uploadSoftware"
+                      << "---------" << quoted(text);
     m_velkgInterface->onUploadFinished(velk::kUploadInfoLogUrl, text);
 }
 
