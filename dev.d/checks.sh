@@ -23,13 +23,21 @@ run_lint() {
     need_packages build terminal tests lint
     local sources failed=() check
     mapfile -t sources <<<"$(cpp_files)"
-    for check in clang_format black flake8 mypy shellcheck xmllint clang_tidy; do
+    for check in limits clang_format black flake8 mypy shellcheck xmllint clang_tidy; do
         echo "lint: $check"
         [[ $check != clang_tidy ]] || build # it reads what the build generates
         narrate "$check" "check_$check" || failed+=("$check")
     done
     ((${#failed[@]} == 0)) || fail "lint: not clean: $(join_words "${failed[@]}")"
     echo "lint: all clean"
+}
+
+# Of files, and of functions in Python; of functions in C++, clang-tidy knows them.
+check_limits() {
+    {
+        printf '%s\n' "${sources[@]}"
+        git ls-files --cached --others --exclude-standard '*.py' | existing
+    } | xargs "$PYTHON" tests/lint/limits.py
 }
 
 check_clang_format() {

@@ -66,6 +66,7 @@ class Tree:
         self.stand_in("sudo", '"$@"')
         for name in ("sandbox/__main__", "pytest", "bench/__main__"):
             self.write(f"{name}.py", _MODULE.format(name=name.split("/")[0]))
+        self.write("tests/lint/limits.py", _MODULE.format(name="limits"))
         self.write("source.cpp", "")
         self.stand_in("git", _GIT)
 

@@ -90,6 +90,12 @@ def test_every_check_is_made_whichever_fails(tree: Tree, failing: str) -> None:
     assert {call.split()[0] for call in tree.calls(*CHECKS)} == set(CHECKS)
 
 
+def test_a_tree_with_a_file_that_is_too_large_is_not_clean(tree: Tree) -> None:
+    tree.extra = {"STATUS_OF_limits": "1"}
+
+    assert refused(tree.dev("lint")) == "lint: not clean: limits"
+
+
 def test_a_clean_tree_is_clean(tree: Tree) -> None:
     ended = tree.dev("lint")
 
