@@ -30,12 +30,10 @@ int main(int argc, char* argv[])
     qputenv("TZ", "UTC");
     const QCoreApplication application(argc, argv);
     MessagePlatform platform(nullptr, QString(), nullptr);
-    constexpr int shortest = 60000;
-    constexpr int longestFirst = 120000;
-    constexpr int longest = 180000;
     for (second = 0; second < kSecondsOfDay; ++second) {
-        const int first = platform.generateRandnum(longestFirst, shortest);
-        std::printf("%d %d\n", first, platform.generateRandnum(longest, shortest));
+        const int first = platform.generateRandnum(kLongestFirstPollInterval, kShortestPollInterval);
+        const int later = platform.generateRandnum(kLongestPollInterval, kShortestPollInterval);
+        std::printf("%d %d\n", first, later);
     }
     return 0;
 }

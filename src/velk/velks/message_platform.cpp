@@ -17,11 +17,6 @@
 
 namespace {
 
-// Poll intervals in milliseconds; each is drawn anew.
-constexpr int kShortestInterval = 60000;
-constexpr int kLongestFirstInterval = 120000;
-constexpr int kLongestInterval = 180000;
-
 /// Seconds since the epoch; the platform knows them as 32 bits.
 quint32 currentSeconds()
 {
@@ -111,7 +106,7 @@ void MessagePlatform::initPlatformMessage()
 {
     m_timer = new QTimer;
     connect(m_timer, &QTimer::timeout, this, &MessagePlatform::onUnReadMessages);
-    m_timer->start(generateRandnum(kLongestFirstInterval, kShortestInterval));
+    m_timer->start(generateRandnum(kLongestFirstPollInterval, kShortestPollInterval));
 }
 
 int MessagePlatform::generateRandnum(const int& max, const int& min)
@@ -136,7 +131,7 @@ void MessagePlatform::onUnReadMessages()
     }
     unreadMessages(m_userName, 1, 1);
     m_timer->stop();
-    m_timer->start(generateRandnum(kLongestInterval, kShortestInterval));
+    m_timer->start(generateRandnum(kLongestPollInterval, kShortestPollInterval));
 }
 
 void MessagePlatform::unreadMessages(const QString& uid, const int& page, const int& limit)

@@ -12,6 +12,11 @@
 class MessageTransfer;
 class QTimer;
 
+// Intervals between polls in milliseconds; each is drawn anew.
+constexpr int kShortestPollInterval = 60000;
+constexpr int kLongestFirstPollInterval = 120000;
+constexpr int kLongestPollInterval = 180000;
+
 /// The parameters of one list request.
 struct NotifyMessageOption
 {
