@@ -2,7 +2,7 @@
 
 #include <QDBusArgument>
 
-#include "remote_interface.h"
+#include "remote_object.h"
 
 __Dock::__Dock(const QString& service, const QString& path, const QDBusConnection& connection,
                QObject* parent)
@@ -11,7 +11,7 @@ __Dock::__Dock(const QString& service, const QString& path, const QDBusConnectio
 
 QList<QDBusObjectPath> __Dock::entries() const
 {
-    const auto argument = RemoteInterface{connection(), service(), path(), interface()}
+    const auto argument = desktopproxies::RemoteObject{connection(), service(), path(), interface()}
                               .read(QStringLiteral("Entries"))
                               .value<QDBusArgument>();
     if (argument.currentSignature() != QLatin1String("ao")) {

@@ -9,7 +9,7 @@
 #include <optional>
 
 #include "entry_signals.h"
-#include "remote_interface.h"
+#include "remote_object.h"
 #include "types.h"
 
 /// Proxy of one entry of the desktop's dock. The desktop's library gives its proxies names with underscores.
@@ -65,7 +65,7 @@ private:
     void noticeWindowInfos(const WindowInfoMap& infos);
     void noticeName(const QString& name);
 
-    RemoteInterface m_object;
+    desktopproxies::RemoteObject m_object;
     std::shared_ptr<EntrySignals> m_signals;
     bool m_isValid = true;
     std::optional<QString> m_id; ///< unset until the dock has told it

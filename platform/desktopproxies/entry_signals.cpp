@@ -4,7 +4,7 @@
 #include <QHash>
 #include <QStringList>
 
-#include "remote_interface.h"
+#include "remote_object.h"
 
 std::shared_ptr<EntrySignals> EntrySignals::of(const QDBusConnection& bus, const QString& service,
                                                const QString& interface)
@@ -23,8 +23,8 @@ EntrySignals::EntrySignals(QDBusConnection bus, const QString& service, const QS
 {
     const QString anyPath;
     const QString anyMember;
-    bus.connect(service, anyPath, kPropertiesInterface, QStringLiteral("PropertiesChanged"), {interface},
-                QString(), this, SLOT(onPropertiesChanged(QDBusMessage)));
+    bus.connect(service, anyPath, desktopproxies::kPropertiesInterface, QStringLiteral("PropertiesChanged"),
+                {interface}, QString(), this, SLOT(onPropertiesChanged(QDBusMessage)));
     bus.connect(service, anyPath, interface, anyMember, this, SLOT(onOwnSignal(QDBusMessage)));
 }
 

@@ -1,19 +1,23 @@
-#include "remote_interface.h"
+#include "remote_object.h"
 
-QDBusMessage RemoteInterface::readCall(const QString& property) const
+namespace desktopproxies {
+
+QDBusMessage RemoteObject::readCall(const QString& property) const
 {
     auto call = QDBusMessage::createMethodCall(service, path, kPropertiesInterface, QStringLiteral("Get"));
     call << interface << property;
     return call;
 }
 
-QDBusReply<QDBusVariant> RemoteInterface::get(const QString& property) const
+QDBusReply<QDBusVariant> RemoteObject::get(const QString& property) const
 {
     return bus.call(readCall(property));
 }
 
-QVariant RemoteInterface::read(const QString& property) const
+QVariant RemoteObject::read(const QString& property) const
 {
     const QDBusReply<QDBusVariant> reply = get(property);
     return reply.isValid() ? reply.value().variant() : QVariant();
 }
+
+} // namespace desktopproxies

@@ -7,11 +7,14 @@
 #include <QString>
 #include <QVariant>
 
+/// Apart from what programs that link this library call by the same names.
+namespace desktopproxies {
+
 /// The D-Bus interface of every object's properties.
 inline const QString kPropertiesInterface = QStringLiteral("org.freedesktop.DBus.Properties");
 
 /// One interface of one object of a service.
-struct RemoteInterface
+struct RemoteObject
 {
     QDBusConnection bus;
     QString service;
@@ -28,3 +31,5 @@ struct RemoteInterface
     /// The same, with an invalid value in place of the error.
     QVariant read(const QString& property) const;
 };
+
+} // namespace desktopproxies
