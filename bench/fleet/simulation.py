@@ -48,8 +48,8 @@ def drawn_intervals(program: str) -> Intervals:
 
 
 def simulate(drawn: Intervals, span: int, late: float = LATE, seconds: int = DAY, kept: float = inf) -> Load:
-    """A fleet whose terminals start spread evenly over `span` seconds, all with an active session. The platform
-    closes connections that have been idle for `kept` seconds."""
+    """A fleet whose terminals start spread evenly over `span` seconds, all with an active session. The
+    platform closes connections that have been idle for `kept` seconds."""
     load = Load([0.0] * seconds, [0.0] * seconds, [0.0] * seconds)
 
     def go_on(now: int, table: list[int], share: float) -> None:

@@ -31,13 +31,6 @@ namespace {
 constexpr int kActionDelay = 60000; // ms between a warning and its forced action
 constexpr int kStatePeriod = 300000; // ms between two reports of the session's state
 
-/// The status codes of SendUserStatus; they are not the values of Screen_State.
-enum UserStatus {
-    UserActive = 1,
-    UserLocked = 2,
-    UserBehindScreenSaver = 3,
-};
-
 UserStatus statusOf(MessageTransfer::Screen_State state)
 {
     switch (state) {

@@ -9,6 +9,13 @@ struct LoginUser
     qint32 uid = 0;
 };
 
+/// The session's state as SendUserStatus tells it; not the values of MessageTransfer::Screen_State.
+enum UserStatus {
+    UserActive = 1,
+    UserLocked = 2,
+    UserBehindScreenSaver = 3,
+};
+
 /// These ask the service at once, each for the D-Bus time limit at most.
 LoginUser loginUser();
 QString loginUserName();
