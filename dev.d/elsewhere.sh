@@ -5,17 +5,20 @@
 readonly ELSEWHERE=$PWD/build/elsewhere
 
 run_elsewhere() {
-    local release=${1:-} keeps='' as_root=() missing=(debootstrap)
+    release=${1:-} keeps='' as_root=()
     [[ $release != --keep ]] || { keeps=yes; shift; release=${1:-}; }
     [[ $release =~ ^[a-z]+$ ]] || refuse elsewhere "it needs the name of a release, such as bookworm or trixie"
     shift
     require_git
     require_space 3000
-    ((EUID == 0)) || as_root=(sudo)
-    require_sudo
+    if ((EUID)); then
+        command -v sudo >/dev/null || fail "this must be root to make a root, and there is no sudo"
+        as_root=(sudo)
+    fi
     need_packages elsewhere
     [[ -e /usr/share/debootstrap/scripts/$release ]] || fail "debootstrap knows no release '$release'"
     make_base
+    trap leave_root EXIT
     make_root
     copy_tree
     enter_root "$@"
@@ -63,10 +66,12 @@ copy_tree() {
 }
 
 enter_root() {
-    local status=0
     "${as_root[@]}" unshare --mount --pid --ipc --uts --fork --kill-child \
-        "$PARTS/enter-root" "$root" "$ELSEWHERE/$release.debs" "$@" || status=$?
+        "$PARTS/enter-root" "$root" "$ELSEWHERE/$release.debs" "$@"
+}
+
+# However the command ended.
+leave_root() {
     "${as_root[@]}" chown -R "$(id -u):$(id -g)" "$ELSEWHERE/$release.debs"
     [[ -n $keeps ]] || "${as_root[@]}" rm -rf "$root"
-    return "$status"
 }

@@ -16,7 +16,7 @@ from sandbox.prompt.registry import run_line
 from sandbox.timeline.agenttime import minutes
 
 _WELCOME = (
-    "A simulated terminal with the real agent; above goes what it says to others and they to it.",
+    "A simulated terminal with the real agent; what it says and hears goes above.",
     "Try: policy 1201, then: advance 60. Type help for the commands, Ctrl+D to end.",
 )
 

@@ -98,3 +98,16 @@ def test_a_package_cannot_be_built_under_a_blank(tmp_path: Path) -> None:
     line = refused(tree.dev("package"))
 
     assert line == f"Debian's package tools cannot work in a folder with a blank in its name: {tree.root}"
+
+
+@pytest.mark.parametrize("release", ["", "--keep", "Trixie", "../x"])
+def test_elsewhere_needs_the_name_of_a_release(tree: Tree, release: str) -> None:
+    line = refused(tree.dev("elsewhere", *release.split()))
+
+    assert line.startswith("elsewhere: it needs the name of a release, such as bookworm or trixie")
+    assert not tree.calls(*WORKERS)
+
+
+def test_a_release_that_does_not_exist_is_told_before_anything_is_fetched(tree: Tree) -> None:
+    assert refused(tree.dev("elsewhere", "nosuchrelease")) == "debootstrap knows no release 'nosuchrelease'"
+    assert not tree.calls("debootstrap", *WORKERS)
