@@ -96,6 +96,7 @@ bool MessagePlatform::loadCfg()
     return velk::base::FileContent::getHostAndPort(m_host, m_port);
 }
 
+// What is connected changes the object. NOLINTNEXTLINE(readability-make-member-function-const)
 void MessagePlatform::initHttpApi()
 {
     HandleEvent::GetInstance()->initHttpApi();
