@@ -116,7 +116,7 @@ class Process:
         return list(Path(f"/proc/{self.pid}/task").iterdir())
 
 
-class Peer(Process):
+class LoadGenerator(Process):
     """One of the programs under bench/load: it takes commands and tells what happens, a line each."""
 
     def __init__(self, name: str, *arguments: str) -> None:

@@ -13,10 +13,10 @@ from sandbox.bus.monitor import BusMonitor
 from sandbox.bus.senders import Senders
 from sandbox.contracts import Contracts
 from sandbox.events import PATIENCE, SYNC, WAKE_UP, Events
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.daemon import Daemon
 from sandbox.fakes.dock import Dock
-from sandbox.fakes.identity import Identity
+from sandbox.fakes.identity import IdentityService
 from sandbox.fakes.launcher import Launcher
 from sandbox.fakes.logind import Logind
 from sandbox.fakes.notifications import Notifications
@@ -41,7 +41,7 @@ class Terminal:
 
     daemon: Daemon
     logind: Logind
-    identity: Identity
+    identity: IdentityService
     policy_service: PolicyService
     notifications: Notifications
     screensaver: ScreenSaver
@@ -68,26 +68,26 @@ class Terminal:
         self.packages = Packages()
         self.tools = Tools(self.commands)
         self.senders = Senders()
-        self._add_peers()
+        self._add_fakes()
         self.system_monitor = self._monitor(self.system_bus)
         self.session_monitor = self._monitor(self.session_bus)
         self.monitors = (self.system_monitor, self.session_monitor)
         self.agent = Agent(self.events, self.senders)
-        unknown = set(absent) - self.peers.keys()
-        assert not unknown, f"no such peers: {unknown}"
-        for name, peer in self.peers.items():
+        unknown = set(absent) - self.fakes.keys()
+        assert not unknown, f"no such fakes: {unknown}"
+        for name, fake in self.fakes.items():
             if name not in absent:
-                peer.appear()
+                fake.appear()
 
-    def _add_peers(self) -> None:
-        self.peers: dict[str, Peer] = {}
+    def _add_fakes(self) -> None:
+        self.fakes: dict[str, Fake] = {}
         for name, fake in FAKES.items():
             bus = self.system_bus if fake.bus_kind == "system" else self.session_bus
-            self.peers[name] = fake(bus, self.events, self.senders)
-            setattr(self, name, self.peers[name])
+            self.fakes[name] = fake(bus, self.events, self.senders)
+            setattr(self, name, self.fakes[name])
 
     def _monitor(self, bus: Bus) -> BusMonitor:
-        served = [peer.bus_name for peer in self.peers.values() if peer.bus is bus]
+        served = [fake.bus_name for fake in self.fakes.values() if fake.bus is bus]
         return BusMonitor(bus, self.senders, served)
 
     def __enter__(self) -> Terminal:
@@ -150,9 +150,9 @@ class Terminal:
         buses and recorded."""
         for bus in (self.system_bus, self.session_bus):
             bus.receive_all_from(self.agent.pid)
-        for peer in self.peers.values():
-            if peer.present:
-                peer.receive_all_from(self.agent.pid)
+        for fake in self.fakes.values():
+            if fake.present:
+                fake.receive_all_from(self.agent.pid)
         for monitor in self.monitors:
             monitor.receive_all()
 
@@ -178,7 +178,7 @@ class Terminal:
         all of them by the agent that asked for what nobody serves."""
         return [
             *self.contracts.violations,
-            *(found for peer in self.peers.values() for found in peer.violations),
+            *(found for fake in self.fakes.values() for found in fake.violations),
             *(found for monitor in self.monitors for found in monitor.violations),
         ]
 
@@ -204,8 +204,8 @@ class Terminal:
         for monitor in self.monitors:
             monitor.close()
         problems += self.violations()
-        for peer in self.peers.values():
-            peer.leave()
+        for fake in self.fakes.values():
+            fake.leave()
         self.commands.close()
         if "platform" in self.__dict__:
             self.platform.close()
@@ -215,5 +215,5 @@ class Terminal:
         return "\n".join([*problems, self.report()])
 
 
-FAKES: dict[str, type[Peer]] = get_type_hints(Terminal)
+FAKES: dict[str, type[Fake]] = get_type_hints(Terminal)
 """The services of a terminal, which are its declared attributes."""

@@ -5,7 +5,7 @@ from __future__ import annotations
 from typing import Iterator
 
 from bench import callgrind
-from bench.bed import Bed
+from bench.testbed import Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
@@ -36,10 +36,10 @@ def _times(plan: Plan) -> Iterator[Figure]:
     for run in plan.times():
         plan.tell(f"dock with {_ENTRIES:,} entries, run {run + 1} of {plan.runs}")
         for program in programs:
-            with Bed(entries=_ENTRIES) as bed, bed.start(program) as process:
-                (read,) = bed.desktop.wait_for("entries", _SECONDS)
+            with Testbed(entries=_ENTRIES) as testbed, testbed.start(program) as process:
+                (read,) = testbed.desktop.wait_for("entries", _SECONDS)
                 reads[program.name].append((read - process.began) / 1e9)
-                begin, end, *_ = _change(bed, process, _CHANGES)
+                begin, end, *_ = _change(testbed, process, _CHANGES)
                 changes[program.name].append((end - begin) / 1e9)
     title = f"dock with {_ENTRIES:,} entries"
     yield Figure("dock.entries", title, "time", "s", reads["agent"], reads["floor"], _GOAL)
@@ -47,11 +47,11 @@ def _times(plan: Plan) -> Iterator[Figure]:
     yield Figure("dock.changes", title, "time", "s", changes["agent"], changes["floor"], _GOAL)
 
 
-def _change(bed: Bed, process: Process, count: int) -> list[int]:
+def _change(testbed: Testbed, process: Process, count: int) -> list[int]:
     """Until it is calm, the agent may read again what changes."""
     process.await_calm()
-    bed.desktop.tell(f"windows {count} {_WINDOW}")
-    return bed.desktop.wait_for("done", _SECONDS)
+    testbed.desktop.tell(f"windows {count} {_WINDOW}")
+    return testbed.desktop.wait_for("done", _SECONDS)
 
 
 def _instructions_of_entry(program: Program) -> float:
@@ -63,10 +63,10 @@ def _instructions_of_change(program: Program) -> float:
 
 
 def _total(program: Program, entries: int, changes: int) -> float:
-    with Bed(entries=entries) as bed:
+    with Testbed(entries=entries) as testbed:
 
         def work(process: Process) -> None:
-            bed.desktop.wait_for("entries", _SECONDS)
-            _change(bed, process, changes)
+            testbed.desktop.wait_for("entries", _SECONDS)
+            _change(testbed, process, changes)
 
         return callgrind.of_work(program, work)

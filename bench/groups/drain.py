@@ -5,7 +5,7 @@ from __future__ import annotations
 from typing import Iterator
 
 from bench import callgrind
-from bench.bed import ADDRESS, Bed
+from bench.testbed import ADDRESS, Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
@@ -23,63 +23,63 @@ _FLAT = Goal("at most", 1.05)
 def measure(plan: Plan) -> Iterator[Figure]:
     """How fast, over how many connections, and with how much memory."""
     programs = agent(), floor("drain", ADDRESS)
-    with Bed(platform=True) as bed:
+    with Testbed(platform=True) as testbed:
         if not plan.quick:
             values, floors = plan.pairs(
-                f"drain of {_ROW:,} messages", *programs, lambda program: _rate(bed, program)
+                f"drain of {_ROW:,} messages", *programs, lambda program: _rate(testbed, program)
             )
             goal = Goal("at least", 0.9)
             yield Figure("drain.rate", "messages over TLS", "rate", "per s", values, floors, goal)
         values, floors = plan.pairs(
-            "instructions of a message", *programs, lambda program: _instructions(bed, program)
+            "instructions of a message", *programs, lambda program: _instructions(testbed, program)
         )
         yield Figure("drain.instructions", "one message", "instructions", "thousand", values, floors)
         if not plan.quick:
             plan.tell("connections of a drain")
-            yield from _connections(bed)
-            yield from _lengths(plan, bed)
+            yield from _connections(testbed)
+            yield from _lengths(plan, testbed)
 
 
-def _drain(bed: Bed, program: Program, messages: int) -> tuple[float, dict[str, float]]:
+def _drain(testbed: Testbed, program: Program, messages: int) -> tuple[float, dict[str, float]]:
     """Seconds, and the memory at the end."""
-    bed.platform.tell(f"messages {messages}")
-    with bed.start(program) as process:
-        begin, end = bed.platform.wait_for("drained", 60 + messages * _SECONDS_PER_MESSAGE)
+    testbed.platform.tell(f"messages {messages}")
+    with testbed.start(program) as process:
+        begin, end = testbed.platform.wait_for("drained", 60 + messages * _SECONDS_PER_MESSAGE)
         memory = {"VmStk": process.status("VmStk"), "Rss": process.memory("Rss")}
     return (end - begin) / 1e9, memory
 
 
-def _rate(bed: Bed, program: Program) -> float:
-    seconds, _ = _drain(bed, program, _ROW)
+def _rate(testbed: Testbed, program: Program) -> float:
+    seconds, _ = _drain(testbed, program, _ROW)
     return _ROW / seconds
 
 
-def _instructions(bed: Bed, program: Program) -> float:
+def _instructions(testbed: Testbed, program: Program) -> float:
     def total(messages: int) -> float:
         def work(process: Process) -> None:
-            bed.platform.wait_for("drained")
+            testbed.platform.wait_for("drained")
             process.await_calm()
 
-        bed.forget()
-        bed.platform.tell(f"messages {messages}")
+        testbed.forget()
+        testbed.platform.tell(f"messages {messages}")
         return callgrind.of_work(program, work)
 
     return (total(_MANY) - total(_FEW)) / (_MANY - _FEW) / 1e3
 
 
-def _connections(bed: Bed) -> Iterator[Figure]:
+def _connections(testbed: Testbed) -> Iterator[Figure]:
     """Handshakes of a row of 1,000, and of one after the server has closed the idle connection."""
     clock = ManualClock()
-    bed.platform.tell("messages 1000")
-    before = _counts(bed)
-    with bed.start(agent(), clock.environment()):
-        bed.platform.wait_for("drained")
-        drained = _counts(bed)
-        bed.platform.tell("close")
-        bed.platform.tell(f"messages {_AFTER_BREAK}")
-        bed.move_clock(clock, SURELY_NEXT_POLL)
-        bed.platform.wait_for("drained")
-        reconnected = _counts(bed)
+    testbed.platform.tell("messages 1000")
+    before = _counts(testbed)
+    with testbed.start(agent(), clock.environment()):
+        testbed.platform.wait_for("drained")
+        drained = _counts(testbed)
+        testbed.platform.tell("close")
+        testbed.platform.tell(f"messages {_AFTER_BREAK}")
+        testbed.move_clock(clock, SURELY_NEXT_POLL)
+        testbed.platform.wait_for("drained")
+        reconnected = _counts(testbed)
     one = Goal("at most", 1, "value")
     yield _count("drain.handshakes", "handshakes for 1,000 messages", drained[0] - before[0], one)
     yield _count(
@@ -96,17 +96,17 @@ def _count(name: str, title: str, value: int, goal: Goal) -> Figure:
     return Figure(name, title, "count", "", [value], (), goal)
 
 
-def _counts(bed: Bed) -> list[int]:
-    bed.platform.tell("counts")
-    return bed.platform.wait_for("counts")
+def _counts(testbed: Testbed) -> list[int]:
+    testbed.platform.tell("counts")
+    return testbed.platform.wait_for("counts")
 
 
-def _lengths(plan: Plan, bed: Bed) -> Iterator[Figure]:
+def _lengths(plan: Plan, testbed: Testbed) -> Iterator[Figure]:
     """The floor is the shortest row, which fills the same buffers."""
     at_first: dict[str, float] = {}
     for length in _LENGTHS:
         plan.tell(f"drain of {length:,} messages")
-        _, memory = _drain(bed, agent(), length)
+        _, memory = _drain(testbed, agent(), length)
         at_first = at_first or memory
         for line, title in {"VmStk": "stack", "Rss": "resident"}.items():
             yield Figure(

@@ -6,7 +6,7 @@ from statistics import median
 from typing import Iterator
 
 from bench import callgrind
-from bench.bed import Bed
+from bench.testbed import Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
@@ -21,11 +21,11 @@ _COUNTED_SIZE = 200
 def measure(plan: Plan) -> Iterator[Figure]:
     """Rates and latencies for small and large policies, and the instructions of a small one."""
     programs = agent(), floor("forwarding")
-    with Bed() as bed:
+    with Testbed() as testbed:
         if not plan.quick:
-            yield from _times(plan, bed, programs)
+            yield from _times(plan, testbed, programs)
         values, floors = plan.pairs(
-            "instructions of a policy", *programs, lambda program: _instructions(bed, program)
+            "instructions of a policy", *programs, lambda program: _instructions(testbed, program)
         )
         yield Figure(
             "forwarding.instructions",
@@ -37,17 +37,17 @@ def measure(plan: Plan) -> Iterator[Figure]:
         )
 
 
-def _times(plan: Plan, bed: Bed, programs: tuple[Program, Program]) -> Iterator[Figure]:
+def _times(plan: Plan, testbed: Testbed, programs: tuple[Program, Program]) -> Iterator[Figure]:
     for size, (title, for_rate, for_latency) in _SIZES.items():
 
         def rate(program: Program) -> float:
-            with bed.start_and_wait(program):
-                begin, end, *_ = bed.policies(for_rate, size, _WINDOW)
+            with testbed.start_and_wait(program):
+                begin, end, *_ = testbed.policies(for_rate, size, _WINDOW)
             return for_rate * 1e9 / (end - begin)
 
         def latency(program: Program) -> float:
-            with bed.start_and_wait(program):
-                _, _, *latencies = bed.policies(for_latency, size)
+            with testbed.start_and_wait(program):
+                _, _, *latencies = testbed.policies(for_latency, size)
             return median(latencies) / 1e3
 
         values, floors = plan.pairs(f"rate of policies, {title}", *programs, rate)
@@ -69,13 +69,13 @@ def _times(plan: Plan, bed: Bed, programs: tuple[Program, Program]) -> Iterator[
         )
 
 
-def _instructions(bed: Bed, program: Program) -> float:
+def _instructions(testbed: Testbed, program: Program) -> float:
     def total(count: int) -> float:
         def work(_process: Process) -> None:
-            bed.desktop.wait_for("UpdateUserInfo")
-            bed.policies(count, _COUNTED_SIZE, _WINDOW)
+            testbed.desktop.wait_for("UpdateUserInfo")
+            testbed.policies(count, _COUNTED_SIZE, _WINDOW)
 
-        bed.forget()
+        testbed.forget()
         return callgrind.of_work(program, work)
 
     return (total(_MANY) - total(_FEW)) / (_MANY - _FEW) / 1e3

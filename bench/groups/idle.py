@@ -5,7 +5,7 @@ from __future__ import annotations
 import time
 from typing import Iterator
 
-from bench.bed import ADDRESS, Bed
+from bench.testbed import ADDRESS, Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import agent, floor
@@ -22,8 +22,8 @@ def measure(plan: Plan) -> Iterator[Figure]:
     who = "domain" if is_domain else "local"
     seconds = _SECONDS[who]
     bare = floor("drain", ADDRESS) if is_domain else floor("start")
-    with Bed(platform=is_domain) as bed, bed.start_and_wait(agent()) as one:
-        with bed.start_and_wait(bare) as other:
+    with Testbed(platform=is_domain) as testbed, testbed.start_and_wait(agent()) as one:
+        with testbed.start_and_wait(bare) as other:
             plan.tell(f"idle for {seconds} s")
             time.sleep(_CALM)
             switches = [process.voluntary_switches() for process in (one, other)]

@@ -5,7 +5,7 @@ from __future__ import annotations
 import json
 from typing import Any, Iterator
 
-from bench.bed import Bed
+from bench.testbed import Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Program, agent, floor
@@ -39,12 +39,12 @@ def _package(number: int) -> str:
 
 
 def _items(plan: Plan, count: int) -> Figure:
-    with Bed(items=count) as bed:
+    with Testbed(items=count) as testbed:
         values, floors = plan.pairs(
             f"inventory of {count} items",
             agent(),
             floor("inventory", "items", str(count)),
-            lambda program: _seconds(bed, program, 2 * count) * 1e3,
+            lambda program: _seconds(testbed, program, 2 * count) * 1e3,
         )
     name = f"inventory.items.{count}"
     goal = Goal("at most", 1.05)
@@ -52,9 +52,9 @@ def _items(plan: Plan, count: int) -> Figure:
     return Figure(name, title, "time", "ms", values, floors, goal, "inventory.items", count)
 
 
-def _seconds(bed: Bed, program: Program, children: int) -> float:
-    with bed.start(program) as process:
-        (told,) = bed.desktop.wait_for("onUploadFinished", 60 + children * _SECONDS_PER_CHILD)
+def _seconds(testbed: Testbed, program: Program, children: int) -> float:
+    with testbed.start(program) as process:
+        (told,) = testbed.desktop.wait_for("onUploadFinished", 60 + children * _SECONDS_PER_CHILD)
     return (told - process.began) / 1e9
 
 
@@ -65,18 +65,18 @@ def _record(package: str, number: int) -> dict[str, Any]:
 def _parsing(plan: Plan) -> Figure:
     """A file of records without a package, which no tool is asked about, against no file."""
     seconds = []
-    with Bed() as bed:
+    with Testbed() as testbed:
 
         def to_announcement() -> float:
-            with bed.start(agent()) as process:
-                (told,) = bed.desktop.wait_for("UpdateUserInfo")
+            with testbed.start(agent()) as process:
+                (told,) = testbed.desktop.wait_for("UpdateUserInfo")
             return (told - process.began) / 1e9
 
         for _ in plan.times():
             plan.tell(f"parsing of {_MEGABYTES} MB")
-            bed.files.write_software_list(layout.SOFTWARE_LIST, [])
+            testbed.files.write_software_list(layout.SOFTWARE_LIST, [])
             without = to_announcement()
-            bed.files.write(layout.SOFTWARE_LIST, json.dumps(_long_list(), indent=4))
+            testbed.files.write(layout.SOFTWARE_LIST, json.dumps(_long_list(), indent=4))
             megabytes = layout.SOFTWARE_LIST.stat().st_size / 1e6
             seconds.append((to_announcement() - without) * _MEGABYTES / megabytes)
     goal = Goal("at most", 1, "value")
@@ -95,12 +95,12 @@ def _file(plan: Plan) -> Iterator[Figure]:
     times = records / asked
     values: list[float] = []
     floors: list[float] = []
-    with Bed(items=1) as bed:
+    with Testbed(items=1) as testbed:
 
         def seconds(program: Program, packages: int) -> float:
             known = [_record(_package(0) if number < packages else "", number) for number in range(records)]
-            bed.files.write(layout.SOFTWARE_LIST, json.dumps(known, indent=4))
-            return _seconds(bed, program, packages)
+            testbed.files.write(layout.SOFTWARE_LIST, json.dumps(known, indent=4))
+            return _seconds(testbed, program, packages)
 
         for run in plan.times():
             plan.tell(f"inventory file of {records:,} records, run {run + 1} of {plan.runs}")

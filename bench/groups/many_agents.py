@@ -5,7 +5,7 @@ from __future__ import annotations
 from contextlib import ExitStack
 from typing import Iterator
 
-from bench.bed import Bed
+from bench.testbed import Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, agent
@@ -20,10 +20,10 @@ def measure(plan: Plan) -> Iterator[Figure]:
         return
     alone: dict[str, list[float]] = {"Pss": [], "Private_Dirty": [], "time": []}
     each: dict[str, list[float]] = {"Pss": [], "Private_Dirty": [], "time": []}
-    with Bed() as bed:
+    with Testbed() as testbed:
         for run in plan.times():
             plan.tell(f"{_AGENTS} agents at once, run {run + 1} of {plan.runs}")
-            one, all_of_them = _start(bed, 1), _start(bed, _AGENTS)
+            one, all_of_them = _start(testbed, 1), _start(testbed, _AGENTS)
             for name in ("Pss", "Private_Dirty"):
                 alone[name].append(one[name])
                 each[name].append((all_of_them[name] - one[name]) / (_AGENTS - 1))
@@ -43,13 +43,13 @@ def measure(plan: Plan) -> Iterator[Figure]:
     )
 
 
-def _start(bed: Bed, count: int) -> dict[str, float]:
+def _start(testbed: Testbed, count: int) -> dict[str, float]:
     """Memory of so many agents together in KiB, and the milliseconds until the last one is announced."""
-    bed.forget()
+    testbed.forget()
     with ExitStack() as stack:
         processes = [stack.enter_context(Process(agent().argv)) for _ in range(count)]
         for _ in processes:
-            (told,) = bed.desktop.wait_for("UpdateUserInfo")
+            (told,) = testbed.desktop.wait_for("UpdateUserInfo")
         for process in processes:
             process.await_calm()
         memory = {

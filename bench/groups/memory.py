@@ -4,7 +4,7 @@ from __future__ import annotations
 
 from typing import Callable, Iterator
 
-from bench.bed import ADDRESS, Bed
+from bench.testbed import ADDRESS, Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Process, Program, agent, floor
@@ -35,11 +35,11 @@ def _after_start(plan: Plan) -> Iterator[Figure]:
     who = "domain" if is_domain else "local"
     programs = agent(), floor("drain", ADDRESS) if is_domain else floor("start")
     taken: dict[str, list[dict[str, float]]] = {"agent": [], "floor": []}
-    with Bed(platform=is_domain) as bed:
+    with Testbed(platform=is_domain) as testbed:
         for _ in plan.times():
             plan.tell(f"memory of a {who} user's agent")
             for program in programs:
-                taken[program.name].append(_memory_after_start(bed, program))
+                taken[program.name].append(_memory_after_start(testbed, program))
     goals = {"Rss": Goal("at most", 1.25), "Private_Dirty": Goal("at most", _MOST_DIRTY, "value")}
     for line, title in _LINES.items():
         yield Figure(
@@ -53,41 +53,41 @@ def _after_start(plan: Plan) -> Iterator[Figure]:
         )
 
 
-def _memory_after_start(bed: Bed, program: Program) -> dict[str, float]:
-    with bed.start_and_wait(program) as process:
+def _memory_after_start(testbed: Testbed, program: Program) -> dict[str, float]:
+    with testbed.start_and_wait(program) as process:
         return {line: process.memory(line) for line in _LINES}
 
 
 def _after_polls(plan: Plan) -> Iterator[Figure]:
-    with Bed(platform=True) as bed:
+    with Testbed(platform=True) as testbed:
         clock = ManualClock()
 
         def poll(process: Process, times: int) -> None:
             for _ in range(times):
                 process.await_calm(_BETWEEN_POLLS)
-                bed.move_clock(clock, SURELY_NEXT_POLL)
+                testbed.move_clock(clock, SURELY_NEXT_POLL)
                 # A program that was not calm yet has armed its timer only after the move.
-                while bed.platform.await_line("listed", _PATIENCE) is None:
-                    bed.move_clock(clock, SURELY_NEXT_POLL)
+                while testbed.platform.await_line("listed", _PATIENCE) is None:
+                    testbed.move_clock(clock, SURELY_NEXT_POLL)
 
         plan.tell(f"memory after {_POLLS:,} polls")
         yield from _growth(
-            bed, floor("drain", ADDRESS), "polls", poll, (_WARM_POLLS, _POLLS), clock.environment()
+            testbed, floor("drain", ADDRESS), "polls", poll, (_WARM_POLLS, _POLLS), clock.environment()
         )
 
 
 def _after_policies(plan: Plan) -> Iterator[Figure]:
-    with Bed() as bed:
+    with Testbed() as testbed:
 
         def push(_process: Process, times: int) -> None:
-            bed.policies(times, window=_WINDOW)
+            testbed.policies(times, window=_WINDOW)
 
         plan.tell(f"memory after {_POLICIES:,} policies")
-        yield from _growth(bed, floor("forwarding"), "policies", push, (_WARM_POLICIES, _POLICIES), {})
+        yield from _growth(testbed, floor("forwarding"), "policies", push, (_WARM_POLICIES, _POLICIES), {})
 
 
 def _growth(
-    bed: Bed,
+    testbed: Testbed,
     bare: Program,
     what: str,
     work: Callable[[Process, int], None],
@@ -98,7 +98,7 @@ def _growth(
     warm, whole = counts
     grown: dict[str, dict[str, float]] = {line: {} for line in _LINES}
     for program in (agent(), bare):
-        with bed.start_and_wait(program, env) as process:
+        with testbed.start_and_wait(program, env) as process:
             work(process, warm)
             before = {line: process.memory(line) for line in _LINES}
             work(process, whole - warm)

@@ -7,7 +7,7 @@ import time
 from typing import Iterator
 
 from bench import callgrind
-from bench.bed import ADDRESS, Bed
+from bench.testbed import ADDRESS, Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
 from bench.programs import Program, agent, floor
@@ -23,11 +23,11 @@ def measure(plan: Plan) -> Iterator[Figure]:
 
 def _local(plan: Plan) -> Iterator[Figure]:
     programs = agent(), floor("start")
-    with Bed() as bed:
+    with Testbed() as testbed:
 
         def milliseconds(program: Program) -> float:
-            with bed.start(program) as process:
-                (told,) = bed.desktop.wait_for("UpdateUserInfo")
+            with testbed.start(program) as process:
+                (told,) = testbed.desktop.wait_for("UpdateUserInfo")
             return (told - process.began) / 1e6
 
         values, floors = plan.pairs("start of a local user", *programs, milliseconds)
@@ -44,11 +44,11 @@ def _local(plan: Plan) -> Iterator[Figure]:
 
 def _domain(plan: Plan) -> Iterator[Figure]:
     programs = agent(), floor("drain", ADDRESS)
-    with Bed(platform=True) as bed:
+    with Testbed(platform=True) as testbed:
 
         def milliseconds(program: Program) -> float:
-            with bed.start(program) as process:
-                (answered,) = bed.platform.wait_for("tips")
+            with testbed.start(program) as process:
+                (answered,) = testbed.platform.wait_for("tips")
             return (answered - process.began) / 1e6
 
         goal = Goal("at most", 1.25)

@@ -5,7 +5,7 @@ from __future__ import annotations
 from collections import defaultdict
 from typing import Iterator, NamedTuple
 
-from bench.bed import Bed
+from bench.testbed import Testbed
 from bench.figures import Figure
 from bench.fleet.simulation import KEPT
 from bench.plan import Plan
@@ -50,25 +50,25 @@ def measure(plan: Plan) -> Iterator[Figure]:
 def _polls(kept: float) -> list[tuple[str, float]]:
     """How an agent's start and its first polls reach the platform, and the bytes that each takes."""
     clock = ManualClock()
-    with Bed(platform=True) as bed, bed.start_and_wait(agent(), clock.environment()) as process:
-        found = [("full", float(_counts(bed).transferred))]
+    with Testbed(platform=True) as testbed, testbed.start_and_wait(agent(), clock.environment()) as process:
+        found = [("full", float(_counts(testbed).transferred))]
         for _ in range(_POLLS):
-            before = _counts(bed)
-            _let_poll(bed, clock, process, kept)
-            after = _counts(bed)
+            before = _counts(testbed)
+            _let_poll(testbed, clock, process, kept)
+            after = _counts(testbed)
             found.append((_way(before, after), after.transferred - before.transferred))
     return found
 
 
-def _let_poll(bed: Bed, clock: ManualClock, process: Process, kept: float) -> None:
+def _let_poll(testbed: Testbed, clock: ManualClock, process: Process, kept: float) -> None:
     """Move the clock to the next poll; the platform closes a connection that has been idle for so long."""
     idle = 0
-    while idle == 0 or bed.platform.await_line("listed", _PATIENCE) is None:
+    while idle == 0 or testbed.platform.await_line("listed", _PATIENCE) is None:
         idle += _STEP
         if idle >= kept:
-            bed.platform.tell("close")
-            _counts(bed)  # comes after it
-        bed.move_clock(clock, _STEP)
+            testbed.platform.tell("close")
+            _counts(testbed)  # comes after it
+        testbed.move_clock(clock, _STEP)
     process.await_calm(_BETWEEN_STEPS)
 
 
@@ -78,7 +78,7 @@ def _way(before: _Counts, after: _Counts) -> str:
     return "resumed" if after.resumed > before.resumed else "full"
 
 
-def _counts(bed: Bed) -> _Counts:
-    bed.platform.tell("counts")
-    handshakes, _lists, _reads, transferred, resumed = bed.platform.wait_for("counts")
+def _counts(testbed: Testbed) -> _Counts:
+    testbed.platform.tell("counts")
+    handshakes, _lists, _reads, transferred, resumed = testbed.platform.wait_for("counts")
     return _Counts(handshakes, resumed, transferred)

@@ -54,10 +54,10 @@ struct Row
     [[nodiscard]] bool mayGoOn() const { return sent < count && sent - answered < window; }
 };
 
-class Desktop
+class FastDesktop
 {
 public:
-    explicit Desktop(DesktopSize size)
+    explicit FastDesktop(DesktopSize size)
         : m_size(size)
         , m_services(size)
         , m_system(sd_bus_open_system, {kDaemon, "org.freedesktop.login1"},
@@ -216,6 +216,6 @@ int main(int argc, char* argv[])
     DesktopSize size;
     size.launcherItems = argc > 1 ? std::stoi(argv[1]) : 0;
     size.dockEntries = argc > 2 ? std::stoi(argv[2]) : 0;
-    Desktop(size).run();
+    FastDesktop(size).run();
     return 0;
 }

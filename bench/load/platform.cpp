@@ -45,7 +45,7 @@ std::string reply(const std::string& headers, const std::string& body)
 }
 
 /// What the platform knows; for any thread.
-class Store
+class MessageStore
 {
 public:
     void post(int messages)
@@ -111,10 +111,10 @@ private:
     long long m_begin = 0;
 };
 
-class Platform
+class FastPlatform
 {
 public:
-    Platform(const TlsContext& context, uint16_t port)
+    FastPlatform(const TlsContext& context, uint16_t port)
         : m_context(context)
         , m_listener(socket(AF_INET, SOCK_STREAM, 0))
     {
@@ -212,7 +212,7 @@ private:
 
     const TlsContext& m_context;
     int m_listener;
-    Store m_store;
+    MessageStore m_store;
     std::mutex m_mutex;
     std::set<int> m_connections;
     int m_handshakes = 0;
@@ -232,7 +232,7 @@ int main(int argc, char* argv[])
         return EXIT_FAILURE;
     }
     const TlsContext context(argv[2], argv[3], argv[4]);
-    Platform platform(context, static_cast<uint16_t>(std::stoi(argv[1])));
+    FastPlatform platform(context, static_cast<uint16_t>(std::stoi(argv[1])));
     std::thread([&platform] { platform.serve(); }).detach();
     std::cout << "ready" << std::endl;
     std::string line;

@@ -23,18 +23,18 @@ std::string plainUserName()
 }
 
 /// A reply that is sent when it goes out of scope.
-class Answer
+class ScopedReply
 {
 public:
-    explicit Answer(sd_bus_message* call)
+    explicit ScopedReply(sd_bus_message* call)
     {
         require(sd_bus_message_new_method_return(call, &m_message), "answer");
     }
-    Answer(const Answer&) = delete;
-    Answer& operator=(const Answer&) = delete;
-    Answer(Answer&&) = delete;
-    Answer& operator=(Answer&&) = delete;
-    ~Answer()
+    ScopedReply(const ScopedReply&) = delete;
+    ScopedReply& operator=(const ScopedReply&) = delete;
+    ScopedReply(ScopedReply&&) = delete;
+    ScopedReply& operator=(ScopedReply&&) = delete;
+    ~ScopedReply()
     {
         sd_bus_send(nullptr, m_message, nullptr);
         sd_bus_message_unref(m_message);
@@ -89,7 +89,7 @@ void Services::answerGet(sd_bus_message* call) const
     require(sd_bus_message_read(call, "ss", &interface, &name), "read a property's name");
     const std::string path = sd_bus_message_get_path(call);
     const std::string property = name;
-    const Answer answer(call);
+    const ScopedReply answer(call);
     auto* reply = answer.message();
     if (path.compare(0, kEntries.size(), kEntries) == 0) {
         appendEntryProperty(reply, path, property);
@@ -132,7 +132,7 @@ void Services::appendEntries(sd_bus_message* reply) const
 
 void Services::answerItems(sd_bus_message* call) const
 {
-    const Answer answer(call);
+    const ScopedReply answer(call);
     auto* reply = answer.message();
     sd_bus_message_open_container(reply, 'a', "(ssssxx)");
     for (int number = 0; number < m_size.launcherItems; ++number) {

@@ -13,7 +13,7 @@ from sandbox.bus.mainloop import MainLoop
 from sandbox.bus.senders import Senders
 from sandbox.bus.values import plain
 from sandbox.events import Events
-from sandbox.fakes.exported import PROPERTIES, ExportedObject, Refused, Reply
+from sandbox.fakes.exported import PROPERTIES, ExportedObject, CallRefused, Reply
 from sandbox.fakes.fault import Fault
 
 _HANDLED = dbus.lowlevel.HANDLER_RESULT_HANDLED
@@ -22,7 +22,7 @@ _CALL = dbus.lowlevel.MESSAGE_TYPE_METHOD_CALL
 _FAILED = "org.freedesktop.DBus.Error.Failed"
 
 
-class Peer:
+class Fake:
     """A service on a bus, under a bus name and a connection of its own.
 
     Every call that reaches it is recorded as an event and checked against the contract of its interface; what
@@ -181,7 +181,7 @@ class Peer:
         }
         try:
             self._check(message)
-        except Refused as refused:
+        except CallRefused as refused:
             self.violations.append(f"{self.name}: {refused}")
         source = self._senders.label(self.bus, message.get_sender())
         simple = tuple(plain(arg) for arg in args)
@@ -189,10 +189,10 @@ class Peer:
         return simple
 
     def _check(self, message: Any) -> None:
-        """Refused if a call breaks the contract of the object that it is for."""
+        """CallRefused if a call breaks the contract of the object that it is for."""
         known = self.objects.get(message.get_path())
         if known is None:
-            raise Refused("UnknownObject", f"no object {message.get_path()}")
+            raise CallRefused("UnknownObject", f"no object {message.get_path()}")
         arguments = message.get_args_list()
         known.check(str(message.get_interface()), message.get_member(), message.get_signature(), arguments)
 
@@ -206,7 +206,7 @@ class Peer:
             return
         try:
             reply = self._carry_out(message)
-        except Refused as refused:
+        except CallRefused as refused:
             self._refuse(message, refused.error_name, str(refused))
         except Exception as error:  # a fake's own mistake must fail the test and not vanish in the loop
             self.violations.append(f"{self.name}: {message.get_member()} broke: {error!r}")
@@ -217,7 +217,7 @@ class Peer:
     def _carry_out(self, message: Any) -> Reply:
         path = message.get_path()
         if path in self.withdrawn:
-            raise Refused("UnknownObject", f"no object {path}")
+            raise CallRefused("UnknownObject", f"no object {path}")
         self._check(message)
         args = tuple(plain(arg) for arg in message.get_args_list())
         return self.objects[path].call(str(message.get_interface()), message.get_member(), args)

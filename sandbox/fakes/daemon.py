@@ -6,7 +6,7 @@ import json
 from typing import Any, Mapping
 
 from sandbox import contracts
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 from sandbox.machine import layout
 from sandbox.platform.server import Platform
@@ -17,7 +17,7 @@ PATH = "/com/norix/velk/velkg"
 MACHINE_ID = "box-machine-0001"
 
 
-class Daemon(Peer):
+class Daemon(Fake):
     """Owns com.norix.velk.velkg on the system bus."""
 
     name = "daemon"

@@ -11,7 +11,7 @@ from sandbox.bus.buses import Bus
 from sandbox.bus.mainloop import MainLoop
 from sandbox.bus.senders import Senders
 from sandbox.events import Events
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.kpx.daemon.Dock"
@@ -31,7 +31,7 @@ WINDOW_TYPES: dict[str, Callable[[str], Any]] = {
 _CHANGE_SIGNALS = {"WindowInfos": "WindowInfosChanged", "Name": "NameChanged"}
 
 
-class Dock(Peer):
+class Dock(Fake):
     """Owns com.norix.kpx.daemon.Dock on the session bus; empty at first.
 
     `announces` says in which ways, one after the other, it tells that an entry has changed: PropertiesChanged

@@ -23,7 +23,7 @@ _STANDARD_METHODS = {
 Handler = Callable[..., Any]
 
 
-class Refused(Exception):
+class CallRefused(Exception):
     """The call gets a D-Bus error; `error_name` is the full name of it."""
 
     def __init__(self, error_name: str, text: str) -> None:
@@ -70,15 +70,15 @@ class ExportedObject:
         return self._values[name]
 
     def check(self, interface: str, member: str, signature: str, args: Sequence[Any]) -> None:
-        """Refused if a call, with its arguments as they came, breaks the contract."""
+        """CallRefused if a call, with its arguments as they came, breaks the contract."""
         expected = _STANDARD_METHODS.get((interface, member))
         if expected is None:
             methods = self.contracts[interface].methods if interface in self.contracts else {}
             if member not in methods:
-                raise Refused("UnknownMethod", f"{self.path} has no method {interface}.{member}")
+                raise CallRefused("UnknownMethod", f"{self.path} has no method {interface}.{member}")
             expected = methods[member].arguments
         if signature != expected:
-            raise Refused(
+            raise CallRefused(
                 "InvalidArgs", f"{interface}.{member} takes ({expected}), called with ({signature})"
             )
         if interface == PROPERTIES:
@@ -108,26 +108,26 @@ class ExportedObject:
 
     def _check_property_call(self, interface: str, name: str | None = None, *values: Any) -> None:
         if interface not in self.contracts:
-            raise Refused("UnknownInterface", f"{self.path} has no interface {interface}")
+            raise CallRefused("UnknownInterface", f"{self.path} has no interface {interface}")
         if name is None:
             return
         known = self.contracts[interface].properties.get(name)
         if known is None:
-            raise Refused("UnknownProperty", f"{self.path} has no property {interface}.{name}")
+            raise CallRefused("UnknownProperty", f"{self.path} has no property {interface}.{name}")
         if values:
             self._check_change(f"{interface}.{name}", known, signature_in_variant(values[0]))
 
     def _check_change(self, name: str, known: contract.Property, signature: str) -> None:
         if "write" not in known.access:
-            raise Refused("PropertyReadOnly", f"{name} is read-only")
+            raise CallRefused("PropertyReadOnly", f"{name} is read-only")
         if signature != known.signature:
-            raise Refused("InvalidArgs", f"{name} is ({known.signature}), set to ({signature})")
+            raise CallRefused("InvalidArgs", f"{name} is ({known.signature}), set to ({signature})")
 
     def _property(self, name: str) -> tuple[Contract, contract.Property]:
         for candidate in self.contracts.values():
             if name in candidate.properties:
                 return candidate, candidate.properties[name]
-        raise Refused("UnknownProperty", f"{self.path} has no property {name}")
+        raise CallRefused("UnknownProperty", f"{self.path} has no property {name}")
 
     def _introspection(self) -> str:
         interfaces = "".join(known.xml for known in self.contracts.values())

@@ -38,7 +38,7 @@ class Fault:
 
     @staticmethod
     def hold() -> Fault:
-        """Keep the calls until `Peer.release`."""
+        """Keep the calls until `Fake.release`."""
         return Fault("hold")
 
 

@@ -2,13 +2,13 @@
 
 from __future__ import annotations
 
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.velk.iam"
 
 
-class Identity(Peer):
+class IdentityService(Fake):
     """Owns com.norix.velk.iam on the system bus."""
 
     name = "identity"

@@ -7,7 +7,7 @@ from dataclasses import astuple, dataclass
 from sandbox.bus.buses import Bus
 from sandbox.bus.senders import Senders
 from sandbox.events import Events
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.kpx.daemon.Launcher"
@@ -27,7 +27,7 @@ class LauncherItem:
     second_number: int = 0
 
 
-class Launcher(Peer):
+class Launcher(Fake):
     """Owns com.norix.kpx.daemon.Launcher on the session bus; `items` is what it lists, nothing at first."""
 
     name = "launcher"

@@ -2,7 +2,7 @@
 
 from __future__ import annotations
 
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 from sandbox.machine.users import current_user
 
@@ -11,7 +11,7 @@ USER = "/org/freedesktop/login1/user/self"
 SESSION = "/org/freedesktop/login1/session/auto"
 
 
-class Logind(Peer):
+class Logind(Fake):
     """Owns org.freedesktop.login1 on the system bus; a reboot or log-out is recorded and nothing else."""
 
     name = "logind"

@@ -4,13 +4,13 @@ from __future__ import annotations
 
 from itertools import count
 
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.kpx.Notification"
 
 
-class Notifications(Peer):
+class Notifications(Fake):
     """Owns com.norix.kpx.Notification on the session bus; numbers the notifications from 1."""
 
     name = "notifications"

@@ -2,13 +2,13 @@
 
 from __future__ import annotations
 
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.velk.prys"
 
 
-class PolicyService(Peer):
+class PolicyService(Fake):
     """Owns com.norix.velk.prys on the session bus."""
 
     name = "policy_service"

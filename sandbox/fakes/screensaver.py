@@ -2,13 +2,13 @@
 
 from __future__ import annotations
 
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.ScreenSaver"
 
 
-class ScreenSaver(Peer):
+class ScreenSaver(Fake):
     """Owns com.norix.ScreenSaver on the session bus; not running at first."""
 
     name = "screensaver"

@@ -2,13 +2,13 @@
 
 from __future__ import annotations
 
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.SessionManager"
 
 
-class SessionManager(Peer):
+class SessionManager(Fake):
     """Owns com.norix.SessionManager on the session bus; unlocked at first."""
 
     name = "session_manager"

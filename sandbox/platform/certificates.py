@@ -12,7 +12,7 @@ _LONG_AGO = datetime(2001, 1, 1)
 
 
 @dataclass(frozen=True)
-class Identity:
+class CertificateFiles:
     """A certificate with its private key, as files: the PEM chain and the PEM key."""
 
     certificate: Path
@@ -36,19 +36,19 @@ class Authority:
         self.certificate = folder / f"{name}.pem"
         self._authority.cert_pem.write_to_path(str(self.certificate))
 
-    def issue_server(self, *hosts: str, expired: bool = False) -> Identity:
+    def issue_server(self, *hosts: str, expired: bool = False) -> CertificateFiles:
         """A certificate for a server reached by these host names or addresses."""
         leaf = self._authority.issue_cert(*hosts, not_after=_LONG_AGO if expired else None)
         return self._store(leaf, f"{'expired' if expired else 'server'}-{hosts[0]}")
 
-    def issue_client(self, name: str) -> Identity:
+    def issue_client(self, name: str) -> CertificateFiles:
         """A certificate for a client, with the name as its subject's common name."""
         leaf = self._authority.issue_cert("client.invalid", common_name=name)
         return self._store(leaf, f"client-{name}")
 
-    def _store(self, leaf: trustme.LeafCert, label: str) -> Identity:
+    def _store(self, leaf: trustme.LeafCert, label: str) -> CertificateFiles:
         stem = re.sub(r"[^\w.-]", "_", f"{self._name}-{label}")
-        identity = Identity(self._folder / f"{stem}.pem", self._folder / f"{stem}.key")
+        identity = CertificateFiles(self._folder / f"{stem}.pem", self._folder / f"{stem}.key")
         identity.certificate.write_bytes(b"".join(blob.bytes() for blob in leaf.cert_chain_pems))
         write_secret(identity.key, leaf.private_key_pem.bytes())
         return identity

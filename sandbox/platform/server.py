@@ -15,8 +15,8 @@ from urllib.parse import urlsplit
 
 from sandbox.events import Events
 from sandbox.machine import layout
-from sandbox.platform.certificates import Authority, Identity
-from sandbox.platform.store import Reply, Route, Store
+from sandbox.platform.certificates import Authority, CertificateFiles
+from sandbox.platform.store import HttpReply, Route, Store
 
 _ADMINISTRATOR = "administrator"
 
@@ -64,8 +64,8 @@ class Trust:
     """Certificates of one platform: its authority, its own and the terminal's."""
 
     authority: Authority
-    server: Identity
-    terminal: Identity
+    server: CertificateFiles
+    terminal: CertificateFiles
 
 
 @cache
@@ -86,7 +86,7 @@ class Platform:
     """
 
     def __init__(
-        self, events: Events, port: int = layout.PLATFORM_PORT, server: Identity | None = None
+        self, events: Events, port: int = layout.PLATFORM_PORT, server: CertificateFiles | None = None
     ) -> None:
         self.port = port
         self.store = Store()
@@ -159,7 +159,7 @@ class Platform:
         self.released.set()
         self.leave()
 
-    def _context(self, identity: Identity) -> ssl.SSLContext:
+    def _context(self, identity: CertificateFiles) -> ssl.SSLContext:
         context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
         context.load_cert_chain(identity.certificate, identity.key)
         context.load_verify_locations(trust().authority.certificate)
@@ -229,7 +229,7 @@ class _Handler(BaseHTTPRequestHandler):
         elif fault.kind == "close":
             self._hang_up()
         else:
-            reply = Reply(fault.status, fault.body, fault.headers)
+            reply = HttpReply(fault.status, fault.body, fault.headers)
             self._reply(route, reply, missing=1000 if fault.kind == "cut" else 0)
 
     def _record(self, route: Route, body: bytes) -> None:
@@ -239,7 +239,7 @@ class _Handler(BaseHTTPRequestHandler):
         detail = {"headers": list(self.headers.items()), "client": subject}
         self._platform.events.record(self._client, "platform", "http", route, (line, body.decode()), detail)
 
-    def _reply(self, route: Route, reply: Reply, own: bool = False, missing: int = 0) -> None:
+    def _reply(self, route: Route, reply: HttpReply, own: bool = False, missing: int = 0) -> None:
         args = (route, reply.status, reply.body.decode(errors="replace"))
         detail = {"headers": reply.headers, "own": own}
         self._platform.events.record("platform", self._client, "reply", "reply", args, detail)

@@ -24,7 +24,7 @@ _REPORT_TYPES: dict[Route, int] = {"software_change": 2002, "inventory": 1103}
 
 
 @dataclass(frozen=True)
-class Reply:
+class HttpReply:
     """Answer to one request."""
 
     status: int
@@ -87,7 +87,7 @@ class Store:
         with self._lock:
             return self._inventory
 
-    def serve(self, route: Route, query: str, body: bytes) -> Reply:
+    def serve(self, route: Route, query: str, body: bytes) -> HttpReply:
         """Answer a request."""
         if route == "list":
             return self._list({key: values[0] for key, values in parse_qs(query).items()})
@@ -97,20 +97,20 @@ class Store:
             return self._tip(_json_object(body).get("username"))
         if route in _REPORT_TYPES:
             return self._take_report(route, _json_object(body))
-        return Reply(404, b"{}")
+        return HttpReply(404, b"{}")
 
-    def _take_report(self, route: Route, report: dict[str, Any]) -> Reply:
+    def _take_report(self, route: Route, report: dict[str, Any]) -> HttpReply:
         payload = report.get("payload")
         if report.get("type") != _REPORT_TYPES[route] or not isinstance(payload, dict):
-            return Reply(400, _json({"code": 1}))
+            return HttpReply(400, _json({"code": 1}))
         with self._lock:
             if route == "inventory":
                 self._inventory = payload.get("list")
             else:
                 self._software_changes.append(payload)
-        return Reply(200, _json({"code": 0}))
+        return HttpReply(200, _json({"code": 0}))
 
-    def _list(self, query: Mapping[str, str]) -> Reply:
+    def _list(self, query: Mapping[str, str]) -> HttpReply:
         limit, offset = int(query.get("limit", "10")), int(query.get("offset", "0"))
         uid = query.get("uid", "")
         if query.get("is_not_read") == "1":
@@ -121,21 +121,23 @@ class Store:
             found = self.messages(uid)
             count, page = len(found), found[offset : offset + limit]
         headers = {"X-Total-Count": count, "X-Total-Offset": offset, "X-Total-Limit": limit}
-        return Reply(200, _json(page), {name: str(value) for name, value in headers.items()})
+        return HttpReply(200, _json(page), {name: str(value) for name, value in headers.items()})
 
-    def _mark_read(self, uuid: Any) -> Reply:
+    def _mark_read(self, uuid: Any) -> HttpReply:
         with self._lock:
             message = self._messages.get(uuid)
             if message:
                 message["read_at"] = _now()
                 self._unread[message["uid"]].pop(uuid, None)
-                return Reply(200, _json({"code": 0}))
-        return Reply(404, _json({"code": 1}))
+                return HttpReply(200, _json({"code": 0}))
+        return HttpReply(404, _json({"code": 1}))
 
-    def _tip(self, user: Any) -> Reply:
+    def _tip(self, user: Any) -> HttpReply:
         with self._lock:
             message = self._tips.get(user)
-        return Reply(200, _json({"code": 0, "data": {"result": message is not None, "msg": message or ""}}))
+        return HttpReply(
+            200, _json({"code": 0, "data": {"result": message is not None, "msg": message or ""}})
+        )
 
 
 def _json(value: Any) -> bytes:

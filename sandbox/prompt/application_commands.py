@@ -6,14 +6,14 @@ from rich.table import Table
 from rich.text import Text
 
 from sandbox.fakes.dock import Dock
-from sandbox.prompt.desk import Desk, Refused
+from sandbox.prompt.context import Context, CommandRefused
 from sandbox.prompt.registry import command, number
 
 
 @command("open", "APPLICATION", "the user opens an application, or one more window of it")
-def open_application(desk: Desk, app: str) -> str:
+def open_application(context: Context, app: str) -> str:
     """Without the dock nobody will see it."""
-    dock = desk.terminal.dock
+    dock = context.terminal.dock
     if app in dock.apps:
         dock.set_windows(app, dock.windows(app) + 1)
     else:
@@ -22,27 +22,27 @@ def open_application(desk: Desk, app: str) -> str:
 
 
 @command("close", "APPLICATION", "the user closes an application with all its windows")
-def close_application(desk: Desk, app: str) -> str:
+def close_application(context: Context, app: str) -> str:
     """It must be on the dock."""
-    _have_windows(_dock_with(desk, app), app, 0)
+    _have_windows(_dock_with(context, app), app, 0)
     return f"{app} is closed."
 
 
 @command("windows", "APPLICATION COUNT", "the user opens or closes windows until there are so many")
-def windows(desk: Desk, app: str, count: str) -> str:
+def windows(context: Context, app: str, count: str) -> str:
     """The application must be on the dock."""
     wanted = int(number(count, int))
     if wanted < 0:
-        raise Refused(f"{wanted} is no number of windows")
-    dock = _dock_with(desk, app)
+        raise CommandRefused(f"{wanted} is no number of windows")
+    dock = _dock_with(context, app)
     _have_windows(dock, app, wanted)
     return f"{app} has {_count(dock, app)}."
 
 
 @command("dock", "APPLICATION", "the user keeps an application on the dock, whether or not it runs")
-def dock_application(desk: Desk, app: str) -> str:
+def dock_application(context: Context, app: str) -> str:
     """One that is not there yet comes without a window."""
-    dock = desk.terminal.dock
+    dock = context.terminal.dock
     if app in dock.apps:
         dock.pin(app)
     else:
@@ -51,9 +51,9 @@ def dock_application(desk: Desk, app: str) -> str:
 
 
 @command("undock", "APPLICATION", "the user takes an application off the dock, where it stays while it runs")
-def undock_application(desk: Desk, app: str) -> str:
+def undock_application(context: Context, app: str) -> str:
     """It must be on the dock."""
-    dock = _dock_with(desk, app)
+    dock = _dock_with(context, app)
     dock.pin(app, False)
     if not dock.windows(app):
         dock.close_app(app)
@@ -61,19 +61,19 @@ def undock_application(desk: Desk, app: str) -> str:
 
 
 @command("apps", "", "the applications on the dock")
-def applications(desk: Desk) -> None:
+def applications(context: Context) -> None:
     """In the dock's order."""
-    dock = desk.terminal.dock
+    dock = context.terminal.dock
     table = Table("Application", "Windows", "Kept on the dock")
     for app in dock.apps:
         table.add_row(Text(app), str(dock.windows(app)), "yes" if dock.is_docked(app) else "no")
-    desk.show(table)
+    context.show(table)
 
 
-def _dock_with(desk: Desk, app: str) -> Dock:
-    dock = desk.terminal.dock
+def _dock_with(context: Context, app: str) -> Dock:
+    dock = context.terminal.dock
     if app not in dock.apps:
-        raise Refused(f"there is no application '{app}' on the dock; see: apps")
+        raise CommandRefused(f"there is no application '{app}' on the dock; see: apps")
     return dock
 
 

@@ -7,15 +7,15 @@ from typing import Iterator, Mapping
 from prompt_toolkit.completion import CompleteEvent, Completer, Completion
 from prompt_toolkit.document import Document
 
-from sandbox.prompt.desk import Desk
+from sandbox.prompt.context import Context
 from sandbox.prompt.registry import COMMANDS
 
 
 class CommandCompleter(Completer):
     """Completes the first word to a command and the second one to one of the command's choices."""
 
-    def __init__(self, desk: Desk) -> None:
-        self._desk = desk
+    def __init__(self, context: Context) -> None:
+        self._context = context
 
     def get_completions(self, document: Document, _event: CompleteEvent) -> Iterator[Completion]:
         """The words that go on as the line ends."""
@@ -28,5 +28,5 @@ class CommandCompleter(Completer):
         if not before:
             return {name: known.help for name, known in COMMANDS.items()}
         if len(before) == 1 and before[0] in COMMANDS:
-            return COMMANDS[before[0]].choices(self._desk)
+            return COMMANDS[before[0]].choices(self._context)
         return {}

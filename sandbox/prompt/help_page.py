@@ -8,7 +8,7 @@ from rich.console import Group, RenderableType
 from rich.table import Table
 from rich.text import Text
 
-from sandbox.prompt.desk import Desk
+from sandbox.prompt.context import Context
 from sandbox.prompt.registry import COMMANDS, Command
 
 GROUPS = {
@@ -28,7 +28,7 @@ _EXAMPLES = {
 }
 
 
-def topics(_desk: Desk) -> Mapping[str, str]:
+def topics(_context: Context) -> Mapping[str, str]:
     """What there is help for."""
     return {name: known.help for name, known in COMMANDS.items()}
 
@@ -55,12 +55,12 @@ def _filled(usages: Sequence[str]) -> str:
     return "\n".join(lines)
 
 
-def about(desk: Desk, known: Command) -> RenderableType:
+def about(context: Context, known: Command) -> RenderableType:
     """One command: how it is typed, what happens, and what may be given to it."""
     lines = [Text.assemble((known.usage, "bold"), f"\n  {known.help}.")]
     if known.run.__doc__:
         lines.append(Text(f"  {known.run.__doc__}", "dim"))
     choices = Table.grid(padding=(0, 2, 0, 2))
-    for word, meaning in known.choices(desk).items():
+    for word, meaning in known.choices(context).items():
         choices.add_row(word, Text(meaning, "dim"))
     return Group(*lines, choices)

@@ -11,7 +11,7 @@ from rich.text import Text
 
 from sandbox.machine import layout
 from sandbox.prompt.completion import CommandCompleter
-from sandbox.prompt.desk import Desk, Refused
+from sandbox.prompt.context import Context, CommandRefused
 from sandbox.prompt.registry import run_line
 from sandbox.timeline.agenttime import minutes
 
@@ -21,22 +21,22 @@ _WELCOME = (
 )
 
 
-def run_prompt(desk: Desk) -> int:
+def run_prompt(context: Context) -> int:
     """Ask for commands while the traffic scrolls by above; Ctrl+C drops the line, Ctrl+D ends."""
     for line in _WELCOME:
-        desk.show(Text(line, "bold"))
+        context.show(Text(line, "bold"))
     session: PromptSession[str] = PromptSession(
         "box> ",
         history=_history(),
-        completer=CommandCompleter(desk),
+        completer=CommandCompleter(context),
         complete_while_typing=False,
-        bottom_toolbar=lambda: _status_line(desk),
+        bottom_toolbar=lambda: _status_line(context),
         refresh_interval=1,
     )
     with patch_stdout(raw=True):
         while True:
             try:
-                _carry_out(desk, session.prompt())
+                _carry_out(context, session.prompt())
             except KeyboardInterrupt:
                 continue
             except EOFError:
@@ -48,28 +48,30 @@ def _history() -> History:
     return FileHistory(str(layout.HISTORY)) if layout.HISTORY.exists() else InMemoryHistory()
 
 
-def run_script(desk: Desk, lines: Iterable[str]) -> int:
+def run_script(context: Context, lines: Iterable[str]) -> int:
     """Carry out the lines; the result is 1 when one of them was refused, else 0."""
     status = 0
     for line in lines:
         try:
-            status |= not _carry_out(desk, line)
+            status |= not _carry_out(context, line)
         except EOFError:
             break
     return int(status)
 
 
-def _carry_out(desk: Desk, line: str) -> bool:
+def _carry_out(context: Context, line: str) -> bool:
     try:
-        run_line(desk, line)
-    except Refused as refused:
-        desk.show(Text(str(refused), "red"))
+        run_line(context, line)
+    except CommandRefused as refused:
+        context.show(Text(str(refused), "red"))
         return False
     return True
 
 
-def _status_line(desk: Desk) -> str:
-    timeline = desk.timeline
+def _status_line(context: Context) -> str:
+    timeline = context.timeline
     log = "shown" if timeline.show_log else "hidden"
     speed = f" (x{timeline.time.speed})" if timeline.time.speed > 1 else ""
-    return f" agent time {minutes(timeline.time.now())}{speed}   user {desk.terminal.user.name}   log {log}"
+    return (
+        f" agent time {minutes(timeline.time.now())}{speed}   user {context.terminal.user.name}   log {log}"
+    )

@@ -7,16 +7,16 @@ import shlex
 from dataclasses import dataclass
 from typing import Any, Callable, Mapping
 
-from sandbox.prompt.desk import Desk, Refused, guess
+from sandbox.prompt.context import Context, CommandRefused, guess
 
 # What may be offered for an argument, each word with its meaning.
-Choices = Callable[[Desk], Mapping[str, str]]
+Choices = Callable[[Context], Mapping[str, str]]
 
 
 @dataclass(frozen=True)
 class Command:
     """One command: its name, the arguments it takes, what it does, and what may be offered for its first
-    argument. `run` gets the desk and the words after the name; it may return a line on what it did."""
+    argument. `run` gets the context and the words after the name; it may return a line on what it did."""
 
     name: str
     arguments: str
@@ -34,9 +34,9 @@ COMMANDS: dict[str, Command] = {}
 
 
 def command(
-    name: str, arguments: str, help: str, choices: Choices = lambda desk: {}
+    name: str, arguments: str, help: str, choices: Choices = lambda context: {}
 ) -> Callable[[Callable[..., str | None]], Callable[..., str | None]]:
-    """Make a function of the desk and some words a command of the prompt."""
+    """Make a function of the context and some words a command of the prompt."""
 
     def register(run: Callable[..., str | None]) -> Callable[..., str | None]:
         COMMANDS[name] = Command(name, arguments, help, choices, run)
@@ -45,22 +45,22 @@ def command(
     return register
 
 
-def run_line(desk: Desk, line: str) -> None:
-    """Carry out a typed line; raises Refused. An empty line and one that begins with "#" do nothing."""
+def run_line(context: Context, line: str) -> None:
+    """Carry out a typed line or raise CommandRefused. Empty lines and remarks ("#") do nothing."""
     name, _, rest = line.strip().partition(" ")
     if not name or name.startswith("#"):
         return
     if name not in COMMANDS:
-        raise Refused(f"there is no command '{name}'; {guess(name, COMMANDS) or 'see: help'}")
+        raise CommandRefused(f"there is no command '{name}'; {guess(name, COMMANDS) or 'see: help'}")
     known = COMMANDS[name]
     words = _words(rest.strip())
     try:
-        call = inspect.signature(known.run).bind(desk, *words)
+        call = inspect.signature(known.run).bind(context, *words)
     except TypeError:
-        raise Refused(f"usage: {known.usage}") from None
+        raise CommandRefused(f"usage: {known.usage}") from None
     told = known.run(*call.args)
     if told:
-        desk.tell(told)
+        context.tell(told)
 
 
 def number(text: str, kind: Callable[[str], Any]) -> Any:
@@ -68,7 +68,7 @@ def number(text: str, kind: Callable[[str], Any]) -> Any:
     try:
         return kind(text)
     except ValueError:
-        raise Refused(f"'{text}' is not a number") from None
+        raise CommandRefused(f"'{text}' is not a number") from None
 
 
 def _words(rest: str) -> list[str]:
@@ -78,4 +78,4 @@ def _words(rest: str) -> list[str]:
     try:
         return shlex.split(rest)
     except ValueError as error:
-        raise Refused(f"cannot read the line: {error}") from None
+        raise CommandRefused(f"cannot read the line: {error}") from None

@@ -11,7 +11,7 @@ from sandbox.box import outside
 from sandbox.box.outside import Trouble
 from sandbox.box.preconditions import clock, require_agent
 from sandbox.prompt import commands, loop, session_end
-from sandbox.prompt.desk import Desk
+from sandbox.prompt.context import Context
 from sandbox.prompt.mirror import Mirror
 from sandbox.terminal import Terminal
 from sandbox.timeline.agenttime import AgentTime
@@ -31,7 +31,7 @@ def run(options: Namespace) -> int:
     if result_stream:
         Mirror(terminal.events, result_stream)
     try:
-        status = _serve(Desk(terminal, timeline))
+        status = _serve(Context(terminal, timeline))
     finally:
         timeline.end()
         problems = terminal.shut_down()
@@ -40,10 +40,10 @@ def run(options: Namespace) -> int:
     return 1 if problems else status
 
 
-def _serve(desk: Desk) -> int:
-    session_end.watch(desk)
+def _serve(context: Context) -> int:
+    session_end.watch(context)
     try:
-        desk.terminal.start_agent()
+        context.terminal.start_agent()
     except AssertionError:
         raise Trouble("the agent did not announce itself to the daemon") from None
-    return loop.run_prompt(desk) if sys.stdin.isatty() else loop.run_script(desk, sys.stdin)
+    return loop.run_prompt(context) if sys.stdin.isatty() else loop.run_script(context, sys.stdin)

@@ -5,7 +5,7 @@ from __future__ import annotations
 from rich.text import Text
 
 from sandbox.events import Event
-from sandbox.prompt.desk import Desk
+from sandbox.prompt.context import Context
 
 _ENDS = {
     "Terminate": "The session would end here. The next one begins with: login",
@@ -13,11 +13,11 @@ _ENDS = {
 }
 
 
-def watch(desk: Desk) -> None:
+def watch(context: Context) -> None:
     """From now on, a line under each forced action."""
 
     def take(event: Event) -> None:
         if (event.source, event.target) == ("velks", "logind") and event.member in _ENDS:
-            desk.show(Text(_ENDS[event.member], "bold"))
+            context.show(Text(_ENDS[event.member], "bold"))
 
-    desk.terminal.events.subscribe(take)
+    context.terminal.events.subscribe(take)

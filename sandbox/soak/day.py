@@ -6,8 +6,8 @@ from dataclasses import dataclass
 from random import Random
 from typing import Callable
 
-from sandbox.soak.deeds import Deeds
-from sandbox.soak.ledger import Ledger
+from sandbox.soak.activities import Activities
+from sandbox.soak.accounting import Accounting
 from sandbox.terminal import Terminal
 
 BEGIN = 8  # o'clock, when somebody logs in
@@ -24,11 +24,11 @@ _HALF_A_MINUTE = 30
 
 
 @dataclass(frozen=True)
-class _Habit:
-    """A deed, and how often an hour sees it: when the user is there, in an absence in the working hours, at
-    night."""
+class _Rate:
+    """How often an activity takes place in an hour: while the user is there, in an absence in the working
+    hours, at night."""
 
-    deed: Callable[[], None]
+    activity: Callable[[], None]
     present: float
     absent: float
     night: float
@@ -37,39 +37,39 @@ class _Habit:
 class Day:
     """Lives hour by hour through a day that a seed tells, minute by minute of the agent's time."""
 
-    def __init__(self, terminal: Terminal, ledger: Ledger, seed: int) -> None:
+    def __init__(self, terminal: Terminal, accounting: Accounting, seed: int) -> None:
         self._terminal = terminal
         self._random = Random(seed)
-        self._deeds = Deeds(terminal, ledger, self._random)
-        self._habits = self._make_habits()
+        self._activities = Activities(terminal, accounting, self._random)
+        self._rates = self._make_rates()
         self._elapsed = 0  # seconds
         self._absence = 0  # minutes until the user is back
         self._absent_for = 0
         self._outage = 0  # minutes until the platform is back
 
-    def _make_habits(self) -> list[_Habit]:
-        deeds = self._deeds
+    def _make_rates(self) -> list[_Rate]:
+        activities = self._activities
         return [
-            _Habit(deeds.use_kept_application, 10, 0, 0),
-            _Habit(deeds.open_application, 10, 0, 0),
-            _Habit(deeds.change_windows, 15, 1, 0),
-            _Habit(deeds.close_application, 8, 1, 0.2),
-            _Habit(self._go_away, 2, 0, 0),
-            _Habit(deeds.post_messages, 4, 4, 1),
-            _Habit(deeds.push_forwarded_policies, 5, 5, 2),
-            _Habit(deeds.push_notice, 1, 1, 0.5),
-            _Habit(deeds.push_logout, 0.5, 0.5, 0.1),
-            _Habit(deeds.push_for_somebody_else, 0.5, 0.5, 0.1),
-            _Habit(deeds.change_packages, 2, 1, 3),
-            _Habit(deeds.restart_daemon, 0.5, 0.5, 0.5),
-            _Habit(deeds.restart_desktop, 0.3, 0.3, 0.1),
-            _Habit(deeds.restart_service, 1, 1, 0.5),
-            _Habit(self._stop_platform, 0.2, 0.2, 0.2),
+            _Rate(activities.use_kept_application, 10, 0, 0),
+            _Rate(activities.open_application, 10, 0, 0),
+            _Rate(activities.change_windows, 15, 1, 0),
+            _Rate(activities.close_application, 8, 1, 0.2),
+            _Rate(self._go_away, 2, 0, 0),
+            _Rate(activities.post_messages, 4, 4, 1),
+            _Rate(activities.push_forwarded_policies, 5, 5, 2),
+            _Rate(activities.push_notice, 1, 1, 0.5),
+            _Rate(activities.push_logout, 0.5, 0.5, 0.1),
+            _Rate(activities.push_for_somebody_else, 0.5, 0.5, 0.1),
+            _Rate(activities.change_packages, 2, 1, 3),
+            _Rate(activities.restart_daemon, 0.5, 0.5, 0.5),
+            _Rate(activities.restart_desktop, 0.3, 0.3, 0.1),
+            _Rate(activities.restart_service, 1, 1, 0.5),
+            _Rate(self._stop_platform, 0.2, 0.2, 0.2),
         ]
 
     def begin(self) -> None:
         """Log in."""
-        self._deeds.log_in()
+        self._activities.log_in()
         self._pass(_HALF_A_MINUTE)
 
     def live_hour(self) -> None:
@@ -80,16 +80,16 @@ class Day:
     def end(self) -> None:
         """Let the user come back and the platform too, and all that still waits arrive."""
         self._come_back()
-        self._deeds.start_platform()
+        self._activities.start_platform()
         for _ in range(_SURELY_ALL_POLLED):
             self._pass(_MINUTES)
 
     def _live_minute(self) -> None:
         works = self._hour in _WORKING_HOURS
-        for habit in self._habits:
-            often = (habit.absent if self._absence else habit.present) if works else habit.night
+        for rate in self._rates:
+            often = (rate.absent if self._absence else rate.present) if works else rate.night
             if self._random.random() < often / _MINUTES:
-                habit.deed()
+                rate.activity()
         self._wait_for_user(works)
         self._wait_for_platform()
         self._pass(_MINUTES)
@@ -102,9 +102,9 @@ class Day:
         if not works:
             self._absence = 1  # and another one, until the morning
         if self._absent_for == 0 and self._absence:
-            self._deeds.lock(True)
+            self._activities.lock(True)
         if self._absent_for == _SCREEN_SAVER_AFTER:
-            self._deeds.start_screen_saver()
+            self._activities.start_screen_saver()
         if self._absence:
             self._absent_for += 1
             self._absence -= 1
@@ -116,24 +116,24 @@ class Day:
 
     def _come_back(self) -> None:
         self._absence = self._absent_for = 0
-        self._deeds.lock(False)
+        self._activities.lock(False)
 
     def _stop_platform(self) -> None:
         self._outage = self._random.randint(1, _LONGEST_OUTAGE)
-        self._deeds.stop_platform()
+        self._activities.stop_platform()
 
     def _wait_for_platform(self) -> None:
         if self._outage:
             self._outage -= 1
         else:
-            self._deeds.start_platform()
+            self._activities.start_platform()
 
     def _pass(self, seconds: int) -> None:
         """Let time pass, with what is due in it."""
         periods = self._elapsed // _STATE_PERIOD
         self._elapsed += seconds
         if self._elapsed // _STATE_PERIOD > periods:
-            self._deeds.expect_status()
+            self._activities.expect_status()
         if seconds == _MINUTES:
-            self._deeds.expect_forced_logout()
+            self._activities.expect_forced_logout()
         self._terminal.advance(seconds)

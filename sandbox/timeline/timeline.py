@@ -14,7 +14,7 @@ from rich.table import Table
 from rich.text import Text
 
 from sandbox.events import SYNC, WAKE_UP, Event, Events
-from sandbox.timeline import wording
+from sandbox.timeline import phrases
 from sandbox.timeline.agenttime import AgentTime, minutes
 from sandbox.timeline.breaking import breakable
 
@@ -129,8 +129,8 @@ class Timeline:
             half = rest * 9 // 16
             line.add_column(width=half - _GAP, overflow="fold")
             line.add_column(max_width=rest - half, overflow="fold")
-            words = breakable(wording.what(event), half - _GAP)
-            cells += [Text(words), Text(wording.meaning(event), _REMARK)]
+            words = breakable(phrases.what(event), half - _GAP)
+            cells += [Text(words), Text(phrases.meaning(event), _REMARK)]
         line.add_row(*cells)
         return line
 
@@ -138,8 +138,8 @@ class Timeline:
 def _stacked(event: Event, width: int) -> Text:
     """What was said and, under it, what it means."""
     style = "dim" if event.kind in _LOG_KINDS else ""
-    means = wording.meaning(event)
-    words = breakable(wording.what(event), width)
+    means = phrases.meaning(event)
+    words = breakable(phrases.what(event), width)
     return Text.assemble((words, style), ("\n" + means if means else "", _REMARK))
 
 
@@ -163,7 +163,7 @@ def _route(event: Event) -> Text:
 
 
 def _participant(name: str) -> Text:
-    return Text(wording.who(name), {"velks": "bold cyan", "stranger": "bold red"}.get(name, "green"))
+    return Text(phrases.who(name), {"velks": "bold cyan", "stranger": "bold red"}.get(name, "green"))
 
 
 def _is_probe(event: Event) -> bool:

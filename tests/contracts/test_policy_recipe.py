@@ -20,9 +20,9 @@ PAGE_TESTS = ("tests/contracts/test_docs.py", "tests/contracts/test_examples.py"
 USES = """
 from sandbox.events import Event
 from sandbox.policies import FORWARDED_CODES, with_action
-from sandbox.timeline import wording
+from sandbox.timeline import phrases
 from tests.fuzz.run import dictionary
-print(wording.meaning(Event(0, "daemon", "*", "signal", "pushPolicyMsg", ("", '{"type": 1305}'))))
+print(phrases.meaning(Event(0, "daemon", "*", "signal", "pushPolicyMsg", ("", '{"type": 1305}'))))
 print(any(policy.code == 1305 for policy in with_action("Notify")), 1305 in FORWARDED_CODES)
 print('"1305"' in dictionary("policy"))
 """

@@ -27,7 +27,7 @@ class Line:
 
 
 @dataclass(frozen=True)
-class Report:
+class CheckReport:
     """One run with --json."""
 
     status: int
@@ -71,13 +71,13 @@ def run(
     return subprocess.run([*command, *arguments], capture_output=True, text=True, timeout=100)
 
 
-def report(terminal: Terminal, env: Mapping[str, str] | None = None) -> Report:
+def report(terminal: Terminal, env: Mapping[str, str] | None = None) -> CheckReport:
     """What it finds now."""
     ended = run(terminal, "--json", env=env)
     assert ended.stderr == ""
     content = json.loads(ended.stdout)
     lines = [(entry["subject"], Line(entry["result"], entry["text"])) for entry in content["findings"]]
-    return Report(ended.returncode, content["result"], lines)
+    return CheckReport(ended.returncode, content["result"], lines)
 
 
 def make_all_well(terminal: Terminal) -> None:

@@ -89,9 +89,9 @@ def test_a_bus_that_was_restarted_is_not_connected_to_again_but_by_a_fresh_agent
     bus_of(terminal, kind).restart()
     assert ends_for_want_of(terminal, kind)
 
-    for peer in terminal.peers.values():
-        if not peer.present:
-            peer.appear()
+    for fake in terminal.fakes.values():
+        if not fake.present:
+            fake.appear()
     terminal.start_agent()
     carries_out_policies(terminal)
 

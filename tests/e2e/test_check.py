@@ -147,7 +147,7 @@ def test_machine_identifier_that_is_missing_is_bad(terminal: Terminal) -> None:
 
 
 @pytest.mark.parametrize(
-    ("peer", "result"),
+    ("fake", "result"),
     [
         ("daemon", "bad"),
         ("logind", "bad"),
@@ -161,13 +161,13 @@ def test_machine_identifier_that_is_missing_is_bad(terminal: Terminal) -> None:
     ],
 )
 def test_service_that_is_absent_is_named_with_what_follows(
-    terminal: Terminal, peer: str, result: str
+    terminal: Terminal, fake: str, result: str
 ) -> None:
-    terminal.peers[peer].leave()
+    terminal.fakes[fake].leave()
     found = report(terminal)
     line = found.line("service", "is not there: ")
-    assert (line.result, line.text.split()[0]) == (result, terminal.peers[peer].bus_name)
-    assert len([name for name, _ in found.lines if name == "service"]) == len(terminal.peers)
+    assert (line.result, line.text.split()[0]) == (result, terminal.fakes[fake].bus_name)
+    assert len([name for name, _ in found.lines if name == "service"]) == len(terminal.fakes)
 
 
 @pytest.mark.parametrize("kind", ["system", "session"])

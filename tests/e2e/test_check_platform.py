@@ -103,13 +103,13 @@ def test_platform_that_is_down_is_bad_with_the_reason(working: Terminal) -> None
 
 
 def test_platform_with_a_certificate_of_somebody_else_is_bad(working: Terminal) -> None:
-    stranger = Authority(layout.BOX / "stranger", "stranger").issue_server(layout.PLATFORM_HOST)
+    certificate = Authority(layout.BOX / "stranger", "stranger").issue_server(layout.PLATFORM_HOST)
     working.platform.leave()
-    impostor = Platform(working.events, working.platform.port, stranger)
+    stranger = Platform(working.events, working.platform.port, certificate)
     try:
         line = report(working).line("platform")
     finally:
-        impostor.close()
+        stranger.close()
     assert line.result == "bad"
     assert "certificate" in line.text
 

@@ -7,7 +7,7 @@ from typing import Callable
 import pytest
 
 from sandbox.events import Event
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
@@ -34,11 +34,11 @@ def changes_come(terminal: Terminal) -> None:
     terminal.launcher.announce("created", terminal.launcher.items[0])
 
 
-def lie(peer: Peer) -> None:
+def lie(fake: Fake) -> None:
     """Answer every call with values of another type than the contract's."""
-    contracts = [contract for known in peer.objects.values() for contract in known.contracts.values()]
+    contracts = [contract for known in fake.objects.values() for contract in known.contracts.values()]
     methods = [name for contract in contracts for name in contract.methods]
-    peer.answers = {name: NONSENSE for name in [*methods, "Get", "Set"]}
+    fake.answers = {name: NONSENSE for name in [*methods, "Get", "Set"]}
 
 
 def let_limits_pass(terminal: Terminal, limit: int, kind: str, name: str) -> None:
@@ -51,10 +51,10 @@ def let_limits_pass(terminal: Terminal, limit: int, kind: str, name: str) -> Non
     terminal.events.subscribe(on_event)
 
 
-def hang(terminal: Terminal, peer: Peer) -> None:
+def hang(terminal: Terminal, fake: Fake) -> None:
     """Take every call from now on and answer none."""
-    peer.fault = Fault.hang()
-    let_limits_pass(terminal, DBUS_LIMIT, "call", peer.name)
+    fake.fault = Fault.hang()
+    let_limits_pass(terminal, DBUS_LIMIT, "call", fake.name)
 
 
 def policies_go_on(terminal: Terminal, faulty: str) -> None:
@@ -87,52 +87,52 @@ def all_goes_on(terminal: Terminal, faulty: str) -> None:
     reports_go_on(terminal)
 
 
-def absent(terminal: Terminal, peer: Peer) -> None:
+def absent(terminal: Terminal, fake: Fake) -> None:
     """Not there at the start, and never after."""
-    peer.leave()
+    fake.leave()
     terminal.start_agent()
-    all_goes_on(terminal, peer.name)
+    all_goes_on(terminal, fake.name)
 
 
-def late(terminal: Terminal, peer: Peer) -> None:
+def late(terminal: Terminal, fake: Fake) -> None:
     """Not there at the start, but later, from when on it is served."""
-    peer.leave()
+    fake.leave()
     terminal.start_agent()
-    peer.appear()
+    fake.appear()
     all_goes_on(terminal, "nobody")
 
 
-def restarting(terminal: Terminal, peer: Peer) -> None:
+def restarting(terminal: Terminal, fake: Fake) -> None:
     """Another process takes its place, which is served as well."""
     terminal.start_agent()
-    peer.restart()
+    fake.restart()
     all_goes_on(terminal, "nobody")
 
 
-def gone(terminal: Terminal, peer: Peer) -> None:
+def gone(terminal: Terminal, fake: Fake) -> None:
     """There at the start and then no more."""
     terminal.start_agent()
-    peer.leave()
-    all_goes_on(terminal, peer.name)
+    fake.leave()
+    all_goes_on(terminal, fake.name)
 
 
-def hung_at_the_start(terminal: Terminal, peer: Peer) -> None:
+def hung_at_the_start(terminal: Terminal, fake: Fake) -> None:
     """Takes every call from the start on and answers none."""
-    hang(terminal, peer)
+    hang(terminal, fake)
     terminal.start_agent()
     all_goes_on(terminal, "nobody")
 
 
-def hung_later(terminal: Terminal, peer: Peer) -> None:
+def hung_later(terminal: Terminal, fake: Fake) -> None:
     """Takes every call and, from some time on, answers none."""
     terminal.start_agent()
-    hang(terminal, peer)
+    hang(terminal, fake)
     all_goes_on(terminal, "nobody")
 
 
-def lying(terminal: Terminal, peer: Peer) -> None:
+def lying(terminal: Terminal, fake: Fake) -> None:
     """Answers with values of another type."""
-    lie(peer)
+    lie(fake)
     terminal.start_agent()
     all_goes_on(terminal, "nobody")
 
@@ -140,16 +140,16 @@ def lying(terminal: Terminal, peer: Peer) -> None:
 @pytest.mark.parametrize("state", [absent, late, restarting, gone, hung_at_the_start, hung_later, lying])
 @pytest.mark.parametrize("name", sorted(FAKES.keys() - {"daemon"}))
 def test_policies_and_reports_go_on_while_a_service_is(
-    terminal: Terminal, name: str, state: Callable[[Terminal, Peer], None]
+    terminal: Terminal, name: str, state: Callable[[Terminal, Fake], None]
 ) -> None:
     busy_desktop(terminal)
-    state(terminal, terminal.peers[name])
+    state(terminal, terminal.fakes[name])
     assert terminal.agent.alive
 
 
 @pytest.mark.parametrize("state", [late, restarting, hung_at_the_start, hung_later, lying])
 def test_policies_and_reports_go_on_while_the_daemon_is(
-    terminal: Terminal, state: Callable[[Terminal, Peer], None]
+    terminal: Terminal, state: Callable[[Terminal, Fake], None]
 ) -> None:
     busy_desktop(terminal)
     state(terminal, terminal.daemon)

@@ -71,7 +71,7 @@ def test_hung_service_reads_as_no_and_the_report_comes(terminal: Terminal, hung:
     terminal.screensaver.run()
     terminal.session_manager.set("Locked", True)
     terminal.start_agent()
-    terminal.peers[hung].fault = Fault.hang()
+    terminal.fakes[hung].fault = Fault.hang()
     mark = terminal.events.mark()
 
     terminal.daemon.push_online()

@@ -11,7 +11,7 @@ import pytest
 
 from sandbox.machine import layout
 from sandbox.periods import SURELY_NEXT_POLL
-from sandbox.platform.certificates import Authority, Identity
+from sandbox.platform.certificates import Authority, CertificateFiles
 from sandbox.platform.server import HttpFault, Platform, trust
 from sandbox.terminal import Terminal
 from tests.e2e.wire import carries_out_policies, log_lines, next_notification
@@ -115,17 +115,17 @@ def test_reply_left_over_counts_are_not_read_again(terminal: Terminal) -> None:
     assert len(warnings(terminal, mark)) == 1
 
 
-def stranger() -> Identity:
+def stranger() -> CertificateFiles:
     """A server's certificate from an authority that the terminal does not know."""
     return Authority(Path(mkdtemp()), "Stranger").issue_server(layout.PLATFORM_HOST)
 
 
-def misnamed() -> Identity:
+def misnamed() -> CertificateFiles:
     """A certificate of the platform's authority for another host."""
     return trust().authority.issue_server("elsewhere.box")
 
 
-def expired() -> Identity:
+def expired() -> CertificateFiles:
     """The platform's certificate, too old."""
     return trust().authority.issue_server(layout.PLATFORM_HOST, expired=True)
 
@@ -134,7 +134,7 @@ def expired() -> Identity:
 def test_platform_with_a_wrong_certificate_is_told_nothing(terminal: Terminal, identity: object) -> None:
     assert callable(identity)
     terminal.platform.close()
-    impostor = Platform(terminal.events, server=identity())
+    stranger = Platform(terminal.events, server=identity())
     try:
         mark = terminal.events.mark()
         terminal.start_agent()
@@ -144,7 +144,7 @@ def test_platform_with_a_wrong_certificate_is_told_nothing(terminal: Terminal, i
         assert len(warnings(terminal, mark)) == 2
         carries_out_policies(terminal)
     finally:
-        impostor.close()
+        stranger.close()
 
 
 def test_terminal_without_its_certificate_gets_nothing_and_goes_on(terminal: Terminal) -> None:

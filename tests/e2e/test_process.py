@@ -84,8 +84,8 @@ def test_binary_knows_no_variable_of_ours(terminal: Terminal) -> None:
 
 
 def test_no_services_at_all_do_not_keep_the_agent_from_running(terminal: Terminal) -> None:
-    for peer in terminal.peers.values():
-        peer.leave()
+    for fake in terminal.fakes.values():
+        fake.leave()
     terminal.start_agent()
     terminal.daemon.appear()
     mark = terminal.events.mark()

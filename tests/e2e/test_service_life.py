@@ -197,11 +197,11 @@ def test_the_screen_is_as_the_service_says_that_is_there_at_the_time(
     terminal: Terminal, name: str, status: int
 ) -> None:
     {"screensaver": terminal.screensaver.run, "session_manager": terminal.session_manager.lock}[name]()
-    peer = terminal.peers[name]
-    peer.leave()
+    fake = terminal.fakes[name]
+    fake.leave()
     terminal.start_agent()
     reports = []
-    for change in (peer.appear, peer.restart, peer.leave, peer.appear):
+    for change in (fake.appear, fake.restart, fake.leave, fake.appear):
         change()
         reports.append(report(terminal)[0])
     assert reports == [status, status, ACTIVE, status]

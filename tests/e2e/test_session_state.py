@@ -56,7 +56,7 @@ def test_screen_saver_goes_before_lock(terminal: Terminal, running: bool, locked
 def test_absent_service_counts_as_no(terminal: Terminal, absent: tuple[str, ...], status: int) -> None:
     show(terminal, running=True, locked=True)
     for name in absent:
-        terminal.peers[name].leave()
+        terminal.fakes[name].leave()
     terminal.start_agent()
     assert five_minute_report(terminal)[0] == status
 
@@ -65,7 +65,7 @@ def test_absent_service_counts_as_no(terminal: Terminal, absent: tuple[str, ...]
 @pytest.mark.parametrize("yes", [True, False])
 def test_service_that_the_bus_can_start_is_started_and_read(terminal: Terminal, name: str, yes: bool) -> None:
     show(terminal, running=yes and name == "screensaver", locked=yes and name == "session_manager")
-    service = terminal.peers[name]
+    service = terminal.fakes[name]
     service.leave()
     terminal.start_agent()
     terminal.commands.hold("start-service")
@@ -113,7 +113,7 @@ def test_each_present_service_is_logged(terminal: Terminal) -> None:
 )
 def test_absent_service_is_not_logged(terminal: Terminal, absent: str, logged: list[str]) -> None:
     show(terminal, running=True, locked=True)
-    terminal.peers[absent].leave()
+    terminal.fakes[absent].leave()
     terminal.start_agent()
     mark = terminal.events.mark()
     five_minute_report(terminal)
@@ -203,7 +203,7 @@ def test_user_of_another_type_is_reported_as_unknown(terminal: Terminal, signatu
 def test_replies_of_another_form_read_as_no(terminal: Terminal, service: str, reply: Reply) -> None:
     show(terminal, running=True, locked=True)
     terminal.start_agent()
-    terminal.peers[service].answers["Get"] = reply
+    terminal.fakes[service].answers["Get"] = reply
     expected = {
         "logind": (SCREEN_SAVER, ""),
         "screensaver": (LOCKED, "zhang.wei"),
@@ -215,13 +215,13 @@ def test_replies_of_another_form_read_as_no(terminal: Terminal, service: str, re
 @pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
 def test_failing_service_reads_as_no(terminal: Terminal, service: str) -> None:
     terminal.start_agent()
-    terminal.peers[service].fault = Fault.fail()
+    terminal.fakes[service].fault = Fault.fail()
     assert five_minute_report(terminal) == (ACTIVE, "" if service == "logind" else "zhang.wei")
 
 
 @pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
 def test_service_that_does_not_introspect_is_read_all_the_same(terminal: Terminal, service: str) -> None:
     show(terminal, running=True, locked=True)
-    terminal.peers[service].faults["Introspect"] = Fault.hang()
+    terminal.fakes[service].faults["Introspect"] = Fault.hang()
     terminal.start_agent()
     assert five_minute_report(terminal) == (SCREEN_SAVER, "zhang.wei")

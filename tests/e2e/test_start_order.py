@@ -14,7 +14,7 @@ SHUTDOWN_NOTICE = "该终端1分钟后进行关机"
 
 def start_until(terminal: Terminal, target: str, member: str) -> int:
     """Start the agent, which now waits for a service's answer; the mark before it."""
-    terminal.peers[target].faults[member] = Fault.hold()
+    terminal.fakes[target].faults[member] = Fault.hold()
     mark = terminal.events.mark()
     terminal.start_agent(ready=lambda: terminal.events.wait_for(target=target, member=member, after=mark))
     return mark

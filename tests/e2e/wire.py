@@ -79,7 +79,7 @@ def asked_of_the_session_bus(terminal: Terminal, change: Callable[[], object]) -
     before = len(terminal.session_monitor.calls)
     change()
     terminal.receive_all()
-    present = [peer.bus_name for peer in terminal.peers.values() if peer.present]
+    present = [fake.bus_name for fake in terminal.fakes.values() if fake.present]
     calls = terminal.session_monitor.calls[before:]
     return [(call.member, *call.args) for call in calls if call.destination not in present]
 

@@ -1,14 +1,14 @@
 #include "fuzzing.h"
 #include "httpclientapi.h"
+#include "https_server.h"
 #include "raw_server.h"
-#include "tls_peer.h"
 
 namespace {
 
 /// A client of a server of its own. Kept until the process ends, as the server's thread is.
 struct Road
 {
-    TlsPeer files; ///< only for its certificates
+    HttpsServer files; ///< only for its certificates
     RawServer server{files.file("server"), files.file("server-key")};
     HttpClientApi client{nullptr, false};
 };

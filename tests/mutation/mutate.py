@@ -21,7 +21,7 @@ from sandbox.ending import exit_with
 from tests.mutation import explanations
 from tests.mutation.areas import Area, area_of, chosen
 from tests.mutation.mutants import Mutant, mutants
-from tests.mutation.workshop import FOLDER, REPOSITORY, Trouble, Verdict, Workshop
+from tests.mutation.workshop import FOLDER, REPOSITORY, WorkshopTrouble, Verdict, Workshop
 
 _LEAST_CAUGHT = 90  # per cent of a component's mutants that are not explained
 _VERDICTS = FOLDER / "verdicts.txt"  # of the last run, a line each
@@ -112,7 +112,7 @@ def main() -> int:
         tasks = _selected(tasks, options)
         print(f"{len(tasks)} mutants", flush=True)
         outcomes = judge_all(tasks, known, options.jobs, options.quick)
-    except (Trouble, ValueError) as trouble:
+    except (WorkshopTrouble, ValueError) as trouble:
         print(f"mutate: {trouble}", file=sys.stderr)
         return 1
     _VERDICTS.write_text("".join(f"{outcome} {task.mutant}\n" for task, outcome in zip(tasks, outcomes)))
@@ -123,7 +123,7 @@ def _require_fresh(known: Iterable[explanations.Key], tasks: Sequence[Task]) -> 
     stale = explanations.stale(known, [task.mutant for task in tasks])
     if stale:
         lines = "".join(f"\n{key.place}: {key.before} → {key.after}" for key in stale)
-        raise Trouble(f"{explanations.FILE.name} explains mutants that are gone:{lines}")
+        raise WorkshopTrouble(f"{explanations.FILE.name} explains mutants that are gone:{lines}")
 
 
 def _selected(tasks: list[Task], options: argparse.Namespace) -> list[Task]:

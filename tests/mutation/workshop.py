@@ -24,7 +24,7 @@ _NO_TESTS = 5  # exit status of pytest when no test was chosen
 _PYTHON = "/usr/bin/python3"
 
 
-class Trouble(Exception):
+class WorkshopTrouble(Exception):
     """What keeps the check from going on, in a line."""
 
 
@@ -38,19 +38,19 @@ class Workshop:
         self._sound: list[Area] = []  # those whose end-to-end tests pass without any change
 
     def prepare(self, areas: Sequence[Area]) -> None:
-        """Bring the copy up to date and build what the tests need; Trouble if unit tests fail as it is."""
+        """Bring the copy up to date and build what the tests need; the unit tests must pass as it is."""
         _copy_tree(self._tree)
         if not (self._build / "build.ninja").exists():
             self._configure()
         unit = tuple({test: None for area in areas for test in area.unit})
         if not self._make("velks", *unit):
-            raise Trouble(f"the tree does not compile; see {self._log}")
+            raise WorkshopTrouble(f"the tree does not compile; see {self._log}")
         if not self._pass_unit_tests(unit, _TEST_SECONDS):
-            raise Trouble(f"unit tests fail without any change; see {self._log}")
+            raise WorkshopTrouble(f"unit tests fail without any change; see {self._log}")
 
     def judge(self, mutant: Mutant, area: Area, quick: bool) -> Verdict:
         """What the tests say to a mutant, if `quick` the unit tests alone; a program that hangs is caught.
-        Trouble if the end-to-end tests fail without it."""
+        WorkshopTrouble if the end-to-end tests fail without it."""
         verdict = self._try(mutant, area, self._meet_unit_tests)
         if verdict != "survived" or quick or not area.e2e:
             return verdict
@@ -80,7 +80,7 @@ class Workshop:
         if area in self._sound:
             return
         if self._meet_e2e_tests(area) != "survived":
-            raise Trouble(f"end-to-end tests of {area.file} fail without any change; see {self._log}")
+            raise WorkshopTrouble(f"end-to-end tests of {area.file} fail without any change; see {self._log}")
         self._sound.append(area)
 
     def _configure(self) -> None:
@@ -91,7 +91,7 @@ class Workshop:
             f"-DCMAKE_PROJECT_INCLUDE={self._tree / 'tests' / 'mutation' / 'precompiled.cmake'}",
         ]
         if self._run(arguments, _BUILD_SECONDS) != 0:
-            raise Trouble(f"the tree cannot be configured; see {self._log}")
+            raise WorkshopTrouble(f"the tree cannot be configured; see {self._log}")
 
     def _make(self, *targets: str) -> bool:
         return self._run(["ninja", "-C", str(self._build), *targets], _BUILD_SECONDS) == 0

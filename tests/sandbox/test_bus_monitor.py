@@ -11,7 +11,7 @@ import pytest
 from sandbox.bus.monitor import Overheard
 from sandbox.bus.stranger import Stranger
 from sandbox.terminal import Terminal
-from tests.sandbox.people import talking_agent
+from tests.sandbox.programs import talking_agent
 
 SOME_POLICY = '{"type": 5}'
 

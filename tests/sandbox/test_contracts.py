@@ -11,7 +11,7 @@ import pytest
 from sandbox import contracts
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.sandbox.people import talking_agent
+from tests.sandbox.programs import talking_agent
 
 CHANGES = "https://%1:%2/uim/v3/client/upinfo_log"
 INVENTORY = "https://%1:%2/uim/v3/client/upload_info"

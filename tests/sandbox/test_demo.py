@@ -16,7 +16,7 @@ from sandbox.events import Event
 from sandbox.terminal import Terminal
 from sandbox.timeline.agenttime import AgentTime
 from sandbox.timeline.timeline import Timeline
-from tests.sandbox.people import idle_agent, rude_agent, run_program
+from tests.sandbox.programs import idle_agent, rude_agent, run_program
 
 _PATIENCE = 20.0
 _NO_PATIENCE = 0.01

@@ -7,7 +7,7 @@ from pathlib import Path
 import pytest
 
 from sandbox.machine.users import current_user
-from tests.sandbox.people import run_program
+from tests.sandbox.programs import run_program
 
 
 def test_piped_commands_are_carried_out_and_the_traffic_is_printed() -> None:

@@ -9,10 +9,10 @@ from prompt_toolkit.document import Document
 from sandbox.policies import POLICIES
 from sandbox.prompt import commands, help_page, session_end
 from sandbox.prompt.completion import CommandCompleter
-from sandbox.prompt.desk import Refused
+from sandbox.prompt.context import CommandRefused
 from sandbox.prompt.registry import COMMANDS, run_line
 from sandbox.terminal import Terminal
-from tests.sandbox.paper import Paper
+from tests.sandbox.recorded_context import RecordedContext
 
 assert commands, "importing the module makes its commands known"
 
@@ -20,10 +20,10 @@ _SHOW_SOMETHING_ELSE = {"apps", "messages", "software", "state", "help", "wait",
 
 
 @pytest.fixture
-def desk(terminal: Terminal) -> Paper:
-    """A desk at a terminal with a platform, whose agent is not started."""
+def context(terminal: Terminal) -> RecordedContext:
+    """A context at a terminal with a platform, whose agent is not started."""
     assert terminal.platform
-    return Paper(terminal)
+    return RecordedContext(terminal)
 
 
 _ANSWERS = {
@@ -59,10 +59,10 @@ _AFTER = {
 
 
 @pytest.mark.parametrize("line", _ANSWERS)
-def test_a_command_is_answered_with_a_line(desk: Paper, line: str) -> None:
+def test_a_command_is_answered_with_a_line(context: RecordedContext, line: str) -> None:
     for typed, answer in {line: _ANSWERS[line], **_AFTER.get(line, {})}.items():
-        run_line(desk, typed)
-        assert desk.lines_with(answer), typed
+        run_line(context, typed)
+        assert context.lines_with(answer), typed
 
 
 def test_no_command_is_left_without_an_answer() -> None:
@@ -71,50 +71,50 @@ def test_no_command_is_left_without_an_answer() -> None:
     assert COMMANDS.keys() - answered == {"advance", "login", *_SHOW_SOMETHING_ELSE}
 
 
-def test_time_passes_at_once_and_the_end_of_the_session_is_told(desk: Paper) -> None:
-    session_end.watch(desk)
-    desk.terminal.start_agent()
-    run_line(desk, "policy 1201")
-    desk.terminal.sync()
+def test_time_passes_at_once_and_the_end_of_the_session_is_told(context: RecordedContext) -> None:
+    session_end.watch(context)
+    context.terminal.start_agent()
+    run_line(context, "policy 1201")
+    context.terminal.sync()
 
-    run_line(desk, "advance 60")
+    run_line(context, "advance 60")
 
-    assert desk.terminal.events.wait_for(source="velks", member="Terminate")
-    desk.terminal.sync()
-    assert desk.lines_with("60 s of the agent's time have passed.")
-    assert desk.lines_with("The session would end here. The next one begins with: login")
-    (ended,) = desk.lines_with("Terminate()")
+    assert context.terminal.events.wait_for(source="velks", member="Terminate")
+    context.terminal.sync()
+    assert context.lines_with("60 s of the agent's time have passed.")
+    assert context.lines_with("The session would end here. The next one begins with: login")
+    (ended,) = context.lines_with("Terminate()")
     assert ended.startswith("01:00")
 
 
-def test_timers_that_come_again_keep_their_turns(desk: Paper) -> None:
-    desk.terminal.start_agent()
-    mark = desk.terminal.events.mark()
+def test_timers_that_come_again_keep_their_turns(context: RecordedContext) -> None:
+    context.terminal.start_agent()
+    mark = context.terminal.events.mark()
 
-    run_line(desk, "advance 900")
+    run_line(context, "advance 900")
 
-    assert desk.terminal.events.wait_for(member="SendUserStatus", after=mark, count=3)
+    assert context.terminal.events.wait_for(member="SendUserStatus", after=mark, count=3)
 
 
-def test_time_cannot_pass_without_the_daemon_that_wakes_the_agent_up(desk: Paper) -> None:
-    run_line(desk, "leave daemon")
+def test_time_cannot_pass_without_the_daemon_that_wakes_the_agent_up(context: RecordedContext) -> None:
+    run_line(context, "leave daemon")
 
-    with pytest.raises(Refused, match="daemon is not on the bus"):
-        run_line(desk, "advance 60")
+    with pytest.raises(CommandRefused, match="daemon is not on the bus"):
+        run_line(context, "advance 60")
 
 
 @pytest.mark.parametrize("seconds", ["0", "-1", "86401"])
-def test_no_more_than_a_day_passes_at_once(desk: Paper, seconds: str) -> None:
-    with pytest.raises(Refused, match="is no time to pass at once"):
-        run_line(desk, f"advance {seconds}")
+def test_no_more_than_a_day_passes_at_once(context: RecordedContext, seconds: str) -> None:
+    with pytest.raises(CommandRefused, match="is no time to pass at once"):
+        run_line(context, f"advance {seconds}")
 
 
 @pytest.mark.parametrize("lines", [["leave daemon", "appear daemon"], ["restart daemon"]])
-def test_a_fresh_daemon_asks_who_is_there(desk: Paper, lines: list[str]) -> None:
+def test_a_fresh_daemon_asks_who_is_there(context: RecordedContext, lines: list[str]) -> None:
     for line in lines:
-        run_line(desk, line)
+        run_line(context, line)
 
-    assert desk.terminal.events.wait_for(source="daemon", member="pushOnlineMsg")
+    assert context.terminal.events.wait_for(source="daemon", member="pushOnlineMsg")
 
 
 def test_each_command_stands_in_one_group() -> None:
@@ -123,12 +123,12 @@ def test_each_command_stands_in_one_group() -> None:
     assert sorted(listed) == sorted(COMMANDS)
 
 
-def test_help_for_a_command_tells_what_may_be_given_to_it(desk: Paper) -> None:
-    run_line(desk, "help policy")
+def test_help_for_a_command_tells_what_may_be_given_to_it(context: RecordedContext) -> None:
+    run_line(context, "help policy")
 
-    assert desk.lines_with("policy CODE [UID] | {JSON}")
+    assert context.lines_with("policy CODE [UID] | {JSON}")
     for policy in POLICIES.values():
-        (line,) = desk.lines_with(f"{policy.code} ")
+        (line,) = context.lines_with(f"{policy.code} ")
         assert policy.meaning in line
 
 
@@ -140,9 +140,9 @@ def test_help_for_a_command_tells_what_may_be_given_to_it(desk: Paper) -> None:
         ("hang damon", "there is no service 'damon'; did you mean daemon?"),
     ],
 )
-def test_a_slip_is_met_with_a_guess(desk: Paper, line: str, guess: str) -> None:
-    with pytest.raises(Refused) as refused:
-        run_line(desk, line)
+def test_a_slip_is_met_with_a_guess(context: RecordedContext, line: str, guess: str) -> None:
+    with pytest.raises(CommandRefused) as refused:
+        run_line(context, line)
 
     assert str(refused.value) == guess
 
@@ -157,7 +157,9 @@ def test_a_slip_is_met_with_a_guess(desk: Paper, line: str, guess: str) -> None:
         ("sing ", {}),
     ],
 )
-def test_tab_offers_words_with_their_meaning(desk: Paper, typed: str, offered: dict[str, str]) -> None:
-    found = CommandCompleter(desk).get_completions(Document(typed), CompleteEvent())
+def test_tab_offers_words_with_their_meaning(
+    context: RecordedContext, typed: str, offered: dict[str, str]
+) -> None:
+    found = CommandCompleter(context).get_completions(Document(typed), CompleteEvent())
 
     assert {each.text: each.display_meta_text for each in found} == offered

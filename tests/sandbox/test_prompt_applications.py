@@ -5,23 +5,23 @@ from __future__ import annotations
 import pytest
 
 from sandbox.prompt import commands
-from sandbox.prompt.desk import Refused
+from sandbox.prompt.context import CommandRefused
 from sandbox.prompt.registry import run_line
 from sandbox.terminal import Terminal
-from tests.sandbox.paper import Paper
+from tests.sandbox.recorded_context import RecordedContext
 
 assert commands, "importing the module makes its commands known"
 
 
 @pytest.fixture
-def desk(terminal: Terminal) -> Paper:
-    """A desk at a terminal whose agent is not started."""
-    return Paper(terminal)
+def context(terminal: Terminal) -> RecordedContext:
+    """A context at a terminal whose agent is not started."""
+    return RecordedContext(terminal)
 
 
-def on_dock(desk: Paper) -> dict[str, tuple[int, bool]]:
+def on_dock(context: RecordedContext) -> dict[str, tuple[int, bool]]:
     """The number of windows of each application, and whether it is kept on the dock."""
-    dock = desk.terminal.dock
+    dock = context.terminal.dock
     return {app: (dock.windows(app), dock.is_docked(app)) for app in dock.apps}
 
 
@@ -44,25 +44,25 @@ def on_dock(desk: Paper) -> dict[str, tuple[int, bool]]:
     ids=str,
 )
 def test_the_dock_is_as_the_user_left_it(
-    desk: Paper, lines: list[str], expected: dict[str, tuple[int, bool]]
+    context: RecordedContext, lines: list[str], expected: dict[str, tuple[int, bool]]
 ) -> None:
     for line in lines:
-        run_line(desk, line)
+        run_line(context, line)
 
-    assert on_dock(desk) == expected
+    assert on_dock(context) == expected
 
 
-def test_the_applications_are_listed(desk: Paper) -> None:
+def test_the_applications_are_listed(context: RecordedContext) -> None:
     for line in ("dock mail", "open editor", "windows editor 4", "apps"):
-        run_line(desk, line)
+        run_line(context, line)
 
-    mail, editor = [line for line in desk.lines_with("│") if "mail" in line or "editor" in line]
+    mail, editor = [line for line in context.lines_with("│") if "mail" in line or "editor" in line]
     assert ("0" in mail, "yes" in mail, "4" in editor, "no" in editor) == (True, True, True, True)
 
 
-def test_what_the_dock_tells_has_a_meaning(desk: Paper) -> None:
+def test_what_the_dock_tells_has_a_meaning(context: RecordedContext) -> None:
     for line in ("open editor", "windows editor 2", "dock editor", "undock editor", "close editor"):
-        run_line(desk, line)
+        run_line(context, line)
 
     for meaning in (
         "an application comes to the dock",
@@ -71,16 +71,16 @@ def test_what_the_dock_tells_has_a_meaning(desk: Paper) -> None:
         "no longer kept on the dock",
         "an application is gone from the dock",
     ):
-        assert desk.lines_with(meaning), meaning
+        assert context.lines_with(meaning), meaning
 
 
-def test_an_entry_whose_values_are_not_told_shows_what_is_another(desk: Paper) -> None:
-    desk.terminal.dock.announces = ("invalidated",)
-    run_line(desk, "open editor")
+def test_an_entry_whose_values_are_not_told_shows_what_is_another(context: RecordedContext) -> None:
+    context.terminal.dock.announces = ("invalidated",)
+    run_line(context, "open editor")
 
-    run_line(desk, "windows editor 2")
+    run_line(context, "windows editor 2")
 
-    assert desk.lines_with("WindowInfos is another")
+    assert context.lines_with("WindowInfos is another")
 
 
 @pytest.mark.parametrize(
@@ -94,12 +94,14 @@ def test_an_entry_whose_values_are_not_told_shows_what_is_another(desk: Paper) -
         ("open", "usage: open APPLICATION"),
     ],
 )
-def test_what_cannot_be_done_is_refused_with_a_reason(desk: Paper, line: str, reason: str) -> None:
-    run_line(desk, "open editor")
-    mark = desk.terminal.events.mark()
+def test_what_cannot_be_done_is_refused_with_a_reason(
+    context: RecordedContext, line: str, reason: str
+) -> None:
+    run_line(context, "open editor")
+    mark = context.terminal.events.mark()
 
-    with pytest.raises(Refused) as refused:
-        run_line(desk, line)
+    with pytest.raises(CommandRefused) as refused:
+        run_line(context, line)
 
     assert reason in str(refused.value)
-    assert not desk.terminal.events.all(after=mark)
+    assert not context.terminal.events.all(after=mark)

@@ -10,10 +10,10 @@ from sandbox.machine import layout
 from sandbox.machine.users import DOMAIN_USER
 from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.prompt import commands
-from sandbox.prompt.desk import Desk, Refused
+from sandbox.prompt.context import Context, CommandRefused
 from sandbox.prompt.registry import COMMANDS, run_line
 from sandbox.terminal import Terminal
-from tests.sandbox.paper import Paper
+from tests.sandbox.recorded_context import RecordedContext
 
 assert commands, "importing the module makes its commands known"
 
@@ -22,37 +22,37 @@ _PASSWORD_NOTICE_DELAY = 61
 
 
 @pytest.fixture
-def desk(terminal: Terminal) -> Paper:
-    """A desk at a terminal with a platform, whose agent is not started."""
+def context(terminal: Terminal) -> RecordedContext:
+    """A context at a terminal with a platform, whose agent is not started."""
     assert terminal.platform
-    return Paper(terminal)
+    return RecordedContext(terminal)
 
 
-def _pushed(desk: Desk) -> list[str]:
-    events = desk.terminal.events.all(source="daemon", member="pushPolicyMsg")
+def _pushed(context: Context) -> list[str]:
+    events = context.terminal.events.all(source="daemon", member="pushPolicyMsg")
     return [event.args[1] for event in events]
 
 
-def test_a_policy_by_code_makes_the_agent_act(desk: Paper) -> None:
-    desk.terminal.start_agent()
+def test_a_policy_by_code_makes_the_agent_act(context: RecordedContext) -> None:
+    context.terminal.start_agent()
 
-    run_line(desk, "policy 1300")
+    run_line(context, "policy 1300")
 
-    shown = desk.terminal.events.wait_for(source="velks", member="Notify")
+    shown = context.terminal.events.wait_for(source="velks", member="Notify")
     assert shown.args[4] == "该终端1分钟后进行关机"
-    assert desk.lines_with("agent → notifications") and desk.lines_with("this terminal will shut down")
+    assert context.lines_with("agent → notifications") and context.lines_with("this terminal will shut down")
 
 
-def test_a_policy_by_code_and_uid_names_the_account(desk: Paper) -> None:
-    run_line(desk, "policy 1203 20001")
+def test_a_policy_by_code_and_uid_names_the_account(context: RecordedContext) -> None:
+    run_line(context, "policy 1203 20001")
 
-    assert [json.loads(text) for text in _pushed(desk)] == [{"type": 1203, "payload": {"uid": 20001}}]
+    assert [json.loads(text) for text in _pushed(context)] == [{"type": 1203, "payload": {"uid": 20001}}]
 
 
-def test_a_policy_in_braces_goes_out_as_it_stands(desk: Paper) -> None:
-    run_line(desk, """  policy {"type" :5,  "text":"it's 校园 }""")
+def test_a_policy_in_braces_goes_out_as_it_stands(context: RecordedContext) -> None:
+    run_line(context, """  policy {"type" :5,  "text":"it's 校园 }""")
 
-    assert _pushed(desk) == ["""{"type" :5,  "text":"it's 校园 }"""]
+    assert _pushed(context) == ["""{"type" :5,  "text":"it's 校园 }"""]
 
 
 @pytest.mark.parametrize(
@@ -65,32 +65,32 @@ def test_a_policy_in_braces_goes_out_as_it_stands(desk: Paper) -> None:
     ],
 )
 def test_the_screen_is_as_told_when_the_agent_announces_itself(
-    desk: Paper, before: list[str], status: int
+    context: RecordedContext, before: list[str], status: int
 ) -> None:
-    desk.terminal.start_agent()
+    context.terminal.start_agent()
     for line in before:
-        run_line(desk, line)
+        run_line(context, line)
 
-    run_line(desk, "online")
+    run_line(context, "online")
 
-    report = desk.terminal.events.wait_for(member="SendUserStatus", count=2)
+    report = context.terminal.events.wait_for(member="SendUserStatus", count=2)
     assert report.args == (status, DOMAIN_USER.plain_name)
 
 
-def test_a_service_leaves_and_comes_back(desk: Paper) -> None:
-    run_line(desk, "leave notifications")
-    assert desk.terminal.session_bus.owner("com.norix.kpx.Notification") is None
+def test_a_service_leaves_and_comes_back(context: RecordedContext) -> None:
+    run_line(context, "leave notifications")
+    assert context.terminal.session_bus.owner("com.norix.kpx.Notification") is None
 
-    run_line(desk, "appear notifications")
-    assert desk.terminal.session_bus.owner("com.norix.kpx.Notification")
+    run_line(context, "appear notifications")
+    assert context.terminal.session_bus.owner("com.norix.kpx.Notification")
 
 
-def test_a_restarted_service_is_another_connection(desk: Paper) -> None:
-    before = desk.terminal.system_bus.owner("org.freedesktop.login1")
+def test_a_restarted_service_is_another_connection(context: RecordedContext) -> None:
+    before = context.terminal.system_bus.owner("org.freedesktop.login1")
 
-    run_line(desk, "restart logind")
+    run_line(context, "restart logind")
 
-    assert desk.terminal.system_bus.owner("org.freedesktop.login1") not in (before, None)
+    assert context.terminal.system_bus.owner("org.freedesktop.login1") not in (before, None)
 
 
 @pytest.mark.parametrize(
@@ -101,55 +101,55 @@ def test_a_restarted_service_is_another_connection(desk: Paper) -> None:
         ("fail identity", "fail"),
     ],
 )
-def test_a_service_behaves_as_told_until_it_is_well(desk: Paper, line: str, manner: str) -> None:
-    run_line(desk, line)
-    run_line(desk, "state")
-    run_line(desk, "well identity")
-    run_line(desk, "state")
+def test_a_service_behaves_as_told_until_it_is_well(context: RecordedContext, line: str, manner: str) -> None:
+    run_line(context, line)
+    run_line(context, "state")
+    run_line(context, "well identity")
+    run_line(context, "state")
 
-    ill, well = desk.lines_with("com.norix.velk.iam")
+    ill, well = context.lines_with("com.norix.velk.iam")
     assert manner in ill and "well" in well
 
 
-def test_the_state_tells_who_is_away(desk: Paper) -> None:
-    run_line(desk, "leave screensaver")
+def test_the_state_tells_who_is_away(context: RecordedContext) -> None:
+    run_line(context, "leave screensaver")
 
-    run_line(desk, "state")
+    run_line(context, "state")
 
-    (line,) = desk.lines_with("com.norix.ScreenSaver")
+    (line,) = context.lines_with("com.norix.ScreenSaver")
     assert " no " in line
 
 
-def test_a_message_reaches_the_user_and_is_then_read(desk: Paper) -> None:
-    desk.terminal.start_agent()
-    run_line(desk, """message "停机, 今晚" 'save "all"' li.na""")
-    run_line(desk, "messages")
-    desk.terminal.advance(SURELY_NEXT_POLL)
-    run_line(desk, "messages")
+def test_a_message_reaches_the_user_and_is_then_read(context: RecordedContext) -> None:
+    context.terminal.start_agent()
+    run_line(context, """message "停机, 今晚" 'save "all"' li.na""")
+    run_line(context, "messages")
+    context.terminal.advance(SURELY_NEXT_POLL)
+    run_line(context, "messages")
 
-    shown = desk.terminal.events.wait_for(source="velks", member="Notify")
+    shown = context.terminal.events.wait_for(source="velks", member="Notify")
     assert shown.args[3:5] == ("停机, 今晚", 'save "all"')
-    (sent,) = desk.terminal.platform.messages(DOMAIN_USER.plain_name)
+    (sent,) = context.terminal.platform.messages(DOMAIN_USER.plain_name)
     assert sent["send_uid"] == "li.na"
-    unread, read = [line for line in desk.lines_with("停机, 今晚") if line.startswith("│")]
+    unread, read = [line for line in context.lines_with("停机, 今晚") if line.startswith("│")]
     assert "not yet" in unread and read.count(sent["read_at"]) >= 1 and sent["created_at"] in read
-    assert desk.lines_with("agent → platform") and desk.lines_with("200, 1 unread")
+    assert context.lines_with("agent → platform") and context.lines_with("200, 1 unread")
 
 
 @pytest.mark.parametrize(("lines", "notices"), [(["tip 3天后过期"], ["3天后过期"]), (["tip x", "tip off"], [])])
 def test_a_tip_is_told_a_minute_after_the_next_login(
-    desk: Paper, lines: list[str], notices: list[str]
+    context: RecordedContext, lines: list[str], notices: list[str]
 ) -> None:
-    desk.terminal.start_agent()
+    context.terminal.start_agent()
     for line in lines:
-        run_line(desk, line)
-    mark = desk.terminal.events.mark()
+        run_line(context, line)
+    mark = context.terminal.events.mark()
 
-    run_line(desk, "login")
+    run_line(context, "login")
 
-    desk.terminal.events.wait_for(member="SendUserStatus", after=mark)
-    desk.terminal.advance(_PASSWORD_NOTICE_DELAY)
-    told = desk.terminal.events.all(source="velks", member="Notify", after=mark)
+    context.terminal.events.wait_for(member="SendUserStatus", after=mark)
+    context.terminal.advance(_PASSWORD_NOTICE_DELAY)
+    told = context.terminal.events.all(source="velks", member="Notify", after=mark)
     assert [notice.args[4] for notice in told] == notices
 
 
@@ -162,80 +162,80 @@ def test_a_tip_is_told_a_minute_after_the_next_login(
         ("platform up", "well", b"200"),
     ],
 )
-def test_the_platform_answers_as_told(desk: Paper, line: str, manner: str, reply: bytes) -> None:
-    run_line(desk, line)
-    desk.terminal.start_agent()
-    run_line(desk, "state")
+def test_the_platform_answers_as_told(context: RecordedContext, line: str, manner: str, reply: bytes) -> None:
+    run_line(context, line)
+    context.terminal.start_agent()
+    run_line(context, "state")
 
-    (row,) = desk.lines_with(f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}")
+    (row,) = context.lines_with(f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}")
     assert " yes " in row and manner in row
-    assert desk.terminal.events.wait_for(kind="reply").args[1] == int(reply)
+    assert context.terminal.events.wait_for(kind="reply").args[1] == int(reply)
 
 
-def test_a_platform_that_hangs_answers_once_it_is_up(desk: Paper) -> None:
-    run_line(desk, "platform hang")
-    desk.terminal.start_agent(ready=lambda: desk.terminal.events.wait_for(kind="http", member="tips"))
-    assert not desk.terminal.events.all(kind="reply")
+def test_a_platform_that_hangs_answers_once_it_is_up(context: RecordedContext) -> None:
+    run_line(context, "platform hang")
+    context.terminal.start_agent(ready=lambda: context.terminal.events.wait_for(kind="http", member="tips"))
+    assert not context.terminal.events.all(kind="reply")
 
-    run_line(desk, "platform up")
+    run_line(context, "platform up")
 
-    assert desk.terminal.events.wait_for(kind="reply").args[:2] == ("tips", 200)
+    assert context.terminal.events.wait_for(kind="reply").args[:2] == ("tips", 200)
 
 
-def test_a_platform_that_is_down_gets_no_request_until_it_is_up(desk: Paper) -> None:
-    desk.terminal.start_agent()
-    mark = desk.terminal.events.mark()
+def test_a_platform_that_is_down_gets_no_request_until_it_is_up(context: RecordedContext) -> None:
+    context.terminal.start_agent()
+    mark = context.terminal.events.mark()
     for _ in range(2):
-        run_line(desk, "platform down")
-    run_line(desk, "state")
-    desk.terminal.advance(SURELY_NEXT_POLL)
-    (row,) = desk.lines_with(f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}")
+        run_line(context, "platform down")
+    run_line(context, "state")
+    context.terminal.advance(SURELY_NEXT_POLL)
+    (row,) = context.lines_with(f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}")
     assert " no " in row
-    assert not desk.terminal.events.all(kind="http", after=mark)
+    assert not context.terminal.events.all(kind="http", after=mark)
 
-    run_line(desk, "platform up")
-    desk.terminal.advance(SURELY_NEXT_POLL)
+    run_line(context, "platform up")
+    context.terminal.advance(SURELY_NEXT_POLL)
 
-    assert desk.terminal.events.wait_for(kind="http", after=mark).member == "list"
-
-
-def test_help_knows_every_command(desk: Paper) -> None:
-    run_line(desk, "help")
-
-    assert all(desk.lines_with(known.usage) for known in COMMANDS.values())
+    assert context.terminal.events.wait_for(kind="http", after=mark).member == "list"
 
 
-def test_the_agents_log_is_shown_while_it_is_on(desk: Paper) -> None:
-    desk.terminal.start_agent()
+def test_help_knows_every_command(context: RecordedContext) -> None:
+    run_line(context, "help")
+
+    assert all(context.lines_with(known.usage) for known in COMMANDS.values())
+
+
+def test_the_agents_log_is_shown_while_it_is_on(context: RecordedContext) -> None:
+    context.terminal.start_agent()
     for line in ("policy 1300", "log on", "policy 1301", "log off", "policy 1304"):
-        run_line(desk, line)
-        desk.terminal.sync()
+        run_line(context, line)
+        context.terminal.sync()
 
     assert [
-        code for code in ("1300", "1301", "1304") if desk.lines_with(f'payload: "{{\\"type\\": {code}')
+        code for code in ("1300", "1301", "1304") if context.lines_with(f'payload: "{{\\"type\\": {code}')
     ] == ["1301"]
 
 
-def test_each_wait_goes_on_where_the_one_before_ended(desk: Paper) -> None:
+def test_each_wait_goes_on_where_the_one_before_ended(context: RecordedContext) -> None:
     for _ in range(2):
-        run_line(desk, "online")
+        run_line(context, "online")
 
-    run_line(desk, "wait pushOnlineMsg")
-    run_line(desk, "wait pushOnlineMsg")
-    with pytest.raises(Refused, match="no pushOnlineMsg came within 0.01 s"):
-        run_line(desk, "wait pushOnlineMsg 0.01")
+    run_line(context, "wait pushOnlineMsg")
+    run_line(context, "wait pushOnlineMsg")
+    with pytest.raises(CommandRefused, match="no pushOnlineMsg came within 0.01 s"):
+        run_line(context, "wait pushOnlineMsg 0.01")
 
 
-def test_quit_ends_the_input(desk: Paper) -> None:
+def test_quit_ends_the_input(context: RecordedContext) -> None:
     with pytest.raises(EOFError):
-        run_line(desk, "quit")
+        run_line(context, "quit")
 
 
 @pytest.mark.parametrize("line", ["", "   ", "# policy 1200"])
-def test_empty_lines_and_remarks_do_nothing(desk: Paper, line: str) -> None:
-    run_line(desk, line)
+def test_empty_lines_and_remarks_do_nothing(context: RecordedContext, line: str) -> None:
+    run_line(context, line)
 
-    assert not _pushed(desk)
+    assert not _pushed(context)
 
 
 @pytest.mark.parametrize(
@@ -263,19 +263,21 @@ def test_empty_lines_and_remarks_do_nothing(desk: Paper, line: str) -> None:
         ("platform error 200", "200 is no error status (400 to 599)"),
     ],
 )
-def test_what_cannot_be_done_is_refused_with_a_reason(desk: Paper, line: str, reason: str) -> None:
-    mark = desk.terminal.events.mark()
+def test_what_cannot_be_done_is_refused_with_a_reason(
+    context: RecordedContext, line: str, reason: str
+) -> None:
+    mark = context.terminal.events.mark()
 
-    with pytest.raises(Refused) as refused:
-        run_line(desk, line)
+    with pytest.raises(CommandRefused) as refused:
+        run_line(context, line)
 
     assert reason in str(refused.value)
-    assert not desk.terminal.events.all(after=mark)
+    assert not context.terminal.events.all(after=mark)
 
 
 @pytest.mark.parametrize("line", ["policy 1300", "online", "leave daemon", "restart daemon"])
-def test_a_daemon_that_is_away_cannot_be_used(desk: Paper, line: str) -> None:
-    run_line(desk, "leave daemon")
+def test_a_daemon_that_is_away_cannot_be_used(context: RecordedContext, line: str) -> None:
+    run_line(context, "leave daemon")
 
-    with pytest.raises(Refused, match="daemon is not on the bus; bring it back with: appear daemon"):
-        run_line(desk, line)
+    with pytest.raises(CommandRefused, match="daemon is not on the bus; bring it back with: appear daemon"):
+        run_line(context, line)

@@ -8,19 +8,19 @@ import pytest
 
 from sandbox.machine.packages import desktop_file
 from sandbox.prompt import commands
-from sandbox.prompt.desk import Refused
+from sandbox.prompt.context import CommandRefused
 from sandbox.prompt.registry import run_line
 from sandbox.terminal import Terminal
-from tests.sandbox.paper import Paper
+from tests.sandbox.recorded_context import RecordedContext
 
 assert commands, "importing the module makes its commands known"
 
 
 @pytest.fixture
-def desk(terminal: Terminal) -> Paper:
-    """A desk at a terminal with a platform, which the daemon uploads to; the agent is not started."""
+def context(terminal: Terminal) -> RecordedContext:
+    """A context at a terminal with a platform, which the daemon uploads to; the agent is not started."""
     terminal.daemon.uploads_to(terminal.platform)
-    return Paper(terminal)
+    return RecordedContext(terminal)
 
 
 def installed() -> dict[str, str]:
@@ -43,39 +43,41 @@ def installed() -> dict[str, str]:
     ids=str,
 )
 def test_packages_and_launcher_are_as_told(
-    desk: Paper, lines: list[str], versions: dict[str, str], actions: list[str]
+    context: RecordedContext, lines: list[str], versions: dict[str, str], actions: list[str]
 ) -> None:
     for line in lines:
-        run_line(desk, line)
+        run_line(context, line)
 
     assert installed() == versions
-    assert [item.path for item in desk.terminal.launcher.items] == [desktop_file(name) for name in versions]
-    changes = desk.terminal.events.all(source="launcher", member="ItemChanged")
+    assert [item.path for item in context.terminal.launcher.items] == [
+        desktop_file(name) for name in versions
+    ]
+    changes = context.terminal.events.all(source="launcher", member="ItemChanged")
     assert [change.args[0] for change in changes] == actions
 
 
-def test_an_installation_reaches_the_platform(desk: Paper) -> None:
-    desk.terminal.start_agent()
-    mark = desk.terminal.events.mark()
+def test_an_installation_reaches_the_platform(context: RecordedContext) -> None:
+    context.terminal.start_agent()
+    mark = context.terminal.events.mark()
 
-    run_line(desk, "install editor 2.1")
-    desk.terminal.events.wait_for(kind="reply", target="daemon", after=mark, count=2)
-    run_line(desk, "software")
+    run_line(context, "install editor 2.1")
+    context.terminal.events.wait_for(kind="reply", target="daemon", after=mark, count=2)
+    run_line(context, "software")
 
-    (change,) = desk.terminal.platform.software_changes()
+    (change,) = context.terminal.platform.software_changes()
     assert (change["software_name"], change["software_version"]) == ("editor", "2.1")
-    (row,) = [line for line in desk.lines_with("editor") if line.startswith("│")]
+    (row,) = [line for line in context.lines_with("editor") if line.startswith("│")]
     assert "2.1" in row
 
 
-def test_what_the_agent_reports_has_a_meaning(desk: Paper) -> None:
-    desk.terminal.start_agent()
+def test_what_the_agent_reports_has_a_meaning(context: RecordedContext) -> None:
+    context.terminal.start_agent()
 
-    run_line(desk, "install editor 2.1")
-    desk.terminal.events.wait_for(kind="reply", target="daemon", count=2)
+    run_line(context, "install editor 2.1")
+    context.terminal.events.wait_for(kind="reply", target="daemon", count=2)
 
     for meaning in ("an application was installed", "what was installed or updated", "all software of the"):
-        assert desk.lines_with(meaning), meaning
+        assert context.lines_with(meaning), meaning
 
 
 @pytest.mark.parametrize(
@@ -88,12 +90,14 @@ def test_what_the_agent_reports_has_a_meaning(desk: Paper) -> None:
         ("install mail", "usage: install PACKAGE VERSION"),
     ],
 )
-def test_what_cannot_be_done_is_refused_with_a_reason(desk: Paper, line: str, reason: str) -> None:
-    run_line(desk, "install editor 2.1")
-    mark = desk.terminal.events.mark()
+def test_what_cannot_be_done_is_refused_with_a_reason(
+    context: RecordedContext, line: str, reason: str
+) -> None:
+    run_line(context, "install editor 2.1")
+    mark = context.terminal.events.mark()
 
-    with pytest.raises(Refused) as refused:
-        run_line(desk, line)
+    with pytest.raises(CommandRefused) as refused:
+        run_line(context, line)
 
     assert reason in str(refused.value)
-    assert installed() == {"editor": "2.1"} and not desk.terminal.events.all(after=mark)
+    assert installed() == {"editor": "2.1"} and not context.terminal.events.all(after=mark)

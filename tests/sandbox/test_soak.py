@@ -11,13 +11,13 @@ from random import Random
 import pytest
 
 from sandbox.agent import default_binary
-from sandbox.soak.deeds import Deeds
-from sandbox.soak.ledger import FORWARDED, KINDS, RECEIPTS, Ledger
-from sandbox.soak.vitals import Vitals, growth, vitals
+from sandbox.soak.activities import Activities
+from sandbox.soak.accounting import FORWARDED, KINDS, RECEIPTS, Accounting
+from sandbox.soak.usage import Usage, growth, usage
 from sandbox.terminal import Terminal
-from tests.sandbox.people import run_program, talking_agent
+from tests.sandbox.programs import run_program, talking_agent
 
-FIRST = Vitals(resident=20_000, private_dirty=3_000, descriptors=13, threads=2)
+FIRST = Usage(resident=20_000, private_dirty=3_000, descriptors=13, threads=2)
 ALLOWANCE = 100
 
 
@@ -63,24 +63,24 @@ def test_memory_beyond_the_allowance_fails_the_day_and_is_named() -> None:
 
 
 def test_what_is_lost_on_the_way_is_named(terminal: Terminal) -> None:
-    ledger = Ledger(terminal.events)
-    deeds = Deeds(terminal, ledger, Random(1))
-    deeds.log_in()
+    accounting = Accounting(terminal.events)
+    activities = Activities(terminal, accounting, Random(1))
+    activities.log_in()
     terminal.policy_service.leave()
-    deeds.push_forwarded_policies()
+    activities.push_forwarded_policies()
 
-    sent = ledger.sent(FORWARDED)
+    sent = accounting.sent(FORWARDED)
     assert sent > 0
-    (lost,) = [line for line in ledger.differences() if line.startswith(FORWARDED)]
+    (lost,) = [line for line in accounting.differences() if line.startswith(FORWARDED)]
     assert lost.startswith(f'{FORWARDED}: {sent} sent, 0 arrived; {sent} missing, such as (\'{{"type": ')
 
 
 def test_another_piece_than_the_one_that_was_sent_counts_as_lost(terminal: Terminal) -> None:
-    ledger = Ledger(terminal.events)
-    ledger.expect(RECEIPTS, "u1")
+    accounting = Accounting(terminal.events)
+    accounting.expect(RECEIPTS, "u1")
     terminal.events.record("velks", "platform", "http", "read", ("PUT", '{"uuid":"u2"}'))
 
-    assert ledger.differences() == [
+    assert accounting.differences() == [
         f"{RECEIPTS}: 1 sent, 1 arrived; 1 missing, such as ('u1',); 1 too many, such as ('u2',)"
     ]
 
@@ -102,7 +102,7 @@ def test_another_piece_than_the_one_that_was_sent_counts_as_lost(terminal: Termi
         (replace(FIRST, threads=3), ["threads grew from 2 to 3"]),
     ],
 )
-def test_growth_is_named(later: Vitals, named: list[str]) -> None:
+def test_growth_is_named(later: Usage, named: list[str]) -> None:
     assert growth([FIRST, later], ALLOWANCE) == named
 
 
@@ -113,10 +113,10 @@ def test_descriptors_that_are_given_back_later_have_grown_all_the_same() -> None
 
 
 def test_vitals_are_those_of_the_process() -> None:
-    before = vitals(os.getpid())
+    before = usage(os.getpid())
     opened = [os.open("/dev/null", os.O_RDONLY) for _ in range(3)]
     held = bytearray(os.urandom(4 << 20))
-    after = vitals(os.getpid())
+    after = usage(os.getpid())
     for descriptor in opened:
         os.close(descriptor)
 

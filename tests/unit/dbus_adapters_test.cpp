@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "proxies.h"
 #include "pryg_adapter.h"
 #include "prys_adapter.h"
@@ -79,7 +79,7 @@ Q_DECLARE_METATYPE(Emit)
 namespace {
 
 /// Puts the object on the bus with the three adapters.
-void exportObject(BusPeer& server, QObject& object)
+void exportObject(BusClient& server, QObject& object)
 {
     new velkgAdapter(&object);
     new prygAdapter(&object);
@@ -87,7 +87,7 @@ void exportObject(BusPeer& server, QObject& object)
     QVERIFY(server.bus().registerObject(path, &object, QDBusConnection::ExportAdaptors));
 }
 
-QDBusMessage callOf(const BusPeer& server, const QString& interface, const QString& method,
+QDBusMessage callOf(const BusClient& server, const QString& interface, const QString& method,
                     const QVariantList& arguments)
 {
     QDBusMessage call = QDBusMessage::createMethodCall(server.uniqueName(), path, interface, method);
@@ -158,10 +158,10 @@ void DBusAdaptersTest::callReachesTheParentAndItsReplyTheCaller()
     QFETCH(const QString, method);
     QFETCH(const QVariantList, arguments);
     QFETCH(const QVariantList, reply);
-    BusPeer server;
+    BusClient server;
     Implementation implementation;
     exportObject(server, implementation);
-    BusPeer client;
+    BusClient client;
 
     const QDBusPendingCall call = client.bus().asyncCall(callOf(server, interface, method, arguments));
     QVERIFY(finished(call));
@@ -177,10 +177,10 @@ void DBusAdaptersTest::parentWithoutTheMethodRepliesEmpty()
     QFETCH(const QString, method);
     QFETCH(const QVariantList, arguments);
     QFETCH(const QVariantList, emptyReply);
-    BusPeer server;
+    BusClient server;
     QObject bare;
     exportObject(server, bare);
-    BusPeer client;
+    BusClient client;
     QTest::ignoreMessage(QtWarningMsg, QRegularExpression(QStringLiteral("No such method.*") + method));
 
     const QDBusPendingCall call = client.bus().asyncCall(callOf(server, interface, method, arguments));
@@ -220,10 +220,10 @@ void DBusAdaptersTest::signalOfTheParentArrivesAtTheProxy()
     QFETCH(const QString, name);
     QFETCH(const QVariantList, arguments);
     QFETCH(const Emit, emitIt);
-    BusPeer server;
+    BusClient server;
     Implementation implementation;
     exportObject(server, implementation);
-    BusPeer client;
+    BusClient client;
     Proxies proxies(server.uniqueName(), path, client.bus());
     QSignalSpy received(&proxies.of(interface), signalNamed(proxies.of(interface), name));
     client.settle();

@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "pryg_adapter.h"
 #include "pryg_interface.h"
 #include "prys_adapter.h"
@@ -265,13 +265,13 @@ void DBusContractTest::proxyCarriesTheIntrospectionText()
 void DBusContractTest::exportedAdapterIntrospectsAsTheFile()
 {
     QFETCH(const Contract, contract);
-    BusPeer exporter;
+    BusClient exporter;
     QObject object;
     contract.exportFrom(&object);
     const QString path = QStringLiteral("/exported");
     QVERIFY(exporter.bus().registerObject(path, &object, QDBusConnection::ExportAdaptors));
 
-    BusPeer client;
+    BusClient client;
     const QDBusPendingReply<QString> reply = client.bus().asyncCall(QDBusMessage::createMethodCall(
         exporter.uniqueName(), path, QStringLiteral("org.freedesktop.DBus.Introspectable"),
         QStringLiteral("Introspect")));

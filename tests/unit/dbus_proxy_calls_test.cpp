@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "proxies.h"
 #include "recorded_service.h"
 
@@ -93,7 +93,7 @@ void DBusProxyCallsTest::callGoesOutAsDeclared()
     QFETCH(const QVariantList, arguments);
     QFETCH(const Call, call);
     const RecordedService server(QDBusConnection::SessionBus, service, answerNothing);
-    BusPeer client;
+    BusClient client;
     Proxies proxies(service, path, client.bus());
 
     call(proxies).waitForFinished();
@@ -128,7 +128,7 @@ void DBusProxyCallsTest::readingTheValueWaitsForTheTypedReply()
     QFETCH(const QVariant, reply);
     QFETCH(const Read, read);
     const RecordedService server(QDBusConnection::SessionBus, service, answerWith(reply));
-    BusPeer client;
+    BusClient client;
     velkgInterface proxy(service, path, client.bus());
 
     QCOMPARE(read(proxy), reply);
@@ -136,7 +136,7 @@ void DBusProxyCallsTest::readingTheValueWaitsForTheTypedReply()
 
 void DBusProxyCallsTest::callToAnAbsentServiceFails()
 {
-    BusPeer client;
+    BusClient client;
     Proxies proxies(service, path, client.bus());
     QVERIFY(!proxies.velkg.isValid());
 
@@ -154,7 +154,7 @@ void DBusProxyCallsTest::callToAnAbsentServiceFails()
 
 void DBusProxyCallsTest::proxyBuiltBeforeItsServiceReachesItLater()
 {
-    BusPeer client;
+    BusClient client;
     Proxies proxies(service, path, client.bus());
     const RecordedService server(QDBusConnection::SessionBus, service, answerNothing);
 

@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "proxies.h"
 
 #include <QTest>
@@ -33,7 +33,7 @@ void addArrival(const QString& interface, const char* name, const QVariantList& 
 }
 
 /// Sends pushPolicyMsg and returns once the receiver has delivered or dropped it.
-void send(BusPeer& sender, const BusPeer& receiver, const Foreign& as)
+void send(BusClient& sender, const BusClient& receiver, const Foreign& as)
 {
     QDBusMessage message = as.broadcast
         ? QDBusMessage::createSignal(as.path, as.interface, member)
@@ -46,11 +46,11 @@ void send(BusPeer& sender, const BusPeer& receiver, const Foreign& as)
 /// The agent's side: a proxy whose pushPolicyMsg is listened to, the match rule being in force.
 struct Listener
 {
-    BusPeer peer;
-    velkgInterface proxy = {service, path, peer.bus()};
+    BusClient client;
+    velkgInterface proxy = {service, path, client.bus()};
     QSignalSpy received = {&proxy, &velkgInterface::pushPolicyMsg};
 
-    Listener() { peer.settle(); }
+    Listener() { client.settle(); }
 };
 
 } // namespace
@@ -107,9 +107,9 @@ void DBusProxySignalsTest::signalOfTheServiceArrives()
     QFETCH(const QString, interface);
     QFETCH(const QString, name);
     QFETCH(const QVariantList, arguments);
-    BusPeer server;
+    BusClient server;
     QVERIFY(server.bus().registerService(service));
-    BusPeer client;
+    BusClient client;
     Proxies proxies(service, path, client.bus());
     QSignalSpy received(&proxies.of(interface), signalNamed(proxies.of(interface), name));
     client.settle();
@@ -125,11 +125,11 @@ void DBusProxySignalsTest::signalOfTheServiceArrives()
 
 void DBusProxySignalsTest::signalSentStraightByTheServiceArrives()
 {
-    BusPeer server;
+    BusClient server;
     QVERIFY(server.bus().registerService(service));
     Listener agent;
 
-    send(server, agent.peer, {path, velkg, false});
+    send(server, agent.client, {path, velkg, false});
 
     QCOMPARE(agent.received.size(), 1);
 }
@@ -137,24 +137,24 @@ void DBusProxySignalsTest::signalSentStraightByTheServiceArrives()
 void DBusProxySignalsTest::signalOfAServiceThatCameLaterArrives()
 {
     Listener agent;
-    BusPeer server;
+    BusClient server;
     QVERIFY(server.bus().registerService(service));
 
-    send(server, agent.peer, {path, velkg});
+    send(server, agent.client, {path, velkg});
 
     QCOMPARE(agent.received.size(), 1);
 }
 
 void DBusProxySignalsTest::signalOfARestartedServiceArrives()
 {
-    BusPeer first;
+    BusClient first;
     QVERIFY(first.bus().registerService(service));
     Listener agent;
     QVERIFY(first.bus().unregisterService(service));
-    BusPeer second;
+    BusClient second;
     QVERIFY(second.bus().registerService(service));
 
-    send(second, agent.peer, {path, velkg});
+    send(second, agent.client, {path, velkg});
 
     QCOMPARE(agent.received.size(), 1);
 }
@@ -170,11 +170,11 @@ void DBusProxySignalsTest::signalOfAnotherPathOrInterfaceIsDropped_data()
 void DBusProxySignalsTest::signalOfAnotherPathOrInterfaceIsDropped()
 {
     QFETCH(const Foreign, foreign);
-    BusPeer server;
+    BusClient server;
     QVERIFY(server.bus().registerService(service));
     Listener agent;
 
-    send(server, agent.peer, foreign);
+    send(server, agent.client, foreign);
 
     QCOMPARE(agent.received.size(), 0);
 }
@@ -182,12 +182,12 @@ void DBusProxySignalsTest::signalOfAnotherPathOrInterfaceIsDropped()
 void DBusProxySignalsTest::signalOfAnotherSenderIsDroppedBesideTheService()
 {
     QFETCH(const Foreign, foreign);
-    BusPeer server;
+    BusClient server;
     QVERIFY(server.bus().registerService(service));
     Listener agent;
-    BusPeer stranger;
+    BusClient stranger;
 
-    send(stranger, agent.peer, foreign);
+    send(stranger, agent.client, foreign);
 
     QCOMPARE(agent.received.size(), 0);
 }
@@ -196,9 +196,9 @@ void DBusProxySignalsTest::signalOfAnotherSenderIsDroppedBeforeTheService()
 {
     QFETCH(const Foreign, foreign);
     Listener agent;
-    BusPeer stranger;
+    BusClient stranger;
 
-    send(stranger, agent.peer, foreign);
+    send(stranger, agent.client, foreign);
 
     QCOMPARE(agent.received.size(), 0);
 }
@@ -206,12 +206,12 @@ void DBusProxySignalsTest::signalOfAnotherSenderIsDroppedBeforeTheService()
 void DBusProxySignalsTest::signalOfAnotherSenderIsDroppedAfterTheService()
 {
     QFETCH(const Foreign, foreign);
-    BusPeer formerServer;
+    BusClient formerServer;
     QVERIFY(formerServer.bus().registerService(service));
     Listener agent;
     QVERIFY(formerServer.bus().unregisterService(service));
 
-    send(formerServer, agent.peer, foreign);
+    send(formerServer, agent.client, foreign);
 
     QCOMPARE(agent.received.size(), 0);
 }

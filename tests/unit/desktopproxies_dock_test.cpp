@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "dock.h"
 #include "property_service.h"
 
@@ -36,7 +36,7 @@ void DesktopProxiesDockTest::entriesComeInTheDocksOrder()
     const QList<QDBusObjectPath> paths{QDBusObjectPath("/z"), QDBusObjectPath("/a"), QDBusObjectPath("/z")};
     PropertyService dock(service);
     dock.set(path, entries, QVariant::fromValue(paths));
-    BusPeer agent;
+    BusClient agent;
     const __Dock proxy(service, path, agent.bus());
     QVERIFY(proxy.isValid());
     QCOMPARE(proxy.entries(), paths);
@@ -45,7 +45,7 @@ void DesktopProxiesDockTest::entriesComeInTheDocksOrder()
 void DesktopProxiesDockTest::dockThatDoesNotAnswerProperlyHasNoEntries()
 {
     PropertyService dock(service);
-    BusPeer agent;
+    BusClient agent;
     const __Dock proxy(service, path, agent.bus());
     QVERIFY(proxy.entries().isEmpty());
     for (const QVariant& value : {QVariant(7), QVariant(QStringList{QStringLiteral("/a")})}) {
@@ -56,7 +56,7 @@ void DesktopProxiesDockTest::dockThatDoesNotAnswerProperlyHasNoEntries()
 
 void DesktopProxiesDockTest::absentDockIsInvalidAndHasNoEntries()
 {
-    BusPeer agent;
+    BusClient agent;
     const __Dock proxy(service, path, agent.bus());
     QVERIFY(!proxy.isValid());
     QVERIFY(proxy.entries().isEmpty());
@@ -65,7 +65,7 @@ void DesktopProxiesDockTest::absentDockIsInvalidAndHasNoEntries()
 void DesktopProxiesDockTest::addedAndRemovedEntriesAreTold()
 {
     PropertyService dock(service);
-    BusPeer agent;
+    BusClient agent;
     const __Dock proxy(service, path, agent.bus());
     QSignalSpy added(&proxy, &__Dock::EntryAdded);
     QSignalSpy removed(&proxy, &__Dock::EntryRemoved);

@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "entry.h"
 #include "property_service.h"
 
@@ -46,7 +46,7 @@ private:
         dock.service().emitSignal(nameChanged(name), m_agent.bus());
     }
 
-    BusPeer m_agent;
+    BusClient m_agent;
 };
 
 void DesktopProxiesEntriesTest::initTestCase()

@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "entry.h"
 #include "property_service.h"
 
@@ -78,7 +78,7 @@ private:
     void tell(const QDBusMessage& signal) { m_dock->service().emitSignal(signal, m_agent->bus()); }
 
     std::unique_ptr<PropertyService> m_dock;
-    std::unique_ptr<BusPeer> m_agent;
+    std::unique_ptr<BusClient> m_agent;
     std::unique_ptr<__Entry> m_entry;
     std::unique_ptr<QSignalSpy> m_names;
     std::unique_ptr<QSignalSpy> m_windows;
@@ -102,7 +102,7 @@ void DesktopProxiesEntryTest::init()
     m_dock->set(path, name, QStringLiteral("编辑器"));
     m_dock->set(path, QStringLiteral("IsDocked"), true);
     m_dock->set(path, windowInfos, windows(2));
-    m_agent = std::make_unique<BusPeer>();
+    m_agent = std::make_unique<BusClient>();
     m_entry = std::make_unique<__Entry>(service, path, m_agent->bus());
     m_names = std::make_unique<QSignalSpy>(m_entry.get(), &__Entry::NameChanged);
     m_windows = std::make_unique<QSignalSpy>(m_entry.get(), &__Entry::WindowInfosChanged);

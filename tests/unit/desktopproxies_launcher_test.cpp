@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "launcherd.h"
 #include "recorded_service.h"
 
@@ -49,7 +49,7 @@ void DesktopProxiesLauncherTest::itemsComeInTheLaunchersOrder()
     const LauncherItemInfoList items{item(), {}, item()};
     const RecordedService launcher(QDBusConnection::SessionBus, service,
                                    answering(QVariant::fromValue(items)));
-    BusPeer agent;
+    BusClient agent;
     __Launcherd proxy(service, path, agent.bus());
     QVERIFY(proxy.isValid());
 
@@ -67,7 +67,7 @@ void DesktopProxiesLauncherTest::itemsComeInTheLaunchersOrder()
 void DesktopProxiesLauncherTest::replyOfAnotherTypeIsAnError()
 {
     const RecordedService launcher(QDBusConnection::SessionBus, service, answering(QStringLiteral("items")));
-    BusPeer agent;
+    BusClient agent;
     QDBusPendingReply<LauncherItemInfoList> reply = __Launcherd(service, path, agent.bus()).GetAllItemInfos();
     reply.waitForFinished();
     QVERIFY(reply.isError());
@@ -76,7 +76,7 @@ void DesktopProxiesLauncherTest::replyOfAnotherTypeIsAnError()
 void DesktopProxiesLauncherTest::changedItemIsTold()
 {
     const RecordedService launcher(QDBusConnection::SessionBus, service, answerNothing);
-    BusPeer agent;
+    BusClient agent;
     const __Launcherd proxy(service, path, agent.bus());
     QSignalSpy changed(&proxy, &__Launcherd::ItemChanged);
     agent.settle();

@@ -6,10 +6,10 @@
 #include <memory>
 
 #include "handleevent.h"
+#include "https_server.h"
 #include "manual_clock.h"
 #include "platform_files.h"
 #include "recorded_service.h"
-#include "tls_peer.h"
 
 using Headers = QList<QPair<QByteArray, QByteArray>>;
 
@@ -17,12 +17,12 @@ namespace {
 
 const char* const kNotice = "用户密码快过期了！！";
 
-/// The address at which the peer answers with this status and body.
-QString said(const TlsPeer& peer, int status, const QString& body)
+/// The address at which the server answers with this status and body.
+QString said(const HttpsServer& server, int status, const QString& body)
 {
     const QByteArray query =
         "/said?status=" + QByteArray::number(status) + "&body=" + QUrl::toPercentEncoding(body);
-    return peer.url("demanding", query.constData());
+    return server.url("demanding", query.constData());
 }
 
 QString tips(const QString& code, const QString& result)
@@ -81,7 +81,7 @@ private Q_SLOTS:
     void passwordReplyIsReadAsUtf8InAnyLocale();
 
 private:
-    std::unique_ptr<TlsPeer> m_peer;
+    std::unique_ptr<HttpsServer> m_server;
     std::unique_ptr<RecordedService> m_notifications;
     int m_ahead = 0;
 };
@@ -90,8 +90,8 @@ void HandleEventPlatformTest::initTestCase()
 {
     qRegisterMetaType<Headers>("QList<QPair<QByteArray,QByteArray> >");
     setClockAhead(0);
-    m_peer = std::make_unique<TlsPeer>();
-    installCertificates(*m_peer);
+    m_server = std::make_unique<HttpsServer>();
+    installCertificates(*m_server);
     HandleEvent::GetInstance()->initHttpApi();
 }
 
@@ -99,7 +99,7 @@ void HandleEventPlatformTest::init()
 {
     m_notifications = std::make_unique<RecordedService>(
         QDBusConnection::SessionBus, QStringLiteral("com.norix.kpx.Notification"), answerNothing);
-    m_peer->forgetRequests();
+    m_server->forgetRequests();
 }
 
 void HandleEventPlatformTest::cleanup()
@@ -110,18 +110,18 @@ void HandleEventPlatformTest::cleanup()
 void HandleEventPlatformTest::secondInitKeepsTheConnection()
 {
     auto* event = HandleEvent::GetInstance();
-    event->getPlatformMsg(said(*m_peer, 200, QString()));
+    event->getPlatformMsg(said(*m_server, 200, QString()));
     event->initHttpApi();
-    event->getPlatformMsg(said(*m_peer, 200, QString()));
+    event->getPlatformMsg(said(*m_server, 200, QString()));
     const QString handshake = QStringLiteral("handshake");
-    const QJsonValue first = m_peer->nextRequest()[handshake];
-    QCOMPARE(m_peer->nextRequest()[handshake], first);
+    const QJsonValue first = m_server->nextRequest()[handshake];
+    QCOMPARE(m_server->nextRequest()[handshake], first);
 }
 
 void HandleEventPlatformTest::messageRequestIsGetWithoutContent()
 {
-    HandleEvent::GetInstance()->getPlatformMsg(m_peer->url("demanding", "/plain?uid=a"));
-    const QJsonObject request = m_peer->nextRequest();
+    HandleEvent::GetInstance()->getPlatformMsg(m_server->url("demanding", "/plain?uid=a"));
+    const QJsonObject request = m_server->nextRequest();
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain?uid=a HTTP/1.1"));
     QCOMPARE(request[QStringLiteral("body")].toString(), QString());
     QVERIFY(!request[QStringLiteral("client")].toString().isEmpty());
@@ -130,7 +130,7 @@ void HandleEventPlatformTest::messageRequestIsGetWithoutContent()
 void HandleEventPlatformTest::replyIsReportedBeforeTheRequestReturns()
 {
     QSignalSpy replies(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg);
-    HandleEvent::GetInstance()->getPlatformMsg(said(*m_peer, 404, QStringLiteral("[]")));
+    HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 404, QStringLiteral("[]")));
     QCOMPARE(replies.count(), 1);
     QCOMPARE(replies.at(0).at(0), QVariant(404));
     QCOMPARE(replies.at(0).at(1), QVariant(QStringLiteral("[]")));
@@ -140,7 +140,7 @@ void HandleEventPlatformTest::replyIsReportedBeforeTheRequestReturns()
 void HandleEventPlatformTest::replyIsLoggedWithStatusBodyAndHeaderCount()
 {
     QTest::ignoreMessage(QtInfoMsg, R"(getPlatformMsg ----nCode: 404 : "[]" : 2)");
-    HandleEvent::GetInstance()->getPlatformMsg(said(*m_peer, 404, QStringLiteral("[]")));
+    HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 404, QStringLiteral("[]")));
 }
 
 void HandleEventPlatformTest::replyIsLoggedBeforeItIsReported()
@@ -150,14 +150,14 @@ void HandleEventPlatformTest::replyIsLoggedBeforeItIsReported()
     const QObject receiver;
     connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
             [&linesWhenReported] { linesWhenReported = LogRecorder::lines(); });
-    HandleEvent::GetInstance()->getPlatformMsg(said(*m_peer, 200, QStringLiteral("[]")));
+    HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 200, QStringLiteral("[]")));
     QCOMPARE(linesWhenReported, QStringList{QStringLiteral(R"(getPlatformMsg ----nCode: 200 : "[]" : 2)")});
 }
 
 void HandleEventPlatformTest::requestWithoutResponseIsReportedAsStatusZero()
 {
     auto* event = HandleEvent::GetInstance();
-    event->getPlatformMsg(said(*m_peer, 200, QStringLiteral("a reply with headers")));
+    event->getPlatformMsg(said(*m_server, 200, QStringLiteral("a reply with headers")));
     QSignalSpy replies(event, &HandleEvent::recvPlatformMsg);
     QTest::ignoreMessage(QtWarningMsg, QRegularExpression(QStringLiteral("^HTTP GET without a response")));
     QTest::ignoreMessage(QtInfoMsg, R"(getPlatformMsg ----nCode: 0 : "" : 0)");
@@ -171,8 +171,8 @@ void HandleEventPlatformTest::answerIsPutAsJsonAndItsReplyDropped()
 {
     QSignalSpy replies(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg);
     const QString body = QStringLiteral(R"({"uuid":"一 %1"})");
-    HandleEvent::GetInstance()->respondPlatformMsg(m_peer->url("demanding", "/broken"), body);
-    const QJsonObject request = m_peer->nextRequest();
+    HandleEvent::GetInstance()->respondPlatformMsg(m_server->url("demanding", "/broken"), body);
+    const QJsonObject request = m_server->nextRequest();
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("PUT /broken HTTP/1.1"));
     QCOMPARE(request[QStringLiteral("body")].toString(), body);
     QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
@@ -181,10 +181,10 @@ void HandleEventPlatformTest::answerIsPutAsJsonAndItsReplyDropped()
 
 void HandleEventPlatformTest::passwordRequestCarriesTheUserName()
 {
-    const QString url = m_peer->url("demanding", "/plain");
+    const QString url = m_server->url("demanding", "/plain");
     QTest::ignoreMessage(QtInfoMsg, qUtf8Printable(QStringLiteral("url  \"%1\"").arg(url)));
     HandleEvent::GetInstance()->getPasswdExpiredTime(url, QStringLiteral("张 \"%1\""));
-    const QJsonObject request = m_peer->nextRequest();
+    const QJsonObject request = m_server->nextRequest();
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
     QCOMPARE(request[QStringLiteral("body")].toString(),
              QStringLiteral("{\n    \"username\": \"张 \\\"%1\\\"\"\n}\n"));
@@ -195,7 +195,7 @@ void HandleEventPlatformTest::passwordReplyIsReportedLikeAnyOther()
 {
     QSignalSpy replies(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg);
     QTest::ignoreMessage(QtInfoMsg, R"(getPasswdExpiredTime ----nCode: 500 : "{}" : 2)");
-    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_peer, 500, QStringLiteral("{}")), QString());
+    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 500, QStringLiteral("{}")), QString());
     QCOMPARE(replies.count(), 1);
     QCOMPARE(replies.at(0).at(0), QVariant(500));
 }
@@ -212,7 +212,7 @@ void HandleEventPlatformTest::passwordReplyThatIsNoJsonStopsTheCheck()
 {
     QFETCH(QString, body);
     const LogRecorder log;
-    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_peer, 200, body), QString());
+    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 200, body), QString());
     QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 0);
 }
 
@@ -242,7 +242,7 @@ void HandleEventPlatformTest::passwordThatDoesNotExpireIsLoggedTwiceAndNotShown(
     QFETCH(int, status);
     QFETCH(QString, body);
     const LogRecorder log;
-    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_peer, status, body), QString());
+    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, status, body), QString());
     setClockAhead(m_ahead += 120);
     QCoreApplication::processEvents();
     QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 2);
@@ -253,7 +253,7 @@ void HandleEventPlatformTest::expiringPasswordIsShownAfterAMinute()
 {
     const LogRecorder log;
     const QString reply = tips(QStringLiteral("0"), QStringLiteral("true"));
-    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_peer, 200, reply), QString());
+    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 200, reply), QString());
     QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 2);
 
     // The notice's timer is coarse: half a second more or less.
@@ -275,7 +275,7 @@ void HandleEventPlatformTest::passwordReplyIsReadAsUtf8InAnyLocale()
     const QString reply = tips(QStringLiteral("0"), QStringLiteral("true"));
     auto* const before = QTextCodec::codecForLocale();
     QTextCodec::setCodecForLocale(QTextCodec::codecForName("ISO-8859-1"));
-    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_peer, 200, reply), QString());
+    HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 200, reply), QString());
     QTextCodec::setCodecForLocale(before);
     setClockAhead(m_ahead += 61);
     QTRY_COMPARE(m_notifications->calls().size(), 1);

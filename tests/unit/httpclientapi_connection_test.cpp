@@ -1,5 +1,5 @@
 #include "http_outcome.h"
-#include "tls_peer.h"
+#include "https_server.h"
 
 #include <QProcess>
 #include <QTimer>
@@ -72,15 +72,15 @@ private Q_SLOTS:
     void child_processes_inherit_nothing();
 
 private:
-    TlsPeer m_peer;
+    HttpsServer m_server;
     std::unique_ptr<HttpClientApi> m_client;
 };
 
 void HttpClientApiConnectionTest::init()
 {
-    m_peer.forgetRequests();
+    m_server.forgetRequests();
     m_client = std::make_unique<HttpClientApi>(nullptr, false);
-    m_client->setSSLConfig(m_peer.file("ca"), {}, {});
+    m_client->setSSLConfig(m_server.file("ca"), {}, {});
 }
 
 void HttpClientApiConnectionTest::cleanup()
@@ -93,8 +93,8 @@ void HttpClientApiConnectionTest::hundred_requests_share_one_connection()
 {
     QSet<int> handshakes;
     for (int i = 0; i < 100; ++i) {
-        QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
-        handshakes << m_peer.nextRequest()[QStringLiteral("handshake")].toInt();
+        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+        handshakes << m_server.nextRequest()[QStringLiteral("handshake")].toInt();
     }
     QCOMPARE(handshakes.size(), 1);
 }
@@ -111,16 +111,16 @@ void HttpClientApiConnectionTest::connects_anew_when_the_server_has_closed()
 {
     QFETCH(QString, path);
 
-    QCOMPARE(get(*m_client, m_peer.url("proper", qUtf8Printable(path))).status, 200);
-    QCOMPARE(put(*m_client, m_peer.url("proper", "/text"), QStringLiteral("{}")).status, 200);
+    QCOMPARE(get(*m_client, m_server.url("proper", qUtf8Printable(path))).status, 200);
+    QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
 }
 
 void HttpClientApiConnectionTest::sends_again_what_went_into_a_dead_path()
 {
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/idle-death")).status, 200);
-    QCOMPARE(put(*m_client, m_peer.url("proper", "/text"), QStringLiteral("{}")).status, 200);
-    const QJsonObject before = m_peer.nextRequest();
-    const QJsonObject after = m_peer.nextRequest();
+    QCOMPARE(get(*m_client, m_server.url("proper", "/idle-death")).status, 200);
+    QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
+    const QJsonObject before = m_server.nextRequest();
+    const QJsonObject after = m_server.nextRequest();
     QCOMPARE(after[QStringLiteral("line")].toString(), QStringLiteral("PUT /text HTTP/1.1"));
     QVERIFY(after[QStringLiteral("handshake")] != before[QStringLiteral("handshake")]);
 }
@@ -128,7 +128,7 @@ void HttpClientApiConnectionTest::sends_again_what_went_into_a_dead_path()
 void HttpClientApiConnectionTest::kernel_watches_an_idle_connection()
 {
     constexpr int shortestPoll = 60;
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
     QCOMPARE(connections().size(), 1);
     const int connection = connections().first();
     QCOMPARE(option(connection, SOL_SOCKET, SO_KEEPALIVE), 1);
@@ -149,10 +149,10 @@ void HttpClientApiConnectionTest::resumes_its_tls_session_on_a_new_connection()
 {
     QFETCH(QString, door);
     QFETCH(QString, version);
-    m_client->setSSLConfig(m_peer.file("ca"), m_peer.file("client"), m_peer.file("client-key"));
+    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
     for (const bool isResumed : {false, true, true}) {
-        QCOMPARE(get(*m_client, m_peer.url(qUtf8Printable(door), "/announced-close")).status, 200);
-        const QJsonObject request = m_peer.nextRequest();
+        QCOMPARE(get(*m_client, m_server.url(qUtf8Printable(door), "/announced-close")).status, 200);
+        const QJsonObject request = m_server.nextRequest();
         QCOMPARE(request[QStringLiteral("tls")].toString(), version);
         QCOMPARE(request[QStringLiteral("resumed")].toBool(), isResumed);
     }
@@ -160,32 +160,32 @@ void HttpClientApiConnectionTest::resumes_its_tls_session_on_a_new_connection()
 
 void HttpClientApiConnectionTest::serves_the_next_request_after_one_without_response()
 {
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/cut-length")).status, 0);
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/body-over-cap")).status, 0);
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/text")).reply, QStringLiteral("用户 ü {}"));
+    QCOMPARE(get(*m_client, m_server.url("proper", "/cut-length")).status, 0);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/body-over-cap")).status, 0);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/text")).reply, QStringLiteral("用户 ü {}"));
 }
 
 void HttpClientApiConnectionTest::speaks_http_1_1_to_a_server_that_prefers_http_2()
 {
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
-    QCOMPARE(m_peer.nextRequest()[QStringLiteral("protocol")].toString(), QStringLiteral("http/1.1"));
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+    QCOMPARE(m_server.nextRequest()[QStringLiteral("protocol")].toString(), QStringLiteral("http/1.1"));
 }
 
 void HttpClientApiConnectionTest::uses_no_proxy_of_the_environment()
 {
-    const QByteArray nobody = m_peer.url("refusing", "").toUtf8().replace("https:", "http:");
+    const QByteArray nobody = m_server.url("refusing", "").toUtf8().replace("https:", "http:");
     qputenv("https_proxy", nobody);
     qputenv("ALL_PROXY", nobody);
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
 }
 
 void HttpClientApiConnectionTest::follows_no_redirect()
 {
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/redirect")).status, 302);
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/next")).status, 200);
-    QCOMPARE(m_peer.nextRequest()[QStringLiteral("line")].toString(),
+    QCOMPARE(get(*m_client, m_server.url("proper", "/redirect")).status, 302);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/next")).status, 200);
+    QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(),
              QStringLiteral("GET /redirect HTTP/1.1"));
-    QCOMPARE(m_peer.nextRequest()[QStringLiteral("line")].toString(), QStringLiteral("GET /next HTTP/1.1"));
+    QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(), QStringLiteral("GET /next HTTP/1.1"));
 }
 
 void HttpClientApiConnectionTest::delivers_no_event_while_a_request_runs()
@@ -194,7 +194,7 @@ void HttpClientApiConnectionTest::delivers_no_event_while_a_request_runs()
     timer.setSingleShot(true);
     QSignalSpy fired(&timer, &QTimer::timeout);
     timer.start(0);
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
     QCOMPARE(fired.count(), 0);
     QVERIFY(fired.wait());
 }
@@ -204,7 +204,7 @@ void HttpClientApiConnectionTest::child_processes_inherit_nothing()
     m_client.reset();
     const QString before = descriptorsOfAChild();
     init();
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
     QCOMPARE(descriptorsOfAChild(), before);
 }
 

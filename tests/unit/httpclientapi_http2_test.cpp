@@ -1,6 +1,6 @@
 #include "files.h"
 #include "http_outcome.h"
-#include "tls_peer.h"
+#include "https_server.h"
 
 #include <QTcpSocket>
 #include <QtTest>
@@ -60,7 +60,7 @@ private Q_SLOTS:
 private:
     QString url() const { return QStringLiteral("https://127.0.0.1:%1/list").arg(kPort); }
 
-    TlsPeer m_certificates;
+    HttpsServer m_certificates;
     QTemporaryDir m_folder;
     QProcess m_server;
 };

@@ -1,6 +1,6 @@
 #include "http_outcome.h"
+#include "https_server.h"
 #include "manual_clock.h"
-#include "tls_peer.h"
 
 #include <QtTest>
 
@@ -15,13 +15,13 @@ private Q_SLOTS:
 
 void HttpClientApiIdleTest::connection_is_used_again_however_long_it_was_idle()
 {
-    TlsPeer peer;
+    HttpsServer server;
     HttpClientApi client(nullptr, false);
-    client.setSSLConfig(peer.file("ca"), {}, {});
+    client.setSSLConfig(server.file("ca"), {}, {});
     for (const int seconds : {0, 119, 1'000, 100'000, 1'000'000}) {
         setClockAhead(seconds);
-        QCOMPARE(get(client, peer.url("proper", "/plain")).status, 200);
-        QCOMPARE(peer.nextRequest()[QStringLiteral("handshake")].toInt(), 1);
+        QCOMPARE(get(client, server.url("proper", "/plain")).status, 200);
+        QCOMPARE(server.nextRequest()[QStringLiteral("handshake")].toInt(), 1);
     }
 }
 

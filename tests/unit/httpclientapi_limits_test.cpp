@@ -1,5 +1,5 @@
 #include "httpclientapi.h"
-#include "tls_peer.h"
+#include "https_server.h"
 #include "warning_recorder.h"
 
 #include <QFile>
@@ -47,7 +47,7 @@ private Q_SLOTS:
 private:
     void start(const char* row, const QString& url);
 
-    TlsPeer m_peer;
+    HttpsServer m_server;
     std::unique_ptr<WarningRecorder> m_warnings;
     std::map<QString, std::shared_future<Outcome>> m_requests;
 };
@@ -60,16 +60,16 @@ void HttpClientApiLimitsTest::initTestCase()
     QCOMPARE(mkfifo("/etc/hosts", 0600), 0);
 
     m_warnings = std::make_unique<WarningRecorder>();
-    start("no header comes", m_peer.url("proper", "/stalled-header"));
-    start("body stops", m_peer.url("proper", "/stalled-body"));
-    start("body drips without end", m_peer.url("proper", "/dripping-body"));
+    start("no header comes", m_server.url("proper", "/stalled-header"));
+    start("body stops", m_server.url("proper", "/stalled-body"));
+    start("body drips without end", m_server.url("proper", "/dripping-body"));
     start("name lookup hangs", QStringLiteral("https://platform.invalid/"));
-    start("TLS handshake hangs", m_peer.url("silent", "/plain"));
+    start("TLS handshake hangs", m_server.url("silent", "/plain"));
 }
 
 void HttpClientApiLimitsTest::start(const char* row, const QString& url)
 {
-    std::packaged_task<Outcome()> request([url, authority = m_peer.file("ca")] {
+    std::packaged_task<Outcome()> request([url, authority = m_server.file("ca")] {
         HttpClientApi client(nullptr, false);
         client.setSSLConfig(authority, {}, {});
         Outcome outcome;

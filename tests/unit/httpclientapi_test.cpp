@@ -1,5 +1,5 @@
 #include "http_outcome.h"
-#include "tls_peer.h"
+#include "https_server.h"
 
 #include <QtTest>
 
@@ -39,22 +39,22 @@ private Q_SLOTS:
     void reply_without_length_that_breaks_off_is_none_where_the_library_can_tell();
 
 private:
-    TlsPeer m_peer;
+    HttpsServer m_server;
     std::unique_ptr<HttpClientApi> m_client;
 };
 
 void HttpClientApiTest::init()
 {
-    m_peer.forgetRequests();
+    m_server.forgetRequests();
     m_client = std::make_unique<HttpClientApi>(nullptr, false);
-    m_client->setSSLConfig(m_peer.file("ca"), {}, {});
+    m_client->setSSLConfig(m_server.file("ca"), {}, {});
 }
 
 void HttpClientApiTest::get_without_body_has_no_content()
 {
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).status, 200);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
 
-    const QJsonObject request = m_peer.nextRequest();
+    const QJsonObject request = m_server.nextRequest();
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
     QVERIFY(headerOf(request, "Content-Length").isNull());
     QVERIFY(headerOf(request, "Content-Type").isNull());
@@ -63,9 +63,9 @@ void HttpClientApiTest::get_without_body_has_no_content()
 void HttpClientApiTest::get_carries_its_body()
 {
     const QString body = QStringLiteral("{\"username\": \"张伟\"}");
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain"), body).status, 200);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain"), body).status, 200);
 
-    const QJsonObject request = m_peer.nextRequest();
+    const QJsonObject request = m_server.nextRequest();
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
     QCOMPARE(request[QStringLiteral("body")].toString(), body);
     QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
@@ -74,9 +74,9 @@ void HttpClientApiTest::get_carries_its_body()
 void HttpClientApiTest::put_carries_its_body()
 {
     const QString body = QStringLiteral("{\"uuid\":\"一\"}");
-    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), body).status, 200);
+    QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), body).status, 200);
 
-    const QJsonObject request = m_peer.nextRequest();
+    const QJsonObject request = m_server.nextRequest();
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("PUT /plain HTTP/1.1"));
     QCOMPARE(request[QStringLiteral("body")].toString(), body);
     QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
@@ -84,9 +84,9 @@ void HttpClientApiTest::put_carries_its_body()
 
 void HttpClientApiTest::put_without_body_declares_empty_content()
 {
-    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), {}).status, 200);
+    QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), {}).status, 200);
 
-    const QJsonObject request = m_peer.nextRequest();
+    const QJsonObject request = m_server.nextRequest();
     QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("PUT /plain HTTP/1.1"));
     QCOMPARE(headerOf(request, "Content-Length"), QStringLiteral("0"));
     QVERIFY(headerOf(request, "Content-Type").isNull());
@@ -94,9 +94,9 @@ void HttpClientApiTest::put_without_body_declares_empty_content()
 
 void HttpClientApiTest::content_that_is_not_json_has_no_content_type()
 {
-    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), QStringLiteral("text"), false).status, 200);
+    QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), QStringLiteral("text"), false).status, 200);
 
-    const QJsonObject request = m_peer.nextRequest();
+    const QJsonObject request = m_server.nextRequest();
     QCOMPARE(request[QStringLiteral("body")].toString(), QStringLiteral("text"));
     QVERIFY(headerOf(request, "Content-Type").isNull());
 }
@@ -104,9 +104,9 @@ void HttpClientApiTest::content_that_is_not_json_has_no_content_type()
 void HttpClientApiTest::large_content_is_sent_without_asking_first()
 {
     const QString body(2 * 1024 * 1024, QLatin1Char('x'));
-    QCOMPARE(put(*m_client, m_peer.url("proper", "/plain"), body).status, 200);
+    QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), body).status, 200);
 
-    const QJsonObject request = m_peer.nextRequest();
+    const QJsonObject request = m_server.nextRequest();
     QVERIFY(headerOf(request, "Expect").isNull());
     QCOMPARE(headerOf(request, "Content-Length"), QString::number(body.size()));
 }
@@ -140,8 +140,8 @@ void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_
     QFETCH(QString, path);
     QFETCH(QString, sent);
 
-    QCOMPARE(get(*m_client, m_peer.url("proper", qUtf8Printable(path))).status, 200);
-    QCOMPARE(m_peer.nextRequest()[QStringLiteral("line")].toString(),
+    QCOMPARE(get(*m_client, m_server.url("proper", qUtf8Printable(path))).status, 200);
+    QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(),
              QStringLiteral("GET %1 HTTP/1.1").arg(sent));
 }
 
@@ -164,7 +164,7 @@ void HttpClientApiTest::status_and_body_are_returned()
     QFETCH(int, status);
     QFETCH(QString, reply);
 
-    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", QTest::currentDataTag()));
+    const HttpOutcome outcome = get(*m_client, m_server.url("proper", QTest::currentDataTag()));
     QCOMPARE(outcome.status, status);
     QCOMPARE(outcome.reply, reply);
     QCOMPARE(outcome.warnings, QStringList());
@@ -172,7 +172,7 @@ void HttpClientApiTest::status_and_body_are_returned()
 
 void HttpClientApiTest::body_of_8_mib_is_accepted()
 {
-    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/body-at-cap"));
+    const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/body-at-cap"));
     QCOMPARE(outcome.status, 200);
     QCOMPARE(outcome.reply.size(), 8 * 1024 * 1024);
 }
@@ -182,41 +182,41 @@ void HttpClientApiTest::headers_keep_their_order_case_and_duplicates()
     const Headers sent = {{"X-Total-Count", "5"}, {"x-lower", "a"},       {"X-UPPER", "b \t c"},
                           {"x-twice", "1"},       {"X-Twice", "2"},       {"x-twice", "1"},
                           {"X-Empty", ""},        {"Content-Length", "2"}};
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/headers")).headers, sent);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/headers")).headers, sent);
 }
 
 void HttpClientApiTest::folded_header_is_one_header()
 {
     const Headers joined = {{"X-Folded", "one two"}, {"Content-Length", "2"}};
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/folded")).headers, joined);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/folded")).headers, joined);
 }
 
 void HttpClientApiTest::interim_responses_have_no_part_in_the_headers()
 {
-    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/interim"));
+    const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/interim"));
     QCOMPARE(outcome.status, 200);
     QCOMPARE(outcome.headers, Headers({{"X-Final", "yes"}, {"Content-Length", "5"}}));
 }
 
 void HttpClientApiTest::trailers_have_no_part_in_the_headers()
 {
-    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/trailers"));
+    const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/trailers"));
     QCOMPARE(outcome.reply, QStringLiteral("first second"));
     QCOMPARE(outcome.headers, Headers({{"Transfer-Encoding", "chunked"}}));
 }
 
 void HttpClientApiTest::headers_of_250_kib_are_accepted()
 {
-    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/headers-within-cap"));
+    const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/headers-within-cap"));
     QCOMPARE(outcome.status, 200);
     QCOMPARE(outcome.headers.size(), 251);
 }
 
 void HttpClientApiTest::headers_are_those_of_the_last_request()
 {
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/headers")).headers.size(), 8);
-    QCOMPARE(get(*m_client, m_peer.url("proper", "/plain")).headers, Headers({{"Content-Length", "2"}}));
-    QCOMPARE(get(*m_client, m_peer.url("refusing", "/plain")).headers, Headers());
+    QCOMPARE(get(*m_client, m_server.url("proper", "/headers")).headers.size(), 8);
+    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).headers, Headers({{"Content-Length", "2"}}));
+    QCOMPARE(get(*m_client, m_server.url("refusing", "/plain")).headers, Headers());
 }
 
 void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning_data()
@@ -227,10 +227,10 @@ void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning_d
     const auto row = [](const char* name, const QString& url, const char* cause) {
         QTest::newRow(name) << url << QString::fromUtf8(cause);
     };
-    const auto path = [this](const char* name) { return m_peer.url("proper", name); };
+    const auto path = [this](const char* name) { return m_server.url("proper", name); };
     const QString withoutTls = path("/plain").replace(QStringLiteral("https:"), QStringLiteral("http:"));
 
-    row("connection refused", m_peer.url("refusing", "/plain"), "onnect");
+    row("connection refused", m_server.url("refusing", "/plain"), "onnect");
     row("body shorter than its length", path("/cut-length"), "97 bytes (remaining|missing)");
     row("last chunk cut", path("/cut-chunk"), "outstanding read data remaining");
     row("connection broken off in the body", path("/cut-connection"), "97 bytes remaining|unexpected eof");
@@ -256,7 +256,7 @@ void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning()
 
 void HttpClientApiTest::reply_without_length_that_breaks_off_is_none_where_the_library_can_tell()
 {
-    const HttpOutcome outcome = get(*m_client, m_peer.url("proper", "/until-break"));
+    const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/until-break"));
 #if LIBCURL_VERSION_NUM >= 0x080000
     QCOMPARE(summary(outcome), kNoResponse);
 #else

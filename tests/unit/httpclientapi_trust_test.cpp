@@ -1,5 +1,5 @@
 #include "http_outcome.h"
-#include "tls_peer.h"
+#include "https_server.h"
 
 #include <QDir>
 #include <QProcess>
@@ -28,10 +28,10 @@ private Q_SLOTS:
     void presents_the_certificate_of_its_latest_configuration();
 
 private:
-    HttpOutcome plainGet(const char* door) { return get(*m_client, m_peer.url(door, "/plain")); }
-    QString clientOfNextRequest() { return m_peer.nextRequest()[QStringLiteral("client")].toString(); }
+    HttpOutcome plainGet(const char* door) { return get(*m_client, m_server.url(door, "/plain")); }
+    QString clientOfNextRequest() { return m_server.nextRequest()[QStringLiteral("client")].toString(); }
 
-    TlsPeer m_peer;
+    HttpsServer m_server;
     QTemporaryDir m_folder;
     std::unique_ptr<HttpClientApi> m_client;
 };
@@ -63,7 +63,7 @@ void HttpClientApiTrustTest::initTestCase()
 
 void HttpClientApiTrustTest::init()
 {
-    m_peer.forgetRequests();
+    m_server.forgetRequests();
     m_client = std::make_unique<HttpClientApi>(nullptr, false);
 }
 
@@ -74,8 +74,8 @@ void HttpClientApiTrustTest::refuses_data()
     QTest::addColumn<QString>("key");
     QTest::addColumn<QString>("cause");
 
-    const QString ca = m_peer.file("ca");
-    const QString key = m_peer.file("client-key");
+    const QString ca = m_server.file("ca");
+    const QString key = m_server.file("client-key");
     const QString none = m_folder.filePath(QStringLiteral("none"));
     const auto row = [](const char* name, const char* door, const QString& authority, const QString& keyFile,
                         const char* cause) {
@@ -99,7 +99,7 @@ void HttpClientApiTrustTest::refuses()
     QFETCH(QString, key);
     QFETCH(QString, cause);
 
-    m_client->setSSLConfig(authority, key.isEmpty() ? QString() : m_peer.file("client"), key);
+    m_client->setSSLConfig(authority, key.isEmpty() ? QString() : m_server.file("client"), key);
     const HttpOutcome outcome = plainGet(qUtf8Printable(door));
     QCOMPARE(summary(outcome), kNoResponse);
     QVERIFY2(outcome.warnings[0].contains(cause), qUtf8Printable(outcome.warnings[0]));
@@ -111,12 +111,12 @@ void HttpClientApiTrustTest::refuses_an_authority_that_only_the_system_trusts()
     QVERIFY(qEnvironmentVariableIsSet("VELK_BOX_USER"));
     const QDir trusted(QStringLiteral("/etc/ssl/certs"));
     QVERIFY(trusted.mkpath(QStringLiteral(".")));
-    const QByteArray stranger = contentOf(m_peer.file("stranger-ca"));
+    const QByteArray stranger = contentOf(m_server.file("stranger-ca"));
     replace(trusted.filePath(QStringLiteral("stranger.pem")), stranger);
     QCOMPARE(
         QProcess::execute(QStringLiteral("/usr/bin/openssl"), {QStringLiteral("rehash"), trusted.path()}), 0);
 
-    m_client->setSSLConfig(m_peer.file("ca"), {}, {});
+    m_client->setSSLConfig(m_server.file("ca"), {}, {});
     QCOMPARE(plainGet("stranger").status, 0);
 }
 
@@ -131,13 +131,13 @@ void HttpClientApiTrustTest::asks_nobody_for_the_password_of_a_key()
     replace(answer, "secret\n");
     QVERIFY(std::freopen(qUtf8Printable(answer), "r", stdin) != nullptr);
 
-    m_client->setSSLConfig(m_peer.file("ca"), m_peer.file("client"), m_peer.file("encrypted-key"));
+    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("encrypted-key"));
     QCOMPARE(summary(plainGet("demanding")), kNoResponse);
 }
 
 void HttpClientApiTrustTest::trusts_the_given_authority()
 {
-    m_client->setSSLConfig(m_peer.file("stranger-ca"), {}, {});
+    m_client->setSSLConfig(m_server.file("stranger-ca"), {}, {});
     QCOMPARE(plainGet("stranger").status, 200);
 }
 
@@ -145,15 +145,15 @@ void HttpClientApiTrustTest::reads_a_replaced_authority_file()
 {
     const QString authority = m_folder.filePath(QStringLiteral("authority.pem"));
     m_client->setSSLConfig(authority, {}, {});
-    replace(authority, contentOf(m_peer.file("stranger-ca")));
+    replace(authority, contentOf(m_server.file("stranger-ca")));
     QCOMPARE(plainGet("proper").status, 0);
-    replace(authority, contentOf(m_peer.file("ca")));
+    replace(authority, contentOf(m_server.file("ca")));
     QCOMPARE(plainGet("proper").status, 200);
 }
 
 void HttpClientApiTrustTest::presents_its_certificate()
 {
-    m_client->setSSLConfig(m_peer.file("ca"), m_peer.file("client"), m_peer.file("client-key"));
+    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
     QCOMPARE(plainGet("demanding").status, 200);
     QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
 }
@@ -161,18 +161,18 @@ void HttpClientApiTrustTest::presents_its_certificate()
 void HttpClientApiTrustTest::finds_the_key_in_the_file_of_the_certificate()
 {
     const QString both = m_folder.filePath(QStringLiteral("both.pem"));
-    replace(both, contentOf(m_peer.file("client")) + contentOf(m_peer.file("client-key")));
-    m_client->setSSLConfig(m_peer.file("ca"), both, {});
+    replace(both, contentOf(m_server.file("client")) + contentOf(m_server.file("client-key")));
+    m_client->setSSLConfig(m_server.file("ca"), both, {});
     QCOMPARE(plainGet("demanding").status, 200);
 }
 
 void HttpClientApiTrustTest::presents_the_certificate_of_its_latest_configuration()
 {
-    m_client->setSSLConfig(m_peer.file("ca"), {}, {});
+    m_client->setSSLConfig(m_server.file("ca"), {}, {});
     QCOMPARE(plainGet("proper").status, 200);
     QCOMPARE(clientOfNextRequest(), QString());
 
-    m_client->setSSLConfig(m_peer.file("ca"), m_peer.file("client"), m_peer.file("client-key"));
+    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
     QCOMPARE(plainGet("proper").status, 200);
     QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
 }

@@ -6,10 +6,10 @@
 #include <memory>
 
 #include "handleevent.h"
+#include "https_server.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "platform_files.h"
-#include "tls_peer.h"
 
 using Waiting = void (*)(QObject*, const std::function<void()>&);
 Q_DECLARE_METATYPE(Waiting)
@@ -38,7 +38,7 @@ private Q_SLOTS:
 private:
     QString requestTarget();
 
-    std::unique_ptr<TlsPeer> m_peer;
+    std::unique_ptr<HttpsServer> m_server;
     std::unique_ptr<MessageTransfer> m_transfer;
     std::unique_ptr<MessagePlatform> m_platform;
     int m_replies = 0; ///< since the start of the test
@@ -48,9 +48,9 @@ private:
 
 void MessagePlatformDrainTest::initTestCase()
 {
-    m_peer = std::make_unique<TlsPeer>();
-    installCertificates(*m_peer);
-    writePlatformAddress(*m_peer);
+    m_server = std::make_unique<HttpsServer>();
+    installCertificates(*m_server);
+    writePlatformAddress(*m_server);
     m_transfer = std::make_unique<MessageTransfer>();
 }
 
@@ -60,7 +60,7 @@ void MessagePlatformDrainTest::init()
     m_replies = 0;
     m_countingReplies = 0;
     m_afterReply = nullptr;
-    m_peer->forgetRequests();
+    m_server->forgetRequests();
     // Adds a count to the replies, while the client waits for them.
     connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, m_platform.get(), [this] {
         if (++m_replies <= m_countingReplies) {
@@ -79,7 +79,7 @@ void MessagePlatformDrainTest::cleanup()
 
 QString MessagePlatformDrainTest::requestTarget()
 {
-    return m_peer->nextRequest()[QStringLiteral("line")].toString().section(QLatin1Char(' '), 1, 1);
+    return m_server->nextRequest()[QStringLiteral("line")].toString().section(QLatin1Char(' '), 1, 1);
 }
 
 void MessagePlatformDrainTest::followUpIsAskedForBeforeTheListReturns()

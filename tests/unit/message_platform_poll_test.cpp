@@ -6,13 +6,13 @@
 #include <memory>
 
 #include "handleevent.h"
+#include "https_server.h"
 #include "log_recorder.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "platform_files.h"
 #include "pretended_time.h"
 #include "recorded_service.h"
-#include "tls_peer.h"
 
 namespace {
 
@@ -59,16 +59,16 @@ private Q_SLOTS:
     void pollTimerOutlivesTheClientAndPollsNoMore();
 
 private:
-    std::unique_ptr<TlsPeer> m_peer;
+    std::unique_ptr<HttpsServer> m_server;
     std::unique_ptr<MessageTransfer> m_transfer;
     std::unique_ptr<MessagePlatform> m_platform;
 };
 
 void MessagePlatformPollTest::initTestCase()
 {
-    m_peer = std::make_unique<TlsPeer>();
-    installCertificates(*m_peer);
-    writePlatformAddress(*m_peer);
+    m_server = std::make_unique<HttpsServer>();
+    installCertificates(*m_server);
+    writePlatformAddress(*m_server);
 
     m_transfer = std::make_unique<MessageTransfer>();
     m_platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("zhang.wei"), m_transfer.get());

@@ -8,12 +8,12 @@
 #include <optional>
 
 #include "handleevent.h"
+#include "https_server.h"
 #include "log_recorder.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "platform_files.h"
 #include "pretended_time.h"
-#include "tls_peer.h"
 
 namespace {
 
@@ -58,16 +58,16 @@ private:
     /// The path and query of the next list request, without its time.
     QString nextList();
 
-    std::unique_ptr<TlsPeer> m_peer;
+    std::unique_ptr<HttpsServer> m_server;
     std::unique_ptr<MessageTransfer> m_transfer;
     std::unique_ptr<MessagePlatform> m_platform;
 };
 
 void MessagePlatformTest::initTestCase()
 {
-    m_peer = std::make_unique<TlsPeer>();
-    installCertificates(*m_peer);
-    writePlatformAddress(*m_peer);
+    m_server = std::make_unique<HttpsServer>();
+    installCertificates(*m_server);
+    writePlatformAddress(*m_server);
 
     m_transfer = std::make_unique<MessageTransfer>();
     m_platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("zhang.wei"), m_transfer.get());
@@ -75,7 +75,7 @@ void MessagePlatformTest::initTestCase()
 
 void MessagePlatformTest::init()
 {
-    m_peer->forgetRequests();
+    m_server->forgetRequests();
 }
 
 void MessagePlatformTest::cleanup()
@@ -86,7 +86,7 @@ void MessagePlatformTest::cleanup()
 
 QString MessagePlatformTest::requestTarget()
 {
-    return m_peer->nextRequest()[QStringLiteral("line")].toString().section(QLatin1Char(' '), 1, 1);
+    return m_server->nextRequest()[QStringLiteral("line")].toString().section(QLatin1Char(' '), 1, 1);
 }
 
 QString MessagePlatformTest::nextList()
@@ -115,7 +115,7 @@ void MessagePlatformTest::startIsLogged()
 {
     const LogRecorder log;
     MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
-    const QString tips = m_peer->url("demanding", "/uim/v3/client/password/tips");
+    const QString tips = m_server->url("demanding", "/uim/v3/client/password/tips");
     const QStringList expected{QStringLiteral("info: ---------load cfg"),
                                QStringLiteral(R"(info: MessagePlatform app path "/usr/bin/velkm")"),
                                QStringLiteral("info: url  \"%1\"").arg(tips)};
@@ -129,7 +129,7 @@ void MessagePlatformTest::unusualAddressIsUsedAsItIs()
     MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
     platform.unreadMessages(QStringLiteral("a"), 1, 1);
     platform.messageRespond(QStringLiteral("u"));
-    writePlatformAddress(*m_peer);
+    writePlatformAddress(*m_server);
 
     const QString base = QStringLiteral("\"https://%2.box:%1/");
     const QStringList addresses = log.lines().filter(base);
@@ -234,7 +234,7 @@ void MessagePlatformTest::bodyIsReadInTheEncodingOfTheLocale()
     QTextCodec::setCodecForLocale(QTextCodec::codecForName("ISO-8859-1"));
     m_platform->OnRecvMsg(200, QStringLiteral(R"([{"uuid":"u终"}])"), {});
     QTextCodec::setCodecForLocale(before);
-    QCOMPARE(m_peer->nextRequest()[QStringLiteral("body")].toString(), QStringLiteral(R"({"uuid":"u?"})"));
+    QCOMPARE(m_server->nextRequest()[QStringLiteral("body")].toString(), QStringLiteral(R"({"uuid":"u?"})"));
 }
 
 void MessagePlatformTest::callbackIsNeverCalled()

@@ -1,4 +1,4 @@
-#include "bus_peer.h"
+#include "bus_client.h"
 #include "prys_interface.h"
 #include "recorded_service.h"
 #include "velkg_interface.h"

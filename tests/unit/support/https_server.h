@@ -5,14 +5,14 @@
 #include <QString>
 #include <QTemporaryDir>
 
-/// The scripted HTTPS server of tests/support/tls_peer.py, which describes its doors, files and paths.
-class TlsPeer
+/// The scripted HTTPS server of tests/support/https_server.py, which describes its doors, files and paths.
+class HttpsServer
 {
 public:
     /// Serves when the constructor returns.
-    TlsPeer();
-    ~TlsPeer();
-    Q_DISABLE_COPY_MOVE(TlsPeer)
+    HttpsServer();
+    ~HttpsServer();
+    Q_DISABLE_COPY_MOVE(HttpsServer)
 
     /// `path` may have a query and characters outside ASCII, in UTF-8.
     QString url(const char* door, const char* path) const;
@@ -28,7 +28,7 @@ private:
     QJsonObject readLine();
 
     QTemporaryDir m_folder;
-    QProcess m_server;
+    QProcess m_process;
     QJsonObject m_ports;
     QJsonObject m_files;
 };

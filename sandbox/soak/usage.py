@@ -10,7 +10,7 @@ from typing import Sequence
 
 
 @dataclass(frozen=True)
-class Vitals:
+class Usage:
     """Resident and private dirty memory in KiB, open descriptors, threads."""
 
     resident: int
@@ -19,11 +19,11 @@ class Vitals:
     threads: int
 
 
-def vitals(pid: int) -> Vitals:
+def usage(pid: int) -> Usage:
     """Those of a process now."""
     process = Path(f"/proc/{pid}")
     memory = (process / "smaps_rollup").read_text()
-    return Vitals(
+    return Usage(
         _kibibytes("Rss", memory),
         _kibibytes("Private_Dirty", memory),
         len(os.listdir(process / "fd")),
@@ -31,7 +31,7 @@ def vitals(pid: int) -> Vitals:
     )
 
 
-def growth(samples: Sequence[Vitals], allowance: int) -> list[str]:
+def growth(samples: Sequence[Usage], allowance: int) -> list[str]:
     """In what a process has grown since the first sample, a line each: memory by more than `allowance` KiB at
     the end, descriptors and threads at any time."""
     first, last = samples[0], samples[-1]

@@ -175,7 +175,7 @@ def test_a_restarted_service_has_a_new_unique_name(terminal: Terminal) -> None:
 def test_a_restarted_bus_has_lost_its_services(terminal: Terminal) -> None:
     terminal.session_bus.restart()
 
-    present = {name for name, peer in terminal.peers.items() if peer.present}
+    present = {name for name, fake in terminal.fakes.items() if fake.present}
     assert present == {"daemon", "logind", "identity"}
 
 

@@ -1,50 +1,50 @@
-#include "tls_peer.h"
+#include "https_server.h"
 
 #include <QJsonArray>
 #include <QJsonDocument>
 
-TlsPeer::TlsPeer()
+HttpsServer::HttpsServer()
 {
     // The server lives by the host's clock, whatever clock the test has been given.
     auto environment = QProcessEnvironment::systemEnvironment();
     environment.remove(QStringLiteral("LD_PRELOAD"));
-    m_server.setProcessEnvironment(environment);
-    m_server.setProcessChannelMode(QProcess::ForwardedErrorChannel);
-    m_server.start(QStringLiteral("/usr/bin/python3"),
-                   {QStringLiteral("-B"), QStringLiteral(VELK_SOURCE_DIR "/tests/support/tls_peer.py"),
-                    m_folder.path()});
+    m_process.setProcessEnvironment(environment);
+    m_process.setProcessChannelMode(QProcess::ForwardedErrorChannel);
+    m_process.start(QStringLiteral("/usr/bin/python3"),
+                    {QStringLiteral("-B"), QStringLiteral(VELK_SOURCE_DIR "/tests/support/https_server.py"),
+                     m_folder.path()});
     const QJsonObject ready = readLine();
     m_ports = ready[QStringLiteral("ports")].toObject();
     m_files = ready[QStringLiteral("files")].toObject();
 }
 
-TlsPeer::~TlsPeer()
+HttpsServer::~HttpsServer()
 {
-    m_server.closeWriteChannel();
-    m_server.waitForFinished();
+    m_process.closeWriteChannel();
+    m_process.waitForFinished();
 }
 
-QString TlsPeer::url(const char* door, const char* path) const
+QString HttpsServer::url(const char* door, const char* path) const
 {
     const int port = m_ports[QString::fromUtf8(door)].toInt();
     return QStringLiteral("https://127.0.0.1:") + QString::number(port) + QString::fromUtf8(path);
 }
 
-QString TlsPeer::file(const char* name) const
+QString HttpsServer::file(const char* name) const
 {
     return m_files[QString::fromUtf8(name)].toString();
 }
 
-void TlsPeer::forgetRequests()
+void HttpsServer::forgetRequests()
 {
-    m_server.waitForReadyRead(0);
-    m_server.readAll();
+    m_process.waitForReadyRead(0);
+    m_process.readAll();
 }
 
-QJsonObject TlsPeer::readLine()
+QJsonObject HttpsServer::readLine()
 {
-    while (!m_server.canReadLine() && m_server.waitForReadyRead()) { }
-    return QJsonDocument::fromJson(m_server.readLine()).object();
+    while (!m_process.canReadLine() && m_process.waitForReadyRead()) { }
+    return QJsonDocument::fromJson(m_process.readLine()).object();
 }
 
 QString headerOf(const QJsonObject& request, const char* name)

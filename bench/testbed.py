@@ -1,4 +1,4 @@
-"""The terminal that the agent and the floors are measured in: real buses, real files, and fast peers."""
+"""Where the agent and the floors are measured: real buses, real files, and fast load generators."""
 
 from __future__ import annotations
 
@@ -6,7 +6,7 @@ from contextlib import ExitStack
 from types import TracebackType
 from typing import Mapping
 
-from bench.programs import Peer, Process, Program
+from bench.programs import LoadGenerator, Process, Program
 from sandbox.machine import layout
 from sandbox.machine.clock import ManualClock
 from sandbox.machine.files import FileView
@@ -17,17 +17,17 @@ _PROGRAM_SECONDS = 120.0
 ADDRESS = f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}"
 
 
-class Bed:
+class Testbed:
     """The desktop's services, and with `platform` the platform, which a domain user's agent asks."""
 
     def __init__(self, items: int = 0, entries: int = 0, platform: bool = False) -> None:
         self._stack = ExitStack()
         self.files = FileView(current_user())
         self.files.reset()
-        self.desktop = self._stack.enter_context(Peer("desktop", str(items), str(entries)))
+        self.desktop = self._stack.enter_context(LoadGenerator("desktop", str(items), str(entries)))
         self._platform = self._start_platform() if platform else None
 
-    def __enter__(self) -> Bed:
+    def __enter__(self) -> Testbed:
         return self
 
     def __exit__(
@@ -36,9 +36,9 @@ class Bed:
         self._stack.close()
 
     @property
-    def platform(self) -> Peer:
+    def platform(self) -> LoadGenerator:
         """The platform."""
-        assert self._platform, "this bed has no platform"
+        assert self._platform, "this testbed has no platform"
         return self._platform
 
     def start(self, program: Program, env: Mapping[str, str] | None = None) -> Process:
@@ -56,7 +56,7 @@ class Bed:
         return process
 
     def forget(self) -> None:
-        """Drop what peers have told so far."""
+        """Drop what the load generators have reported so far."""
         self.desktop.forget()
         if self._platform:
             self._platform.forget()
@@ -71,7 +71,7 @@ class Bed:
         clock.jump(seconds)
         self.desktop.tell("wake")
 
-    def _start_platform(self) -> Peer:
+    def _start_platform(self) -> LoadGenerator:
         known = trust()
         server = known.server
         self.files.write_certificates(
@@ -79,4 +79,6 @@ class Bed:
         )
         self.files.write_platform_address(layout.PLATFORM_PORT)
         files = (server.certificate, server.key, known.authority.certificate)
-        return self._stack.enter_context(Peer("platform", str(layout.PLATFORM_PORT), *map(str, files)))
+        return self._stack.enter_context(
+            LoadGenerator("platform", str(layout.PLATFORM_PORT), *map(str, files))
+        )

@@ -7,7 +7,7 @@ from typing import Any, Callable, Sized
 
 from sandbox.events import Event
 from sandbox.policies import POLICIES
-from sandbox.timeline import glosses
+from sandbox.timeline import translations
 
 _LONGEST = 160
 _NAMES = {
@@ -36,7 +36,7 @@ def what(event: Event) -> str:
 def meaning(event: Event) -> str:
     """What it means, empty when what was said speaks for itself."""
     if event.kind == "http":
-        return glosses.REQUESTS.get(event.member, "")
+        return translations.REQUESTS.get(event.member, "")
     known = _MEANING.get(event.member)
     return known(event.args) if known else ""
 
@@ -104,9 +104,9 @@ _WHAT_OF_KIND: dict[str, Callable[[Event], str]] = {
 
 
 def _notice_meaning(args: tuple[Any, ...]) -> str:
-    gloss = glosses.NOTICES.get(args[4], "")
-    actions = [f"[{glosses.ACTIONS.get(label, label)}]" for label in args[5][1::2]]
-    return " ".join(filter(None, (gloss, *actions)))
+    translation = translations.NOTICES.get(args[4], "")
+    actions = [f"[{translations.ACTIONS.get(label, label)}]" for label in args[5][1::2]]
+    return " ".join(filter(None, (translation, *actions)))
 
 
 def _policy_meaning(args: tuple[Any, ...]) -> str:
@@ -129,13 +129,13 @@ def _new_value(name: str, value: Any) -> str:
     if name == "WindowInfos":
         return _window_count(value)
     if name == "Name":
-        return glosses.APPLICATIONS.get(value, "")
-    return glosses.CHANGES.get((name, value), "")
+        return translations.APPLICATIONS.get(value, "")
+    return translations.CHANGES.get((name, value), "")
 
 
 def _application_meaning(args: tuple[Any, ...]) -> str:
     state, name = args
-    words = (glosses.APPLICATION_STATES.get(state), glosses.APPLICATIONS.get(name))
+    words = (translations.APPLICATION_STATES.get(state), translations.APPLICATIONS.get(name))
     return ": ".join(filter(None, words))
 
 
@@ -147,14 +147,14 @@ _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
     "appears": lambda args: "on the bus",
     "leaves": lambda args: "gone from the bus",
     "UpdateUserInfo": lambda args: "whose session this is",
-    "SendUserStatus": lambda args: glosses.STATUSES.get(args[0], ""),
+    "SendUserStatus": lambda args: translations.STATUSES.get(args[0], ""),
     "pushPolicyMsg": _policy_meaning,
     "pushOnlineMsg": lambda args: "sessions, announce yourselves",
     "onPolicyMsg": lambda args: "passed on for the policy service to carry out",
     "onDomainConfig": lambda args: "take the terminal out of the domain's configuration",
     "Notify": _notice_meaning,
     "PropertiesChanged": _change_meaning,
-    "Get": lambda args: glosses.PROPERTIES.get((args[0], args[1]), ""),
+    "Get": lambda args: translations.PROPERTIES.get((args[0], args[1]), ""),
     "Set": lambda args: "switched off" if args[2] is False else "",
     "Terminate": lambda args: "forced log-out",
     "Reboot": lambda args: "forced reboot",
@@ -165,10 +165,10 @@ _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
     "EntryAdded": lambda args: "an application comes to the dock",
     "EntryRemoved": lambda args: "an application is gone from the dock",
     "WindowInfosChanged": lambda args: _window_count(args[0]),
-    "NameChanged": lambda args: glosses.APPLICATIONS.get(args[0], ""),
+    "NameChanged": lambda args: translations.APPLICATIONS.get(args[0], ""),
     "sendAppOpenState": _application_meaning,
     "GetAllItemInfos": lambda args: "which applications are installed?",
-    "ItemChanged": lambda args: glosses.ITEM_ACTIONS.get(args[0], ""),
+    "ItemChanged": lambda args: translations.ITEM_ACTIONS.get(args[0], ""),
     "GetMachineID": lambda args: "which terminal is this?",
     "onUploadFinished": lambda args: "for the platform; the daemon uploads it",
 }

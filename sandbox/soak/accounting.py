@@ -42,7 +42,7 @@ _SHOWN_PIECES = 3
 Piece = tuple[Any, ...]
 
 
-class Ledger:
+class Accounting:
     """Counts pieces by kind and content: those that must come, noted by who causes them, and those that came.
 
     Message lists are noted by themselves: the platform's answers are what is sent.

@@ -9,7 +9,7 @@ import pytest
 from sandbox.bus.buses import Bus
 from sandbox.bus.stranger import Stranger
 from sandbox.fakes import daemon, dock, launcher
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.terminal import Terminal
 from tests.e2e.dockwatch import settle, told
 from tests.e2e.software import EDITOR, install, uploads
@@ -95,8 +95,8 @@ def test_daemon_is_not_replaced_by_somebody_who_says_so(
 def test_awaited_service_has_not_come_because_somebody_says_so(
     terminal: Terminal, on_session: Stranger, straight: bool, name: str, bus_name: str, arrived: str
 ) -> None:
-    peer: Peer = terminal.peers[name]
-    peer.leave()
+    fake: Fake = terminal.fakes[name]
+    fake.leave()
     mark = terminal.events.mark()
     terminal.start_agent()
     for receiver in receivers(terminal, terminal.session_bus, straight):
@@ -105,7 +105,7 @@ def test_awaited_service_has_not_come_because_somebody_says_so(
     carries_out_policies(terminal)
     assert arrived not in log_lines(terminal, mark)
 
-    peer.appear()
+    fake.appear()
     terminal.events.wait_for(kind="log", args=(arrived,), after=mark)
 
 
@@ -165,11 +165,11 @@ ARGUMENTS: list[tuple[str, tuple[Any, ...]]] = [
 def test_signal_with_other_arguments_than_its_own_does_nothing(
     terminal: Terminal, name: str, path: str, interface: str, member: str, wanted: str
 ) -> None:
-    peer = terminal.peers[name]
+    fake = terminal.fakes[name]
     terminal.start_agent()
     settle(terminal)
-    peer.leave()
-    owner = Stranger(peer.bus)
+    fake.leave()
+    owner = Stranger(fake.bus)
     assert owner.own(interface) == 1
     mark = terminal.events.mark()
     for signature, args in ARGUMENTS:
@@ -177,7 +177,7 @@ def test_signal_with_other_arguments_than_its_own_does_nothing(
             owner.emit(path, interface, member, *args, signature=signature)
     let_reach_the_bus(owner)
     owner.close()
-    peer.appear()
+    fake.appear()
     settle(terminal)
     assert settled(terminal, mark) == []
     assert told(terminal, mark) == []

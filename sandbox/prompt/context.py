@@ -9,7 +9,7 @@ from rich.console import RenderableType
 from rich.text import Text
 
 from sandbox.events import Event
-from sandbox.fakes.base import Peer
+from sandbox.fakes.base import Fake
 from sandbox.terminal import Terminal
 from sandbox.timeline.timeline import Timeline
 
@@ -17,7 +17,7 @@ _ANSWER_SECONDS = 5.0
 _STEP = 10
 
 
-class Refused(Exception):
+class CommandRefused(Exception):
     """A command that cannot be carried out; the text is the line that says why."""
 
 
@@ -27,7 +27,7 @@ def guess(word: str, known: Iterable[str]) -> str:
     return f"did you mean {like[0]}?" if like else ""
 
 
-class Desk:
+class Context:
     """The terminal, its timeline, and how far the person has followed the traffic."""
 
     def __init__(self, terminal: Terminal, timeline: Timeline) -> None:
@@ -43,20 +43,20 @@ class Desk:
         """Say in a line what became of a command."""
         self.show(Text(line, "dim"))
 
-    def peer(self, name: str) -> Peer:
+    def fake(self, name: str) -> Fake:
         """A service by its name."""
-        known = self.terminal.peers
+        known = self.terminal.fakes
         if name not in known:
             hint = guess(name, known) or f"there are: {', '.join(known)}"
-            raise Refused(f"there is no service '{name}'; {hint}")
+            raise CommandRefused(f"there is no service '{name}'; {hint}")
         return known[name]
 
-    def present(self, name: str) -> Peer:
+    def present(self, name: str) -> Fake:
         """A service that is on the bus."""
-        peer = self.peer(name)
-        if not peer.present:
-            raise Refused(f"{name} is not on the bus; bring it back with: appear {name}")
-        return peer
+        fake = self.fake(name)
+        if not fake.present:
+            raise CommandRefused(f"{name} is not on the bus; bring it back with: appear {name}")
+        return fake
 
     def advance(self, seconds: int) -> None:
         """Let some of the agent's time pass, step by step: one long one would let timers that come again miss
@@ -86,5 +86,5 @@ class Desk:
         try:
             found = events.wait_for(is_wanted, after=self._followed, timeout=seconds)
         except AssertionError:
-            raise Refused(f"no {member} came within {seconds:g} s") from None
+            raise CommandRefused(f"no {member} came within {seconds:g} s") from None
         self._followed = events.all().index(found) + 1

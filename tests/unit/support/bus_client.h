@@ -10,24 +10,24 @@
 
 /// One program on the test's session bus: a connection of its own, so that a single test program can play
 /// several programs that talk to each other. Leaves the bus when it is destroyed.
-class BusPeer
+class BusClient
 {
 public:
-    BusPeer()
+    BusClient()
         : m_bus(QDBusConnection::connectToBus(QDBusConnection::SessionBus, QUuid::createUuid().toString()))
     { }
-    ~BusPeer() { QDBusConnection::disconnectFromBus(m_bus.name()); }
-    Q_DISABLE_COPY_MOVE(BusPeer)
+    ~BusClient() { QDBusConnection::disconnectFromBus(m_bus.name()); }
+    Q_DISABLE_COPY_MOVE(BusClient)
 
     QDBusConnection& bus() { return m_bus; }
     QString uniqueName() const { return m_bus.baseService(); }
 
-    /// Returns once the bus has carried out what this peer asked it so far, match rules included.
+    /// Returns once the bus has carried out what this client asked it so far, match rules included.
     void settle() { ping(QStringLiteral("org.freedesktop.DBus")); }
 
-    /// Returns once the receiver has delivered everything that this peer sent it so far: the bus keeps the
-    /// order of what goes from one peer to another, so the answer to a ping comes after all of it.
-    void deliverTo(const BusPeer& receiver)
+    /// Returns once the receiver has delivered everything that this client sent it so far: the bus keeps the
+    /// order of what goes from one client to another, so the answer to a ping comes after all of it.
+    void deliverTo(const BusClient& receiver)
     {
         ping(receiver.uniqueName());
         QCoreApplication::sendPostedEvents();

@@ -1,4 +1,4 @@
-"""What people and services do on a terminal, each deed with what must arrive because of it."""
+"""What people and services do on a terminal, each activity with what must arrive because of it."""
 
 from __future__ import annotations
 
@@ -8,8 +8,8 @@ from random import Random
 from sandbox import policies
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.machine.packages import desktop_file
-from sandbox.soak import ledger as kinds
-from sandbox.soak.ledger import Ledger
+from sandbox.soak import accounting as kinds
+from sandbox.soak.accounting import Accounting
 from sandbox.terminal import Terminal
 
 _OPENED, _CLOSED = 1, 2
@@ -27,12 +27,12 @@ _PASSWORD_TIP = "your password will expire in 3 days"
 _RESTARTED = ("logind", "identity", "policy_service", "notifications", "screensaver", "session_manager")
 
 
-class Deeds:
-    """The people and services of one terminal. A deed returns once what it leads to at once has arrived."""
+class Activities:
+    """What users and services do. An activity returns once what it leads to at once has arrived."""
 
-    def __init__(self, terminal: Terminal, ledger: Ledger, random: Random) -> None:
+    def __init__(self, terminal: Terminal, accounting: Accounting, random: Random) -> None:
         self._terminal = terminal
-        self._ledger = ledger
+        self._accounting = accounting
         self._random = random
         self._packages: dict[LauncherItem, int] = {}  # the launcher's items with their packages' versions
         self._number = 0
@@ -42,7 +42,7 @@ class Deeds:
         """Fill the terminal and start the agent, which announces all that it finds."""
         terminal = self._terminal
         terminal.platform.password_tip(terminal.user.plain_name, _PASSWORD_TIP)
-        self._ledger.expect(kinds.NOTICES, _PASSWORD_TIP)
+        self._accounting.expect(kinds.NOTICES, _PASSWORD_TIP)
         for app, name in _KEPT_ON_DOCK.items():
             terminal.dock.open_app(app, name, docked=True, windows=0)
         for package in _FIRST_PACKAGES:
@@ -58,12 +58,12 @@ class Deeds:
         status = _LOCKED if self._terminal.session_manager.value("Locked") else _ACTIVE
         if self._terminal.screensaver.value("isRunning"):
             status = _BEHIND_SCREEN_SAVER
-        self._ledger.expect(kinds.STATUSES, status, self._terminal.user.plain_name)
+        self._accounting.expect(kinds.STATUSES, status, self._terminal.user.plain_name)
 
     def expect_forced_logout(self) -> None:
         """Note the log-out that a policy of the last minute leads to, if there was one."""
         if self._logout_due:
-            self._ledger.expect(kinds.LOGOUTS)
+            self._accounting.expect(kinds.LOGOUTS)
         self._logout_due = False
 
     def lock(self, locked: bool) -> None:
@@ -82,8 +82,8 @@ class Deeds:
         for _ in range(self._random.randint(1, 5)):
             title, content = f"message {self._next()}", self._random.choice(("short", "长" * 500))
             uuid = self._terminal.platform.post_message(user, title, content)
-            self._ledger.expect(kinds.MESSAGES, title, content)
-            self._ledger.expect(kinds.RECEIPTS, uuid)
+            self._accounting.expect(kinds.MESSAGES, title, content)
+            self._accounting.expect(kinds.RECEIPTS, uuid)
 
     def push_forwarded_policies(self) -> None:
         """The platform sets a few policies that are not the agent's own."""
@@ -93,20 +93,20 @@ class Deeds:
                 "number": self._next(),
                 "text": "终端",
             }
-            self._ledger.expect(kinds.FORWARDED, json.dumps(policy, ensure_ascii=False))
+            self._accounting.expect(kinds.FORWARDED, json.dumps(policy, ensure_ascii=False))
             self._terminal.daemon.push_policy(policy)
         self._terminal.sync()
 
     def push_notice(self) -> None:
         """The platform wants the user to know something."""
         policy = self._random.choice(_NOTICES)
-        self._ledger.expect(kinds.NOTICES, policy.notice)
+        self._accounting.expect(kinds.NOTICES, policy.notice)
         self._push(policy.code)
 
     def push_logout(self) -> None:
         """The platform ends the session, of which the box's login manager only takes note."""
         policy = self._random.choice(_LOGOUTS)
-        self._ledger.expect(kinds.NOTICES, policy.notice)
+        self._accounting.expect(kinds.NOTICES, policy.notice)
         self._push(policy.code)
         self._logout_due = True
 
@@ -118,7 +118,7 @@ class Deeds:
         """Open a window of an application that is kept on the dock, or close all."""
         app = self._random.choice(list(_KEPT_ON_DOCK))
         opens = not self._terminal.dock.windows(app)
-        self._ledger.expect(kinds.APPLICATIONS, _OPENED if opens else _CLOSED, _KEPT_ON_DOCK[app])
+        self._accounting.expect(kinds.APPLICATIONS, _OPENED if opens else _CLOSED, _KEPT_ON_DOCK[app])
         self._terminal.dock.set_windows(app, 1 if opens else 0)
         self._wait_for_dock()
 
@@ -127,7 +127,7 @@ class Deeds:
         closed = [name for name in _OTHERS if name not in self._terminal.dock.apps]
         if closed:
             name = self._random.choice(closed)
-            self._ledger.expect(kinds.APPLICATIONS, _OPENED, name)
+            self._accounting.expect(kinds.APPLICATIONS, _OPENED, name)
             self._terminal.dock.open_app(name, name)
             self._wait_for_dock()
 
@@ -137,7 +137,7 @@ class Deeds:
         if name:
             windows = self._terminal.dock.windows(name)
             wanted = 1 if windows > 1 else windows + 1
-            self._ledger.expect(kinds.APPLICATIONS, _OPENED if wanted > windows else _CLOSED, name)
+            self._accounting.expect(kinds.APPLICATIONS, _OPENED if wanted > windows else _CLOSED, name)
             self._terminal.dock.set_windows(name, wanted)
             self._wait_for_dock()
 
@@ -145,7 +145,7 @@ class Deeds:
         """End an open one with all its windows."""
         name = self._open_application()
         if name:
-            self._ledger.expect(kinds.APPLICATIONS, _CLOSED, name)
+            self._accounting.expect(kinds.APPLICATIONS, _CLOSED, name)
             self._terminal.dock.close_app(name)
             self._wait_for_dock()
 
@@ -163,7 +163,7 @@ class Deeds:
                 self._update()
             case _:
                 self._remove()
-        self._ledger.wait(kinds.CHANGES, kinds.INVENTORIES)
+        self._accounting.wait(kinds.CHANGES, kinds.INVENTORIES)
 
     def restart_daemon(self) -> None:
         """The daemon is updated: it ends, starts and asks the sessions to announce themselves."""
@@ -184,7 +184,7 @@ class Deeds:
     def restart_service(self) -> None:
         """One of the other services starts again."""
         self._terminal.sync()
-        self._terminal.peers[self._random.choice(_RESTARTED)].restart()
+        self._terminal.fakes[self._random.choice(_RESTARTED)].restart()
         self._terminal.receive_all()
 
     def stop_platform(self) -> None:
@@ -206,14 +206,14 @@ class Deeds:
         package = f"package-{self._next()}"
         item = LauncherItem(desktop_file(package), package.title())
         self._put(item, 1)
-        self._ledger.expect(kinds.CHANGES, _CREATED, item.name, "1")
+        self._accounting.expect(kinds.CHANGES, _CREATED, item.name, "1")
         self._expect_inventory()
         self._terminal.launcher.install(item)
 
     def _update(self) -> None:
         item = self._random.choice(list(self._packages))
         self._put(item, self._packages[item] + 1)
-        self._ledger.expect(kinds.CHANGES, _UPDATED, item.name, str(self._packages[item]))
+        self._accounting.expect(kinds.CHANGES, _UPDATED, item.name, str(self._packages[item]))
         self._expect_inventory()
         self._terminal.launcher.update(item)
 
@@ -230,17 +230,17 @@ class Deeds:
 
     def _expect_inventory(self) -> None:
         software = [(item.name, str(version)) for item, version in self._packages.items()]
-        self._ledger.expect(kinds.INVENTORIES, *software)
+        self._accounting.expect(kinds.INVENTORIES, *software)
 
     def _expect_user(self) -> None:
-        self._ledger.expect(kinds.USERS, self._terminal.user.plain_name, self._terminal.user.uid)
+        self._accounting.expect(kinds.USERS, self._terminal.user.plain_name, self._terminal.user.uid)
 
     def _open_application(self) -> str | None:
         names = [name for name in self._terminal.dock.apps if name not in _KEPT_ON_DOCK]
         return self._random.choice(names) if names else None
 
     def _wait_for_dock(self) -> None:
-        self._ledger.wait(kinds.APPLICATIONS)
+        self._accounting.wait(kinds.APPLICATIONS)
         self._terminal.receive_all()
 
     def _next(self) -> int:

@@ -5,7 +5,7 @@ one JSON line with ports and files:
 
     {"ports": {DOOR: PORT, ...}, "files": {NAME: PATH, ...}}
 
-Each door is a port with a TLS side of its own, see `_doors`; the paths are in tls_scripts.py. From then on,
+Each door is a port with a TLS side of its own, see `_doors`; the paths are in https_scripts.py. From then on,
 each request received is one more JSON line, printed before the request is answered. The server leaves when
 its standard input is closed.
 """
@@ -26,8 +26,8 @@ from cryptography.hazmat.primitives import serialization
 
 sys.path.insert(0, str(Path(__file__).resolve().parents[2]))
 
-from sandbox.platform.certificates import Authority, Identity, write_secret  # noqa: E402
-from tests.support.tls_scripts import Conversation, Over, answer  # noqa: E402
+from sandbox.platform.certificates import Authority, CertificateFiles, write_secret  # noqa: E402
+from tests.support.https_scripts import Conversation, Over, answer  # noqa: E402
 
 _HOST = "127.0.0.1"
 _LISTEN_BACKLOG = 64
@@ -59,7 +59,7 @@ def _print_json(value: object) -> None:
         print(json.dumps(value), flush=True)
 
 
-def _context(identity: Identity, clients: Authority, demand: ssl.VerifyMode) -> ssl.SSLContext:
+def _context(identity: CertificateFiles, clients: Authority, demand: ssl.VerifyMode) -> ssl.SSLContext:
     context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
     context.load_cert_chain(identity.certificate, identity.key)
     context.load_verify_locations(clients.certificate)
@@ -69,13 +69,13 @@ def _context(identity: Identity, clients: Authority, demand: ssl.VerifyMode) -> 
     return context
 
 
-def _older_context(identity: Identity, clients: Authority) -> ssl.SSLContext:
+def _older_context(identity: CertificateFiles, clients: Authority) -> ssl.SSLContext:
     context = _context(identity, clients, ssl.CERT_REQUIRED)
     context.maximum_version = ssl.TLSVersion.TLSv1_2
     return context
 
 
-def _outdated_context(identity: Identity, clients: Authority) -> ssl.SSLContext:
+def _outdated_context(identity: CertificateFiles, clients: Authority) -> ssl.SSLContext:
     context = _context(identity, clients, ssl.CERT_OPTIONAL)
     with warnings.catch_warnings():
         warnings.simplefilter("ignore", DeprecationWarning)
@@ -84,7 +84,9 @@ def _outdated_context(identity: Identity, clients: Authority) -> ssl.SSLContext:
     return context
 
 
-def _doors(platform: Authority, stranger: Authority, proper: Identity) -> dict[str, ssl.SSLContext | None]:
+def _doors(
+    platform: Authority, stranger: Authority, proper: CertificateFiles
+) -> dict[str, ssl.SSLContext | None]:
     """The doors' names and TLS sides; None: nothing is ever said there."""
     return {
         "proper": _context(proper, platform, ssl.CERT_OPTIONAL),
@@ -98,7 +100,7 @@ def _doors(platform: Authority, stranger: Authority, proper: Identity) -> dict[s
     }
 
 
-def _encrypt_key(identity: Identity) -> Path:
+def _encrypt_key(identity: CertificateFiles) -> Path:
     key = serialization.load_pem_private_key(identity.key.read_bytes(), password=None)
     encrypted = identity.key.with_suffix(".encrypted.key")
     pem = key.private_bytes(
@@ -110,7 +112,7 @@ def _encrypt_key(identity: Identity) -> Path:
     return encrypted
 
 
-def _files(platform: Authority, stranger: Authority, proper: Identity) -> dict[str, str]:
+def _files(platform: Authority, stranger: Authority, proper: CertificateFiles) -> dict[str, str]:
     client = platform.issue_client("terminal")
     files = {
         "ca": platform.certificate,
