@@ -16,6 +16,12 @@ from sandbox.policies import POLICIES
 
 NOT_COPIED = shutil.ignore_patterns("build", ".*", "__pycache__")
 PAGE_TESTS = ("tests/contracts/test_docs.py", "tests/contracts/test_examples.py")
+# The action that has a text of its own, its test, and the picture.
+SHOWING_ITS_OWN = {
+    "src/velk/velks/handleevent.cpp",
+    "tests/unit/handleevent_notification_test.cpp",
+    "docs/demo.svg",
+}
 # What people at the prompt, the tests, the soak and the fuzzer make of the code.
 USES = """
 from sandbox.events import Event
@@ -119,6 +125,15 @@ def test_code_is_added_by_the_recipe_and_nothing_is_left_behind(tree: Path) -> N
     lists = [(name, text) for name, text in texts(tree) if all(str(code) in text for code in POLICIES)]
     assert len(lists) >= 3
     assert [name for name, text in lists if "1305" not in text] == []
+
+
+def test_text_of_a_notice_stands_where_the_recipe_says_and_nowhere_else(tree: Path) -> None:
+    found = {name for name, text in texts(tree) if any(policy.notice in text for policy in POLICIES.values())}
+    assert found - SHOWING_ITS_OWN == {
+        "contracts/json/policy-message.schema.json",
+        "docs/policy-messages.md",
+        "src/velk/velks/session_policy.cpp",
+    }
 
 
 def test_recipe_names_five_files_at_most() -> None:

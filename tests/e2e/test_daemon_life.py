@@ -5,7 +5,7 @@ from __future__ import annotations
 from sandbox.events import Event
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from tests.e2e.wire import FIVE_MINUTES, log_lines, next_notification, next_status
+from tests.e2e.wire import FIVE_MINUTES, SHUTDOWN_NOTICE, log_lines, next_notification, next_status
 
 
 def announcements(terminal: Terminal, after: int) -> list[tuple[str, tuple[object, ...]]]:
@@ -73,7 +73,7 @@ def test_restarted_daemon_is_announced_to_and_obeyed(terminal: Terminal) -> None
     terminal.daemon.appear(announce=True)
     next_status(terminal, mark)
     terminal.daemon.push_policy({"type": 1300})
-    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
 
 
 def test_daemon_that_never_answers_is_still_told_and_obeyed(terminal: Terminal) -> None:

@@ -14,7 +14,7 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import FAKES, Terminal
-from tests.e2e.wire import FIVE_MINUTES, next_notification, next_status
+from tests.e2e.wire import FIVE_MINUTES, SHUTDOWN_NOTICE, next_notification, next_status
 
 DBUS_LIMIT = 25
 TRANSFER_LIMIT = 30
@@ -63,7 +63,7 @@ def policies_go_on(terminal: Terminal, faulty: str) -> None:
     terminal.daemon.push_policy({"type": 1300})
     terminal.daemon.push_policy({"type": 5})
     if faulty != "notifications":
-        assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+        assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
     if faulty != "policy_service":
         terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
     terminal.sync()

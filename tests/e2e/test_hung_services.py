@@ -6,7 +6,7 @@ import pytest
 
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from tests.e2e.wire import forced_actions, log_lines, next_notification, next_status
+from tests.e2e.wire import SHUTDOWN_NOTICE, forced_actions, log_lines, next_notification, next_status
 
 DBUS_LIMIT = 25
 
@@ -120,7 +120,7 @@ def test_hung_policy_service_does_not_hold_up_the_agent(terminal: Terminal) -> N
     mark = terminal.events.mark()
     terminal.daemon.push_policy({"type": 5})
     terminal.daemon.push_policy({"type": 1300})
-    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
 
 
 def test_no_signal_is_handled_while_a_notification_is_waited_for(terminal: Terminal) -> None:

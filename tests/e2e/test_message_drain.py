@@ -11,6 +11,7 @@ import pytest
 
 from sandbox.events import Event
 from sandbox.periods import SURELY_NEXT_POLL
+from sandbox.policies import POLICIES
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from tests.e2e.messages import USER, answer_always, as_reply, message, poll, requests
@@ -37,7 +38,10 @@ def test_count_that_never_falls_does_not_keep_a_log_out_waiting(session: Termina
 
     session.daemon.push_policy({"type": 1201})
     session.events.wait_for(
-        lambda event: "强制注销" in event.args[4], target="notifications", member="Notify", after=mark
+        lambda event: event.args[4] == POLICIES[1201].notice,
+        target="notifications",
+        member="Notify",
+        after=mark,
     )
     session.sync()
     session.jump(60)

@@ -9,7 +9,7 @@ import pytest
 from sandbox.machine.users import User
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.e2e.wire import log_lines, next_notification
+from tests.e2e.wire import SHUTDOWN_NOTICE, log_lines, next_notification
 
 USER = "zhang.wei"
 NOTICE = "用户密码快过期了！！"
@@ -65,7 +65,7 @@ def test_hanging_check_delays_the_start_by_the_transfer_limit(terminal: Terminal
     terminal.start_agent(ready=lambda: terminal.events.wait_for(kind="http", member="tips", after=mark))
     terminal.daemon.push_policy({"type": 1300})
     terminal.jump(30)
-    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
 
 
 def test_tips_that_carry_a_count_ask_for_messages_at_once_and_mark_them_read(terminal: Terminal) -> None:

@@ -9,7 +9,14 @@ import pytest
 from sandbox import policies
 from sandbox.policies import FORWARDED_CODES, Policy
 from sandbox.terminal import Terminal
-from tests.e2e.wire import Notification, forced_actions, log_lines, next_notification, settled
+from tests.e2e.wire import (
+    SHUTDOWN_NOTICE,
+    Notification,
+    forced_actions,
+    log_lines,
+    next_notification,
+    settled,
+)
 
 REMINDER = "提醒"
 
@@ -37,7 +44,7 @@ def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, policy:
 def test_policy_is_obeyed_whatever_its_application(session: Terminal, app_id: str) -> None:
     mark = session.events.mark()
     session.daemon.push_policy({"type": 1300}, app_id)
-    assert next_notification(session, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
 def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
@@ -149,7 +156,7 @@ def test_text_that_is_no_policy_is_logged_and_ignored(session: Terminal, payload
 def test_characters_outside_latin1_do_not_hide_a_policy(session: Terminal) -> None:
     mark = session.events.mark()
     session.daemon.push_policy('{"type":1300,"reason":"停用"}')
-    assert next_notification(session, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
 BYTE_ORDER_MARK = "\ufeff"
@@ -158,7 +165,7 @@ BYTE_ORDER_MARK = "\ufeff"
 def test_leading_byte_order_mark_is_lost_on_the_bus(session: Terminal) -> None:
     mark = session.events.mark()
     session.daemon.push_policy(BYTE_ORDER_MARK + '{"type":1300}')
-    assert next_notification(session, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
     mark = session.events.mark()
     text = f'{{"type":5,"text":"{BYTE_ORDER_MARK}"}}'

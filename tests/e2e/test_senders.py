@@ -10,7 +10,7 @@ import pytest
 
 from sandbox.bus.stranger import Stranger
 from sandbox.terminal import Terminal
-from tests.e2e.wire import next_notification, next_status, settled
+from tests.e2e.wire import SHUTDOWN_NOTICE, next_notification, next_status, settled
 
 NAME = "com.norix.velk.velkg"
 PATH = "/com/norix/velk/velkg"
@@ -130,7 +130,7 @@ def test_new_owner_of_the_name_is_obeyed(session: Terminal, stranger: Stranger) 
     assert stranger.own(NAME) == 1
     mark = session.events.mark()
     stranger.emit(PATH, NAME, "pushPolicyMsg", "box", '{"type":1300}', signature="ss")
-    assert next_notification(session, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
 def test_signals_that_the_agent_does_not_use_do_nothing(session: Terminal) -> None:

@@ -7,7 +7,13 @@ import pytest
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from tests.e2e.wire import FIVE_MINUTES, forced_actions, next_notification, next_status
+from tests.e2e.wire import (
+    FIVE_MINUTES,
+    SHUTDOWN_NOTICE,
+    forced_actions,
+    next_notification,
+    next_status,
+)
 
 ACTIVE, LOCKED, SCREEN_SAVER = 1, 2, 3
 NOTICE = {"type": 1300}
@@ -169,7 +175,7 @@ def test_notices_go_to_the_notification_service_that_is_there_at_the_time(termin
         change()
         mark = terminal.events.mark()
         terminal.daemon.push_policy(NOTICE)
-        assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+        assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
 
 
 def test_a_notification_service_that_has_gone_does_not_keep_the_log_out_back(terminal: Terminal) -> None:

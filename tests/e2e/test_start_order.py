@@ -7,9 +7,7 @@ from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 from tests.e2e.dockwatch import CLOSED, OPENED, settle, told
 from tests.e2e.software import CHANGE, EDITOR, INVENTORY, install, next_inventory, uploads
-from tests.e2e.wire import log_lines, next_notification
-
-SHUTDOWN_NOTICE = "该终端1分钟后进行关机"
+from tests.e2e.wire import SHUTDOWN_NOTICE, log_lines, next_notification
 
 
 def start_until(terminal: Terminal, target: str, member: str) -> int:

@@ -13,7 +13,14 @@ from sandbox.fakes.base import Fake
 from sandbox.terminal import Terminal
 from tests.e2e.dockwatch import settle, told
 from tests.e2e.software import EDITOR, install, uploads
-from tests.e2e.wire import carries_out_policies, log_lines, next_notification, next_status, settled
+from tests.e2e.wire import (
+    SHUTDOWN_NOTICE,
+    carries_out_policies,
+    log_lines,
+    next_notification,
+    next_status,
+    settled,
+)
 
 BUS = "org.freedesktop.DBus"
 BUS_PATH = "/org/freedesktop/DBus"
@@ -71,7 +78,7 @@ def test_stranger_in_the_queue_is_obeyed_once_it_owns_the_name_and_not_before(
 
     terminal.daemon.leave()
     push(on_system, '{"type":1300}')
-    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
 
 
 @straight_or_not

@@ -8,9 +8,11 @@ from uuid import uuid4
 
 from sandbox.events import Event
 from sandbox.periods import STATE_REPORT
+from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
 
 FORWARDED_CODE = 5
+SHUTDOWN_NOTICE = POLICIES[1300].notice
 # The agent's five-minute timer is coarse: half a second more or less.
 FIVE_MINUTES = STATE_REPORT + 1
 
@@ -40,7 +42,7 @@ def carries_out_policies(terminal: Terminal) -> None:
     """Assert that a policy reaches the user."""
     mark = terminal.events.mark()
     terminal.daemon.push_policy({"type": 1300})
-    assert next_notification(terminal, mark).body == "该终端1分钟后进行关机"
+    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
 
 
 def next_status(terminal: Terminal, after: int, count: int = 1) -> tuple[Any, ...]:

@@ -13,6 +13,7 @@ from sandbox.demo.scene import NOTHING_ASKED, NOTHING_SHOWN, Scene, Step, from_a
 from sandbox.demo.scenes import SCENES
 from sandbox.demo.tour import Outcome, Tour
 from sandbox.events import Event
+from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
 from sandbox.timeline.agenttime import AgentTime
 from sandbox.timeline.timeline import Timeline
@@ -152,7 +153,7 @@ def test_the_picture_needs_nothing_from_elsewhere_and_tells_nothing_of_the_machi
 
     drawn = picture.read_text()
     assert ended.returncode == 0, ended.stdout
-    assert "该终端1分钟后进行关机" in drawn
+    assert POLICIES[1300].notice in drawn
     assert "@font-face" not in drawn and "url(http" not in drawn and 'url("http' not in drawn
     assert str(Path.cwd()) not in drawn and str(tmp_path) not in drawn
 

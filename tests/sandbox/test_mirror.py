@@ -15,6 +15,7 @@ import dbus.service
 import pytest
 
 from sandbox.bus.mainloop import MainLoop
+from sandbox.policies import POLICIES
 from sandbox.prompt.mirror import Mirror
 from sandbox.terminal import Terminal
 
@@ -95,7 +96,7 @@ def test_a_notification_leaves_the_box_as_a_line(terminal: Terminal) -> None:
     assert json.loads(line) == {
         "app_name": "提醒",
         "summary": "提醒",
-        "body": "该终端1分钟后进行关机",
+        "body": POLICIES[1300].notice,
         "timeout": 0,
     }
 

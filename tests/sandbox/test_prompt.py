@@ -7,6 +7,7 @@ from pathlib import Path
 import pytest
 
 from sandbox.machine.users import current_user
+from sandbox.policies import POLICIES
 from tests.sandbox.programs import run_program
 
 
@@ -14,7 +15,7 @@ def test_piped_commands_are_carried_out_and_the_traffic_is_printed() -> None:
     ended = run_program("box", script="policy 1300\nwait Notify\n")
 
     assert (ended.returncode, ended.stderr) == (0, "")
-    assert "该终端1分钟后进行关机" in ended.stdout and "this terminal will shut down in 1 minute" in ended.stdout
+    assert POLICIES[1300].notice in ended.stdout and POLICIES[1300].english_notice in ended.stdout
 
 
 def test_the_agents_time_runs_as_fast_as_asked_for() -> None:
@@ -35,7 +36,7 @@ def test_a_refused_line_does_not_keep_the_others_from_being_carried_out_but_show
 
     assert ended.returncode == 1
     assert "there is no command 'sing'; see: help" in ended.stdout
-    assert "该终端1分钟后进行重启" in ended.stdout
+    assert POLICIES[1301].notice in ended.stdout
 
 
 def test_lines_after_quit_are_not_read() -> None:

@@ -9,6 +9,7 @@ import pytest
 from sandbox.machine import layout
 from sandbox.machine.users import DOMAIN_USER
 from sandbox.periods import SURELY_NEXT_POLL
+from sandbox.policies import POLICIES
 from sandbox.prompt import commands
 from sandbox.prompt.context import Context, CommandRefused
 from sandbox.prompt.registry import COMMANDS, run_line
@@ -39,7 +40,7 @@ def test_a_policy_by_code_makes_the_agent_act(context: RecordedContext) -> None:
     run_line(context, "policy 1300")
 
     shown = context.terminal.events.wait_for(source="velks", member="Notify")
-    assert shown.args[4] == "该终端1分钟后进行关机"
+    assert shown.args[4] == POLICIES[1300].notice
     assert context.lines_with("agent → notifications") and context.lines_with("this terminal will shut down")
 
 
