@@ -2,11 +2,15 @@
 
 from __future__ import annotations
 
+import os
+import subprocess
 from pathlib import Path
+from tempfile import NamedTemporaryFile
+from typing import Iterator
 
 import pytest
 
-from tests.dev.devtree import Tree, refused
+from tests.dev.devtree import REPOSITORY, Tree, refused
 
 NEEDS_BOXES = ("demo", "box", "soak", "picture", "test", "bench", "mutate", "fuzz", "coverage")
 NEEDS_GIT = ("lint", "format", "package", "mutate")
@@ -111,3 +115,33 @@ def test_elsewhere_needs_the_name_of_a_release(tree: Tree, release: str) -> None
 def test_a_release_that_does_not_exist_is_told_before_anything_is_fetched(tree: Tree) -> None:
     assert refused(tree.dev("elsewhere", "nosuchrelease")) == "debootstrap knows no release 'nosuchrelease'"
     assert not tree.calls("debootstrap", *WORKERS)
+
+
+@pytest.fixture
+def program_in_tmp() -> Iterator[Path]:
+    """A program in a folder that the box covers with one of its own."""
+    with NamedTemporaryFile(dir="/tmp") as file:
+        os.chmod(file.name, 0o755)
+        yield Path(file.name)
+
+
+@pytest.mark.parametrize(
+    ("agent", "line"),
+    [
+        ("/nonexistent", "VELK_AGENT names no program: /nonexistent"),
+        ("/etc/passwd", "VELK_AGENT names no program: /etc/passwd"),
+        (None, "the box has a /tmp of its own; put the agent into another folder"),
+    ],
+)
+def test_an_agent_that_the_box_would_lack_is_told_at_once(
+    program_in_tmp: Path, agent: str | None, line: str
+) -> None:
+    ended = subprocess.run(
+        ["/usr/bin/python3", "-m", "sandbox", "demo"],
+        cwd=REPOSITORY,
+        env={**os.environ, "VELK_AGENT": agent or str(program_in_tmp)},
+        capture_output=True,
+        text=True,
+    )
+
+    assert (ended.returncode, ended.stderr) == (1, f"demo: {line}\n")
