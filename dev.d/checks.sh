@@ -13,7 +13,7 @@ existing() {
 readonly PYTHON_FOLDERS=(bench sandbox tests)
 readonly SHELL_SCRIPTS=(
     dev dev.d/enter-root dev.d/tidy .ci/run data/autostart debian/tests/installed-agent
-    sandbox/can-box sandbox/in-box sandbox/in-box-python tests/sanitizers/memcheck-agent
+    sandbox/can-box sandbox/in-box sandbox/in-box-python tests/booted/can-boot tests/sanitizers/memcheck-agent
 )
 
 # All checks are made, whichever of them fails.

@@ -23,9 +23,10 @@ run_package() {
     (cd "$folder" && sha256sum ./*.deb ./*.dsc ./*.tar.*)
 }
 
-# A fixed locale, umask and zone: the same commit gives the same bytes.
+# In this folder, with further arguments of dpkg-buildpackage. A fixed locale, umask and zone: the same commit gives the same bytes.
 build_package() {
     cd "$1" || return
+    shift
     umask 022
-    LC_ALL=C.UTF-8 TZ=UTC dpkg-buildpackage --unsigned-source --unsigned-changes --jobs="$(nproc)"
+    LC_ALL=C.UTF-8 TZ=UTC dpkg-buildpackage --unsigned-source --unsigned-changes --jobs="$(nproc)" "$@"
 }

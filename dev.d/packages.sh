@@ -2,11 +2,11 @@
 
 readonly APT_LOG=build/apt.log
 
-# Names in the given groups, in all without a group.
+# Names in the given groups; without a group, in all but [booted], which changes how people log in.
 wanted_packages() {
     awk -v groups=" $* " '
         /^\[/ { group = substr($1, 2, length($1) - 2); next }
-        /^[^#]/ && (groups == "  " || index(groups, " " group " ")) { print $1 }' packages.txt | sort -u
+        /^[^#]/ && (groups == "  " && group != "booted" || index(groups, " " group " ")) { print $1 }' packages.txt | sort -u
 }
 
 missing_packages() {

@@ -8,6 +8,10 @@ readonly PYTEST_CHOSE_NONE=5 # exit status of pytest when no test was left
 run_test() {
     local layer=${1:-all}
     (($#)) && shift
+    if [[ $layer == booted ]]; then
+        run_booted_tests "$@"
+        return
+    fi
     require_boxes
     require_space 1000
     need_packages build terminal tests

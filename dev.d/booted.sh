@@ -1,0 +1,33 @@
+# The tests on a machine that really boots. They need root, and a kernel that lets them mount; they take some five
+# minutes. So they are no part of `./dev test` alone.
+
+run_booted_tests() {
+    local as_root=() missing=(systemd-container) folder=build/booted
+    ((EUID == 0)) || as_root=(sudo)
+    require_git
+    require_plain_path
+    require_sudo
+    require_machines
+    require_space 500
+    need_packages build package tests booted
+    build_booted_package
+    # In namespaces of its own, all ends with the tests. sudo hands on no variables.
+    narrate "testing" "${as_root[@]}" env PYTHONDONTWRITEBYTECODE=1 \
+        VELK_BOOTED_ROOT="${VELK_BOOTED_ROOT:-/}" VELK_PACKAGE="$(echo "$PWD/$folder"/velk-session-agent_*.deb)" \
+        unshare --mount --pid --fork --kill-child --mount-proc \
+        "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" --confcutdir tests/booted tests/booted "$@"
+}
+
+require_machines() {
+    local trouble
+    trouble=$("${as_root[@]}" tests/booted/can-boot 2>&1) || fail "$trouble"
+}
+
+# As ./dev package does, but the binary package alone, unchecked, and with the compiler's cache.
+build_booted_package() {
+    rm -rf "$folder"
+    mkdir -p "$folder/velk-session-agent"
+    export_tree "$folder/velk-session-agent"
+    PATH=/usr/lib/ccache:$PATH DEB_BUILD_OPTIONS="noautodbgsym parallel=$(nproc)" \
+        narrate "building the package" build_package "$folder/velk-session-agent" --build=binary
+}

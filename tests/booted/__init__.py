@@ -1,0 +1,1 @@
+"""The installed package on a machine that really boots: see machine.py."""
