@@ -25,6 +25,7 @@ class Logind(Fake):
         caller.set("Name", user.name)
         caller.set("UID", user.uid)
         manager = ExportedObject(MANAGER, "org.freedesktop.login1.Manager")
+        manager.handlers["CanReboot"] = lambda: "yes"
         session = ExportedObject(SESSION, "org.freedesktop.login1.Session")
         return [manager, caller, session]
 

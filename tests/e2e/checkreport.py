@@ -82,7 +82,7 @@ def report(terminal: Terminal, env: Mapping[str, str] | None = None) -> CheckRep
 
 def make_all_well(terminal: Terminal) -> None:
     """A session that lacks nothing: platform, unit and agent."""
-    terminal.commands.answer("systemctl", Answer(stdout=b"active\n"))
+    terminal.commands.answer("systemctl", Answer(stdout=b"LoadState=loaded\nActiveState=active\n"))
     if terminal.user.is_domain_user:
         assert terminal.platform.present
     terminal.start_agent()

@@ -1,94 +1,87 @@
 #include "environment_checks.h"
 
-#include <QDBusConnection>
-#include <QDBusError>
 #include <QDir>
 #include <QFileInfo>
+#include <QHash>
 
 #include <unistd.h>
 
 #include "package_tool.h"
-#include "remote_object.h"
-#include "services.h"
 
 namespace velk::check {
 
 namespace {
 
-struct Service
+Finding checkPackageTool(const QString& program, const QString& package)
 {
-    QString name;
-    Grade whenAbsent;
-    const char* purpose; ///< what does not work without it
-};
-
-const QList<Service> kSystemServices{
-    {service::kDaemon, Grade::Bad, "no policy arrives, nothing is reported"},
-    {service::kLoginManager, Grade::Bad, "the user's name is not known, nobody can be logged out"},
-    {service::kIdentityService, Grade::Warning, "leaving the domain does not switch it off"},
-};
-
-const QList<Service> kSessionServices{
-    {service::kPolicyService, Grade::Warning, "forwarded policies are lost"},
-    {service::kNotifications, Grade::Bad, "the user sees no warning and no message"},
-    {service::kScreenSaver, Grade::Warning, "the session never counts as behind the screen saver"},
-    {service::kSessionManager, Grade::Warning, "the session never counts as locked"},
-    {service::kDock, Grade::Warning, "opened applications are not reported"},
-    {service::kLauncher, Grade::Warning, "software is not reported"},
-};
-
-Finding checkService(const QDBusConnection& bus, const Service& service)
-{
-    if (isOnBus(bus, service.name)) {
-        return {Grade::Good, QStringLiteral("service"), service.name + QStringLiteral(" is there")};
-    }
-    return {service.whenAbsent, QStringLiteral("service"),
-            QStringLiteral("%1 is not there: %2").arg(service.name, QString::fromLatin1(service.purpose))};
-}
-
-Findings checkBus(const QDBusConnection& bus, const QString& kind, const QList<Service>& services)
-{
-    if (!bus.isConnected()) {
-        return {{Grade::Bad, kind + QStringLiteral(" bus"),
-                 QStringLiteral("cannot be reached: ") + bus.lastError().message()}};
-    }
-    Findings findings;
-    for (const Service& service : services) {
-        findings.append(checkService(bus, service));
-    }
-    return findings;
-}
-
-Finding checkPackageTool(const QString& program, const QStringList& arguments)
-{
-    const PackageToolRun run = runPackageTool(program, arguments);
+    const PackageToolRun run = runPackageTool(program, {QStringLiteral("--version")});
     const QString subject = QStringLiteral("package tool");
     if (run.ended && !run.output.isEmpty()) {
         return {Grade::Good, subject, program + QStringLiteral(" works")};
     }
     return {Grade::Warning, subject,
-            program + QStringLiteral(" does not work: reports of software are incomplete")};
+            program
+                + QStringLiteral(" does not work: reports of software are incomplete; it comes with %1")
+                      .arg(package)};
+}
+
+/// Properties of the unit by name, as the user's service manager tells them; none without one.
+QHash<QString, QString> unitProperties()
+{
+    const QString output =
+        runPackageTool(
+            QStringLiteral("systemctl"),
+            {QStringLiteral("--user"), QStringLiteral("show"), QStringLiteral("velks.service"),
+             QStringLiteral(
+                 "--property=LoadState,ActiveState,Result,ConditionResult,ConditionTimestampMonotonic")})
+            .output;
+    QHash<QString, QString> found;
+    for (const QString& line : output.split(QLatin1Char('\n'))) {
+        found.insert(line.section(QLatin1Char('='), 0, 0), line.section(QLatin1Char('='), 1));
+    }
+    return found;
+}
+
+/// What an administrator needs to know of a unit that is not active.
+QString unitTrouble(const QHash<QString, QString>& unit)
+{
+    const QString state = unit.value(QStringLiteral("ActiveState"));
+    if (unit.value(QStringLiteral("LoadState")) == QLatin1String("masked")) {
+        return QStringLiteral(
+            "masked: somebody wants no agent here; systemctl unmask changes that, with --global or "
+            "--user as it was masked");
+    }
+    if (unit.value(QStringLiteral("LoadState")) == QLatin1String("not-found")) {
+        return QStringLiteral("not known to the service manager; is the package installed whole?");
+    }
+    if (state == QLatin1String("activating")) {
+        return QStringLiteral("about to start again after a failure; see journalctl --user -u velks");
+    }
+    if (state == QLatin1String("failed")) {
+        return QStringLiteral("failed; see journalctl --user -u velks, then systemctl --user restart velks");
+    }
+    const bool wasLookedAt = unit.value(QStringLiteral("ConditionTimestampMonotonic")) != QLatin1String("0");
+    if (unit.value(QStringLiteral("Result")) == QLatin1String("exec-condition")
+        || (wasLookedAt && unit.value(QStringLiteral("ConditionResult")) == QLatin1String("no"))) {
+        return QStringLiteral(
+            "not meant to run for this user: neither greeters nor system accounts have an agent");
+    }
+    return QStringLiteral("%1; start it with systemctl --user start velks").arg(state);
 }
 
 Finding checkUnit()
 {
     const QString subject = QStringLiteral("unit");
-    const QString state = runPackageTool(QStringLiteral("systemctl"),
-                                         {QStringLiteral("--user"), QStringLiteral("is-active"),
-                                          QStringLiteral("velks.service")})
-                              .output.trimmed();
-    if (state == QLatin1String("active")) {
-        return {Grade::Good, subject, QStringLiteral("velks.service is active")};
-    }
-    if (state == QLatin1String("failed")) {
-        return {Grade::Bad, subject,
-                QStringLiteral("velks.service has failed; see journalctl --user -u velks")};
-    }
+    const QHash<QString, QString> unit = unitProperties();
+    const QString state = unit.value(QStringLiteral("ActiveState"));
     if (state.isEmpty()) {
         return {Grade::Warning, subject, QStringLiteral("there is no user service manager to ask")};
     }
-    return {Grade::Warning, subject,
-            QStringLiteral("velks.service is %1; start it with systemctl --user start velks").arg(state)};
+    if (state == QLatin1String("active")) {
+        return {Grade::Good, subject, QStringLiteral("velks.service is active")};
+    }
+    return {state == QLatin1String("failed") ? Grade::Bad : Grade::Warning, subject,
+            QStringLiteral("velks.service is ") + unitTrouble(unit)};
 }
 
 QByteArray processName(const QString& folder)
@@ -110,6 +103,14 @@ QFileInfoList runningAgents()
     return agents;
 }
 
+/// Whether somebody has stopped a process without ending it.
+bool isFrozen(const QFileInfo& process)
+{
+    QFile file(process.filePath() + QStringLiteral("/stat"));
+    // The state follows the name, which is in brackets and may hold anything.
+    return file.open(QIODevice::ReadOnly) && file.readAll().contains(") T ");
+}
+
 /// Whether another program has taken the place of the one that a process runs, as in an upgrade.
 bool runsReplacedProgram(const QFileInfo& process)
 {
@@ -127,6 +128,10 @@ Finding checkProcess()
     if (agents.size() > 1) {
         return {Grade::Bad, subject, QStringLiteral("runs %1 times; there must be one").arg(agents.size())};
     }
+    if (isFrozen(agents.first())) {
+        return {Grade::Bad, subject,
+                QStringLiteral("is stopped by a signal and does nothing; kill -CONT lets it go on")};
+    }
     if (runsReplacedProgram(agents.first())) {
         return {Grade::Warning, subject,
                 QStringLiteral("runs an older program than the one installed; "
@@ -137,18 +142,11 @@ Finding checkProcess()
 
 } // namespace
 
-Findings checkServices()
-{
-    return checkBus(QDBusConnection::systemBus(), QStringLiteral("system"), kSystemServices)
-        + checkBus(QDBusConnection::sessionBus(), QStringLiteral("session"), kSessionServices);
-}
-
 Findings checkPackageTools()
 {
-    const QString versionOption = QStringLiteral("--version");
-    return {checkPackageTool(QStringLiteral("dpkg"), {versionOption}),
-            checkPackageTool(QStringLiteral("/usr/bin/dpkg-query"), {versionOption}),
-            checkPackageTool(QStringLiteral("/usr/bin/dpkg-architecture"), {versionOption})};
+    const QString dpkg = QStringLiteral("dpkg");
+    return {checkPackageTool(dpkg, dpkg), checkPackageTool(QStringLiteral("/usr/bin/dpkg-query"), dpkg),
+            checkPackageTool(QStringLiteral("/usr/bin/dpkg-architecture"), QStringLiteral("dpkg-dev"))};
 }
 
 Findings checkAgent()

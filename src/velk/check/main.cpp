@@ -9,6 +9,7 @@
 #include "file_checks.h"
 #include "platform_check.h"
 #include "report.h"
+#include "service_checks.h"
 
 namespace {
 
