@@ -65,4 +65,6 @@ class Boot:
     def _child(self) -> int:
         assert not self.ended, "systemd-nspawn has ended; see its log"
         children = Path(f"/proc/{self._nspawn.pid}/task/{self._nspawn.pid}/children").read_text().split()
-        return int(children[0]) if children else 0
+        # An earlier child of nspawn only prepares the machine and ends.
+        begun = [pid for pid in children if Path(f"/proc/{pid}/comm").read_text() in {"systemd\n", "init\n"}]
+        return int(begun[0]) if begun else 0

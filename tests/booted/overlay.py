@@ -1,7 +1,7 @@
 """A root file system for a booted machine: that of this machine, with all changes kept in memory apart.
 
-VELK_BOOTED_ROOT names another folder to take, such as the root of another release, with the packages of [booted]
-and those that the agent depends on.
+VELK_BOOTED_ROOT names another folder to take, such as the root of another release, with the packages of the
+group [booted] and those that the agent depends on.
 """
 
 from __future__ import annotations
