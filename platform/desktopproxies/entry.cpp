@@ -112,15 +112,31 @@ WindowInfoMap __Entry::windowInfos()
     return infos;
 }
 
-/// What the dock announced before its answer waits in this thread's queue now, and is older than the answer.
-/// A call that is queued behind it says when it is through.
+/// What the dock announced before its answer waits in this thread's queue ahead of it and is older; what it
+/// announced afterwards waits behind it and is news, even if it came before this thread woke up.
 QVariant __Entry::readNow(const QString& property)
 {
-    QVariant value = m_object.read(property);
+    auto* watcher = ask(property);
     ++m_queuedBefore[property];
-    const auto passed = [this, property] { --m_queuedBefore[property]; };
-    QMetaObject::invokeMethod(this, passed, Qt::QueuedConnection);
-    return value;
+    connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, property, watcher] {
+        watcher->deleteLater();
+        --m_queuedBefore[property];
+    });
+    QDBusPendingReply<QDBusVariant> reply = *watcher;
+    reply.waitForFinished();
+    return reply.isError() ? QVariant() : reply.value().variant();
+}
+
+/// A call whose watcher is in time to be told of the answer at the answer's own place in the queue. One that
+/// comes later is told at a later place, so the dock is asked once more.
+QDBusPendingCallWatcher* __Entry::ask(const QString& property)
+{
+    QDBusPendingCallWatcher* watcher = nullptr;
+    do {
+        delete watcher;
+        watcher = new QDBusPendingCallWatcher(m_object.bus.asyncCall(m_object.readCall(property)), this);
+    } while (watcher->isFinished() && !watcher->isError());
+    return watcher;
 }
 
 void __Entry::onPropertiesChanged(const QDBusMessage& signal)

@@ -59,6 +59,7 @@ private:
     void onOwnSignal(const QDBusMessage& signal) override;
 
     QVariant readNow(const QString& property);
+    QDBusPendingCallWatcher* ask(const QString& property);
     void hear(const QString& property, const QVariant& value);
     void readAgain(const QString& property);
     void notice(const QString& property, const QVariant& value);

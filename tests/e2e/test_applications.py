@@ -4,6 +4,8 @@ from __future__ import annotations
 
 import pytest
 
+from sandbox.bus.mainloop import MainLoop
+from sandbox.events import Event
 from sandbox.fakes import dock
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
@@ -254,3 +256,17 @@ def test_changes_right_after_a_new_entry_are_all_reported(session: Terminal) -> 
     settle(session)
 
     assert told(session, mark) == [(OPENED, "Mail"), (CLOSED, "Mail")] * 40
+
+
+def test_windows_that_come_right_after_an_entry_was_read_are_reported(session: Terminal) -> None:
+    def open_window_after_answer(event: Event) -> None:
+        if event.target == "dock" and event.args[1:] == ("WindowInfos",):
+            newest = [*session.dock.apps][-1]
+            MainLoop.later(0, lambda: session.dock.set_windows(newest, 1))
+
+    session.events.subscribe(open_window_after_answer)
+    for number in range(40):
+        session.dock.open_app(f"new {number}", f"New {number}", docked=True, windows=0)
+        settle(session)
+
+    assert told(session) == [(OPENED, f"New {number}") for number in range(40)]
