@@ -20,7 +20,10 @@ run_bench() {
     require_boxes
     need_packages "${groups[@]}"
     build velks velks-check bench_programs
-    VELK_AGENT=$AGENT exec "$PYTHON" -m bench "$@"
+    export VELK_AGENT=$AGENT
+    # On a terminal it shows its progress itself.
+    if [[ -t 1 ]]; then exec "$PYTHON" -m bench "$@"; fi
+    narrate "measuring" "$PYTHON" -m bench "$@"
 }
 
 # Builds in copies of the tree of its own.
