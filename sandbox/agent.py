@@ -36,6 +36,10 @@ def default_binary() -> Path:
     return build / "src" / "velks"
 
 
+class StillRunning(Exception):
+    """The agent did not end when it was asked to; it has been killed."""
+
+
 class Agent:
     """One agent process at a time; it may be started again after it has ended."""
 
@@ -140,7 +144,7 @@ class Agent:
         except subprocess.TimeoutExpired:
             self._process.kill()
             self.wait()
-            raise AssertionError("the agent did not end on SIGTERM") from None
+            raise StillRunning("the agent did not end on SIGTERM") from None
 
 
 class LogReader:

@@ -40,6 +40,10 @@ class Event:
         return f"{self.kind:7} {self.source} -> {self.target}: {self.member}({shown})"
 
 
+class NotSeen(AssertionError):
+    """An event that was waited for did not come; the text lists what came instead."""
+
+
 class Events:
     """Thread-safe, append-only list of events that can be waited for."""
 
@@ -99,7 +103,7 @@ class Events:
     ) -> Event:
         """The `count`th event after mark `after` that has these field values and satisfies `predicate`.
 
-        Waits for it if need be; an AssertionError after `timeout` seconds lists what came instead.
+        Waits for it if need be; raises NotSeen after `timeout` seconds.
         """
         found: list[Event] = []
         looked_at = after
@@ -112,7 +116,7 @@ class Events:
 
         with self._changed:
             if not self._changed.wait_for(came, timeout):
-                raise AssertionError(self._missing(fields, len(found), count, after))
+                raise NotSeen(self._missing(fields, len(found), count, after))
         return found[count - 1]
 
     def report(self, after: int = 0) -> str:

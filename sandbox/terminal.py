@@ -7,7 +7,7 @@ from types import TracebackType
 from typing import Callable, Collection, Mapping, get_type_hints
 from uuid import uuid4
 
-from sandbox.agent import Agent
+from sandbox.agent import Agent, StillRunning
 from sandbox.bus.buses import Bus
 from sandbox.bus.monitor import BusMonitor
 from sandbox.bus.senders import Senders
@@ -199,7 +199,7 @@ class Terminal:
             problems.append(f"the agent died: exit status {self.agent.exit_status}")
         try:
             self.agent.stop()
-        except AssertionError as error:
+        except StillRunning as error:
             problems.append(str(error))
         for monitor in self.monitors:
             monitor.close()

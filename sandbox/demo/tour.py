@@ -11,7 +11,7 @@ from rich.rule import Rule
 from rich.text import Text
 
 from sandbox.demo.scene import REBOOT, Expectation, Scene, Step
-from sandbox.events import Event
+from sandbox.events import Event, NotSeen
 from sandbox.terminal import Terminal
 from sandbox.timeline.timeline import Timeline
 
@@ -117,7 +117,7 @@ class Tour:
                 self._let_pass(expectation, place, step=_SKIP if speed else 1)
             try:
                 return self._terminal.events.wait_for(expectation.matches, after=place, timeout=timeout)
-            except AssertionError:
+            except NotSeen:
                 return None
 
     def _let_pass(self, expectation: Expectation, place: int, step: int) -> None:
@@ -137,7 +137,7 @@ class Tour:
         """Whether the agent has handled everything, so that what has not come by now will not come."""
         try:
             self._terminal.sync()
-        except AssertionError:
+        except NotSeen:
             return False
         return True
 

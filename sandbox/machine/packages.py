@@ -88,7 +88,8 @@ class Packages:
         Without `files` it brings a desktop file of its own name, without `architecture` it is made for the
         terminal's own. Packages with `multi_arch` "same" may be installed for several architectures at once.
         """
-        assert _NAME.fullmatch(name), f"no package can be called {name!r}"
+        if not _NAME.fullmatch(name):
+            raise ValueError(f"no package can be called {name!r}")
         package = Package(name, version, architecture or native_architecture(), multi_arch)
         self.remove(name, package.architecture)
         self._packages[name, package.architecture] = package

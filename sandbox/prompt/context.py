@@ -8,7 +8,7 @@ from typing import Iterable
 from rich.console import RenderableType
 from rich.text import Text
 
-from sandbox.events import Event
+from sandbox.events import Event, NotSeen
 from sandbox.fakes.base import Fake
 from sandbox.terminal import Terminal
 from sandbox.timeline.timeline import Timeline
@@ -72,7 +72,7 @@ class Context:
     def _answers(self) -> bool:
         try:
             self.terminal.sync(_ANSWER_SECONDS)
-        except AssertionError:
+        except NotSeen:
             return False
         return True
 
@@ -85,6 +85,6 @@ class Context:
         events = self.terminal.events
         try:
             found = events.wait_for(is_wanted, after=self._followed, timeout=seconds)
-        except AssertionError:
+        except NotSeen:
             raise CommandRefused(f"no {member} came within {seconds:g} s") from None
         self._followed = events.all().index(found) + 1

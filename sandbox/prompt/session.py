@@ -10,6 +10,7 @@ from rich.text import Text
 from sandbox.box import outside
 from sandbox.box.outside import Trouble
 from sandbox.box.preconditions import clock, require_agent
+from sandbox.events import NotSeen
 from sandbox.prompt import commands, loop, session_end
 from sandbox.prompt.context import Context
 from sandbox.prompt.mirror import Mirror
@@ -44,6 +45,6 @@ def _serve(context: Context) -> int:
     session_end.watch(context)
     try:
         context.terminal.start_agent()
-    except AssertionError:
+    except NotSeen:
         raise Trouble("the agent did not announce itself to the daemon") from None
     return loop.run_prompt(context) if sys.stdin.isatty() else loop.run_script(context, sys.stdin)

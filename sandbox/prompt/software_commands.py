@@ -62,5 +62,5 @@ def _require_installed(context: Context, package: str) -> None:
 def _put_in_place(context: Context, package: str, version: str) -> None:
     try:
         context.terminal.packages.install(package, version)
-    except AssertionError as error:
+    except ValueError as error:
         raise CommandRefused(str(error)) from None

@@ -115,5 +115,5 @@ def test_packages_and_their_files_are_gone_in_the_next_terminal() -> None:
 
 
 def test_name_that_no_package_can_have_is_refused(terminal: Terminal) -> None:
-    with pytest.raises(AssertionError, match="no package can be called"):
+    with pytest.raises(ValueError, match="no package can be called"):
         terminal.packages.install("Two Words", "1")
