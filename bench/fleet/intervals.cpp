@@ -12,8 +12,8 @@
 namespace {
 
 constexpr int kSecondsOfDay = 24 * 60 * 60;
-int second =
-    0; // NOLINT(cppcoreguidelines-avoid-non-const-global-variables): the clock below has no other way
+// NOLINTNEXTLINE(cppcoreguidelines-avoid-non-const-global-variables): the clock below has no other way
+int second = 0;
 
 } // namespace
 

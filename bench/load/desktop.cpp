@@ -3,12 +3,15 @@
 /// usage: bench_desktop [LAUNCHER_ITEMS [DOCK_ENTRIES]]
 ///
 /// Commands, one a line on the standard input:
-///   policies COUNT SIZE WINDOW  push so many policies of so many bytes, of which at most WINDOW are on their
-///   way windows COUNT WINDOW        change the windows of the dock's entries so many times, likewise wake
-///   push a policy that is no JSON
-/// On the standard output, with the monotonic clock in nanoseconds:
-///   ready | UpdateUserInfo TIME | onUploadFinished TIME | entries TIME (all entries have been read)
-///   done BEGIN END LATENCY...   of a row; the latency of each where one at a time was on its way
+///   * policies COUNT SIZE WINDOW: push COUNT policies of SIZE bytes, at most WINDOW of them at a time
+///   * windows COUNT WINDOW: change the windows of the dock's entries COUNT times, at most WINDOW at a time
+///   * wake: push a policy that is no JSON
+///
+/// Lines on the standard output, with times of the monotonic clock in nanoseconds:
+///   * ready
+///   * UpdateUserInfo TIME, onUploadFinished TIME
+///   * entries TIME: all entries have been read
+///   * done BEGIN END LATENCY...: a command has ended; the latencies stand there where WINDOW is 1
 
 #include "bus_connection.h"
 #include "services.h"

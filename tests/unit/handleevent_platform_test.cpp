@@ -3,10 +3,12 @@
 #include <QTextCodec>
 #include <QUrl>
 
+#include <algorithm>
 #include <memory>
 
 #include "handleevent.h"
 #include "https_server.h"
+#include "log_recorder.h"
 #include "manual_clock.h"
 #include "platform_files.h"
 #include "recorded_service.h"
@@ -31,26 +33,14 @@ QString tips(const QString& code, const QString& result)
         .arg(code, result);
 }
 
-/// How often each text was logged while the recorder lives.
-class LogRecorder
+/// How often the notice's line was logged.
+int notices(const LogRecorder& log)
 {
-public:
-    LogRecorder() { s_lines.clear(), s_previous = qInstallMessageHandler(record); }
-    ~LogRecorder() { qInstallMessageHandler(s_previous); }
-    Q_DISABLE_COPY_MOVE(LogRecorder)
-
-    static QStringList lines() { return s_lines; }
-    static int count(const QString& line) { return s_lines.count(line); }
-
-private:
-    static void record(QtMsgType /*type*/, const QMessageLogContext& /*context*/, const QString& text)
-    {
-        s_lines.append(text);
-    }
-
-    inline static QStringList s_lines;
-    inline static QtMessageHandler s_previous = nullptr;
-};
+    const QString text = QString::fromUtf8(kNotice);
+    const QStringList lines = log.lines();
+    return static_cast<int>(std::count_if(lines.cbegin(), lines.cend(),
+                                          [&text](const QString& line) { return line.endsWith(text); }));
+}
 
 } // namespace
 
@@ -149,9 +139,10 @@ void HandleEventPlatformTest::replyIsLoggedBeforeItIsReported()
     QStringList linesWhenReported;
     const QObject receiver;
     connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
-            [&linesWhenReported] { linesWhenReported = LogRecorder::lines(); });
+            [&linesWhenReported, &log] { linesWhenReported = log.lines(); });
     HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 200, QStringLiteral("[]")));
-    QCOMPARE(linesWhenReported, QStringList{QStringLiteral(R"(getPlatformMsg ----nCode: 200 : "[]" : 2)")});
+    QCOMPARE(linesWhenReported,
+             QStringList{QStringLiteral(R"(info: getPlatformMsg ----nCode: 200 : "[]" : 2)")});
 }
 
 void HandleEventPlatformTest::requestWithoutResponseIsReportedAsStatusZero()
@@ -213,7 +204,7 @@ void HandleEventPlatformTest::passwordReplyThatIsNoJsonStopsTheCheck()
     QFETCH(QString, body);
     const LogRecorder log;
     HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 200, body), QString());
-    QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 0);
+    QCOMPARE(notices(log), 0);
 }
 
 void HandleEventPlatformTest::passwordThatDoesNotExpireIsLoggedTwiceAndNotShown_data()
@@ -245,7 +236,7 @@ void HandleEventPlatformTest::passwordThatDoesNotExpireIsLoggedTwiceAndNotShown(
     HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, status, body), QString());
     setClockAhead(m_ahead += 120);
     QCoreApplication::processEvents();
-    QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 2);
+    QCOMPARE(notices(log), 2);
     QVERIFY(m_notifications->calls().isEmpty());
 }
 
@@ -254,7 +245,7 @@ void HandleEventPlatformTest::expiringPasswordIsShownAfterAMinute()
     const LogRecorder log;
     const QString reply = tips(QStringLiteral("0"), QStringLiteral("true"));
     HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 200, reply), QString());
-    QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 2);
+    QCOMPARE(notices(log), 2);
 
     // The notice's timer is coarse: half a second more or less.
     setClockAhead(m_ahead += 59);
@@ -267,7 +258,7 @@ void HandleEventPlatformTest::expiringPasswordIsShownAfterAMinute()
     QCOMPARE(arguments.value(3), QVariant(QStringLiteral("提醒")));
     QCOMPARE(arguments.value(4), QVariant(QStringLiteral("您的密码还有3天过期")));
     QCOMPARE(arguments.value(7), QVariant(-1));
-    QCOMPARE(LogRecorder::count(QString::fromUtf8(kNotice)), 3);
+    QCOMPARE(notices(log), 3);
 }
 
 void HandleEventPlatformTest::passwordReplyIsReadAsUtf8InAnyLocale()

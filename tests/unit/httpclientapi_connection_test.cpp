@@ -57,19 +57,19 @@ private Q_SLOTS:
     void init();
     void cleanup();
 
-    void hundred_requests_share_one_connection();
-    void connects_anew_when_the_server_has_closed_data();
-    void connects_anew_when_the_server_has_closed();
-    void sends_again_what_went_into_a_dead_path();
-    void kernel_watches_an_idle_connection();
-    void resumes_its_tls_session_on_a_new_connection_data();
-    void resumes_its_tls_session_on_a_new_connection();
-    void serves_the_next_request_after_one_without_response();
-    void speaks_http_1_1_to_a_server_that_prefers_http_2();
-    void uses_no_proxy_of_the_environment();
-    void follows_no_redirect();
-    void delivers_no_event_while_a_request_runs();
-    void child_processes_inherit_nothing();
+    void hundredRequestsShareOneConnection();
+    void connectsAnewWhenTheServerHasClosed_data();
+    void connectsAnewWhenTheServerHasClosed();
+    void sendsAgainWhatWentIntoADeadPath();
+    void kernelWatchesAnIdleConnection();
+    void resumesItsTlsSessionOnANewConnection_data();
+    void resumesItsTlsSessionOnANewConnection();
+    void servesTheNextRequestAfterOneWithoutResponse();
+    void speaksHttp11ToAServerThatPrefersHttp2();
+    void usesNoProxyOfTheEnvironment();
+    void followsNoRedirect();
+    void deliversNoEventWhileARequestRuns();
+    void childProcessesInheritNothing();
 
 private:
     HttpsServer m_server;
@@ -89,7 +89,7 @@ void HttpClientApiConnectionTest::cleanup()
     qunsetenv("ALL_PROXY");
 }
 
-void HttpClientApiConnectionTest::hundred_requests_share_one_connection()
+void HttpClientApiConnectionTest::hundredRequestsShareOneConnection()
 {
     QSet<int> handshakes;
     for (int i = 0; i < 100; ++i) {
@@ -99,7 +99,7 @@ void HttpClientApiConnectionTest::hundred_requests_share_one_connection()
     QCOMPARE(handshakes.size(), 1);
 }
 
-void HttpClientApiConnectionTest::connects_anew_when_the_server_has_closed_data()
+void HttpClientApiConnectionTest::connectsAnewWhenTheServerHasClosed_data()
 {
     QTest::addColumn<QString>("path");
     QTest::newRow("idle connection closed") << QStringLiteral("/idle-close");
@@ -107,7 +107,7 @@ void HttpClientApiConnectionTest::connects_anew_when_the_server_has_closed_data(
     QTest::newRow("close announced in the response") << QStringLiteral("/announced-close");
 }
 
-void HttpClientApiConnectionTest::connects_anew_when_the_server_has_closed()
+void HttpClientApiConnectionTest::connectsAnewWhenTheServerHasClosed()
 {
     QFETCH(QString, path);
 
@@ -115,7 +115,7 @@ void HttpClientApiConnectionTest::connects_anew_when_the_server_has_closed()
     QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
 }
 
-void HttpClientApiConnectionTest::sends_again_what_went_into_a_dead_path()
+void HttpClientApiConnectionTest::sendsAgainWhatWentIntoADeadPath()
 {
     QCOMPARE(get(*m_client, m_server.url("proper", "/idle-death")).status, 200);
     QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
@@ -125,7 +125,7 @@ void HttpClientApiConnectionTest::sends_again_what_went_into_a_dead_path()
     QVERIFY(after[QStringLiteral("handshake")] != before[QStringLiteral("handshake")]);
 }
 
-void HttpClientApiConnectionTest::kernel_watches_an_idle_connection()
+void HttpClientApiConnectionTest::kernelWatchesAnIdleConnection()
 {
     constexpr int shortestPoll = 60;
     QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
@@ -137,7 +137,7 @@ void HttpClientApiConnectionTest::kernel_watches_an_idle_connection()
     QCOMPARE(option(connection, IPPROTO_TCP, TCP_USER_TIMEOUT), 10000);
 }
 
-void HttpClientApiConnectionTest::resumes_its_tls_session_on_a_new_connection_data()
+void HttpClientApiConnectionTest::resumesItsTlsSessionOnANewConnection_data()
 {
     QTest::addColumn<QString>("door");
     QTest::addColumn<QString>("version");
@@ -145,7 +145,7 @@ void HttpClientApiConnectionTest::resumes_its_tls_session_on_a_new_connection_da
     QTest::newRow("TLS 1.2") << QStringLiteral("demanding older") << QStringLiteral("TLSv1.2");
 }
 
-void HttpClientApiConnectionTest::resumes_its_tls_session_on_a_new_connection()
+void HttpClientApiConnectionTest::resumesItsTlsSessionOnANewConnection()
 {
     QFETCH(QString, door);
     QFETCH(QString, version);
@@ -158,20 +158,20 @@ void HttpClientApiConnectionTest::resumes_its_tls_session_on_a_new_connection()
     }
 }
 
-void HttpClientApiConnectionTest::serves_the_next_request_after_one_without_response()
+void HttpClientApiConnectionTest::servesTheNextRequestAfterOneWithoutResponse()
 {
     QCOMPARE(get(*m_client, m_server.url("proper", "/cut-length")).status, 0);
     QCOMPARE(get(*m_client, m_server.url("proper", "/body-over-cap")).status, 0);
     QCOMPARE(get(*m_client, m_server.url("proper", "/text")).reply, QStringLiteral("用户 ü {}"));
 }
 
-void HttpClientApiConnectionTest::speaks_http_1_1_to_a_server_that_prefers_http_2()
+void HttpClientApiConnectionTest::speaksHttp11ToAServerThatPrefersHttp2()
 {
     QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
     QCOMPARE(m_server.nextRequest()[QStringLiteral("protocol")].toString(), QStringLiteral("http/1.1"));
 }
 
-void HttpClientApiConnectionTest::uses_no_proxy_of_the_environment()
+void HttpClientApiConnectionTest::usesNoProxyOfTheEnvironment()
 {
     const QByteArray nobody = m_server.url("refusing", "").toUtf8().replace("https:", "http:");
     qputenv("https_proxy", nobody);
@@ -179,7 +179,7 @@ void HttpClientApiConnectionTest::uses_no_proxy_of_the_environment()
     QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
 }
 
-void HttpClientApiConnectionTest::follows_no_redirect()
+void HttpClientApiConnectionTest::followsNoRedirect()
 {
     QCOMPARE(get(*m_client, m_server.url("proper", "/redirect")).status, 302);
     QCOMPARE(get(*m_client, m_server.url("proper", "/next")).status, 200);
@@ -188,7 +188,7 @@ void HttpClientApiConnectionTest::follows_no_redirect()
     QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(), QStringLiteral("GET /next HTTP/1.1"));
 }
 
-void HttpClientApiConnectionTest::delivers_no_event_while_a_request_runs()
+void HttpClientApiConnectionTest::deliversNoEventWhileARequestRuns()
 {
     QTimer timer;
     timer.setSingleShot(true);
@@ -199,7 +199,7 @@ void HttpClientApiConnectionTest::delivers_no_event_while_a_request_runs()
     QVERIFY(fired.wait());
 }
 
-void HttpClientApiConnectionTest::child_processes_inherit_nothing()
+void HttpClientApiConnectionTest::childProcessesInheritNothing()
 {
     m_client.reset();
     const QString before = descriptorsOfAChild();

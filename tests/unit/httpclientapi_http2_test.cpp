@@ -54,8 +54,8 @@ private Q_SLOTS:
     void initTestCase();
     void cleanupTestCase();
 
-    void is_answered_over_http_1_1_with_header_names_in_their_case();
-    void is_turned_away_without_client_certificate();
+    void isAnsweredOverHttp11WithHeaderNamesInTheirCase();
+    void isTurnedAwayWithoutClientCertificate();
 
 private:
     QString url() const { return QStringLiteral("https://127.0.0.1:%1/list").arg(kPort); }
@@ -87,7 +87,7 @@ void HttpClientApiHttp2Test::cleanupTestCase()
     m_server.waitForFinished();
 }
 
-void HttpClientApiHttp2Test::is_answered_over_http_1_1_with_header_names_in_their_case()
+void HttpClientApiHttp2Test::isAnsweredOverHttp11WithHeaderNamesInTheirCase()
 {
     HttpClientApi client(nullptr, false);
     client.setSSLConfig(m_certificates.file("ca"), m_certificates.file("client"),
@@ -99,7 +99,7 @@ void HttpClientApiHttp2Test::is_answered_over_http_1_1_with_header_names_in_thei
     QVERIFY(outcome.headers.contains({"X-Protocol", "HTTP/1.1"}));
 }
 
-void HttpClientApiHttp2Test::is_turned_away_without_client_certificate()
+void HttpClientApiHttp2Test::isTurnedAwayWithoutClientCertificate()
 {
     HttpClientApi client(nullptr, false);
     client.setSSLConfig(m_certificates.file("ca"), {}, {});

@@ -10,10 +10,10 @@ class HttpClientApiIdleTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void connection_is_used_again_however_long_it_was_idle();
+    void connectionIsUsedAgainHoweverLongItWasIdle();
 };
 
-void HttpClientApiIdleTest::connection_is_used_again_however_long_it_was_idle()
+void HttpClientApiIdleTest::connectionIsUsedAgainHoweverLongItWasIdle()
 {
     HttpsServer server;
     HttpClientApi client(nullptr, false);

@@ -1,6 +1,6 @@
 #include "httpclientapi.h"
 #include "https_server.h"
-#include "warning_recorder.h"
+#include "log_recorder.h"
 
 #include <QFile>
 #include <QRegularExpression>
@@ -37,18 +37,18 @@ class HttpClientApiLimitsTest : public QObject
 
 private Q_SLOTS:
     void initTestCase();
-    void gives_up_data();
-    void gives_up();
-    void each_request_given_up_is_one_warning();
-    void connecting_is_given_up_before_the_rest();
-    void lookup_left_behind_reaches_no_child_process();
-    void cleanupTestCase() { m_warnings.reset(); }
+    void givesUp_data();
+    void givesUp();
+    void eachRequestGivenUpIsOneWarning();
+    void connectingIsGivenUpBeforeTheRest();
+    void lookupLeftBehindReachesNoChildProcess();
+    void cleanupTestCase() { m_log.reset(); }
 
 private:
     void start(const char* row, const QString& url);
 
     HttpsServer m_server;
-    std::unique_ptr<WarningRecorder> m_warnings;
+    std::unique_ptr<LogRecorder> m_log;
     std::map<QString, std::shared_future<Outcome>> m_requests;
 };
 
@@ -59,7 +59,7 @@ void HttpClientApiLimitsTest::initTestCase()
     QVERIFY(QFile::remove(QStringLiteral("/etc/hosts")));
     QCOMPARE(mkfifo("/etc/hosts", 0600), 0);
 
-    m_warnings = std::make_unique<WarningRecorder>();
+    m_log = std::make_unique<LogRecorder>();
     start("no header comes", m_server.url("proper", "/stalled-header"));
     start("body stops", m_server.url("proper", "/stalled-body"));
     start("body drips without end", m_server.url("proper", "/dripping-body"));
@@ -81,7 +81,7 @@ void HttpClientApiLimitsTest::start(const char* row, const QString& url)
     std::thread(std::move(request)).detach(); // one without limit must not keep the test from ending
 }
 
-void HttpClientApiLimitsTest::gives_up_data()
+void HttpClientApiLimitsTest::givesUp_data()
 {
     QTest::addColumn<QString>("request");
     for (const auto& request : m_requests) {
@@ -89,7 +89,7 @@ void HttpClientApiLimitsTest::gives_up_data()
     }
 }
 
-void HttpClientApiLimitsTest::gives_up()
+void HttpClientApiLimitsTest::givesUp()
 {
     QFETCH(QString, request);
 
@@ -100,24 +100,24 @@ void HttpClientApiLimitsTest::gives_up()
     QVERIFY(!result.get().hasHeaders);
 }
 
-void HttpClientApiLimitsTest::each_request_given_up_is_one_warning()
+void HttpClientApiLimitsTest::eachRequestGivenUpIsOneWarning()
 {
     for (const auto& request : m_requests) {
         QCOMPARE(request.second.wait_for(kPatience), std::future_status::ready);
     }
-    const QStringList warnings = m_warnings->texts();
+    const QStringList warnings = m_log->warnings();
     QCOMPARE(warnings.size(), 5);
     QCOMPARE(warnings.filter(QRegularExpression(QStringLiteral("timed out|timeout"))).size(), 5);
 }
 
-void HttpClientApiLimitsTest::connecting_is_given_up_before_the_rest()
+void HttpClientApiLimitsTest::connectingIsGivenUpBeforeTheRest()
 {
-    const QStringList warnings = m_warnings->texts();
+    const QStringList warnings = m_log->warnings();
     const QRegularExpression connecting(QStringLiteral("Resolving|SSL connection|Connection timed out"));
     QCOMPARE(warnings.mid(0, 2).filter(connecting).size(), 2);
 }
 
-void HttpClientApiLimitsTest::lookup_left_behind_reaches_no_child_process()
+void HttpClientApiLimitsTest::lookupLeftBehindReachesNoChildProcess()
 {
     for (int descriptor = STDERR_FILENO + 1; descriptor < FD_SETSIZE; ++descriptor) {
         struct stat found

@@ -15,28 +15,28 @@ class HttpClientApiTest : public QObject
 private Q_SLOTS:
     void init();
 
-    void get_without_body_has_no_content();
-    void get_carries_its_body();
-    void put_carries_its_body();
-    void put_without_body_declares_empty_content();
-    void content_that_is_not_json_has_no_content_type();
-    void large_content_is_sent_without_asking_first();
-    void url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry_data();
-    void url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry();
+    void getWithoutBodyHasNoContent();
+    void getCarriesItsBody();
+    void putCarriesItsBody();
+    void putWithoutBodyDeclaresEmptyContent();
+    void contentThatIsNotJsonHasNoContentType();
+    void largeContentIsSentWithoutAskingFirst();
+    void urlGoesOutAsGivenButForCharactersThatARequestLineCannotCarry_data();
+    void urlGoesOutAsGivenButForCharactersThatARequestLineCannotCarry();
 
-    void status_and_body_are_returned_data();
-    void status_and_body_are_returned();
-    void body_of_8_mib_is_accepted();
-    void headers_keep_their_order_case_and_duplicates();
-    void folded_header_is_one_header();
-    void interim_responses_have_no_part_in_the_headers();
-    void trailers_have_no_part_in_the_headers();
-    void headers_of_250_kib_are_accepted();
-    void headers_are_those_of_the_last_request();
+    void statusAndBodyAreReturned_data();
+    void statusAndBodyAreReturned();
+    void bodyOf8MibIsAccepted();
+    void headersKeepTheirOrderCaseAndDuplicates();
+    void foldedHeaderIsOneHeader();
+    void interimResponsesHaveNoPartInTheHeaders();
+    void trailersHaveNoPartInTheHeaders();
+    void headersOf250KibAreAccepted();
+    void headersAreThoseOfTheLastRequest();
 
-    void without_a_whole_response_there_is_none_and_one_warning_data();
-    void without_a_whole_response_there_is_none_and_one_warning();
-    void reply_without_length_that_breaks_off_is_none_where_the_library_can_tell();
+    void withoutAWholeResponseThereIsNoneAndOneWarning_data();
+    void withoutAWholeResponseThereIsNoneAndOneWarning();
+    void replyWithoutLengthThatBreaksOffIsNoneWhereTheLibraryCanTell();
 
 private:
     HttpsServer m_server;
@@ -50,7 +50,7 @@ void HttpClientApiTest::init()
     m_client->setSSLConfig(m_server.file("ca"), {}, {});
 }
 
-void HttpClientApiTest::get_without_body_has_no_content()
+void HttpClientApiTest::getWithoutBodyHasNoContent()
 {
     QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
 
@@ -60,7 +60,7 @@ void HttpClientApiTest::get_without_body_has_no_content()
     QVERIFY(headerOf(request, "Content-Type").isNull());
 }
 
-void HttpClientApiTest::get_carries_its_body()
+void HttpClientApiTest::getCarriesItsBody()
 {
     const QString body = QStringLiteral("{\"username\": \"张伟\"}");
     QCOMPARE(get(*m_client, m_server.url("proper", "/plain"), body).status, 200);
@@ -71,7 +71,7 @@ void HttpClientApiTest::get_carries_its_body()
     QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
 }
 
-void HttpClientApiTest::put_carries_its_body()
+void HttpClientApiTest::putCarriesItsBody()
 {
     const QString body = QStringLiteral("{\"uuid\":\"一\"}");
     QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), body).status, 200);
@@ -82,7 +82,7 @@ void HttpClientApiTest::put_carries_its_body()
     QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
 }
 
-void HttpClientApiTest::put_without_body_declares_empty_content()
+void HttpClientApiTest::putWithoutBodyDeclaresEmptyContent()
 {
     QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), {}).status, 200);
 
@@ -92,7 +92,7 @@ void HttpClientApiTest::put_without_body_declares_empty_content()
     QVERIFY(headerOf(request, "Content-Type").isNull());
 }
 
-void HttpClientApiTest::content_that_is_not_json_has_no_content_type()
+void HttpClientApiTest::contentThatIsNotJsonHasNoContentType()
 {
     QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), QStringLiteral("text"), false).status, 200);
 
@@ -101,7 +101,7 @@ void HttpClientApiTest::content_that_is_not_json_has_no_content_type()
     QVERIFY(headerOf(request, "Content-Type").isNull());
 }
 
-void HttpClientApiTest::large_content_is_sent_without_asking_first()
+void HttpClientApiTest::largeContentIsSentWithoutAskingFirst()
 {
     const QString body(2 * 1024 * 1024, QLatin1Char('x'));
     QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), body).status, 200);
@@ -111,7 +111,7 @@ void HttpClientApiTest::large_content_is_sent_without_asking_first()
     QCOMPARE(headerOf(request, "Content-Length"), QString::number(body.size()));
 }
 
-void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry_data()
+void HttpClientApiTest::urlGoesOutAsGivenButForCharactersThatARequestLineCannotCarry_data()
 {
     QTest::addColumn<QString>("path");
     QTest::addColumn<QString>("sent");
@@ -135,7 +135,7 @@ void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_
     row("signs in the query", "/?a=b+c@d?e/f=", "/?a=b+c@d?e/f=");
 }
 
-void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_line_cannot_carry()
+void HttpClientApiTest::urlGoesOutAsGivenButForCharactersThatARequestLineCannotCarry()
 {
     QFETCH(QString, path);
     QFETCH(QString, sent);
@@ -145,7 +145,7 @@ void HttpClientApiTest::url_goes_out_as_given_but_for_characters_that_a_request_
              QStringLiteral("GET %1 HTTP/1.1").arg(sent));
 }
 
-void HttpClientApiTest::status_and_body_are_returned_data()
+void HttpClientApiTest::statusAndBodyAreReturned_data()
 {
     QTest::addColumn<int>("status");
     QTest::addColumn<QString>("reply");
@@ -159,7 +159,7 @@ void HttpClientApiTest::status_and_body_are_returned_data()
     QTest::newRow("/until-close") << 200 << QStringLiteral("all of it");
 }
 
-void HttpClientApiTest::status_and_body_are_returned()
+void HttpClientApiTest::statusAndBodyAreReturned()
 {
     QFETCH(int, status);
     QFETCH(QString, reply);
@@ -170,14 +170,14 @@ void HttpClientApiTest::status_and_body_are_returned()
     QCOMPARE(outcome.warnings, QStringList());
 }
 
-void HttpClientApiTest::body_of_8_mib_is_accepted()
+void HttpClientApiTest::bodyOf8MibIsAccepted()
 {
     const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/body-at-cap"));
     QCOMPARE(outcome.status, 200);
     QCOMPARE(outcome.reply.size(), 8 * 1024 * 1024);
 }
 
-void HttpClientApiTest::headers_keep_their_order_case_and_duplicates()
+void HttpClientApiTest::headersKeepTheirOrderCaseAndDuplicates()
 {
     const Headers sent = {{"X-Total-Count", "5"}, {"x-lower", "a"},       {"X-UPPER", "b \t c"},
                           {"x-twice", "1"},       {"X-Twice", "2"},       {"x-twice", "1"},
@@ -185,41 +185,41 @@ void HttpClientApiTest::headers_keep_their_order_case_and_duplicates()
     QCOMPARE(get(*m_client, m_server.url("proper", "/headers")).headers, sent);
 }
 
-void HttpClientApiTest::folded_header_is_one_header()
+void HttpClientApiTest::foldedHeaderIsOneHeader()
 {
     const Headers joined = {{"X-Folded", "one two"}, {"Content-Length", "2"}};
     QCOMPARE(get(*m_client, m_server.url("proper", "/folded")).headers, joined);
 }
 
-void HttpClientApiTest::interim_responses_have_no_part_in_the_headers()
+void HttpClientApiTest::interimResponsesHaveNoPartInTheHeaders()
 {
     const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/interim"));
     QCOMPARE(outcome.status, 200);
     QCOMPARE(outcome.headers, Headers({{"X-Final", "yes"}, {"Content-Length", "5"}}));
 }
 
-void HttpClientApiTest::trailers_have_no_part_in_the_headers()
+void HttpClientApiTest::trailersHaveNoPartInTheHeaders()
 {
     const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/trailers"));
     QCOMPARE(outcome.reply, QStringLiteral("first second"));
     QCOMPARE(outcome.headers, Headers({{"Transfer-Encoding", "chunked"}}));
 }
 
-void HttpClientApiTest::headers_of_250_kib_are_accepted()
+void HttpClientApiTest::headersOf250KibAreAccepted()
 {
     const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/headers-within-cap"));
     QCOMPARE(outcome.status, 200);
     QCOMPARE(outcome.headers.size(), 251);
 }
 
-void HttpClientApiTest::headers_are_those_of_the_last_request()
+void HttpClientApiTest::headersAreThoseOfTheLastRequest()
 {
     QCOMPARE(get(*m_client, m_server.url("proper", "/headers")).headers.size(), 8);
     QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).headers, Headers({{"Content-Length", "2"}}));
     QCOMPARE(get(*m_client, m_server.url("refusing", "/plain")).headers, Headers());
 }
 
-void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning_data()
+void HttpClientApiTest::withoutAWholeResponseThereIsNoneAndOneWarning_data()
 {
     QTest::addColumn<QString>("url");
     QTest::addColumn<QString>("cause");
@@ -244,7 +244,7 @@ void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning_d
     row("empty address", QString(), "URL");
 }
 
-void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning()
+void HttpClientApiTest::withoutAWholeResponseThereIsNoneAndOneWarning()
 {
     QFETCH(QString, url);
     QFETCH(QString, cause);
@@ -254,7 +254,7 @@ void HttpClientApiTest::without_a_whole_response_there_is_none_and_one_warning()
     QVERIFY2(outcome.warnings[0].contains(QRegularExpression(cause)), qUtf8Printable(outcome.warnings[0]));
 }
 
-void HttpClientApiTest::reply_without_length_that_breaks_off_is_none_where_the_library_can_tell()
+void HttpClientApiTest::replyWithoutLengthThatBreaksOffIsNoneWhereTheLibraryCanTell()
 {
     const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/until-break"));
 #if LIBCURL_VERSION_NUM >= 0x080000

@@ -18,14 +18,14 @@ private Q_SLOTS:
 
     void refuses_data();
     void refuses();
-    void refuses_an_authority_that_only_the_system_trusts();
-    void refuses_without_configuration();
-    void asks_nobody_for_the_password_of_a_key();
-    void trusts_the_given_authority();
-    void reads_a_replaced_authority_file();
-    void presents_its_certificate();
-    void finds_the_key_in_the_file_of_the_certificate();
-    void presents_the_certificate_of_its_latest_configuration();
+    void refusesAnAuthorityThatOnlyTheSystemTrusts();
+    void refusesWithoutConfiguration();
+    void asksNobodyForThePasswordOfAKey();
+    void trustsTheGivenAuthority();
+    void readsAReplacedAuthorityFile();
+    void presentsItsCertificate();
+    void findsTheKeyInTheFileOfTheCertificate();
+    void presentsTheCertificateOfItsLatestConfiguration();
 
 private:
     HttpOutcome plainGet(const char* door) { return get(*m_client, m_server.url(door, "/plain")); }
@@ -105,7 +105,7 @@ void HttpClientApiTrustTest::refuses()
     QVERIFY2(outcome.warnings[0].contains(cause), qUtf8Printable(outcome.warnings[0]));
 }
 
-void HttpClientApiTrustTest::refuses_an_authority_that_only_the_system_trusts()
+void HttpClientApiTrustTest::refusesAnAuthorityThatOnlyTheSystemTrusts()
 {
     // Outside of the simulated terminal this would be the machine's own trust.
     QVERIFY(qEnvironmentVariableIsSet("VELK_BOX_USER"));
@@ -120,12 +120,12 @@ void HttpClientApiTrustTest::refuses_an_authority_that_only_the_system_trusts()
     QCOMPARE(plainGet("stranger").status, 0);
 }
 
-void HttpClientApiTrustTest::refuses_without_configuration()
+void HttpClientApiTrustTest::refusesWithoutConfiguration()
 {
     QCOMPARE(plainGet("proper").status, 0);
 }
 
-void HttpClientApiTrustTest::asks_nobody_for_the_password_of_a_key()
+void HttpClientApiTrustTest::asksNobodyForThePasswordOfAKey()
 {
     const QString answer = m_folder.filePath(QStringLiteral("answer"));
     replace(answer, "secret\n");
@@ -135,13 +135,13 @@ void HttpClientApiTrustTest::asks_nobody_for_the_password_of_a_key()
     QCOMPARE(summary(plainGet("demanding")), kNoResponse);
 }
 
-void HttpClientApiTrustTest::trusts_the_given_authority()
+void HttpClientApiTrustTest::trustsTheGivenAuthority()
 {
     m_client->setSSLConfig(m_server.file("stranger-ca"), {}, {});
     QCOMPARE(plainGet("stranger").status, 200);
 }
 
-void HttpClientApiTrustTest::reads_a_replaced_authority_file()
+void HttpClientApiTrustTest::readsAReplacedAuthorityFile()
 {
     const QString authority = m_folder.filePath(QStringLiteral("authority.pem"));
     m_client->setSSLConfig(authority, {}, {});
@@ -151,14 +151,14 @@ void HttpClientApiTrustTest::reads_a_replaced_authority_file()
     QCOMPARE(plainGet("proper").status, 200);
 }
 
-void HttpClientApiTrustTest::presents_its_certificate()
+void HttpClientApiTrustTest::presentsItsCertificate()
 {
     m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
     QCOMPARE(plainGet("demanding").status, 200);
     QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
 }
 
-void HttpClientApiTrustTest::finds_the_key_in_the_file_of_the_certificate()
+void HttpClientApiTrustTest::findsTheKeyInTheFileOfTheCertificate()
 {
     const QString both = m_folder.filePath(QStringLiteral("both.pem"));
     replace(both, contentOf(m_server.file("client")) + contentOf(m_server.file("client-key")));
@@ -166,7 +166,7 @@ void HttpClientApiTrustTest::finds_the_key_in_the_file_of_the_certificate()
     QCOMPARE(plainGet("demanding").status, 200);
 }
 
-void HttpClientApiTrustTest::presents_the_certificate_of_its_latest_configuration()
+void HttpClientApiTrustTest::presentsTheCertificateOfItsLatestConfiguration()
 {
     m_client->setSSLConfig(m_server.file("ca"), {}, {});
     QCOMPARE(plainGet("proper").status, 200);

@@ -1,6 +1,6 @@
 #include "libvelkkpx.h"
+#include "log_recorder.h"
 #include "recorded_service.h"
-#include "warning_recorder.h"
 
 #include <QDir>
 #include <QSettings>
@@ -37,23 +37,23 @@ class LibvelkkpxTest : public QObject
 private Q_SLOTS:
     void init();
 
-    void switch_is_kept_under_its_name_data();
-    void switch_is_kept_under_its_name();
-    void hotspot_is_kept_as_number();
-    void control_center_lists_are_kept();
-    void list_of_one_empty_string_stays_one();
-    void file_is_in_the_home_folder_without_configuration_folder_data();
-    void file_is_in_the_home_folder_without_configuration_folder();
-    void other_content_of_the_file_is_kept();
-    void switch_that_cannot_be_kept_returns_the_error();
-    void switch_is_kept_although_the_file_was_damaged();
-    void lists_and_hotspot_that_cannot_be_kept_are_one_warning_each();
+    void switchIsKeptUnderItsName_data();
+    void switchIsKeptUnderItsName();
+    void hotspotIsKeptAsNumber();
+    void controlCenterListsAreKept();
+    void listOfOneEmptyStringStaysOne();
+    void fileIsInTheHomeFolderWithoutConfigurationFolder_data();
+    void fileIsInTheHomeFolderWithoutConfigurationFolder();
+    void otherContentOfTheFileIsKept();
+    void switchThatCannotBeKeptReturnsTheError();
+    void switchIsKeptAlthoughTheFileWasDamaged();
+    void listsAndHotspotThatCannotBeKeptAreOneWarningEach();
 
-    void reboot_asks_the_login_manager();
-    void logout_ends_the_own_session();
-    void call_that_fails_is_one_warning_data();
-    void call_that_fails_is_one_warning();
-    void absent_login_manager_is_one_warning();
+    void rebootAsksTheLoginManager();
+    void logoutEndsTheOwnSession();
+    void callThatFailsIsOneWarning_data();
+    void callThatFailsIsOneWarning();
+    void absentLoginManagerIsOneWarning();
 
 private:
     std::unique_ptr<QTemporaryDir> m_folder;
@@ -68,7 +68,7 @@ void LibvelkkpxTest::init()
     qputenv("XDG_CONFIG_HOME", QFile::encodeName(m_folder->path()));
 }
 
-void LibvelkkpxTest::switch_is_kept_under_its_name_data()
+void LibvelkkpxTest::switchIsKeptUnderItsName_data()
 {
     QTest::addColumn<SwitchSetter>("set");
     QTest::newRow("ShortcutKeyEnable") << &Libvelkkpx::SetShortcutKeyEnable;
@@ -80,7 +80,7 @@ void LibvelkkpxTest::switch_is_kept_under_its_name_data()
     QTest::newRow("UsbTrayIconClickable") << &Libvelkkpx::SetUsbTrayIconClickable;
 }
 
-void LibvelkkpxTest::switch_is_kept_under_its_name()
+void LibvelkkpxTest::switchIsKeptUnderItsName()
 {
     QFETCH(SwitchSetter, set);
     const QByteArray key = QTest::currentDataTag();
@@ -91,7 +91,7 @@ void LibvelkkpxTest::switch_is_kept_under_its_name()
     QCOMPARE(contentOf(m_file), "[restrictions]\n" + key + "=false\n");
 }
 
-void LibvelkkpxTest::hotspot_is_kept_as_number()
+void LibvelkkpxTest::hotspotIsKeptAsNumber()
 {
     m_control.SetHotspotEnable(1);
     QCOMPARE(contentOf(m_file), QByteArray("[restrictions]\nHotspotEnable=1\n"));
@@ -99,7 +99,7 @@ void LibvelkkpxTest::hotspot_is_kept_as_number()
     QCOMPARE(contentOf(m_file), QByteArray("[restrictions]\nHotspotEnable=0\n"));
 }
 
-void LibvelkkpxTest::control_center_lists_are_kept()
+void LibvelkkpxTest::controlCenterListsAreKept()
 {
     const QStringList modules = {QStringLiteral("network"), QStringLiteral("账户, all")};
     const QStringList extra = {QStringLiteral("a"), QString(), QStringLiteral("b")};
@@ -108,21 +108,21 @@ void LibvelkkpxTest::control_center_lists_are_kept()
     QCOMPARE(stored(m_file, QStringLiteral("ControlCenterExtra")).toStringList(), extra);
 }
 
-void LibvelkkpxTest::list_of_one_empty_string_stays_one()
+void LibvelkkpxTest::listOfOneEmptyStringStaysOne()
 {
     m_control.SetControlConfig({}, {QString()});
     QCOMPARE(stored(m_file, QStringLiteral("ControlCenterList")).toStringList(), QStringList());
     QCOMPARE(stored(m_file, QStringLiteral("ControlCenterExtra")).toStringList(), QStringList(QString()));
 }
 
-void LibvelkkpxTest::file_is_in_the_home_folder_without_configuration_folder_data()
+void LibvelkkpxTest::fileIsInTheHomeFolderWithoutConfigurationFolder_data()
 {
     QTest::addColumn<bool>("set");
     QTest::newRow("variable not set") << false;
     QTest::newRow("variable empty") << true;
 }
 
-void LibvelkkpxTest::file_is_in_the_home_folder_without_configuration_folder()
+void LibvelkkpxTest::fileIsInTheHomeFolderWithoutConfigurationFolder()
 {
     QFETCH(bool, set);
     const QByteArray home = qgetenv("HOME");
@@ -136,7 +136,7 @@ void LibvelkkpxTest::file_is_in_the_home_folder_without_configuration_folder()
         QVariant(QStringLiteral("true")));
 }
 
-void LibvelkkpxTest::other_content_of_the_file_is_kept()
+void LibvelkkpxTest::otherContentOfTheFileIsKept()
 {
     QVERIFY(QDir(m_folder->path()).mkdir(QStringLiteral("norix")));
     QFile file(m_file);
@@ -157,15 +157,15 @@ static void makeUnwritable(const QTemporaryDir& folder)
     QVERIFY(obstacle.open(QIODevice::WriteOnly));
 }
 
-void LibvelkkpxTest::switch_that_cannot_be_kept_returns_the_error()
+void LibvelkkpxTest::switchThatCannotBeKeptReturnsTheError()
 {
     makeUnwritable(*m_folder);
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     QCOMPARE(m_control.SetLauncherDisplayable(true), QStringLiteral("cannot write ") + m_file);
-    QCOMPARE(recorder.texts(), QStringList());
+    QCOMPARE(recorder.warnings(), QStringList());
 }
 
-void LibvelkkpxTest::switch_is_kept_although_the_file_was_damaged()
+void LibvelkkpxTest::switchIsKeptAlthoughTheFileWasDamaged()
 {
     QVERIFY(QDir(m_folder->path()).mkdir(QStringLiteral("norix")));
     QFile file(m_file);
@@ -178,21 +178,21 @@ void LibvelkkpxTest::switch_is_kept_although_the_file_was_damaged()
     QCOMPARE(contentOf(m_file), QByteArray("[restrictions]\nLauncherDisplayable=true\nOther=x\n"));
 }
 
-void LibvelkkpxTest::lists_and_hotspot_that_cannot_be_kept_are_one_warning_each()
+void LibvelkkpxTest::listsAndHotspotThatCannotBeKeptAreOneWarningEach()
 {
     makeUnwritable(*m_folder);
     const QString warning = QStringLiteral("cannot write ") + m_file;
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     m_control.SetHotspotEnable(1);
-    QCOMPARE(recorder.texts(), QStringList(warning));
+    QCOMPARE(recorder.warnings(), QStringList(warning));
     m_control.SetControlConfig({}, {});
-    QCOMPARE(recorder.texts(), QStringList({warning, warning}));
+    QCOMPARE(recorder.warnings(), QStringList({warning, warning}));
 }
 
-void LibvelkkpxTest::reboot_asks_the_login_manager()
+void LibvelkkpxTest::rebootAsksTheLoginManager()
 {
     const RecordedService logind(QDBusConnection::SystemBus, kLoginManager, answerNothing);
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     m_control.Reboot();
 
     QCOMPARE(logind.calls().size(), 1);
@@ -201,13 +201,13 @@ void LibvelkkpxTest::reboot_asks_the_login_manager()
     QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.login1.Manager"));
     QCOMPARE(call.member(), QStringLiteral("Reboot"));
     QCOMPARE(call.arguments(), QVariantList({false}));
-    QCOMPARE(recorder.texts(), QStringList());
+    QCOMPARE(recorder.warnings(), QStringList());
 }
 
-void LibvelkkpxTest::logout_ends_the_own_session()
+void LibvelkkpxTest::logoutEndsTheOwnSession()
 {
     const RecordedService logind(QDBusConnection::SystemBus, kLoginManager, answerNothing);
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     m_control.Logout();
 
     QCOMPARE(logind.calls().size(), 1);
@@ -216,38 +216,39 @@ void LibvelkkpxTest::logout_ends_the_own_session()
     QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.login1.Session"));
     QCOMPARE(call.member(), QStringLiteral("Terminate"));
     QCOMPARE(call.arguments(), QVariantList());
-    QCOMPARE(recorder.texts(), QStringList());
+    QCOMPARE(recorder.warnings(), QStringList());
 }
 
 using Action = void (Libvelkkpx::*)();
 Q_DECLARE_METATYPE(Action)
 
-void LibvelkkpxTest::call_that_fails_is_one_warning_data()
+void LibvelkkpxTest::callThatFailsIsOneWarning_data()
 {
     QTest::addColumn<Action>("act");
     QTest::newRow("Reboot") << &Libvelkkpx::Reboot;
     QTest::newRow("Terminate") << &Libvelkkpx::Logout;
 }
 
-void LibvelkkpxTest::call_that_fails_is_one_warning()
+void LibvelkkpxTest::callThatFailsIsOneWarning()
 {
     QFETCH(Action, act);
     const RecordedService logind(QDBusConnection::SystemBus, kLoginManager, [](const QDBusMessage& call) {
         return call.createErrorReply(QDBusError::AccessDenied, QStringLiteral("not allowed now"));
     });
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     (m_control.*act)();
-    QCOMPARE(recorder.texts(),
+    QCOMPARE(recorder.warnings(),
              QStringList(QStringLiteral("cannot call %1: not allowed now")
                              .arg(QString::fromUtf8(QTest::currentDataTag()))));
 }
 
-void LibvelkkpxTest::absent_login_manager_is_one_warning()
+void LibvelkkpxTest::absentLoginManagerIsOneWarning()
 {
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     m_control.Reboot();
-    QCOMPARE(recorder.texts().size(), 1);
-    QVERIFY2(recorder.texts().first().contains(kLoginManager), qUtf8Printable(recorder.texts().first()));
+    QCOMPARE(recorder.warnings().size(), 1);
+    QVERIFY2(recorder.warnings().first().contains(kLoginManager),
+             qUtf8Printable(recorder.warnings().first()));
 }
 
 QTEST_GUILESS_MAIN(LibvelkkpxTest)

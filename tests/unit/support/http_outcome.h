@@ -1,7 +1,7 @@
 #pragma once
 
 #include "httpclientapi.h"
-#include "warning_recorder.h"
+#include "log_recorder.h"
 
 /// What a caller of HttpClientApi sees of one request.
 struct HttpOutcome
@@ -15,21 +15,21 @@ struct HttpOutcome
 inline HttpOutcome get(HttpClientApi& client, const QString& url, const QString& body = {},
                        bool isJson = true)
 {
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     HttpOutcome outcome;
     outcome.status = client.getRequest(outcome.reply, url, body, isJson);
     outcome.headers = client.getRawHeader();
-    outcome.warnings = recorder.texts();
+    outcome.warnings = recorder.warnings();
     return outcome;
 }
 
 inline HttpOutcome put(HttpClientApi& client, const QString& url, const QString& body, bool isJson = true)
 {
-    const WarningRecorder recorder;
+    const LogRecorder recorder;
     HttpOutcome outcome;
     outcome.status = client.putRequest(outcome.reply, url, body, isJson);
     outcome.headers = client.getRawHeader();
-    outcome.warnings = recorder.texts();
+    outcome.warnings = recorder.warnings();
     return outcome;
 }
 
