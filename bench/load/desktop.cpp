@@ -71,7 +71,7 @@ public:
 
     void run()
     {
-        std::cout << "ready" << std::endl;
+        std::cout << "ready" << '\n' << std::flush;
         while (m_isWanted) {
             m_system.process();
             m_session.process();
@@ -96,14 +96,14 @@ private:
     {
         const std::string member = sd_bus_message_get_member(call);
         if (member == "UpdateUserInfo" || member == "onUploadFinished") {
-            std::cout << member << ' ' << now() << std::endl;
+            std::cout << member << ' ' << now() << '\n' << std::flush;
         } else if (member == m_row.kind) {
             countAnswer();
         }
         const bool isKnown = m_services.answer(call);
         if (member == "Get" && sd_bus_message_get_path(call) == Services::entryPath(m_size.dockEntries - 1)
             && ++m_readsOfLastEntry == kPropertiesOfEntry) {
-            std::cout << "entries " << now() << std::endl;
+            std::cout << "entries " << now() << '\n' << std::flush;
         }
         return isKnown;
     }
@@ -119,7 +119,7 @@ private:
             for (const auto latency : m_row.latencies) {
                 std::cout << ' ' << latency;
             }
-            std::cout << std::endl;
+            std::cout << '\n' << std::flush;
             m_row = {};
         }
     }

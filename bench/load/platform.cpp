@@ -63,7 +63,7 @@ public:
             m_begin = now();
         }
         if (m_unread == 0) {
-            std::cout << "listed " << now() << std::endl;
+            std::cout << "listed " << now() << '\n' << std::flush;
             return reply(count(), "[]");
         }
         const std::string number = std::to_string(m_unread);
@@ -91,14 +91,15 @@ public:
     void tellDrained()
     {
         const std::lock_guard lock(m_mutex);
-        std::cout << "drained " << m_begin << ' ' << now() << std::endl;
+        std::cout << "drained " << m_begin << ' ' << now() << '\n' << std::flush;
     }
 
     void tellCounts(int handshakes, uint64_t bytes, int resumed)
     {
         const std::lock_guard lock(m_mutex);
         std::cout << "counts " << handshakes << ' ' << m_lists << ' ' << m_reads << ' ' << bytes << ' '
-                  << resumed << std::endl;
+                  << resumed << '\n'
+                  << std::flush;
     }
 
 private:
@@ -194,7 +195,7 @@ private:
                 }
             } else {
                 stream.write(m_store.tips());
-                std::cout << "tips " << now() << std::endl;
+                std::cout << "tips " << now() << '\n' << std::flush;
             }
             const std::lock_guard lock(m_mutex);
             m_bytes += stream.bytes() - counted;
@@ -234,7 +235,7 @@ int main(int argc, char* argv[])
     const TlsContext context(argv[2], argv[3], argv[4]);
     FastPlatform platform(context, static_cast<uint16_t>(std::stoi(argv[1])));
     std::thread([&platform] { platform.serve(); }).detach();
-    std::cout << "ready" << std::endl;
+    std::cout << "ready" << '\n' << std::flush;
     std::string line;
     while (std::getline(std::cin, line)) {
         platform.obey(line);

@@ -17,7 +17,7 @@ void dropLine(QtMsgType, const QMessageLogContext&, const QString&) { }
 void require(bool condition, const char* what)
 {
     if (!condition) {
-        std::cerr << "not so: " << what << std::endl;
+        std::cerr << "not so: " << what << '\n' << std::flush;
         std::abort();
     }
 }

@@ -18,7 +18,7 @@ int main(int argc, char* argv[])
     for (int i = 1; i < argc; ++i) {
         const auto inputs = QDir(QString::fromLocal8Bit(argv[i])).entryInfoList(QDir::Files, QDir::Name);
         for (const QFileInfo& input : inputs) {
-            std::cout << qPrintable(input.fileName()) << std::endl;
+            std::cout << qPrintable(input.fileName()) << '\n' << std::flush;
             const QByteArray content = readBytes(input.filePath());
             LLVMFuzzerTestOneInput(reinterpret_cast<const std::uint8_t*>(content.constData()),
                                    static_cast<std::size_t>(content.size()));

@@ -15,8 +15,9 @@ void keepNoLargeBlocks()
 void giveMemoryBackAfterWork()
 {
     constexpr std::clock_t kMuchWork = CLOCKS_PER_SEC / 5;
+    const std::clock_t begin = std::clock();
     QObject::connect(QAbstractEventDispatcher::instance(), &QAbstractEventDispatcher::aboutToBlock,
-                     [last = std::clock()]() mutable {
+                     [last = begin]() mutable {
                          const std::clock_t now = std::clock();
                          if (now - last > kMuchWork) {
                              giveMemoryBack();

@@ -38,7 +38,7 @@ std::optional<QJsonObject> parsePolicyMessage(const QString& payload)
     if (error.error != QJsonParseError::NoError || !document.isObject()) {
         return std::nullopt;
     }
-    const QJsonObject message = document.object();
+    QJsonObject message = document.object();
     if (!message.contains(QLatin1String("type"))) {
         return std::nullopt;
     }
