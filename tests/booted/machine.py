@@ -170,6 +170,10 @@ class Machine:
         lines = Path(f"/proc/{self._boot.leader}/root/run/booted/events").read_text().splitlines()
         return [Event(**json.loads(line)) for line in lines]
 
+    def count(self, member: str, after: int) -> int:
+        """How often a member was called since then."""
+        return sum(event.member == member for event in self.events()[after:])
+
     def mark(self) -> int:
         """The place in `events` where what comes now begins."""
         return len(self.events())

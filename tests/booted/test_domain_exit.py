@@ -21,7 +21,7 @@ PROBES = {
     "service-manager": "systemctl --user show-environment",
     "bus": "busctl --user list",
     "setgid-folder": "mkdir -p ~/probe && chmod g+s ~/probe",
-    "readable-files": 'touch ~/made && test "$(stat -c %a ~/made)" = 644',
+    "readable-files": 'touch ~/made && test -n "$(find ~/made -perm -o=r)"',
     "personality": "setarch --addr-no-randomize true",
     "broken-pipe": 'yes | head -n 1; test "${PIPESTATUS[0]}" = 141',
     "open-files": 'test "$(ulimit -n)" -ge 1024',

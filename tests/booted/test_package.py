@@ -48,7 +48,7 @@ def program_of(machine: Machine, pid: int) -> str:
 def test_upgrade_and_downgrade_renew_each_running_agent_and_start_no_other(
     terminal: Machine, newer: Path
 ) -> None:
-    terminal.run("loginctl", "enable-linger", "bob")
+    terminal.run("systemctl", "start", f"user@{USERS['bob']}.service")  # a manager without a session
     terminal.log_in("alice")
     terminal.log_in("zhang@corp.example", "autostart")
     terminal.log_in("@li", kind="tty", seat="")
@@ -61,7 +61,7 @@ def test_upgrade_and_downgrade_renew_each_running_agent_and_start_no_other(
             assert program_of(terminal, fresh) == "/usr/bin/velks"
         assert terminal.agents() == [USERS["alice"], USERS["zhang@corp.example"]]
     assert terminal.session_names() == sessions
-    terminal.run("loginctl", "disable-linger", "bob")
+    terminal.run("systemctl", "stop", f"user@{USERS['bob']}.service")
 
 
 def test_upgrade_leaves_an_agent_alone_that_is_about_to_end_its_session(

@@ -3,6 +3,7 @@
 from __future__ import annotations
 
 import json
+from pathlib import Path
 
 import pytest
 
@@ -143,6 +144,16 @@ def test_machine_identifier_is_one_word(terminal: Terminal, identifier: str, res
 def test_machine_identifier_that_is_missing_is_bad(terminal: Terminal) -> None:
     terminal.files.remove(layout.MACHINE_ID)
     assert report(terminal).line("machine identifier", "cannot be read").result == "bad"
+
+
+@pytest.mark.parametrize("path", [layout.RESTORE_SCRIPT, layout.BACKUP_CONFIG])
+def test_file_that_the_exit_restores_from_is_a_warning_where_it_is_missing(
+    terminal: Terminal, path: Path
+) -> None:
+    make_all_well(terminal)
+    terminal.files.remove(path)
+    line = report(terminal).line("restore", "cannot be read")
+    assert (line.result, line.text.split()[0]) == ("warning", str(path))
 
 
 def test_changes_nothing(terminal: Terminal) -> None:

@@ -126,8 +126,18 @@ def test_platform_that_rejects_the_terminals_certificate_is_bad(working: Termina
 @pytest.mark.parametrize(
     ("fault", "text"),
     [
-        (HttpFault.reply(401), "answers, but does not accept this terminal or user (HTTP status 401)"),
-        (HttpFault.reply(403), "answers, but does not accept this terminal or user (HTTP status 403)"),
+        (
+            HttpFault.reply(400),
+            "answers, but does not accept this terminal's certificate or this user (HTTP status 400)",
+        ),
+        (
+            HttpFault.reply(401),
+            "answers, but does not accept this terminal's certificate or this user (HTTP status 401)",
+        ),
+        (
+            HttpFault.reply(403),
+            "answers, but does not accept this terminal's certificate or this user (HTTP status 403)",
+        ),
         (HttpFault.reply(500, b"[]"), "answers with HTTP status 500 instead of messages"),
         (HttpFault.reply(200, b"{}"), "answers with something else than messages"),
         (HttpFault.reply(200, b"<html>"), "answers with something else than messages"),

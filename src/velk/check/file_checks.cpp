@@ -88,6 +88,17 @@ bool isSoundIdentifier(const QString& identifier)
                        [](QChar character) { return character.isPrint() && !character.isSpace(); });
 }
 
+Finding checkRestoreFile(const QString& path, const QString& consequence)
+{
+    const QString subject = QStringLiteral("restore");
+    QFile file(path);
+    if (!file.open(QIODevice::ReadOnly)) {
+        return {Grade::Warning, subject,
+                QStringLiteral("%1 cannot be read (%2): %3").arg(path, file.errorString(), consequence)};
+    }
+    return {Grade::Good, subject, path + QStringLiteral(" can be read")};
+}
+
 } // namespace
 
 Findings checkInformationFile(const SessionUser& user)
@@ -125,6 +136,14 @@ Finding checkMachineIdentifier()
                     .arg(kMachineidPath)};
     }
     return {Grade::Good, subject, identifier};
+}
+
+Findings checkRestoreFiles()
+{
+    return {checkRestoreFile(kScriptsPath + QStringLiteral("restore_config.bash"),
+                             QStringLiteral("leaving the domain restores nothing but the desktop")),
+            checkRestoreFile(kBackupConfigPath,
+                             QStringLiteral("leaving the domain gives the desktop an empty control center"))};
 }
 
 } // namespace velk::check

@@ -11,4 +11,7 @@ Findings checkInformationFile(const SessionUser& user);
 /// The identifier that the platform knows the terminal by.
 Finding checkMachineIdentifier();
 
+/// What the exit from the domain restores from.
+Findings checkRestoreFiles();
+
 } // namespace velk::check

@@ -24,6 +24,7 @@ Findings checkAll()
     Findings findings{checkUser(user)};
     findings += checkInformationFile(user);
     findings += checkMachineIdentifier();
+    findings += checkRestoreFiles();
     if (user.isDomainUser) {
         findings += checkCertificates();
         findings += checkPlatform(user);

@@ -49,9 +49,12 @@ Finding checkPlatform(const SessionUser& user)
     if (answer.status == 0) {
         return {Grade::Bad, subject, QStringLiteral("does not answer: ") + CapturedLog::lastWarning()};
     }
-    if (answer.status == 401 || answer.status == 403) {
+    const QList<int> refusals{400, 401, 403, 495,
+                              496}; // a bad certificate is 400, 495 or 496 for web servers
+    if (refusals.contains(answer.status)) {
         return {Grade::Bad, subject,
-                QStringLiteral("answers, but does not accept this terminal or user (HTTP status %1)")
+                QStringLiteral(
+                    "answers, but does not accept this terminal's certificate or this user (HTTP status %1)")
                     .arg(answer.status)};
     }
     if (answer.status != 200) {

@@ -35,13 +35,12 @@ def record(who: str, member: str, args: list[Any], uid: int | None = None, pid: 
 
 
 class Services:
-    """Owns names on one bus. `answers` gives the replies; a member that is told to hang never gets one."""
+    """Owns names on one bus. `answers` gives the replies."""
 
     def __init__(self, who: str, bus: Any, names: list[str], answers: Answers) -> None:
         self._who = who
         self._bus = bus
         self._answers = answers
-        self._hanging: set[str] = set()
         bus.add_message_filter(self._on_message)
         for name in names:
             bus.request_name(name)
@@ -59,7 +58,7 @@ class Services:
         member = str(message.get_member())
         args = json.loads(json.dumps(message.get_args_list(), default=str))
         record(self._who, member, args, *self._sender(message.get_sender()))
-        if member in self._hanging or message.get_no_reply():
+        if message.get_no_reply():
             return
         key = (str(args[0]), f"{member} {args[1]}") if member in ("Get", "Set") else None
         known = self._answers.get(key or (str(message.get_interface()), member))
@@ -80,12 +79,11 @@ class Services:
         return found
 
     def _obey(self, message: Any) -> None:
-        """A test's wish: `Emit` a signal of strings, or let a member `Hang`."""
+        """A test's wish: `Emit` a signal of strings, or `EmitMany` of it."""
         args = [str(arg) for arg in message.get_args_list()]
-        if message.get_member() == "Hang":
-            self._hanging.add(args[0])
-        else:
-            path, interface, member, *values = args
+        times = int(args.pop(0)) if message.get_member() == "EmitMany" else 1
+        path, interface, member, *values = args
+        for _ in range(times):
             signal = dbus.lowlevel.SignalMessage(path, interface, member)
             signal.append(*values, signature="s" * len(values))
             self._bus.send_message(signal)
