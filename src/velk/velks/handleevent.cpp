@@ -81,7 +81,7 @@ HandleEvent::PlatformReply HandleEvent::requestPlatform(const char* operation, c
     return {status, body};
 }
 
-void HandleEvent::respondPlatformMsg(const QString& url, const QString& body)
+void HandleEvent::respondPlatformMsg(const QString& url, QString body)
 {
     QString ignoredReply;
     m_http->putRequest(ignoredReply, url, body, true);

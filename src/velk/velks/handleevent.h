@@ -30,7 +30,7 @@ public:
     void getPlatformMsg(const QString& url);
 
     /// Sends an answer to the platform; its reply is not looked at.
-    void respondPlatformMsg(const QString& url, const QString& body);
+    void respondPlatformMsg(const QString& url, QString body);
 
     /// Asks whether the user's password is about to expire, and shows the platform's notice one minute
     /// later if so.

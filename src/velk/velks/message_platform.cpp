@@ -59,7 +59,7 @@ FollowUps& followUpsOf(const MessagePlatform& platform)
 
 } // namespace
 
-MessagePlatform::MessagePlatform(QObject* parent, const QString& userName, MessageTransfer* transfer)
+MessagePlatform::MessagePlatform(QObject* parent, QString userName, MessageTransfer* transfer)
     : QObject(parent)
     , m_userName(userName)
     , m_transfer(transfer)
@@ -141,7 +141,7 @@ void MessagePlatform::unreadMessages(const QString& uid, const int& page, const 
 }
 
 int MessagePlatform::getNotifyMessageList(const QString& uid, bool isNotRead, int page, int limit,
-                                          const list_message_callback& callback)
+                                          list_message_callback callback)
 {
     NotifyMessageOption option;
     option.uid = uid;
@@ -152,7 +152,7 @@ int MessagePlatform::getNotifyMessageList(const QString& uid, bool isNotRead, in
 }
 
 int MessagePlatform::getNotifyMessageList(const NotifyMessageOption& option,
-                                          const list_message_callback& /*callback*/)
+                                          list_message_callback /*callback*/)
 {
     followUpsOf(*this).after([this, &option] { requestList(option); });
     return 0;

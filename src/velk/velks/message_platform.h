@@ -59,7 +59,7 @@ class MessagePlatform : public QObject
     Q_OBJECT
 
 public:
-    MessagePlatform(QObject* parent, const QString& userName, MessageTransfer* transfer);
+    MessagePlatform(QObject* parent, QString userName, MessageTransfer* transfer);
 
     bool isLdapUser();
     bool loadCfg();
@@ -75,8 +75,8 @@ public:
     /// Both request a list and return 0 when it and its follow-ups have been handled. Results reach the
     /// program through OnRecvMsg only; the callback is never called.
     int getNotifyMessageList(const QString& uid, bool isNotRead, int page, int limit,
-                             const list_message_callback& callback);
-    int getNotifyMessageList(const NotifyMessageOption& option, const list_message_callback& callback);
+                             list_message_callback callback);
+    int getNotifyMessageList(const NotifyMessageOption& option, list_message_callback callback);
 
     /// Marks one message read on the platform.
     void messageRespond(const QString& uuid);

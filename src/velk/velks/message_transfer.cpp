@@ -172,12 +172,12 @@ void MessageTransfer::restoreConfiguration()
     restoreDesktop();
 }
 
-void MessageTransfer::onSoftwareChanged(const QString& action, const QStringList& info)
+void MessageTransfer::onSoftwareChanged(QString action, QStringList info)
 {
     uploadSoftware(action, info);
 }
 
-void MessageTransfer::uploadSoftware(const QString& type, const QStringList& info)
+void MessageTransfer::uploadSoftware(QString type, QStringList info)
 {
     const int change = softwareChange(type);
     qDebug() << type << info;
@@ -270,13 +270,13 @@ void MessageTransfer::notifySend(const QString& msg, int timeout)
     HandleEvent::GetInstance()->sendMessage(kReminderTitle, msg, timeout);
 }
 
-void MessageTransfer::startTime(const QString& msg, int code)
+void MessageTransfer::startTime(QString msg, int code)
 {
     notifySend(msg, -1);
     startCountdown(code);
 }
 
-void MessageTransfer::rebootTime(const QString& msg, int code)
+void MessageTransfer::rebootTime(QString msg, int code)
 {
     constexpr uint defaultTimeout = static_cast<uint>(-1);
     HandleEvent::GetInstance()->sendMessage(QStringLiteral("reboot"), kReminderTitle, msg, QString(),

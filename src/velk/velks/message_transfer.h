@@ -40,10 +40,10 @@ public:
 
     /// Warns and starts the minute before the forced action of a policy code. A countdown that already
     /// runs starts again with the new code.
-    void startTime(const QString& msg, int code);
+    void startTime(QString msg, int code);
 
     /// As startTime, but the warning offers the reboot at once.
-    void rebootTime(const QString& msg, int code);
+    void rebootTime(QString msg, int code);
 
     /// Whether the session's user is a domain user; local accounts have uids up to 10000.
     bool isLdapUser();
@@ -57,11 +57,11 @@ public:
 
     /// Hands the daemon the full inventory, unless it is empty; before it a report of one change if type is
     /// "created" or "update". info is the software's display name and version, either may be missing.
-    void uploadSoftware(const QString& type, const QStringList& info);
+    void uploadSoftware(QString type, QStringList info);
 
 public Q_SLOTS:
     void onPolicyMsg(const QString& appID, const QString& payload);
-    void onSoftwareChanged(const QString& action, const QStringList& info);
+    void onSoftwareChanged(QString action, QStringList info);
     void onTimeout();
     void getUserState();
 
