@@ -76,6 +76,7 @@ def test_service_that_the_bus_can_start_is_started_and_read(terminal: Terminal, 
     terminal.events.wait_for(kind="command", member="start-service", after=mark)
     service.appear()
     terminal.commands.release("start-service")
+    terminal.sync()
     no = ACTIVE
     started = SCREEN_SAVER if name == "screensaver" else LOCKED
 
