@@ -119,7 +119,7 @@ QVariant __Entry::readNow(const QString& property)
     auto* watcher = ask(property);
     ++m_queuedBefore[property];
     connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, property, watcher] {
-        // An answer that comes while its watcher is being built is signalled twice.
+        // Counted once, even if QtDBus should signal an answer twice.
         watcher->disconnect(this);
         watcher->deleteLater();
         --m_queuedBefore[property];
