@@ -1,16 +1,16 @@
-# Options of every target that we compile; link velk_compile_options PRIVATE, so that programs built on
-# our libraries choose their own.
+# Options of all our targets; link velk_compile_options PRIVATE, so that programs built on our libraries choose their
+# own.
 add_library(velk_compile_options INTERFACE)
 
 target_compile_options(velk_compile_options INTERFACE
     -Wall -Wextra -Wpedantic -Wconversion -Wsign-conversion -Wshadow
     -Wold-style-cast -Wnon-virtual-dtor -Woverloaded-virtual -Wnull-dereference -Wformat=2
     $<$<BOOL:${VELK_WARNINGS_AS_ERRORS}>:-Werror>
-    # Log calls carry their source file: keep it relative to the tree, whatever the build machine.
+    # Log calls contain their source file: keep its name relative to the tree on every build machine.
     -fmacro-prefix-map=${PROJECT_SOURCE_DIR}/=)
 
 target_compile_definitions(velk_compile_options INTERFACE
-    # Release builds drop file, line and function of a log call unless told to keep them.
+    # By default, release builds drop file, line and function of log calls.
     QT_MESSAGELOGCONTEXT
     QT_NO_CAST_FROM_ASCII
     QT_NO_CAST_TO_ASCII

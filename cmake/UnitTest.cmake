@@ -2,9 +2,9 @@ find_package(Qt5 5.15 REQUIRED COMPONENTS Test)
 
 # velk_add_unit_test(<name> [USER domain|local] [MANUAL_CLOCK] [OWN_NETWORK] [LIBRARIES ...])
 #
-# Builds <name>.cpp, one QtTest executable, and runs it inside the simulated terminal: its own file view,
-# its own empty system and session bus, as the wanted user. MANUAL_CLOCK preloads a clock that the test moves
-# (see support/manual_clock.h). OWN_NETWORK gives the test a network that it may change.
+# Builds <name>.cpp, a QtTest executable, and runs it inside the simulated terminal as the given user, with its own file
+# system view and its own empty system and session bus. MANUAL_CLOCK preloads a clock that the test moves (see
+# support/manual_clock.h). OWN_NETWORK gives the test a network that it may change.
 function(velk_add_unit_test name)
     cmake_parse_arguments(PARSE_ARGV 1 arg "MANUAL_CLOCK;OWN_NETWORK" "USER" "LIBRARIES")
     if(NOT arg_USER)
@@ -28,7 +28,7 @@ function(velk_add_unit_test name)
             file(REAL_PATH "${asan}" asan)
             string(PREPEND preload "${asan} ")
         endif()
-        # QtTest's own time limit would count what the clock is moved ahead.
+        # QtTest's own time limit would include the time by which the clock is moved.
         set(wrapper env "LD_PRELOAD=${preload}" FAKETIME_TIMESTAMP_FILE=/tmp/clock FAKETIME_NO_CACHE=1
             QTEST_FUNCTION_TIMEOUT=86400000)
     endif()

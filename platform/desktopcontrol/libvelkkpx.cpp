@@ -10,8 +10,8 @@
 
 namespace {
 
-/// Calls a method of the login manager. A plain message, as a proxy object would first ask the service for
-/// its description, and wait once more for one that hangs.
+/// Calls a method of the login manager with a plain message: a proxy object would first introspect the
+/// service, and wait twice for one that hangs.
 void callLoginManager(const QString& path, const QString& interface, const QString& method,
                       const QVariantList& arguments)
 {
@@ -53,7 +53,7 @@ void warnOf(const QString& error)
 
 void Libvelkkpx::Reboot()
 {
-    const bool interactive = false; // nobody is asked for a password
+    const bool interactive = false; // no password dialog
     callLoginManager(QStringLiteral("/org/freedesktop/login1"),
                      QStringLiteral("org.freedesktop.login1.Manager"), QStringLiteral("Reboot"),
                      {interactive});

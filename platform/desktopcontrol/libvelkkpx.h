@@ -8,7 +8,7 @@
 /// keeps the desktop's restriction switches.
 ///
 /// The switches are in the user's configuration folder, norix/desktop-control.ini, group "restrictions", one
-/// key per switch, written before the setter returns. Whatever else the file holds is kept.
+/// key per switch, written before the setter returns. Other content of the file is kept.
 class Libvelkkpx : public QObject
 {
     Q_OBJECT
@@ -16,7 +16,7 @@ class Libvelkkpx : public QObject
 public:
     using QObject::QObject;
 
-    /// Both block until the login manager has answered; a failure is logged as one warning.
+    /// Both block until the login manager answers; a failure is logged as one warning.
     void Reboot();
     void Logout();
 

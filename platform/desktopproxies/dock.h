@@ -4,8 +4,8 @@
 #include <QDBusObjectPath>
 #include <QList>
 
-/// Proxy of the desktop's dock. It may be built before the dock is there, and follows whichever dock owns the
-/// name. The desktop's library gives its proxies names with underscores.
+/// Proxy of the desktop's dock. It may be built before the dock is on the bus, and addresses the name's
+/// current owner. The desktop's library gives its proxies names with underscores.
 // NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 class __Dock : public QDBusAbstractInterface
 {
@@ -17,7 +17,7 @@ public:
     __Dock(const QString& service, const QString& path, const QDBusConnection& connection,
            QObject* parent = nullptr);
 
-    /// The objects of the entries, in the dock's order, read now; empty if the dock does not answer.
+    /// The entries' objects, in the dock's order, read now; empty if the dock does not answer.
     QList<QDBusObjectPath> entries() const;
 
 Q_SIGNALS:

@@ -13,14 +13,14 @@ const QString kId = QStringLiteral("Id");
 const QString kName = QStringLiteral("Name");
 const QString kWindowInfos = QStringLiteral("WindowInfos");
 
-/// Whether a reading failed because no such entry exists. Any other error comes from an entry that does.
+/// Whether a read failed because the entry does not exist. All other errors come from an existing entry.
 bool saysThatNothingIsThere(const QDBusError& error)
 {
     switch (error.type()) {
     case QDBusError::ServiceUnknown:
     case QDBusError::UnknownObject:
     case QDBusError::UnknownInterface:
-    case QDBusError::UnknownMethod: // what older D-Bus libraries say of a missing object
+    case QDBusError::UnknownMethod: // older D-Bus libraries answer this for a missing object
     case QDBusError::Disconnected:
         return true;
     default:
@@ -28,13 +28,13 @@ bool saysThatNothingIsThere(const QDBusError& error)
     }
 }
 
-/// A text as it is; other types are not converted.
+/// A text; values of other types are not converted.
 QString textOf(const QVariant& value)
 {
     return value.type() == QVariant::String ? value.toString() : QString();
 }
 
-/// The windows of a map from their identifiers to values of any type; empty for anything else.
+/// The windows from a map of identifiers to values of any type; empty for anything else.
 std::optional<WindowInfoMap> windowInfosOf(const QVariant& value)
 {
     const auto argument = value.value<QDBusArgument>();
@@ -47,7 +47,7 @@ std::optional<WindowInfoMap> windowInfosOf(const QVariant& value)
         uint window = 0;
         argument.beginMapEntry();
         argument >> window;
-        argument.asVariant(); // goes past the value
+        argument.asVariant(); // skips the value
         argument.endMapEntry();
         infos.insert(window, {});
     }
@@ -63,7 +63,7 @@ __Entry::__Entry(const QString& service, const QString& path, const QDBusConnect
     , m_object{connection, service, path, QString::fromLatin1(staticInterfaceName())}
     , m_signals(EntrySignals::of(connection, service, m_object.interface))
 {
-    // Before anything is read, so that no change falls between.
+    // Subscribe before reading, so that no change is missed.
     m_signals->add(path, this);
     const QDBusReply<QDBusVariant> reply = m_object.get(kId);
     if (reply.isValid()) {
@@ -112,14 +112,14 @@ WindowInfoMap __Entry::windowInfos()
     return infos;
 }
 
-/// What the dock announced before its answer waits in this thread's queue ahead of it and is older; what it
-/// announced afterwards waits behind it and is news, even if it came before this thread woke up.
+/// Announcements that precede the dock's answer in this thread's queue are older than the value. Those that
+/// follow it are news, even if they arrived before this thread woke up.
 QVariant __Entry::readNow(const QString& property)
 {
     auto* watcher = ask(property);
     ++m_queuedBefore[property];
     connect(watcher, &QDBusPendingCallWatcher::finished, this, [this, property, watcher] {
-        // Counted once, even if QtDBus should signal an answer twice.
+        // Counted once, even if QtDBus signals an answer twice.
         watcher->disconnect(this);
         watcher->deleteLater();
         --m_queuedBefore[property];
@@ -129,8 +129,8 @@ QVariant __Entry::readNow(const QString& property)
     return reply.isError() ? QVariant() : reply.value().variant();
 }
 
-/// A call whose watcher is in time to be told of the answer at the answer's own place in the queue. One that
-/// comes later is told at a later place, so the dock is asked once more.
+/// A call whose watcher is notified at the answer's place in the queue. A watcher that was created after the
+/// answer arrived is notified at a later place, so the dock is asked again.
 QDBusPendingCallWatcher* __Entry::ask(const QString& property)
 {
     QDBusPendingCallWatcher* watcher = nullptr;
@@ -145,7 +145,7 @@ void __Entry::onPropertiesChanged(const QDBusMessage& signal)
 {
     const auto changed = qdbus_cast<QVariantMap>(signal.arguments().value(1));
     for (auto property = changed.cbegin(); property != changed.cend(); ++property) {
-        hear(property.key(), property.value());
+        receive(property.key(), property.value());
     }
     const QStringList invalidated = signal.arguments().value(2).toStringList();
     for (const QString& property : {kName, kWindowInfos}) {
@@ -159,11 +159,11 @@ void __Entry::onOwnSignal(const QDBusMessage& signal)
 {
     const QString suffix = QStringLiteral("Changed");
     if (signal.member().endsWith(suffix)) {
-        hear(signal.member().chopped(suffix.size()), signal.arguments().value(0));
+        receive(signal.member().chopped(suffix.size()), signal.arguments().value(0));
     }
 }
 
-void __Entry::hear(const QString& property, const QVariant& value)
+void __Entry::receive(const QString& property, const QVariant& value)
 {
     if (m_queuedBefore.value(property) == 0) {
         notice(property, value);

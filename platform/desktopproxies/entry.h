@@ -14,15 +14,15 @@
 
 /// Proxy of one entry of the desktop's dock. The desktop's library gives its proxies names with underscores.
 ///
-/// Docks announce changes in different ways: by the standard signal of properties, with the value or without
-/// it, or by signals of the entry's own. Each change is signalled once, with the value that was announced; a
-/// value that a dock only declares invalid is read without waiting.
+/// Docks announce changes in different ways: by PropertiesChanged, with or without the value, or by signals
+/// of the entry's own interface. Each change is signalled once, with the announced value; a value that a dock
+/// only invalidates is read without waiting.
 ///
-/// While the program is busy, announcements wait. Those about an entry that is only built and read afterwards
-/// are older than what was read, and are dropped; every later one is signalled, whatever else is read or
-/// built meanwhile. Until the event loop runs for the first time Qt holds all signals back, so what is
-/// announced between the first entry's subscription and an entry's own reading, some milliseconds, may be
-/// signalled although the value read includes it.
+/// Announcements queue while the program is busy. Those that are older than the value that has been read are
+/// dropped; every later one is signalled, whatever else is read or built meanwhile. One exception: until the
+/// event loop first runs, Qt holds all signals back. What a dock announces in the milliseconds between the
+/// first entry's subscription and an entry's own read may then be signalled although the value read includes
+/// it.
 // NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 class __Entry : public QObject, private EntryListener
 {
@@ -31,20 +31,20 @@ class __Entry : public QObject, private EntryListener
 public:
     static const char* staticInterfaceName() { return "com.norix.kpx.daemon.Dock.Entry"; }
 
-    /// Asks the dock for the entry's identifier, for the D-Bus time limit at most.
+    /// Reads the entry's identifier, for the D-Bus time limit at most.
     __Entry(const QString& service, const QString& path, const QDBusConnection& connection,
             QObject* parent = nullptr);
     ~__Entry() override;
     Q_DISABLE_COPY_MOVE(__Entry)
 
-    /// Whether the entry was there when the proxy was built. A dock that refused to answer, or was too slow,
-    /// has the entry all the same.
+    /// Whether the entry existed when the proxy was built. It counts as existing if the dock refused to
+    /// answer or was too slow.
     bool isValid() const;
 
-    /// The identifier never changes, so it is read again only if the dock did not tell it before.
+    /// The identifier never changes, so it is read again only if it could not be read before.
     QString id();
 
-    /// These read the dock's value now. They and id() wait for the D-Bus time limit at most and are empty or
+    /// These read the current value. They and id() wait for the D-Bus time limit at most, and are empty or
     /// false if the dock does not answer.
     QString name();
     bool isDocked() const;
@@ -60,7 +60,7 @@ private:
 
     QVariant readNow(const QString& property);
     QDBusPendingCallWatcher* ask(const QString& property);
-    void hear(const QString& property, const QVariant& value);
+    void receive(const QString& property, const QVariant& value);
     void readAgain(const QString& property);
     void notice(const QString& property, const QVariant& value);
     void noticeWindowInfos(const WindowInfoMap& infos);
@@ -69,13 +69,13 @@ private:
     desktopproxies::RemoteObject m_object;
     std::shared_ptr<EntrySignals> m_signals;
     bool m_isValid = true;
-    std::optional<QString> m_id; ///< unset until the dock has told it
-    // What has been read or signalled already.
+    std::optional<QString> m_id; ///< unset until it has been read
+    // The value last read or signalled.
     std::optional<QString> m_knownName;
     std::optional<QList<uint>> m_knownWindows;
-    /// By property: how many readings still have announcements older than themselves in the queue.
+    /// By property: how many reads still have older announcements in the queue.
     QHash<QString, int> m_queuedBefore;
-    /// Properties that are being read, and whether they have changed once more meanwhile. One read at a time
-    /// keeps a dock that declares faster than it answers from filling the memory.
+    /// Properties that are being read, and whether each was invalidated again since. Only one read runs at a
+    /// time, so that a dock that invalidates faster than it answers cannot fill the memory.
     QHash<QString, bool> m_reads;
 };

@@ -52,7 +52,7 @@ void EntrySignals::forEachListener(const QString& path, const std::function<void
 {
     const QList<EntryListener*> listeners = m_listeners.values(path);
     for (auto* listener : listeners) {
-        // A listener may cause others to be removed.
+        // A listener may remove others.
         if (m_listeners.contains(path, listener)) {
             call(*listener);
         }

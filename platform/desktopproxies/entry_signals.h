@@ -9,11 +9,11 @@
 
 class QDBusMessage;
 
-/// Hears what a dock announces of one entry.
+/// Receives a dock's announcements about one entry.
 class EntryListener
 {
 public:
-    /// The standard signal of properties.
+    /// The standard PropertiesChanged.
     virtual void onPropertiesChanged(const QDBusMessage& signal) = 0;
     /// A signal of the entry's own interface.
     virtual void onOwnSignal(const QDBusMessage& signal) = 0;
@@ -24,15 +24,15 @@ protected:
     Q_DISABLE_COPY_MOVE(EntryListener)
 };
 
-/// Passes the signals of a dock's entries on to their listeners. However many entries there are, there are
-/// only two subscriptions: Qt compares each signal with every subscription of a program.
+/// Passes a dock's signals to the entries' listeners. There are only two subscriptions, however many entries
+/// there are: Qt compares each signal with every subscription of a program.
 class EntrySignals : public QObject
 {
     Q_OBJECT
 
 public:
-    /// The shared instance for a dock on a bus and the interface of its entries; it lives as long as it is
-    /// held.
+    /// The shared instance for a dock on a bus and its entries' interface; it lives as long as it is
+    /// referenced.
     static std::shared_ptr<EntrySignals> of(const QDBusConnection& bus, const QString& service,
                                             const QString& interface);
 

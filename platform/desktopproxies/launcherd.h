@@ -5,8 +5,8 @@
 
 #include "types.h"
 
-/// Proxy of the desktop's launcher. The launcher's item types must be registered before its signal is
-/// connected or its method called. The desktop's library gives its proxies names with underscores.
+/// Proxy of the desktop's launcher. Register its item types before connecting the signal or calling the
+/// method. The desktop's library gives its proxies names with underscores.
 // NOLINTNEXTLINE(bugprone-reserved-identifier,cert-dcl37-c,cert-dcl51-cpp)
 class __Launcherd : public QDBusAbstractInterface
 {
@@ -18,7 +18,7 @@ public:
     __Launcherd(const QString& service, const QString& path, const QDBusConnection& connection,
                 QObject* parent = nullptr);
 
-    /// Asks for all items and does not wait.
+    /// Requests all items and does not wait.
     QDBusPendingReply<LauncherItemInfoList> GetAllItemInfos();
 
 Q_SIGNALS:

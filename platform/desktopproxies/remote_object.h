@@ -7,10 +7,10 @@
 #include <QString>
 #include <QVariant>
 
-/// Apart from what programs that link this library call by the same names.
+/// In a namespace: programs that link this library have a class of the same name.
 namespace desktopproxies {
 
-/// The D-Bus interface of every object's properties.
+/// The standard D-Bus interface for properties.
 inline const QString kPropertiesInterface = QStringLiteral("org.freedesktop.DBus.Properties");
 
 /// One interface of one object of a service.
@@ -24,11 +24,11 @@ struct RemoteObject
     /// The call that reads a property.
     QDBusMessage readCall(const QString& property) const;
 
-    /// Waits for a property's value, for the D-Bus time limit at most; an error if the service is absent,
-    /// hangs or has no such object or property.
+    /// Waits for a property's value, for the D-Bus time limit at most; an error if the service is absent or
+    /// hangs, or lacks the object or the property.
     QDBusReply<QDBusVariant> get(const QString& property) const;
 
-    /// The same, with an invalid value in place of the error.
+    /// Like get(), but an invalid value instead of the error.
     QVariant read(const QString& property) const;
 };
 

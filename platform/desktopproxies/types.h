@@ -6,8 +6,8 @@
 #include <QMetaType>
 #include <QString>
 
-/// One item of the desktop's launcher, in the order of its fields on the wire: (ssssxx). What the last four
-/// hold is the launcher's own business.
+/// One item of the desktop's launcher, its fields in the order on the wire: (ssssxx). Only the launcher knows
+/// the meaning of the last four.
 struct LauncherItemInfo
 {
     QString path; ///< desktop file
@@ -20,7 +20,7 @@ struct LauncherItemInfo
 
 using LauncherItemInfoList = QList<LauncherItemInfo>;
 
-/// One window of a dock entry. What a dock tells of it differs between docks and is not kept.
+/// One window of a dock entry. Its data varies between docks and is discarded.
 struct WindowInfo
 {
 };
@@ -35,7 +35,7 @@ Q_DECLARE_METATYPE(WindowInfo)
 QDBusArgument& operator<<(QDBusArgument& argument, const LauncherItemInfo& info);
 const QDBusArgument& operator>>(const QDBusArgument& argument, LauncherItemInfo& info);
 
-/// Make the types known to the meta-type system, under their names, and to D-Bus marshalling. Both are needed
-/// before the first launcher item is sent or received; calling them again changes nothing.
+/// Register the types with the meta-type system, under their names, and with D-Bus marshalling. Both are
+/// needed before the first launcher item is sent or received; further calls change nothing.
 void registerLauncherItemInfoMetaType();
 void registerLauncherItemInfoListMetaType();

@@ -11,11 +11,11 @@ template <typename Function> Function resolve(QLibrary& library, const char* nam
     if (function == nullptr) {
         qFatal("libcurl: %s", qUtf8Printable(library.errorString()));
     }
-    // What a library exports has no type. NOLINTNEXTLINE(cppcoreguidelines-pro-type-reinterpret-cast)
+    // Exported symbols have no type. NOLINTNEXTLINE(cppcoreguidelines-pro-type-reinterpret-cast)
     return reinterpret_cast<Function>(function);
 }
 
-/// Must come before anything else of libcurl, and once.
+/// Must be the first call of libcurl, and the only one of its kind.
 void initialise(QLibrary& library)
 {
     const CURLcode result =

@@ -2,11 +2,11 @@
 
 #include <curl/curl.h>
 
-/// libcurl's functions. The library is loaded and initialised by the first call of curl() and not with the
-/// program: some twenty-five libraries come along with it, which cost more than the rest of a start, and many
-/// users' agents never make a request.
+/// libcurl's functions. The first call of curl() loads and initialises the library, as many users' agents
+/// never make a request: libcurl brings some twenty-five libraries along, which cost more than the rest of a
+/// start.
 ///
-/// Where that fails, the program ends with a message, as the dynamic linker would do.
+/// If loading fails, the program ends with a message, as with the dynamic linker.
 struct CurlLibrary
 {
     decltype(&curl_easy_init) easyInit;

@@ -21,9 +21,9 @@ constexpr long kConnectLimitMs = 10'000;
 constexpr long kTotalLimitMs = 30'000;
 constexpr long kHttpVersion = CURL_HTTP_VERSION_1_1; // an enumerator or a long, by the library's version
 
-// The kernel asks an idle peer whether it is there, and gives the connection up when nothing comes back for
-// 10 s, be it a probe or a request that is on its way. So a path that died is mostly known as dead before the
-// next request, and otherwise leaves time for a new connection.
+// The kernel probes an idle connection, and drops the connection when a probe or a request is not
+// acknowledged for 10 s. So a dead path is usually noticed before the next request, and otherwise leaves time
+// for a new connection.
 constexpr long kProbeAfterSeconds = 40;
 constexpr long kProbeEverySeconds = 10;
 constexpr unsigned int kUnansweredLimitMs = 10'000;
@@ -35,7 +35,7 @@ size_t receive(char* data, size_t, size_t size, void* reception)
     return (static_cast<Reception*>(reception)->*add)(part) ? size : CURL_WRITEFUNC_ERROR;
 }
 
-// libcurl's own sockets would be inherited by every child process of the program.
+// libcurl's own sockets would be inherited by every child process.
 curl_socket_t openSocket(void*, curlsocktype, curl_sockaddr* address)
 {
     const int opened = socket(address->family, address->socktype | SOCK_CLOEXEC, address->protocol);
@@ -43,32 +43,24 @@ curl_socket_t openSocket(void*, curlsocktype, curl_sockaddr* address)
     return opened;
 }
 
-/// A lookup that hangs is left behind with a descriptor of its own.
+/// A hung lookup is abandoned together with a descriptor of its own.
 int beginLookup(void*, void*, void* lookup)
 {
     static_cast<std::optional<PrivateDescriptors>*>(lookup)->emplace();
     return 0;
 }
 
-/// Percent-encodes, as UTF-8, the characters that a request line cannot carry. QUrl would also alter others.
-/// A "#" is one of them: what follows it would be taken for a fragment, which is never sent.
+/// Percent-encodes, as UTF-8, the characters that a request line cannot carry; QUrl would alter others, too.
+/// "#" is included: a server never receives what follows it, the fragment.
 QByteArray encodedUrl(const QString& url)
 {
-    QByteArray encoded;
-    for (const char byte : url.toUtf8()) {
-        const auto code = static_cast<unsigned char>(byte);
-        if (code > 0x20 && code < 0x7f && byte != '#') {
-            encoded += byte;
-        } else {
-            encoded += '%' + QByteArray(1, byte).toHex().toUpper();
-        }
-    }
-    return encoded;
+    static const QByteArray alsoKept("!\"$%&'()*+,/:;<=>?@[\\]^`{|}"); // letters and digits are kept anyway
+    return url.toUtf8().toPercentEncoding(alsoKept);
 }
 
-/// One request, on a handle of its own: a used handle reads freed memory when the next response begins with a
-/// folded header line (seen in libcurl 7.88). What is worth keeping lives in `multi` and `share`: an easy
-/// handle that has to make a multi handle of its own opens and closes a pair of sockets for each request.
+/// One request, on a handle of its own: a reused handle reads freed memory when the next response begins with
+/// a folded header line (seen in libcurl 7.88). What is worth keeping lives in `multi` and `share`: an easy
+/// handle without a multi handle creates one and opens a pair of sockets for each request.
 class Exchange
 {
 public:
@@ -85,11 +77,11 @@ public:
         // HTTP/2 would lower-case the header names, which callers compare with their case.
         set(CURLOPT_HTTP_VERSION, kHttpVersion);
         set(CURLOPT_FOLLOWLOCATION, 0L);
-        set(CURLOPT_PROXY, ""); // not even one from the environment
+        set(CURLOPT_PROXY, ""); // nor one from the environment
         set(CURLOPT_CONNECTTIMEOUT_MS, kConnectLimitMs);
         set(CURLOPT_TIMEOUT_MS, kTotalLimitMs);
         set(CURLOPT_NOSIGNAL, 1L);
-        set(CURLOPT_QUICK_EXIT, 1L); // a hanging name lookup is left behind at the time limit
+        set(CURLOPT_QUICK_EXIT, 1L); // abandon a hung name lookup at the time limit
         set(CURLOPT_RESOLVER_START_FUNCTION, beginLookup);
         set(CURLOPT_RESOLVER_START_DATA, &m_lookup);
         set(CURLOPT_OPENSOCKETFUNCTION, openSocket);
@@ -102,15 +94,15 @@ public:
         set(CURLOPT_SSL_VERIFYPEER, 1L);
         set(CURLOPT_SSL_VERIFYHOST, 2L);
         set(CURLOPT_CAINFO, caCert.constData());
-        set(CURLOPT_CAPATH, nullptr); // by default the folder of authorities that the system trusts
-        set(CURLOPT_CA_CACHE_TIMEOUT, 0L); // the file may be replaced at any time
+        set(CURLOPT_CAPATH, nullptr); // not the system's trusted authorities, which are the default
+        set(CURLOPT_CA_CACHE_TIMEOUT, 0L); // reread the file, which may be replaced at any time
         if (!clientCert.isEmpty()) {
             set(CURLOPT_SSLCERT, clientCert.constData());
         }
         if (!clientKey.isEmpty()) {
             set(CURLOPT_SSLKEY, clientKey.constData());
         }
-        set(CURLOPT_KEYPASSWD, ""); // an encrypted key must fail, not ask on the terminal
+        set(CURLOPT_KEYPASSWD, ""); // fail on an encrypted key instead of asking for a password
     }
 
     void setRequest(const char* method, const QString& url)
@@ -129,7 +121,7 @@ public:
         set(CURLOPT_COPYPOSTFIELDS, content.constData());
     }
 
-    /// The status of the response; 0 when there is none.
+    /// The response's status; 0 if there is none.
     int run()
     {
         set(CURLOPT_ERRORBUFFER, m_error.data());
@@ -158,8 +150,8 @@ public:
     }
 
 private:
-    /// A connection is used for as long as the server keeps it, however long it was idle: libcurl alone would
-    /// drop it after 118 s.
+    /// Reuses a connection as long as the server keeps it; by default libcurl drops it after 118 s without
+    /// use.
     void setKeeping()
     {
         set(CURLOPT_MAXAGE_CONN, static_cast<long>(std::numeric_limits<int>::max()));
@@ -185,7 +177,7 @@ private:
         return result;
     }
 
-    // Nothing is sent once libcurl has rejected a setting.
+    // If libcurl has rejected a setting, nothing is sent.
     template <typename Value> void set(CURLoption option, Value value)
     {
         if (m_result == CURLE_OK) {
@@ -203,8 +195,8 @@ private:
     std::array<char, CURL_ERROR_SIZE> m_error{};
     std::unique_ptr<curl_slist, decltype(&curl_slist_free_all)> m_headerLines{nullptr, curl().slistFreeAll};
     Reception m_reception;
-    std::optional<PrivateDescriptors> m_lookup; ///< from the beginning of a name lookup
-    // The last member, so the first to go: it points to the others.
+    std::optional<PrivateDescriptors> m_lookup; ///< from the start of a name lookup
+    // The last member, so it is destroyed first: it points to the others.
     std::unique_ptr<CURL, decltype(&curl_easy_cleanup)> m_curl{curl().easyInit(), curl().easyCleanup};
 };
 
@@ -267,7 +259,7 @@ int HttpClientApi::request(const char* method, QString& reply, const QString& ur
     exchange.setTransport();
     exchange.setTls(m_caCert, m_clientCert, m_clientKey);
     exchange.setRequest(method, url);
-    // A GET without a body has no content at all; a PUT then has content of length 0.
+    // Without a body, a GET has no content and a PUT has content of length 0.
     if (!body.isEmpty() || qstrcmp(method, "GET") != 0) {
         exchange.setContent(body.toUtf8(), isJson);
     }

@@ -10,43 +10,41 @@
 
 /// Blocking HTTPS client (HTTP/1.1, TLS 1.2 or newer) with a client certificate.
 ///
-/// A request returns when the whole reply is in; no event loop runs meanwhile. Connections and TLS sessions
-/// are kept for the life of the object and reused: a connection for as long as the server keeps it, however
-/// long it was idle. The kernel notices within 50 s that the path of an idle one is dead; a request over one
-/// that died just now is sent again on a new connection after 10 s. Redirects are not followed and no proxy
-/// is used. Child processes inherit nothing of it.
+/// A request returns when the whole reply has arrived; no event loop runs meanwhile. Connections and TLS
+/// sessions are kept for the life of the object and reused as long as the server keeps them. The kernel
+/// notices within 50 s that the path of an idle connection is dead; a request on a path that has just died is
+/// sent again on a new connection after 10 s. Redirects are not followed and no proxy is used. Child
+/// processes inherit no descriptor of it.
 ///
 /// A request without a response (refused, TLS failure, time limit, truncated or oversized reply) returns 0,
 /// empties the reply and the raw headers, and logs one warning. Limits: 10 s to connect, 30 s in all; 8 MiB
-/// of body, 256 KiB of headers, of which libcurl takes at most 100 KiB in one line.
-/// A body that comes without a length ends where the connection ends: libcurl does not tell a cut from an
-/// end.
+/// of body, 256 KiB of headers, 100 KiB in a header line (libcurl's own limit). A body of undeclared
+/// length ends with the connection: libcurl does not distinguish a cut from an end.
 class HttpClientApi : public QObject
 {
     Q_OBJECT
 
 public:
-    /// This implementation has one mode only: the bool is part of the interface and has no effect.
+    /// The bool is part of the interface and has no effect here.
     HttpClientApi(QObject* parent, bool);
     ~HttpClientApi() override;
     Q_DISABLE_COPY_MOVE(HttpClientApi)
 
-    /// Paths of PEM files, read anew for each connection. The server's certificate and host name are verified
-    /// against `caCert` and nothing else: without it, every request fails. An empty `clientCert` means that
-    /// no client certificate is offered; an empty `clientKey`, that the key is in the certificate's file. An
-    /// encrypted key counts as unreadable.
+    /// Paths of PEM files, read again for each connection. The server's certificate and host name are
+    /// verified against `caCert` and nothing else: without it, every request fails. With an empty
+    /// `clientCert`, no client certificate is offered; with an empty `clientKey`, the key is read from the
+    /// certificate's file. An encrypted key counts as unreadable.
     void setSSLConfig(const QString& caCert, const QString& clientCert, const QString& clientKey);
 
     /// Requests `url`, with `body` as content unless it is empty, and returns the status (0: no response).
-    /// `reply` receives the body of the response, read as UTF-8. `isJson`: the content is declared as JSON,
-    /// otherwise no content type is sent. Characters of `url` that a request line cannot carry (control
-    /// characters, blanks, "#", those outside ASCII) go out percent-encoded as UTF-8; all else is sent as it
-    /// is.
+    /// `reply` receives the response's body, read as UTF-8. With `isJson`, the content type is JSON;
+    /// otherwise none is sent. Characters of `url` that a request line cannot carry (control characters,
+    /// blanks, "#", those outside ASCII) are percent-encoded as UTF-8; all else is sent unchanged.
     int getRequest(QString& reply, const QString& url, const QString& body, bool isJson);
     int putRequest(QString& reply, const QString& url, const QString& body, bool isJson);
 
     /// Headers of the last response, names and values as the server sent them, in their order. Interim
-    /// responses and trailers do not count.
+    /// responses and trailers are excluded.
     [[nodiscard]] QList<QPair<QByteArray, QByteArray>> getRawHeader() const;
 
 private:

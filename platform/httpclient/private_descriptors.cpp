@@ -14,8 +14,8 @@ std::set<int> openDescriptors()
     if (folder == nullptr) {
         return descriptors;
     }
-    while (const auto* entry = readdir(folder)) { // NOLINT(concurrency-mt-unsafe): safe for one's own stream
-        // "." and ".." count as 0, which is never new.
+    while (const auto* entry = readdir(folder)) { // NOLINT(concurrency-mt-unsafe): safe on its own stream
+        // "." and ".." parse as 0, which is never new.
         descriptors.insert(static_cast<int>(std::strtol(entry->d_name, nullptr, 10)));
     }
     descriptors.erase(dirfd(folder));

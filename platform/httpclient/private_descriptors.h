@@ -2,11 +2,11 @@
 
 #include <set>
 
-/// Keeps the file descriptors that the program opens while this object lives from child processes that it
-/// starts later.
+/// Keeps child processes started later from inheriting the file descriptors that the program opens while this
+/// object lives.
 ///
-/// For what libcurl opens without asking: the ends of the pipes by which it is woken up, and by which a name
-/// lookup tells its result. Both are left open for longer than the call that opened them.
+/// Needed for the pipes that libcurl opens internally: one wakes it up, one returns the result of a name
+/// lookup. Both stay open longer than the call that opened them.
 class PrivateDescriptors
 {
 public:

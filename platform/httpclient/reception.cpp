@@ -29,7 +29,7 @@ bool Reception::addHeaderLine(const QByteArray& line)
     } else if (line.startsWith("HTTP/")) {
         beginHeaders();
     }
-    // Any other line outside of a header block is a trailer.
+    // Outside a header block, any other line is a trailer.
     return true;
 }
 
@@ -39,7 +39,7 @@ void Reception::beginHeaders()
     m_inHeaders = true;
 }
 
-// Own parsing: libcurl's header iteration takes quadratic time, 20 s for the headers that the cap allows.
+// Parsed here: libcurl's header iteration takes quadratic time, 20 s for the headers that the cap allows.
 void Reception::addHeader(const QByteArray& line)
 {
     const QByteArray content = line.trimmed();

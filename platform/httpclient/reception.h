@@ -4,17 +4,17 @@
 #include <QList>
 #include <QPair>
 
-/// What has arrived of a reply. Refuses what exceeds a cap, 8 MiB of body or 256 KiB of headers, and then
-/// says why.
+/// The part of a reply that has arrived. Refuses what exceeds a cap, 8 MiB of body or 256 KiB of headers, and
+/// then gives the reason.
 class Reception
 {
 public:
     using Headers = QList<QPair<QByteArray, QByteArray>>;
 
     [[nodiscard]] const QByteArray& body() const { return m_body; }
-    /// Those of the last response: an interim response has a header block of its own.
+    /// The last response's headers: an interim response has its own header block.
     [[nodiscard]] const Headers& headers() const { return m_headers; }
-    /// Null if nothing was refused.
+    /// The reason; null if nothing was refused.
     [[nodiscard]] const char* refusal() const { return m_refusal; }
 
     bool addBody(const QByteArray& part);

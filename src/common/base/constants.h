@@ -2,8 +2,8 @@
 
 #include <QString>
 
-/// Paths of the files that the daemon installs and keeps, and the platform's address templates
-/// (%1 host, %2 port).
+/// Paths of the files that the daemon installs and maintains, and the platform's URL templates (%1 host, %2
+/// port).
 namespace velk {
 
 inline const QString kUserinfoPath = QStringLiteral("/etc/velk/userinfo.json");

@@ -40,7 +40,7 @@ bool openFile(FileProxy& file, const QString& path, QIODevice::OpenMode mode, co
     return opened;
 }
 
-/// Nothing if the file cannot be opened; an empty object if it holds none.
+/// Nothing if the file cannot be opened; an empty object if the file holds none.
 std::optional<QJsonObject> readUserInfo(FileProxy& file, const QString& operation)
 {
     if (!openFile(file, kUserinfoPath, QIODevice::ReadOnly, operation)) {
@@ -59,14 +59,14 @@ template <typename T> T readValue(const QString& key, const QString& operation, 
     T value{};
     FileProxy file;
     const auto info = readUserInfo(file, operation);
-    // True without a file is intended: callers take a terminal without it for one that is in no domain and
-    // has no alias, not for a broken one.
+    // Without a file ok is true: callers treat such a terminal as one outside every domain and without an
+    // alias, not as a broken one.
     report(ok, !info || BaseUtils::getJsonObjectValue(*info, key, value, operation));
     return value;
 }
 
-/// Takes the value of an older key where the key is missing, and writes it back under the key. False if
-/// neither is there, or if it cannot be written back.
+/// If the key is missing, takes the older key's value and writes it back under the key. False if neither
+/// exists or if writing back fails.
 bool readOrMigrate(const QJsonObject& info, const QString& key, const QString& olderKey, QString& value)
 {
     return BaseUtils::getJsonObjectValue(info, key, value, kGetUserInfo)
@@ -153,13 +153,13 @@ UserInfo FileContent::getUserInfo(bool* ok)
     FileProxy file;
     const auto info = readUserInfo(file, kGetUserInfo);
     if (!info) {
-        report(ok, true); // intended, as in readValue
+        report(ok, true); // as in readValue
         return result;
     }
     BaseUtils::getJsonObjectValue(*info, kIsDomain, result.isDomain, kGetUserInfo);
     BaseUtils::getJsonObjectValue(*info, kServerHost, result.serverHost, kGetUserInfo);
     readOrMigrate(*info, kDomainHost, kServerIp, result.domainHost);
-    // That only these three count for ok is intended: callers get by with what an older daemon recorded.
+    // ok depends on these three only: callers can work with what an older daemon recorded.
     const bool hasDomainPort = readOrMigrate(*info, kDomainPort, kServerPort, result.domainPort);
     const bool hasServerPort =
         BaseUtils::getJsonObjectValue(*info, kServerPort, result.serverPort, kGetUserInfo);

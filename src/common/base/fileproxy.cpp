@@ -14,7 +14,7 @@ bool FileProxy::open(const QString& fileName, QIODevice::OpenMode mode)
         m_file.close();
     }
     m_file.setFileName(fileName);
-    // Unbuffered, so that a write that fails is seen at once and not lost when the file is closed.
+    // Unbuffered, so that a failed write is noticed at once and not lost when the file is closed.
     const bool opened = m_file.open(mode | QIODevice::Unbuffered);
     if (!opened) {
         qWarning() << "open file failed, file:" << fileName << ", mode:" << mode

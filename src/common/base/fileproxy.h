@@ -6,8 +6,7 @@
 
 namespace velk::base {
 
-/// One file handle that logs why it could not be opened. It closes its file when it is opened anew and when
-/// it is destroyed.
+/// A file handle that logs why it could not be opened. Opening it again closes the previous file.
 class FileProxy : public QObject
 {
     Q_OBJECT
@@ -20,7 +19,7 @@ public:
 
     QByteArray readAll();
 
-    /// How many bytes reached the file: fewer than given on a full disk, -1 if none could be written.
+    /// The number of bytes written: fewer than given on a full disk, -1 if none could be written.
     qint64 write(const QByteArray& content);
 
 private:

@@ -4,7 +4,7 @@
 #include <QObject>
 #include <QString>
 
-/// Whole text files: reads one, or writes one together with its directories.
+/// Reads a whole text file, or writes one and creates its directories.
 class FileManager : public QObject
 {
     Q_OBJECT
@@ -12,12 +12,12 @@ class FileManager : public QObject
 public:
     static FileManager* GetInstance();
 
-    /// Writes in the encoding of the locale; the mode says whether it replaces or appends. Always true, even
-    /// if nothing could be written: intended, callers go on either way and must not rely on it.
+    /// Writes in the locale's encoding; the mode replaces or appends. Returns true even if writing failed:
+    /// callers ignore the result.
     bool writeFile(const QString& path, const QString& content, QIODevice::OpenMode mode);
 
-    /// The text up to the first NUL byte, read as UTF-8 with lines ending in "\n"; empty, with a warning, if
-    /// the file cannot be opened.
+    /// The text up to the first NUL byte, read as UTF-8 with "\n" line ends; empty, with a warning, if the
+    /// file cannot be opened.
     QString readFile(const QString& path);
 
 private:

@@ -4,7 +4,7 @@ namespace velk::module::message {
 
 namespace {
 
-/// What all parts of the hardware tell of themselves but for the network devices.
+/// The fields of all hardware parts other than network devices.
 template <typename Part> QJsonObject partToJson(const Part& part)
 {
     return {{QStringLiteral("sn"), part.sn}, {QStringLiteral("model"), part.model}};

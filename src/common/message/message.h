@@ -5,10 +5,10 @@
 #include <QString>
 #include <QStringList>
 
-/// The messages that a terminal uploads, as plain records, and their JSON forms, which contracts/json/
-/// describes (upload-*.schema.json).
+/// The messages that a terminal uploads, as plain records, and their JSON forms, which
+/// contracts/json/upload-*.schema.json describe.
 ///
-/// "Playload", "Graphisc" and "graphisc_list" are spelled as intended: the platform knows them so.
+/// Keep the spellings "Playload", "Graphisc" and "graphisc_list": the platform uses them.
 namespace velk::module::message {
 
 /// The envelope of a message.
@@ -46,14 +46,14 @@ struct DiskPlayload
 {
     QString sn;
     QString model;
-    qint64 cap = 0; ///< capacity; receivers that read numbers as doubles know it exactly up to 2^53
+    qint64 cap = 0; ///< capacity; receivers that read numbers as doubles get it exactly up to 2^53
 };
 
 struct MemoryPlayload
 {
     QString sn;
     QString model;
-    qint64 cap = 0; ///< capacity, as that of a disk
+    qint64 cap = 0; ///< capacity, as for a disk
 };
 
 struct MainboardPlayload
@@ -68,7 +68,7 @@ struct GraphiscPlayload
     QString model;
 };
 
-/// The terminal as a whole. Its parts are held in their JSON forms: each is the to_json of the part's record.
+/// The whole terminal. Its parts are held as JSON, each made by the part's to_json.
 struct SystemInfoPlayload
 {
     qint32 active_state = 0;
@@ -93,7 +93,7 @@ struct SystemInfoPlayload
     QJsonArray network_device_list;
 };
 
-/// The JSON form of a record. All keys are always there; empty texts and lists are written as such.
+/// The JSON form of a record, always with all keys; empty texts and lists are included.
 QJsonObject to_json(const Message& value);
 QJsonObject to_json(const TaskBody& value);
 QJsonObject to_json(const NetworkDevicePlayload& value);

@@ -4,8 +4,8 @@
 
 namespace velk::check {
 
-/// Keeps what the agent's classes log away from the report while it exists, and remembers the last warning,
-/// which says why something did not work. One at a time.
+/// While it exists, keeps log lines of the agent's classes out of the report and remembers the last warning,
+/// which gives the reason of a failure. One at a time.
 class CapturedLog
 {
 public:

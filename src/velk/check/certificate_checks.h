@@ -4,8 +4,7 @@
 
 namespace velk::check {
 
-/// The files that the agent meets the platform with: the platform's authority, the terminal's certificate
-/// and its key.
+/// The files for TLS with the platform: its authority, the terminal's certificate and its key.
 Findings checkCertificates();
 
 } // namespace velk::check

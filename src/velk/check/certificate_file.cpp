@@ -12,7 +12,7 @@ namespace velk::check {
 
 namespace {
 
-/// A whole file; `error` says why it cannot be read.
+/// A whole file; `error` is the reason if it cannot be read.
 QByteArray contentOf(const QString& path, QString& error)
 {
     QFile file(path);
@@ -28,7 +28,7 @@ std::unique_ptr<BIO, FreeOpenSsl> streamOf(const QByteArray& content)
     return std::unique_ptr<BIO, FreeOpenSsl>(BIO_new_mem_buf(content.constData(), content.size()));
 }
 
-/// Never a password: without this OpenSSL would ask for one on the terminal.
+/// Without this, OpenSSL would ask for a password on the terminal.
 int noPassword(char* /*buffer*/, int /*size*/, int /*writing*/, void* /*data*/)
 {
     return -1;
@@ -59,7 +59,7 @@ CertificateFile::CertificateFile(const QString& path)
         validUntil = certificates.empty() ? end : std::min(validUntil, end);
         certificates.push_back(std::move(next));
     }
-    // Where the file ends is told as an error, too.
+    // OpenSSL reports the end of the file as an error, too.
     const bool endsProperly = ERR_GET_REASON(ERR_peek_last_error()) == PEM_R_NO_START_LINE;
     ERR_clear_error();
     if (certificates.empty() || !endsProperly) {

@@ -21,18 +21,22 @@ struct FreeOpenSsl
 using Certificate = std::unique_ptr<X509, FreeOpenSsl>;
 using Key = std::unique_ptr<EVP_PKEY, FreeOpenSsl>;
 
-/// The certificates of a PEM file, the owner's own one first. `error` is empty on success.
+// Read with OpenSSL, as the agent's HTTPS client does. Qt's classes skip a broken certificate silently,
+// know no Ed25519 keys, and cannot say whether a key matches.
+
+/// The certificates of a PEM file, the owner's own first. `error` is empty on success.
 struct CertificateFile
 {
     explicit CertificateFile(const QString& path);
 
     std::vector<Certificate> certificates;
-    QDateTime validFrom; ///< when the last of them begins to be valid
-    QDateTime validUntil; ///< when the first of them ends to be valid
+    QDateTime validFrom; ///< when the last of them becomes valid
+    QDateTime validUntil; ///< when the first of them expires
     QString error;
 };
 
-/// The private key of a PEM file. An encrypted one counts as unreadable: nobody is there to be asked.
+/// The private key of a PEM file. An encrypted one counts as unreadable, as the agent cannot ask for a
+/// password.
 struct KeyFile
 {
     explicit KeyFile(const QString& path);

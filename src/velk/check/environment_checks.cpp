@@ -21,11 +21,11 @@ Finding checkPackageTool(const QString& program, const QString& package)
     }
     return {Grade::Warning, subject,
             program
-                + QStringLiteral(" does not work: reports of software are incomplete; it comes with %1")
+                + QStringLiteral(" does not work: software reports are incomplete; it comes with %1")
                       .arg(package)};
 }
 
-/// Properties of the unit by name, as the user's service manager tells them; none without one.
+/// The unit's properties by name, from the user's service manager; empty without one.
 QHash<QString, QString> unitProperties()
 {
     const QString output =
@@ -42,17 +42,17 @@ QHash<QString, QString> unitProperties()
     return found;
 }
 
-/// What an administrator needs to know of a unit that is not active.
+/// The cause and the remedy of a unit that is not active.
 QString unitTrouble(const QHash<QString, QString>& unit)
 {
     const QString state = unit.value(QStringLiteral("ActiveState"));
     if (unit.value(QStringLiteral("LoadState")) == QLatin1String("masked")) {
         return QStringLiteral(
-            "masked: somebody wants no agent here; systemctl unmask changes that, with --global or "
-            "--user as it was masked");
+            "masked: an administrator or the user has disabled the agent; systemctl unmask undoes that, "
+            "with --global or --user as it was masked");
     }
     if (unit.value(QStringLiteral("LoadState")) == QLatin1String("not-found")) {
-        return QStringLiteral("not known to the service manager; is the package installed whole?");
+        return QStringLiteral("unknown to the service manager; is the package fully installed?");
     }
     if (state == QLatin1String("activating")) {
         return QStringLiteral("about to start again after a failure; see journalctl --user -u velks");
@@ -90,28 +90,56 @@ QByteArray processName(const QString& folder)
     return file.open(QIODevice::ReadOnly) ? file.readAll().trimmed() : QByteArray();
 }
 
-QFileInfoList runningAgents()
+/// The kernel's status fields of a process: state, parent and others; empty if it has ended.
+QList<QByteArray> statusOf(const QFileInfo& process)
 {
-    QFileInfoList agents;
+    QFile file(process.filePath() + QStringLiteral("/stat"));
+    if (!file.open(QIODevice::ReadOnly)) {
+        return {};
+    }
+    const QByteArray content = file.readAll();
+    // They follow the name, which is in parentheses and may hold any characters.
+    return content.mid(content.lastIndexOf(") ") + 2).split(' ');
+}
+
+QFileInfoList processesOfThatName()
+{
+    QFileInfoList found;
     const QFileInfoList processes =
         QDir(QStringLiteral("/proc")).entryInfoList({QStringLiteral("[1-9]*")}, QDir::Dirs);
     for (const QFileInfo& process : processes) {
         if (process.ownerId() == getuid() && processName(process.filePath()) == "velks") {
+            found.append(process);
+        }
+    }
+    return found;
+}
+
+/// A forked child of the agent has the agent's name until it calls exec, but is not an agent.
+QFileInfoList runningAgents()
+{
+    const QFileInfoList named = processesOfThatName();
+    QList<QByteArray> pids;
+    for (const QFileInfo& process : named) {
+        pids.append(process.fileName().toLatin1());
+    }
+    QFileInfoList agents;
+    for (const QFileInfo& process : named) {
+        const QList<QByteArray> status = statusOf(process);
+        if (!status.isEmpty() && !pids.contains(status.value(1))) {
             agents.append(process);
         }
     }
     return agents;
 }
 
-/// Whether somebody has stopped a process without ending it.
+/// Whether a signal has stopped the process without ending it.
 bool isFrozen(const QFileInfo& process)
 {
-    QFile file(process.filePath() + QStringLiteral("/stat"));
-    // The state follows the name, which is in brackets and may hold anything.
-    return file.open(QIODevice::ReadOnly) && file.readAll().contains(") T ");
+    return statusOf(process).value(0) == "T";
 }
 
-/// Whether another program has taken the place of the one that a process runs, as in an upgrade.
+/// Whether the process's program file has been replaced, as by an upgrade.
 bool runsReplacedProgram(const QFileInfo& process)
 {
     return QFile::symLinkTarget(process.filePath() + QStringLiteral("/exe"))

@@ -4,7 +4,7 @@
 
 namespace velk::check {
 
-/// The package tools that the reports of software need. Each is run, 60 s at most.
+/// The package tools that software reports need. Runs each, for 60 s at most.
 Findings checkPackageTools();
 
 /// The agent's unit and its process: there must be exactly one agent.

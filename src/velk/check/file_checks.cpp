@@ -77,7 +77,7 @@ Finding checkTerminalName()
     const QString name = FileContent::getTerminalAlias(nullptr);
     if (name.isEmpty()) {
         return {Grade::Warning, subject,
-                QStringLiteral("the information file names none: reports of software go without it")};
+                QStringLiteral("the information file names none: software reports lack it")};
     }
     return {Grade::Good, subject, name};
 }
@@ -105,7 +105,7 @@ Findings checkInformationFile(const SessionUser& user)
 {
     Findings findings{checkReadable(user)};
     if (findings.constFirst().grade != Grade::Good) {
-        return findings; // what it lacks follows from that
+        return findings; // an unreadable file lacks everything
     }
     findings.append(checkDomain(user));
     if (user.isDomainUser) {
@@ -122,12 +122,12 @@ Finding checkMachineIdentifier()
     const QString identifier = FileContent::instace()->getMachineID(&read);
     if (!read) {
         return {Grade::Bad, subject,
-                QStringLiteral("%1 cannot be read: the platform cannot tell whose software is reported")
+                QStringLiteral("%1 cannot be read: software reports do not identify this terminal")
                     .arg(kMachineidPath)};
     }
     if (identifier.isEmpty()) {
         return {Grade::Bad, subject,
-                QStringLiteral("%1 is empty: the platform cannot tell whose software is reported")
+                QStringLiteral("%1 is empty: software reports do not identify this terminal")
                     .arg(kMachineidPath)};
     }
     if (!isSoundIdentifier(identifier)) {

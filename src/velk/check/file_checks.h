@@ -5,13 +5,13 @@
 
 namespace velk::check {
 
-/// The daemon's information file: whether it can be read, and what the agent misses in it.
+/// The daemon's information file: whether it can be read, and what it lacks.
 Findings checkInformationFile(const SessionUser& user);
 
-/// The identifier that the platform knows the terminal by.
+/// The terminal's identifier on the platform.
 Finding checkMachineIdentifier();
 
-/// What the exit from the domain restores from.
+/// The files that the exit from the domain restores from.
 Findings checkRestoreFiles();
 
 } // namespace velk::check

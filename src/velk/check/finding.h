@@ -7,16 +7,16 @@ namespace velk::check {
 
 enum class Grade {
     Good,
-    Warning, ///< the agent works, but not all of it
-    Bad, ///< the agent does not do its work
+    Warning, ///< part of the agent's work fails
+    Bad, ///< the agent cannot do its work
 };
 
 /// One line of the report.
 struct Finding
 {
     Grade grade;
-    QString subject; ///< what was looked at, in a word or two
-    QString text; ///< what was found, what follows from it, and what helps
+    QString subject; ///< what was checked, in a word or two
+    QString text; ///< the finding, its consequence and its remedy
 };
 
 using Findings = QList<Finding>;

@@ -38,7 +38,7 @@ Findings checkAll()
     return findings;
 }
 
-/// Whether the command line is understood. Help and version, if asked for, are shown and end the program.
+/// Whether the command line is valid. Shows help or version if asked for, and then ends the program.
 bool readCommandLine(QCommandLineParser& parser, const QStringList& arguments)
 {
     const QCommandLineOption help = parser.addHelpOption();
@@ -63,7 +63,7 @@ int main(int argc, char* argv[])
 
     QCommandLineParser parser;
     parser.setApplicationDescription(
-        QStringLiteral("Says whether the session agent velks can work in this session, and if not, why.\n"
+        QStringLiteral("Checks whether the session agent velks can work in this session, and if not, why.\n"
                        "Changes nothing. Exit status: 0 good, 1 warnings, 2 bad, 3 wrong usage."));
     const QCommandLineOption json(QStringLiteral("json"), QStringLiteral("Report as JSON."));
     parser.addOption(json);

@@ -39,7 +39,7 @@ Finding checkPlatform(const SessionUser& user)
     QString port;
     velk::base::FileContent::getHostAndPort(host, port);
     if (host.isEmpty() || port.isEmpty()) {
-        return {Grade::Bad, subject, QStringLiteral("cannot be asked: its address is not known")};
+        return {Grade::Bad, subject, QStringLiteral("cannot be reached: its address is unknown")};
     }
 
     const QString url = kUrlHead.arg(host, port)
@@ -50,7 +50,7 @@ Finding checkPlatform(const SessionUser& user)
         return {Grade::Bad, subject, QStringLiteral("does not answer: ") + CapturedLog::lastWarning()};
     }
     const QList<int> refusals{400, 401, 403, 495,
-                              496}; // a bad certificate is 400, 495 or 496 for web servers
+                              496}; // web servers answer 400, 495 or 496 to a bad certificate
     if (refusals.contains(answer.status)) {
         return {Grade::Bad, subject,
                 QStringLiteral(
@@ -62,7 +62,7 @@ Finding checkPlatform(const SessionUser& user)
                 QStringLiteral("answers with HTTP status %1 instead of messages").arg(answer.status)};
     }
     if (!QJsonDocument::fromJson(answer.body.toUtf8()).isArray()) {
-        return {Grade::Bad, subject, QStringLiteral("answers with something else than messages")};
+        return {Grade::Bad, subject, QStringLiteral("answers with something other than messages")};
     }
     return {Grade::Good, subject, QStringLiteral("answers and accepts this terminal")};
 }

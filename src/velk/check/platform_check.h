@@ -5,8 +5,8 @@
 
 namespace velk::check {
 
-/// Asks the platform for one unread message, the way the agent does, and neither shows it nor marks it read.
-/// Takes 30 s at most. Needs a CapturedLog, which knows why there was no answer.
+/// Requests one unread message from the platform, as the agent does, but neither shows it nor marks it read.
+/// Takes 30 s at most. Needs a CapturedLog for the reason of a missing answer.
 Finding checkPlatform(const SessionUser& user);
 
 } // namespace velk::check

@@ -31,8 +31,7 @@ QString conclusionOf(Grade grade)
     case Grade::Good:
         return QStringLiteral("The agent can do its work in this session.");
     case Grade::Warning:
-        return QStringLiteral(
-            "The agent can work in this session, but not all of its work; see the warnings.");
+        return QStringLiteral("The agent can do only part of its work in this session; see the warnings.");
     case Grade::Bad:
         break;
     }

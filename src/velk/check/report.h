@@ -6,13 +6,13 @@
 
 namespace velk::check {
 
-/// The worst grade of all.
+/// The worst grade of the findings; good without findings.
 Grade overall(const Findings& findings);
 
-/// One line per finding with its mark in front, and one that says what it all comes to.
+/// One line per finding, its mark first, and a concluding line.
 QByteArray textReport(const Findings& findings);
 
-/// The same for machines: {"result": MARK, "findings": [{"result": MARK, "subject": ..., "text": ...}]}.
+/// As JSON: {"result": MARK, "findings": [{"result": MARK, "subject": ..., "text": ...}]}.
 QByteArray jsonReport(const Findings& findings);
 
 } // namespace velk::check

@@ -1,8 +1,11 @@
 #include "service_checks.h"
 
+#include <QDBusArgument>
 #include <QDBusConnection>
 #include <QDBusError>
 #include <QDBusMessage>
+#include <QDBusObjectPath>
+#include <QDBusVariant>
 
 #include "remote_object.h"
 #include "services.h"
@@ -11,9 +14,9 @@ namespace velk::check {
 
 namespace {
 
-constexpr int kPatienceMs = 2000; // for an answer that a service has at hand
+constexpr int kPatienceMs = 2000; // for an answer that takes a service no work
 
-/// A call that changes nothing; no object if the service need not be asked.
+/// A call that changes nothing; no object if the service need not be called.
 struct Question
 {
     QString object;
@@ -44,7 +47,7 @@ QList<Service> systemServices()
          QStringLiteral("no policy arrives, nothing is reported"),
          {QStringLiteral("/com/norix/velk/velkg"), service::kDaemon, QStringLiteral("GetMachineID"), {}}},
         {service::kLoginManager, Grade::Bad,
-         QStringLiteral("the user's name is not known, nobody can be logged out"),
+         QStringLiteral("the user's name is unknown, and policies cannot log the user out"),
          property(QStringLiteral("/org/freedesktop/login1/user/self"),
                   QStringLiteral("org.freedesktop.login1.User"), QStringLiteral("Name"))},
         {service::kIdentityService, Grade::Warning,
@@ -78,7 +81,7 @@ QDBusMessage ask(const QDBusConnection& bus, const QString& name, const Question
     return bus.call(call, QDBus::Block, kPatienceMs);
 }
 
-/// Why a service that is on the bus is of no use to this user; empty if it answers.
+/// Why this user cannot use a service that is on the bus; empty if it answers.
 QString troubleWith(const QDBusConnection& bus, const Service& service)
 {
     if (service.question.object.isEmpty()) {
@@ -123,7 +126,7 @@ Findings checkBus(const QDBusConnection& bus, const QString& kind, const QList<S
     return findings;
 }
 
-/// The reboot at the exit from the domain is the user's own call, which the login manager may refuse.
+/// The user's session requests the reboot at the exit from the domain; the login manager may refuse it.
 Findings checkReboot(const QDBusConnection& bus)
 {
     const QDBusMessage reply = ask(bus, service::kLoginManager,
@@ -131,18 +134,69 @@ Findings checkReboot(const QDBusConnection& bus)
                                     QStringLiteral("org.freedesktop.login1.Manager"),
                                     QStringLiteral("CanReboot"),
                                     {}});
-    if (reply.type() != QDBusMessage::ReplyMessage) {
-        return {}; // a login manager that does not answer has its line already
+    const bool isDenied = QDBusError(reply).type() == QDBusError::AccessDenied; // without a policy kit
+    if (reply.type() != QDBusMessage::ReplyMessage && !isDenied) {
+        return {}; // checkService() has reported a login manager that does not answer
     }
-    const QString answer = reply.arguments().value(0).toString();
+    const QString answer = isDenied ? reply.errorMessage() : reply.arguments().value(0).toString();
     const QString subject = QStringLiteral("reboot");
     if (answer == QLatin1String("yes")) {
         return {{Grade::Good, subject, QStringLiteral("is permitted to this user now")}};
     }
     return {{Grade::Warning, subject,
-             QStringLiteral("would be refused now (%1): leaving the domain would not end with it; "
-                            "docs/terminal.md of the package says why and what helps")
+             QStringLiteral("would be refused now (%1): the domain exit would not reboot; "
+                            "docs/terminal.md of the package gives causes and remedies")
                  .arg(answer)}};
+}
+
+/// A property of the user or of a session; invalid if the login manager does not answer.
+QVariant loginProperty(const QDBusConnection& bus, const QString& object, const QString& kind,
+                       const QString& name)
+{
+    const QString interface = QStringLiteral("org.freedesktop.login1.") + kind;
+    const QDBusMessage reply = ask(bus, service::kLoginManager, property(object, interface, name));
+    return reply.arguments().value(0).value<QDBusVariant>().variant();
+}
+
+/// The login manager's type, class and activity of one session.
+Finding judgeSession(const QString& type, const QString& sessionClass, bool isActive)
+{
+    const QString subject = QStringLiteral("session");
+    const bool isGraphical = type == QLatin1String("x11") || type == QLatin1String("wayland");
+    if (!isGraphical || !sessionClass.startsWith(QLatin1String("user"))) {
+        return {Grade::Bad, subject,
+                QStringLiteral("this user has no graphical one: nobody sees a warning, and a policy may end "
+                               "another session; systemctl --user stop velks ends an agent that is left "
+                               "without its session")};
+    }
+    return {Grade::Good, subject,
+            QStringLiteral("is graphical (%1)").arg(type)
+                + (isActive ? QString() : QStringLiteral(", in the background"))};
+}
+
+/// The session that the login manager prefers among those of the user, which a policy ends.
+Findings checkSession(const QDBusConnection& bus)
+{
+    const QVariant display = loginProperty(bus, QStringLiteral("/org/freedesktop/login1/user/self"),
+                                           QStringLiteral("User"), QStringLiteral("Display"));
+    if (display.userType() != qMetaTypeId<QDBusArgument>()) {
+        return {}; // checkService() has reported a login manager that does not answer
+    }
+    QString name;
+    QDBusObjectPath object;
+    const auto content = display.value<QDBusArgument>();
+    content.beginStructure();
+    content >> name >> object;
+    content.endStructure();
+    if (name.isEmpty()) {
+        return {judgeSession({}, {}, false)};
+    }
+    const auto ofSession = [&](const QString& property) {
+        return loginProperty(bus, object.path(), QStringLiteral("Session"), property);
+    };
+    return {judgeSession(ofSession(QStringLiteral("Type")).toString(),
+                         ofSession(QStringLiteral("Class")).toString(),
+                         ofSession(QStringLiteral("Active")).toBool())};
 }
 
 } // namespace
@@ -151,6 +205,7 @@ Findings checkServices()
 {
     const QDBusConnection system = QDBusConnection::systemBus();
     Findings findings = checkBus(system, QStringLiteral("system"), systemServices());
+    findings += checkSession(system);
     findings += checkReboot(system);
     findings += checkBus(QDBusConnection::sessionBus(), QStringLiteral("session"), sessionServices());
     return findings;

@@ -4,8 +4,8 @@
 
 namespace velk::check {
 
-/// The services that the agent speaks with: whether they are on their buses now, and whether those without
-/// which the agent is of no use answer to this user. None is started, and nothing is changed.
+/// The services that the agent uses: whether they are on their buses now, and whether those that the agent
+/// cannot do without answer to this user. Starts and changes nothing.
 Findings checkServices();
 
 } // namespace velk::check

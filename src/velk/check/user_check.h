@@ -6,7 +6,7 @@
 
 namespace velk::check {
 
-/// Whose session this is. Only domain users get messages of the platform.
+/// The session's user. Only domain users get messages of the platform.
 struct SessionUser
 {
     QString loginName; ///< empty without an account entry

@@ -1,12 +1,12 @@
 #pragma once
 
-#include "pryg_introspection.h"
-
 #include <QDBusAbstractAdaptor>
 
-/// Exports the device-control policy service's interface from its parent: a call goes to the parent's
-/// invokable method of the same name, and has no effect on a parent without one; a signal of the parent of
-/// the same name goes out on the bus. The mixed case of the names is what is on the wire.
+#include "pryg_introspection.h"
+
+/// Exports the device-control policy service's interface from its parent: a call invokes the parent's
+/// invokable method of the same name, and does nothing if the parent lacks it; the parent's signals of the
+/// same name are sent on the bus. The mixed case of the names is that of the wire.
 class prygAdapter : public QDBusAbstractAdaptor
 {
     Q_OBJECT

@@ -1,13 +1,13 @@
 #pragma once
 
-#include "pryg_introspection.h"
-
 #include <QDBusAbstractInterface>
 #include <QDBusPendingReply>
 
+#include "pryg_introspection.h"
+
 /// Proxy of the device-control policy service's interface. Each slot sends its call at once and does not
-/// wait; a caller that drops the pending reply drops the call's error with it. The mixed case of the names is
-/// what is on the wire.
+/// wait; a caller that drops the pending reply ignores errors. The mixed case of the names is that of the
+/// wire.
 class prygInterface : public QDBusAbstractInterface
 {
     Q_OBJECT

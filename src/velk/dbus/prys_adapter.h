@@ -1,11 +1,11 @@
 #pragma once
 
-#include "prys_introspection.h"
-
 #include <QDBusAbstractAdaptor>
 
-/// Exports the session policy service's interface from its parent: the call goes to the parent's invokable
-/// method of the same name, and has no effect on a parent without one.
+#include "prys_introspection.h"
+
+/// Exports the session policy service's interface from its parent: the call invokes the parent's invokable
+/// method of the same name, and does nothing if the parent lacks it.
 class prysAdapter : public QDBusAbstractAdaptor
 {
     Q_OBJECT

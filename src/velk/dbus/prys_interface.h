@@ -1,17 +1,17 @@
 #pragma once
 
-#include "prys_introspection.h"
-#include "unread_calls.h"
-
 #include <QDBusAbstractInterface>
 #include <QDBusPendingReply>
 
+#include "prys_introspection.h"
+#include "unread_calls.h"
+
 /// Proxy of the session policy service's interface, on the session bus.
 ///
-/// The slot sends its call at once and does not wait; a caller that drops the pending reply drops the call's
-/// error with it, as when the service is absent. No number of calls is too many for the bus: behind 64 that
-/// the service has not answered yet, and for a text of more than 65,536 characters, the call goes out without
-/// asking for a reply. Its pending reply is finished at once and is no error, whatever becomes of the call.
+/// The slot sends its call at once and does not wait. A caller that drops the pending reply ignores errors,
+/// such as an absent service. The bus never refuses a call, however many are sent: with more than 65,536
+/// characters, or while 64 are unanswered, a call is sent without asking for a reply. Its pending reply is
+/// finished at once and is never an error.
 class prysInterface : public QDBusAbstractInterface
 {
     Q_OBJECT

@@ -9,13 +9,13 @@
 
 namespace {
 
-// Half of what a system bus allows leaves room for the calls whose replies are read.
+// Half of a system bus's limit, which leaves room for calls whose replies are read.
 constexpr int kMostUnanswered = 64;
 
-// Qt keeps a call, with all that it carries, until it is answered or times out.
+// Qt keeps a call and its arguments until it is answered or times out.
 constexpr int kMostCharacters = 65536;
 
-/// The length of all texts among the arguments.
+/// The total length of the arguments' texts.
 int characters(const QVariantList& arguments)
 {
     return std::accumulate(arguments.cbegin(), arguments.cend(), 0, [](int sum, const QVariant& argument) {

@@ -5,13 +5,12 @@
 
 class QDBusAbstractInterface;
 
-/// Sends calls that return nothing, which callers mostly drop the replies of.
+/// Sends calls without a return value, whose replies most callers drop.
 ///
-/// A bus refuses further calls of a program that has too many unanswered (128 on a system bus), and each one
-/// costs memory until it is answered or times out. So a call asks for a reply only while fewer than 64 are
-/// unanswered, whichever these are, and none does that carries more than 65,536 characters; the others are
-/// sent without, and their pending call counts as finished at once, without an error: no call is lost,
-/// however many there are and whatever their size.
+/// A bus refuses calls of a program that has too many unanswered ones (128 on a system bus), and each call
+/// takes memory until it is answered or times out. So a call asks for a reply only while fewer than 64 are
+/// unanswered and if it holds at most 65,536 characters. Other calls are sent without, and their pending call
+/// is finished at once without an error. No call is lost, whatever the number and size.
 class UnreadCalls
 {
 public:
@@ -19,5 +18,5 @@ public:
                           const QVariantList& arguments);
 
 private:
-    QList<QDBusPendingCall> m_unanswered; ///< those answered meanwhile go with the next call
+    QList<QDBusPendingCall> m_unanswered; ///< and answered ones, which the next call removes
 };

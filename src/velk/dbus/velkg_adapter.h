@@ -1,12 +1,12 @@
 #pragma once
 
-#include "velkg_introspection.h"
-
 #include <QDBusAbstractAdaptor>
 
-/// Exports the system daemon's interface from its parent: a call goes to the parent's invokable method of the
-/// same name, a signal of the parent of the same name goes out on the bus. A parent without the method
-/// answers 0, an empty text or nothing. The mixed case of the names is what is on the wire.
+#include "velkg_introspection.h"
+
+/// Exports the system daemon's interface from its parent: a call invokes the parent's invokable method of the
+/// same name, and the parent's signals of the same name are sent on the bus. If the parent lacks the method,
+/// the answer is 0, an empty text or nothing. The mixed case of the names is that of the wire.
 class velkgAdapter : public QDBusAbstractAdaptor
 {
     Q_OBJECT

@@ -1,22 +1,22 @@
 #pragma once
 
-#include "unread_calls.h"
-#include "velkg_introspection.h"
-
 #include <QDBusAbstractInterface>
 #include <QDBusPendingReply>
+
+#include "unread_calls.h"
+#include "velkg_introspection.h"
 
 /// Proxy of the system daemon's interface, on the system bus.
 ///
 /// Each slot sends its call at once and does not wait. A caller that reads the value blocks until the reply
-/// is there, for D-Bus's default time at most, and asks isError() first: Qt hands out a failed call's error
-/// text as the value of a text. The proxy may be built before the daemon is on the bus: it serves whichever
-/// daemon owns the name at the moment. The mixed case of the names is what is on the wire.
+/// arrives, for D-Bus's default time limit at most, and must check isError() first: Qt returns the error text
+/// of a failed call as the value of a text. The proxy may be built before the daemon is on the bus; it
+/// addresses the name's current owner. The mixed case of the names is that of the wire.
 ///
-/// A caller that drops the pending reply drops the call's error with it. No number of calls without a value
-/// (QDBusPendingReply<>) is too many for the bus: behind 64 of them that the daemon has not answered yet, and
-/// with texts of more than 65,536 characters, such a call goes out without asking for a reply. Its pending
-/// reply is finished at once and is no error, whatever becomes of the call.
+/// A caller that drops the pending reply ignores errors. The bus never refuses a call without a value
+/// (QDBusPendingReply<>), however many are sent: with more than 65,536 characters, or while 64 are
+/// unanswered, it is sent without asking for a reply. Its pending reply is finished at once and is never an
+/// error.
 class velkgInterface : public QDBusAbstractInterface
 {
     Q_OBJECT

@@ -33,7 +33,7 @@ AppOpenSpy* AppOpenSpy::instance()
 
 AppOpenSpy::AppOpenSpy()
 {
-    // Queued before the dock is listened to, so that it also runs before any of the dock's signals.
+    // Queued before the dock's signals are connected, so it also runs before them.
     const auto alreadyOpen = std::make_shared<QStringList>();
     const auto reportAlreadyOpen = [this, alreadyOpen] {
         for (const QString& appName : *alreadyOpen) {
@@ -79,7 +79,7 @@ void AppOpenSpy::addEntry(const QDBusObjectPath& path, const ReportOpened& repor
         qWarning() << "repeat entry added, path:" << path.path();
     }
     m_entries.insert(entry->entryId(), entry);
-    // A docked entry stands on the dock whether or not its application runs.
+    // A docked entry exists whether or not its application runs.
     if (!entry->isDocked()) {
         report(entry->appName());
     }
@@ -95,7 +95,7 @@ void AppOpenSpy::onEntryRemoved(const QString& id)
 {
     const QSharedPointer<EntryInfo> entry = m_entries.value(id);
     if (entry.isNull()) {
-        // The misspelling is intended: fleets search their logs for it.
+        // Keep the misspelling: fleets search their logs for it.
         qWarning() << "unknow entry removed, id:" << id;
         return;
     }

@@ -13,8 +13,8 @@ namespace velk::module::software {
 
 class EntryInfo;
 
-/// Follows the dock's entries and reports every application opened (1) or closed (2). A dock that is absent
-/// at the start is waited for; one that goes away later is not.
+/// Follows the dock's entries and reports each application opened (1) or closed (2). If the dock is absent at
+/// the start, waits for it; if the dock leaves later, does not wait for it to return.
 ///
 /// Applications already open at construction are reported when the event loop first runs, before any later
 /// change, so that callers of instance() can connect first.

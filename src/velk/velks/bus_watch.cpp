@@ -10,12 +10,13 @@
 BusWatch::BusWatch(QDBusConnection bus, const QString& kind)
     : m_kind(kind)
 {
-    // The D-Bus library itself sends this signal. A bus passes on none of this path, so nobody else can.
+    // The D-Bus library itself sends this signal. Buses pass on nothing from this path, so others cannot
+    // forge it.
     const QString anyService;
     const bool isWatched = bus.connect(anyService, QStringLiteral("/org/freedesktop/DBus/Local"),
                                        QStringLiteral("org.freedesktop.DBus.Local"),
                                        QStringLiteral("Disconnected"), this, SLOT(endProgram()));
-    // Asked after that: the bus may have gone just before.
+    // Checked after connecting: the bus may have gone just before.
     if (!isWatched || !bus.isConnected()) {
         QMetaObject::invokeMethod(this, &BusWatch::endProgram, Qt::QueuedConnection);
     }
@@ -23,7 +24,7 @@ BusWatch::BusWatch(QDBusConnection bus, const QString& kind)
 
 void BusWatch::endProgram()
 {
-    if (std::exchange(m_hasTold, true)) {
+    if (std::exchange(m_isEnding, true)) {
         return;
     }
     qCritical("no connection to the %s bus, ending", qUtf8Printable(m_kind));

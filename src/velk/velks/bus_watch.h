@@ -5,17 +5,17 @@
 
 class QDBusConnection;
 
-/// Ends the program, with one line and a status other than 0, when a bus is lost or was never there. QtDBus
-/// does not connect again: a program that lives on hears nothing any more, while its service manager would
-/// start a fresh one.
+/// Ends the program with one log line and a status other than 0 when a bus is lost or was never there. QtDBus
+/// does not reconnect: a program that stays alive is deaf, whereas its service manager would start a fresh
+/// one.
 ///
-/// It ends when the event loop gets to it, so whatever runs at that moment is carried out first.
+/// The program ends when control returns to the event loop, so work in progress is finished first.
 class BusWatch : public QObject
 {
     Q_OBJECT
 
 public:
-    /// `kind` is what the line calls the bus.
+    /// `kind` names the bus in the log line.
     BusWatch(QDBusConnection bus, const QString& kind);
 
 private Q_SLOTS:
@@ -23,5 +23,5 @@ private Q_SLOTS:
 
 private:
     QString m_kind;
-    bool m_hasTold = false;
+    bool m_isEnding = false;
 };

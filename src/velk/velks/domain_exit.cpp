@@ -19,8 +19,8 @@ void runRestoreScript()
             << "----strPath:" << script;
     QProcess bash;
     bash.setProcessChannelMode(QProcess::ForwardedChannels);
-    // At its end from the start: a script that reads its input goes on instead of waiting for ever, so the
-    // reboot after it is not lost.
+    // A script that reads its standard input must get end-of-file at once: if it waited, the reboot would
+    // never come.
     bash.setStandardInputFile(QProcess::nullDevice());
     bash.start(QStringLiteral("bash"), {script});
     bash.waitForFinished(-1);
@@ -32,7 +32,7 @@ void restoreDesktop()
     Libvelkkpx desktop;
 
     backup.beginGroup(QStringLiteral("config"));
-    // The second list holds one empty string, as the library expects it.
+    // The library expects one empty string in the second list.
     desktop.SetControlConfig(backup.value(QStringLiteral("ControlCenterList")).toStringList(), {QString()});
     backup.endGroup();
 
@@ -45,8 +45,8 @@ void restoreDesktop()
     desktop.SetWebTrayIconClickable(true);
     desktop.SetUsbTrayIconClickable(true);
 
-    // The exit status is not looked at: the reboot that follows stops what systemctl could not. The fixed
-    // command holds nothing that a shell could misread.
+    // The exit status is ignored: the reboot that follows stops what systemctl could not. The command is
+    // constant, so a shell cannot misread it.
     [[maybe_unused]] const int status = std::system("systemctl --global stop prys"); // NOLINT(cert-env33-c)
 }
 

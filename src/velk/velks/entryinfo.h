@@ -8,14 +8,14 @@ class QDBusObjectPath;
 
 namespace velk::module::software {
 
-/// What an application's state change is called on the way to the daemon.
+/// The codes of sendAppOpenState.
 enum AppState {
     AppOpened = 1,
     AppClosed = 2,
 };
 
-/// One entry of the dock: follows its name and the number of its windows. An entry that cannot be reached is
-/// empty: no identifier, no name, no window.
+/// One entry of the dock: follows its name and the number of its windows. An unreachable entry has no
+/// identifier, no name and no windows.
 class EntryInfo : public QObject
 {
     Q_OBJECT
@@ -31,7 +31,7 @@ public:
     bool isDocked() const;
 
 Q_SIGNALS:
-    /// More windows (1) or fewer (2) than before, once for each change whatever its size.
+    /// More windows (1) or fewer (2) than before; once per change, however large.
     void windowSizeChanged(int type, const QString& appName);
 
 public Q_SLOTS:

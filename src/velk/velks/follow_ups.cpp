@@ -6,13 +6,12 @@
 
 namespace {
 
-// Follow-ups before the event loop has its turn.
-constexpr int kAtOnce = 50;
+constexpr int kBatch = 50; // follow-ups before the event loop runs
 
-// A backlog of so many is drained at full speed. Then comes a second's pause after each time; one less at a
-// time, as a poll may fall into the pause.
+// A backlog up to this size is read at full speed. Beyond it, a pause of one second follows each batch, which
+// is one smaller, as a poll may fall into the pause.
 constexpr int kAtFullSpeed = 1000;
-constexpr int kAtOnceWhenSlow = kAtOnce - 1;
+constexpr int kSlowBatch = kBatch - 1;
 constexpr int kSlowPause = 1000; // ms
 
 } // namespace
@@ -28,7 +27,7 @@ void FollowUps::after(const std::function<void()>& request)
         const QScopedValueRollback<bool> asking(m_isAsking, true);
         request();
     }
-    askInARow();
+    askBatch();
 }
 
 void FollowUps::count(int unread)
@@ -38,23 +37,23 @@ void FollowUps::count(int unread)
         return;
     }
     m_isDue = true;
-    askInARow();
+    askBatch();
 }
 
 void FollowUps::timerEvent(QTimerEvent* /*event*/)
 {
     m_pause.stop();
-    askInARow();
+    askBatch();
 }
 
-void FollowUps::askInARow()
+void FollowUps::askBatch()
 {
     if (m_isAsking || m_pause.isActive()) {
         return;
     }
     const QScopedValueRollback<bool> asking(m_isAsking, true);
-    const int most = m_asked < kAtFullSpeed ? kAtOnce : kAtOnceWhenSlow;
-    for (int asked = 0; m_isDue && asked < most; ++asked) {
+    const int batch = m_asked < kAtFullSpeed ? kBatch : kSlowBatch;
+    for (int asked = 0; m_isDue && asked < batch; ++asked) {
         m_isDue = false;
         ++m_asked;
         m_ask();

@@ -5,12 +5,12 @@
 
 #include <functional>
 
-/// Asks the platform for one unread message after the other, while its replies count more.
+/// Asks the platform for one unread message after another while its replies count more than one.
 ///
-/// Never inside the handling of a reply, where each message would add its frames to the stack: the outermost
-/// caller asks, in a loop. After 50 follow-ups the event loop has its turn, so that nothing waits for a
-/// platform whose count never falls. Such a platform is spared, too: after 1,000 follow-ups of one row, it is
-/// asked at most 50 times in any second. A row ends when the count has fallen to 1 or below.
+/// A reply's handler never asks, as each message would add its frames to the stack: the outermost caller asks
+/// in a loop. After a batch of 50 the event loop runs, so that a platform whose count never falls blocks
+/// nothing else. To spare such a platform, after 1,000 follow-ups of one backlog it is asked at most 50 times
+/// in any second. A backlog ends when the count has fallen to 1 or below.
 class FollowUps : public QObject
 {
     Q_OBJECT
@@ -19,11 +19,11 @@ public:
     /// `ask` sends one follow-up and returns when its reply has been counted.
     FollowUps(std::function<void()> ask, QObject* parent);
 
-    /// Sends a request that is no follow-up, then asks for what follows from its reply. While a drain is on
-    /// its way, that is left to it: a second one beside it would keep others waiting.
+    /// Sends a request of another kind, then a batch of follow-ups if its reply calls for one. If a batch is
+    /// already scheduled, only sends the request: a second batch would delay other events.
     void after(const std::function<void()>& request);
 
-    /// To be called for each reply, with its count of unread messages. A reply that comes on its own is
+    /// Takes the count of unread messages of a reply. A reply that was not requested by after() or a batch is
     /// followed up at once.
     void count(int unread);
 
@@ -31,13 +31,12 @@ protected:
     void timerEvent(QTimerEvent* event) override;
 
 private:
-    void askInARow();
+    void askBatch();
 
     std::function<void()> m_ask;
     bool m_isAsking = false;
     bool m_isDue = false;
-    int m_asked = 0; ///< in the present row
-    // Goes on from the event loop. Not a queued call: those go before timers, and a forced log-out that is
-    // due is one.
+    int m_asked = 0; ///< in the present backlog
+    // Schedules the next batch. A queued call would overtake timers, and a forced log-out is one.
     QBasicTimer m_pause;
 };

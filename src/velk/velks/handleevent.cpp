@@ -20,8 +20,8 @@ constexpr int kPasswordNoticeDelay = 60000; // ms
 
 const QString kOpenAction = QStringLiteral("_open");
 
-/// Calls the desktop's notification service and waits for its answer, which holds the notification's id.
-/// The title is also the application name.
+/// Calls the desktop's notification service and waits for the notification's id. The title is also the
+/// application name.
 QDBusMessage notify(const QString& title, const QString& body, const QStringList& actions,
                     const QVariantMap& hints, int timeout)
 {
@@ -99,8 +99,7 @@ void HandleEvent::getPasswdExpiredTime(const QString& url, const QString& userNa
     if (error.error != QJsonParseError::NoError) {
         return;
     }
-    // Logged for every reply that can be parsed, expiring or not, and once more at the end: log readers
-    // count on it.
+    // Logged for every parsed reply, expiring or not, and again at the end: log readers rely on both lines.
     qInfo() << "用户密码快过期了！！";
     if (isPasswordExpiring(reply.status, document.object())) {
         remindOfPassword(document.object());
@@ -128,13 +127,13 @@ void HandleEvent::sendMessage(const QString& type, const QString& title, const Q
 {
     qInfo() << "----HandleEvent::sendMessage----" << type << title;
     const bool isReboot = type == QLatin1String("reboot");
-    // The values are joined as they are, commas inside them included: the notification service hands the
-    // text on as it stands.
+    // The values are joined as they are, including their commas: the notification service passes the text on
+    // unparsed.
     const QString action =
         isReboot ? type : QStringList{type, title, body, sender, time}.join(QLatin1Char(','));
     const QString label = isReboot ? QStringLiteral("重启") : QStringLiteral("查看");
 
-    // On the wire the timeout is signed: the unsigned -1 goes out as -1.
+    // The timeout is signed on the wire, where the unsigned -1 becomes -1.
     const QDBusMessage reply =
         notify(title, body, {kOpenAction, label}, {{QStringLiteral("x-norix-action-_open"), action}},
                static_cast<int>(timeout));

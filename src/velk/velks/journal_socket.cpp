@@ -15,7 +15,7 @@
 namespace {
 
 constexpr std::string_view kPath = "/run/systemd/journal/socket";
-constexpr int kBurstBytes = 8 * 1024 * 1024; // on their way to the journal, as libsystemd allows
+constexpr int kBurstBytes = 8 * 1024 * 1024; // the send buffer, as large as libsystemd's
 constexpr int kLongestWaitMs = 100;
 
 bool sendMessage(int socket, const msghdr& message)
@@ -32,7 +32,7 @@ bool sendAsDatagram(int socket, const QByteArray& entry)
     return sendMessage(socket, message);
 }
 
-/// The journal reads what is too long for a datagram from a file in memory that nobody can change any more.
+/// An entry too long for a datagram is passed as a memory file that is sealed against changes.
 bool sendAsFile(int socket, const QByteArray& entry)
 {
     const int file = memfd_create("journal-entry", MFD_CLOEXEC | MFD_ALLOW_SEALING);
@@ -82,7 +82,7 @@ JournalSocket::Result JournalSocket::send(const QByteArray& entry)
 {
     Result result = attempt(entry);
     if (result == Result::Gone) {
-        close(); // a journal that was restarted with its socket has another one at the same place
+        close(); // a restarted journal may have a new socket at the same path
         result = attempt(entry);
     }
     return result;
@@ -110,7 +110,7 @@ bool JournalSocket::open()
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
     kPath.copy(static_cast<char*>(address.sun_path), kPath.size());
-    // Only a connected socket tells when its other side has room again.
+    // Only on a connected socket does poll() wait until the receiver has room.
     if (m_socket < 0
         || connect(m_socket, reinterpret_cast<const sockaddr*>(&address), sizeof(address)) != 0) {
         close();

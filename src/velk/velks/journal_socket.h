@@ -2,14 +2,14 @@
 
 #include <QByteArray>
 
-/// The journal's own socket, without libsystemd's wait: its functions block for as long as a journal that
-/// hangs takes nothing, and all policies with them.
+/// The journal's own socket. libsystemd's functions block while a hung journal accepts nothing, which would
+/// block all policies.
 class JournalSocket
 {
 public:
     enum class Result {
         Taken,
-        Dropped, ///< the journal is there and takes nothing
+        Dropped, ///< the journal is there but accepts nothing
         Gone, ///< there is no journal
     };
 
@@ -17,9 +17,8 @@ public:
     ~JournalSocket();
     Q_DISABLE_COPY_MOVE(JournalSocket)
 
-    /// Hands over one entry, in the form of the journal's native protocol. In a burst that the journal takes
-    /// more slowly than it comes, this waits a moment; once that moment was in vain, entries are dropped at
-    /// once until the journal takes one again.
+    /// Sends one entry in the journal's native protocol. If the journal has no room, waits 100 ms for it.
+    /// After a wait in vain, drops entries without waiting until the journal accepts one again.
     Result send(const QByteArray& entry);
 
 private:

@@ -35,7 +35,8 @@ __Launcherd* newLauncher(QObject* parent)
                            QDBusConnection::sessionBus(), parent);
 }
 
-/// Runs a command line as it stands: split at blanks, and only double quotes quote.
+/// Runs a command line without a shell: splits it at blanks outside double quotes; no other character is
+/// special.
 PackageToolRun runCommandLine(const QString& commandLine, const QProcessEnvironment& environment = {})
 {
     QStringList parts = QProcess::splitCommand(commandLine);
@@ -135,12 +136,12 @@ QString LauncherGuard::getCurVersion(const QString& packageName)
         qWarning() << "get version failed, empty packageName";
         return kFailed;
     }
-    // Taken before it is changed: the first child runs without the setting, every later one with it. This
-    // order is intended, whoever stands in for the tool counts on it.
+    // Copied before LC_ALL is set: the first child runs without LC_ALL=C, all later ones with it.
+    // Replacements of the tool rely on this order.
     const QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
     qputenv("LC_ALL", "C");
 
-    // The quotes reach the tool and come back around the version.
+    // The quotes reach the tool, which prints them around the version.
     const PackageToolRun run = runCommandLine(
         QStringLiteral("/usr/bin/dpkg-query  -W -f='${Version}' %1").arg(packageName), environment);
     if (!run.ended) {
@@ -165,8 +166,8 @@ bool LauncherGuard::getSoftwareList(const QString& path)
     if (!records) {
         return false;
     }
-    // Each child is forked, which takes the longer the more memory there is: the text of the file and its
-    // document, many times as large as the records, must be gone before the first one.
+    // Forking a child takes longer the more memory the agent holds. The file's text and its JSON document are
+    // many times as large as the records, so they must be freed before the first child.
     giveMemoryBack();
     for (SoftwareInfo info : *records) {
         info.version = getCurVersion(info.packageName);

@@ -14,16 +14,15 @@ struct SoftwareInfo
     QString packageName;
     QString name; ///< display name
     qint32 id = 0; ///< the platform's identifier, -1 for software known only from the launcher
-    QString version; ///< as installed; "failed" if it could not be found out
+    QString version; ///< as installed; "failed" if the package tool failed
     QString architecture;
-    qint32 installedType = 0; ///< how it came onto the machine, 2 for software known only from the launcher
+    qint32 installedType = 0; ///< the kind of installation, 2 for software known only from the launcher
 };
 
-/// Watches the desktop's launcher and knows what software is installed. A launcher that is absent at the
-/// start is waited for; one that goes away later is not.
+/// Watches the desktop's launcher and lists the installed software. If the launcher is absent at the start,
+/// waits for it; if it leaves later, does not wait for it to return.
 ///
-/// Packages are looked up by the system's package tools, which block for 60 s each at most: 30 s to start and
-/// 30 s to end.
+/// The package tools look packages up. Each run blocks for 60 s at most: 30 s to start and 30 s to end.
 class LauncherGuard : public QObject
 {
     Q_OBJECT
@@ -31,14 +30,14 @@ class LauncherGuard : public QObject
 public:
     explicit LauncherGuard(QObject* parent);
 
-    /// Every launcher item with its package, in the launcher's order; what an inventory file knows of a
-    /// package goes before what the package tools say. Empty without a launcher.
+    /// Every launcher item with its package, in the launcher's order; an inventory file's record of a package
+    /// takes precedence over the package tools. Empty without a launcher.
     QList<SoftwareInfo> getSoftwareList();
 
-    /// Adds the records of one inventory file; false if it is no JSON array.
+    /// Adds the records of one inventory file; false if the file holds no JSON array.
     bool getSoftwareList(const QString& path);
 
-    /// Empty if the launcher is absent or fails. The misspelt name is intended, callers use it so.
+    /// Empty if the launcher is absent or fails. The misspelt name is kept: callers use it.
     LauncherItemInfoList GetLauncerItems();
 
     /// Empty if no package owns the file.
@@ -53,7 +52,7 @@ public:
 Q_SIGNALS:
     /// info is the display name and the package's version.
     void softwareChanged(QString action, QStringList info);
-    /// Once, when a launcher that was absent at the start has arrived.
+    /// Emitted once, when a launcher that was absent at the start has appeared.
     void softwareInited();
 
 public Q_SLOTS:
@@ -63,6 +62,6 @@ private:
     void watchLauncher(__Launcherd* launcher);
     SoftwareInfo softwareOf(const LauncherItemInfo& item, const QString& architecture);
 
-    QList<SoftwareInfo> m_softwareList; ///< of the inventory files, while a list is being made
+    QList<SoftwareInfo> m_softwareList; ///< from the inventory files, while a list is built
     __Launcherd* m_launcher = nullptr;
 };

@@ -17,8 +17,8 @@ namespace {
 
 QtMessageHandler writeToStandardError = nullptr;
 
-/// The service manager names device and inode of the stream that it has connected to the journal. A child
-/// process inherits the variable even where its standard error has been led elsewhere since.
+/// JOURNAL_STREAM holds device and inode of the stream that the service manager has connected to the journal.
+/// A child process inherits the variable even if its standard error was redirected since.
 bool isStandardErrorTheJournal()
 {
     struct stat stream = {};
@@ -47,7 +47,7 @@ int priorityOf(QtMsgType type)
     return LOG_INFO;
 }
 
-/// A field in the form that lets its value hold line breaks.
+/// A field in the form that allows line breaks in its value.
 QByteArray field(const char* name, const QByteArray& value)
 {
     QByteArray length(sizeof(quint64), Qt::Uninitialized);
@@ -66,17 +66,17 @@ QByteArray entry(QtMsgType type, const QMessageLogContext& context, const QByteA
 QByteArray lineOf(QtMsgType type, const QMessageLogContext& context, const QString& text)
 {
     const QByteArray line = qFormatLogMessage(type, context, text).toUtf8();
-    return line.constData(); // a text ends at a NUL byte, as Qt ends it on standard error
+    return line.constData(); // cut at a NUL byte, as Qt does on standard error
 }
 
-/// The journal and what it did not take. Qt logs from any thread.
+/// The journal, and the number of lines that it did not accept. Locked, as Qt logs from any thread.
 class Journal
 {
 public:
     void write(QtMsgType type, const QMessageLogContext& context, const QString& text)
     {
         const QMutexLocker locker(&m_mutex);
-        tellDropped();
+        reportDropped();
         switch (m_socket.send(entry(type, context, lineOf(type, context, text)))) {
         case JournalSocket::Result::Taken:
             break;
@@ -90,7 +90,7 @@ public:
     }
 
 private:
-    void tellDropped()
+    void reportDropped()
     {
         const QByteArray line =
             QByteArray::number(m_dropped) + " log lines are lost, the journal did not take them";
@@ -108,7 +108,7 @@ private:
 
 void writeToJournal(QtMsgType type, const QMessageLogContext& context, const QString& text)
 {
-    static Journal& journal = *new Journal; // lines may still come when all else is gone
+    static Journal& journal = *new Journal; // never destroyed: destructors of other objects may log
     journal.write(type, context, text);
 }
 

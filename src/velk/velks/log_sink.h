@@ -2,13 +2,13 @@
 
 #include <QByteArray>
 
-/// Sends the process's log lines to the journal where standard error is connected to it, as it is under a
-/// service manager: priority, source file, line and function become fields of the entry. Anywhere else, and
-/// where there is no journal, Qt goes on writing to standard error. The texts are the same. Lines that a
-/// journal which hangs does not take are lost, and their number is told when it takes one again. To be called
-/// once, before the first line.
+/// Sends the process's log lines to the journal where standard error is connected to it, as under a service
+/// manager; priority, source file, line and function become fields of the entry. Elsewhere, and where there
+/// is no journal, Qt keeps writing the same texts to standard error. Lines that a hung journal does not
+/// accept are lost; when it accepts lines again, one line gives their number. Call this once, before the
+/// first line.
 void sendLogToJournal();
 
-/// The name of a function without its result and arguments, from the compiler's full signature; that of the
-/// enclosing function for a lambda. It is what people search the journal for.
+/// A function's name without its result and arguments, from the compiler's full signature; for a lambda, the
+/// enclosing function's. People search the journal for it.
 QByteArray functionName(const char* signature);

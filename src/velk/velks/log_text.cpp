@@ -7,7 +7,7 @@
 
 namespace {
 
-// Characters are looked at in blocks, which compilers turn into vector instructions.
+// Characters are compared in blocks, which compilers turn into vector instructions.
 constexpr std::size_t kBlock = 16;
 
 bool isPrintableAscii(ushort unit)
@@ -20,7 +20,7 @@ bool isEscaped(ushort unit)
     return unit == '"' || unit == '\\';
 }
 
-/// Whether a whole block is written as it stands.
+/// Whether all characters of a block stay unescaped.
 bool isPlain(const ushort* block)
 {
     std::array<ushort, kBlock> isSpecial{};
@@ -34,13 +34,12 @@ bool isPlain(const ushort* block)
     return any == 0;
 }
 
-/// Appends the printable ASCII up to the first other character, and returns where that stands.
+/// Appends printable ASCII up to the first other character; returns that character's position.
 const ushort* appendAscii(QString& result, const ushort* at, const ushort* end)
 {
     const int before = result.size();
-    result.resize(before + 2 * static_cast<int>(end - at)); // as if each had a backslash
-    // A QChar is a ushort, but is not copied as fast.
-    // NOLINTNEXTLINE(cppcoreguidelines-pro-type-reinterpret-cast)
+    result.resize(before + 2 * static_cast<int>(end - at)); // room for a backslash before each
+    // A QChar is a ushort but is copied more slowly.
     auto* const begin = reinterpret_cast<ushort*>(result.data());
     ushort* to = begin + before;
     while (at != end && isPrintableAscii(*at)) {
@@ -61,8 +60,8 @@ const ushort* appendAscii(QString& result, const ushort* at, const ushort* end)
     return at;
 }
 
-/// Appends all up to the next printable ASCII, and returns where that stands. QDebug escapes each of these
-/// characters by itself.
+/// Appends everything up to the next printable ASCII character; returns that character's position. QDebug
+/// escapes each of these characters on its own.
 const ushort* appendOther(QString& result, const ushort* at, const ushort* end)
 {
     const ushort* const ascii = std::find_if(at, end, isPrintableAscii);

@@ -2,7 +2,7 @@
 
 #include <QString>
 
-/// A text as QDebug quotes it, to the character, for a log line that is told not to quote. QDebug looks every
-/// character up in the Unicode tables and writes the short runs between two quotation marks of a JSON text
-/// one by one; for a long policy that costs more than handing the policy on.
+/// A text, character for character as QDebug quotes it, for a log line with noquote(). QDebug is slower: it
+/// looks each character up in the Unicode tables, and writes the short runs between a JSON text's quotation
+/// marks one by one. For a long policy that costs more than forwarding the policy.
 QString quoted(const QString& text);

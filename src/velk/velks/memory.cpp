@@ -8,7 +8,7 @@
 
 void keepNoLargeBlocks()
 {
-    constexpr int kLargeBytes = 128 * 1024; // what the C library starts with
+    constexpr int kLargeBytes = 128 * 1024; // the C library's initial threshold
     mallopt(M_MMAP_THRESHOLD, kLargeBytes);
 }
 

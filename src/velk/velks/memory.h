@@ -1,14 +1,14 @@
 #pragma once
 
-// Measures against memory that nobody needs any more and the C library would keep.
+// Return freed memory to the system that the C library would keep.
 
-/// Gives the memory of large texts back to the system once they are gone. Without a fixed limit the C library
-/// keeps ever larger blocks for later, and one burst of long policies would stay with the agent for its life.
+/// Returns the memory of large texts as soon as they are freed. Without a fixed threshold the C library keeps
+/// ever larger blocks, and one burst of long policies would enlarge the agent for its lifetime.
 void keepNoLargeBlocks();
 
-/// Does the same for what a burst of small things took: Qt queues signals as fast as they come, and what it
-/// took for 200,000 of them would stay with the agent. Needs the application's event dispatcher.
+/// Returns the memory of bursts of small objects, such as 200,000 signals queued by Qt, once the event loop
+/// is about to wait. Needs the application's event dispatcher.
 void giveMemoryBackAfterWork();
 
-/// Gives back what is free now.
+/// Returns what is free now.
 void giveMemoryBack();

@@ -17,7 +17,7 @@
 
 namespace {
 
-/// Seconds since the epoch; the platform knows them as 32 bits.
+/// Seconds since the epoch, in the 32 bits that the platform expects.
 quint32 currentSeconds()
 {
     return static_cast<quint32>(QDateTime::currentSecsSinceEpoch());
@@ -36,7 +36,7 @@ NotifyMessage messageOf(const QJsonObject& object)
     return message;
 }
 
-/// The counts of a reply. Header names are compared with their case, as the platform writes them.
+/// The counts of a reply. Header names are compared case-sensitively, as the platform writes them.
 NotifyMessageResponse responseOf(const QList<QPair<QByteArray, QByteArray>>& rawHeaders)
 {
     NotifyMessageResponse response;
@@ -96,7 +96,7 @@ bool MessagePlatform::loadCfg()
     return velk::base::FileContent::getHostAndPort(m_host, m_port);
 }
 
-// What is connected changes the object. NOLINTNEXTLINE(readability-make-member-function-const)
+// The connected slot changes the object. NOLINTNEXTLINE(readability-make-member-function-const)
 void MessagePlatform::initHttpApi()
 {
     HandleEvent::GetInstance()->initHttpApi();
@@ -115,7 +115,7 @@ int MessagePlatform::generateRandnum(const int& max, const int& min)
     if (max == min) {
         return min;
     }
-    // The old generator and its seed are intended: how a fleet's polls spread is planned with them.
+    // Keep the old generator and its seed: fleets plan the spread of their polls with them.
     QT_WARNING_PUSH
     QT_WARNING_DISABLE_DEPRECATED
     qsrand(static_cast<uint>(QTime(0, 0).secsTo(QTime::currentTime())));
@@ -160,8 +160,7 @@ int MessagePlatform::getNotifyMessageList(const NotifyMessageOption& option,
 
 void MessagePlatform::requestList(const NotifyMessageOption& option)
 {
-    // "timestaps" is the key that the platform expects, and no value is encoded: it compares them as they
-    // are.
+    // The platform expects the key "timestaps" and compares the values unencoded.
     m_requestUrl = QStringLiteral("%1?uid=%2&is_not_read=%3&limit=%4&offset=%5&order=%6&desc=%7&timestaps=%8")
                        .arg(m_listUrl, option.uid, QString::number(option.is_not_read ? 1 : 0),
                             QString::number(option.limit), QString::number(option.offset), option.order,
@@ -199,7 +198,7 @@ void MessagePlatform::show(const NotifyMessage& message)
 void MessagePlatform::messageRespond(const QString& uuid)
 {
     const QString body = QStringLiteral(R"({"uuid":"%1"})").arg(uuid);
-    // Here the time is signed, other than in the list request: the platform expects it so.
+    // Unlike in the list request, the platform expects a signed time here.
     const QString url =
         m_readUrl + QStringLiteral("?timestaps=") + QString::number(static_cast<qint32>(currentSeconds()));
     qInfo() << "---------Qurl" << url << ":qJsonBuf:" << body;

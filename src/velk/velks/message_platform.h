@@ -12,7 +12,7 @@
 class MessageTransfer;
 class QTimer;
 
-// Intervals between polls in milliseconds; each is drawn anew.
+// Bounds of the intervals between polls, in milliseconds; each interval is drawn at random.
 constexpr int kShortestPollInterval = 60000;
 constexpr int kLongestFirstPollInterval = 120000;
 constexpr int kLongestPollInterval = 180000;
@@ -51,9 +51,9 @@ struct NotifyMessageResponse
 
 using list_message_callback = std::function<void(bool, const NotifyMessageResponse&)>;
 
-/// Brings the platform's unread messages to a domain user: polls while the session is active, shows each
-/// message as a notification and marks it read. Idle for local users, and where the daemon's information
-/// file names no host and port. Requests block; see HandleEvent.
+/// Shows a domain user the platform's unread messages: polls while the session is active, shows each message
+/// as a notification and marks it read. Idle for local users, and where the daemon's information file lacks
+/// host or port. Requests block; see HandleEvent.
 class MessagePlatform : public QObject
 {
     Q_OBJECT
@@ -66,14 +66,14 @@ public:
     void initHttpApi();
     void initPlatformMessage();
 
-    /// A poll interval in milliseconds, at least min and below max (min where both are equal). It depends on
-    /// the second of the day at which it is drawn.
+    /// A poll interval in milliseconds, from min up to but not including max (min if both are equal). It
+    /// depends only on the second of the day.
     int generateRandnum(const int& max, const int& min);
 
     void unreadMessages(const QString& uid, const int& page, const int& limit);
 
-    /// Both request a list and return 0 when it and its follow-ups have been handled. Results reach the
-    /// program through OnRecvMsg only; the callback is never called.
+    /// Both request a list and return 0 once the list and its follow-ups have been handled. Results arrive
+    /// through OnRecvMsg only; the callback is never called.
     int getNotifyMessageList(const QString& uid, bool isNotRead, int page, int limit,
                              list_message_callback callback);
     int getNotifyMessageList(const NotifyMessageOption& option, list_message_callback callback);
@@ -84,7 +84,7 @@ public:
 public Q_SLOTS:
     void onUnReadMessages();
 
-    /// Handles any reply of the platform, and asks for the next message while the reply counts more than one.
+    /// Handles any reply of the platform, and requests the next message while the reply counts more than one.
     void OnRecvMsg(const int& statusCode, const QString& body,
                    const QList<QPair<QByteArray, QByteArray>>& rawHeaders);
 
@@ -92,8 +92,8 @@ private:
     void show(const NotifyMessage& message);
     void requestList(const NotifyMessageOption& option);
 
-    // Other code is compiled against these members as they are, in this order: none may come or go. What the
-    // client needs besides lives in a child object.
+    // Other code is compiled against exactly these members in this order: add none and remove none. Anything
+    // else lives in a child object.
     QTimer* m_timer = nullptr; ///< without a parent, kept until the process ends
     QString m_userName;
     QString m_appPath;

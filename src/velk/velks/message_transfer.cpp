@@ -58,12 +58,12 @@ MessageTransfer::MessageTransfer(QObject* parent)
     startSoftwareReports();
 
     readLoginUser();
-    // Replies are never read, here and below: a daemon that is absent emits pushOnlineMsg when it comes.
+    // The replies to reports are never read: a daemon that is absent now emits pushOnlineMsg when it appears.
     m_velkgInterface->UpdateUserInfo(m_userName, m_uid);
     startTimers();
     m_velkgInterface->SendUserStatus(UserActive, m_userName);
 
-    // Nothing in between: each application opened or closed is one call.
+    // Connected directly: each application opened or closed is one call.
     connect(AppOpenSpy::instance(), &AppOpenSpy::appStateChange, m_velkgInterface,
             &velkgInterface::sendAppOpenState);
 }
@@ -72,7 +72,7 @@ void MessageTransfer::connectDaemon()
 {
     connect(m_velkgInterface, &velkgInterface::pushPolicyMsg, this, &MessageTransfer::onPolicyMsg);
     connect(
-        m_velkgInterface, &velkgInterface::pushOnlineMsg, m_velkgInterface, [this] { announceAgain(); },
+        m_velkgInterface, &velkgInterface::pushOnlineMsg, m_velkgInterface, [this] { reportAgain(); },
         Qt::DirectConnection);
 }
 
@@ -105,7 +105,7 @@ void MessageTransfer::readLoginUser()
     m_uid = user.uid;
 }
 
-void MessageTransfer::announceAgain()
+void MessageTransfer::reportAgain()
 {
     m_velkgInterface->UpdateUserInfo(m_userName, m_uid);
     qDebug() << "velkg restart sendonline  " << m_userName << m_uid;
@@ -197,8 +197,8 @@ void MessageTransfer::uploadSoftwareChange(int change, const QStringList& info)
     report.change = change;
     report.ipAddress = terminalAddress();
     report.hardwareAddress = terminalHardwareAddress();
-    // Asked anew for each report, while the inventory bears the identifier of the start. That the two come
-    // from different places is intended: the platform compares them as they are.
+    // Read for each report, whereas the inventory carries the identifier read at start-up. Keep the two
+    // sources: the platform compares the identifiers.
     QDBusPendingReply<QString> machineId = m_velkgInterface->GetMachineID();
     machineId.waitForFinished();
     report.machineId = machineId.isError() ? QString() : machineId.value();
@@ -232,7 +232,7 @@ void MessageTransfer::onTimeout()
 
 void MessageTransfer::getUserState()
 {
-    // The name is read afresh: the daemon is told who is there now, not who was at start-up.
+    // Read the name again: it may have changed since start-up.
     const QString name = loginUserName();
     m_velkgInterface->SendUserStatus(statusOf(getScreenState()), name);
 }

@@ -6,10 +6,10 @@
 
 namespace {
 
-constexpr int kTimeLimit = 30000; // ms, once for the start and once for the end
+constexpr int kTimeLimit = 30000; // ms, for the start and again for the end
 
-/// A process object waits for its child when it is destroyed; this one is left to the event loop instead,
-/// which destroys it when the child is gone.
+/// A QProcess waits for its child when it is destroyed; this one is left to the event loop, which destroys it
+/// when the child has ended.
 void endWithoutWaiting(std::unique_ptr<QProcess> process)
 {
     auto* running = process.release();

@@ -4,14 +4,14 @@
 #include <QString>
 #include <QStringList>
 
-/// What became of one run of a package tool.
+/// The result of one run of a package tool.
 struct PackageToolRun
 {
     bool ended = false; ///< it started and ended in time
-    QString output; ///< its standard output up to there, read in the encoding of the locale
+    QString output; ///< its standard output so far, read in the locale's encoding
 };
 
-/// Runs a program and waits for it, 30 s to start and 30 s to end. A program that does not end is killed and
-/// costs no further waiting. An empty environment is the agent's own.
+/// Runs a program and waits for it, 30 s to start and 30 s to end. A program that does not end is killed
+/// without further waiting. An empty environment stands for the agent's own.
 PackageToolRun runPackageTool(const QString& program, const QStringList& arguments,
                               const QProcessEnvironment& environment = {});

@@ -18,7 +18,7 @@ QVariant valueOf(QDBusPendingReply<QDBusVariant> reply)
 
 bool isOnBus(const QDBusConnection& bus, const QString& service)
 {
-    // There is no bus interface when the connection to the bus was never made.
+    // The bus interface is null if the connection to the bus was never made.
     const auto* busInterface = bus.interface();
     return busInterface != nullptr && busInterface->isServiceRegistered(service);
 }

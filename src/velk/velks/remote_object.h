@@ -12,27 +12,26 @@
 /// Whether a name has an owner now. Asks only the bus, never the service.
 bool isOnBus(const QDBusConnection& bus, const QString& service);
 
-/// The properties of one object of another service. It is reached without introspection, so a service that
-/// introspects badly can still be read and written, and a service that hangs costs one D-Bus time limit
-/// (25 s) per read and nothing else.
+/// The properties of one object of another service. Needs no introspection, so it works with a service that
+/// introspects badly, and a hung service costs only one D-Bus time limit (25 s) per read.
 class RemoteObject
 {
 public:
     RemoteObject(const QDBusConnection& bus, const QString& service, const QString& path,
                  const QString& interface);
 
-    /// Waits for the value. Invalid if the service is absent, hangs, fails or has no such property.
+    /// Waits for the value. Invalid if the service is absent, hangs, fails or lacks the property.
     QVariant property(const QString& name) const;
 
-    /// As property(), but nothing if no such service is on the bus and none could be started. A service that
-    /// D-Bus knows how to start is started by the reading.
+    /// Like property(), but nothing if the service is neither on the bus nor startable by D-Bus. Reading
+    /// starts a startable service.
     std::optional<QVariant> propertyIfPresent(const QString& name) const;
 
-    /// The values of several properties, in the order of the names. They are asked for together, so that
-    /// a service that hangs costs the time limit once for all of them.
+    /// The values of several properties, in the order of the names. They are requested together, so a hung
+    /// service costs the time limit only once.
     QVariantList properties(const QStringList& names) const;
 
-    /// Sends the value and does not wait: failures are not seen.
+    /// Sends the value and does not wait, so failures go unnoticed.
     void setProperty(const QString& name, const QVariant& value) const;
 
 private:

@@ -9,19 +9,19 @@ ServiceArrival::ServiceArrival(const QString& service, QObject* parent)
     , m_watcher(service, QDBusConnection::sessionBus(),
                 QDBusServiceWatcher::WatchForRegistration | QDBusServiceWatcher::WatchForUnregistration)
 {
-    connect(&m_watcher, &QDBusServiceWatcher::serviceRegistered, this, &ServiceArrival::tellOnce);
-    // It may have arrived since it was missed and before it was watched for.
+    connect(&m_watcher, &QDBusServiceWatcher::serviceRegistered, this, &ServiceArrival::emitOnce);
+    // The service may have appeared before the watcher was ready.
     if (isOnBus(QDBusConnection::sessionBus(), service)) {
-        QMetaObject::invokeMethod(this, &ServiceArrival::tellOnce, Qt::QueuedConnection);
+        QMetaObject::invokeMethod(this, &ServiceArrival::emitOnce, Qt::QueuedConnection);
     }
 }
 
-void ServiceArrival::tellOnce()
+void ServiceArrival::emitOnce()
 {
-    if (m_told) {
+    if (m_hasEmitted) {
         return;
     }
-    m_told = true;
+    m_hasEmitted = true;
     deleteLater();
     Q_EMIT arrived();
 }

@@ -3,8 +3,8 @@
 #include <QDBusServiceWatcher>
 #include <QObject>
 
-/// Waits for a service of the session bus that was absent a moment ago, tells once from the event loop that
-/// it has arrived, and then deletes itself. Whether it stays is not looked at.
+/// Waits for a service of the session bus that was just found absent, emits arrived() once, from the event
+/// loop, and then deletes itself. The service may be gone again by then.
 class ServiceArrival : public QObject
 {
     Q_OBJECT
@@ -16,8 +16,8 @@ Q_SIGNALS:
     void arrived();
 
 private:
-    void tellOnce();
+    void emitOnce();
 
     QDBusServiceWatcher m_watcher;
-    bool m_told = false;
+    bool m_hasEmitted = false;
 };

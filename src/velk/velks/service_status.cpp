@@ -4,6 +4,6 @@
 
 void showServiceStatus(const char* line)
 {
-    constexpr int kKeepVariables = 0; // the next line needs them as well
+    constexpr int kKeepVariables = 0; // later calls need them too
     sd_notifyf(kKeepVariables, "STATUS=%s", line);
 }

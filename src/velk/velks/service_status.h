@@ -1,6 +1,5 @@
 #pragma once
 
-/// Has the service manager show a line about the agent, as in `systemctl --user status velks`; an empty one
-/// takes it back. Without a service manager it does nothing. The package's scripts restart no agent that has
-/// one.
+/// Sets the line that `systemctl --user status velks` shows for the agent; an empty one removes it. Does
+/// nothing without a service manager. While a line is set, the package's scripts do not restart the agent.
 void showServiceStatus(const char* line);

@@ -5,7 +5,7 @@
 #include "prys_introspection.h"
 #include "velkg_introspection.h"
 
-/// The services that the agent speaks with, by their names on the buses.
+/// Bus names of the services that the agent uses.
 namespace velk::service {
 
 inline const QString kDaemon = QStringLiteral(VELKG_INTERFACE_NAME);

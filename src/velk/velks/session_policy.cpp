@@ -21,7 +21,7 @@ SessionPolicy sessionPolicy(int code)
         {1203,
          {Action::WarnThenLogOut, Audience::AddressedDomainUser,
           QStringLiteral("您的帐号已被管理员停用，1分钟后强制注销")}},
-        // Of these two the agent only tells the user; it neither shuts down nor reboots.
+        // Notify is no more than a notice: another program shuts down or reboots.
         {1300, {Action::Notify, Audience::EverySession, QStringLiteral("该终端1分钟后进行关机")}},
         {1301, {Action::Notify, Audience::EverySession, QStringLiteral("该终端1分钟后进行重启")}},
         {1304, {Action::RequestPasswordChange, Audience::DomainUsers, QString()}},
@@ -31,8 +31,8 @@ SessionPolicy sessionPolicy(int code)
 
 std::optional<QJsonObject> parsePolicyMessage(const QString& payload)
 {
-    // Latin-1, not UTF-8, is intended: characters outside Latin-1 become question marks before parsing,
-    // and all agents of a fleet must read one message alike.
+    // Latin-1, not UTF-8: characters outside Latin-1 become question marks before parsing. All agents of a
+    // fleet must read a message alike.
     QJsonParseError error{};
     const auto document = QJsonDocument::fromJson(payload.toLatin1(), &error);
     if (error.error != QJsonParseError::NoError || !document.isObject()) {

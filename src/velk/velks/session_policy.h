@@ -6,7 +6,7 @@
 
 #include <optional>
 
-/// What a policy code asks of the user's session.
+/// What a policy code requires of the user's session.
 struct SessionPolicy
 {
     Q_GADGET
@@ -15,11 +15,11 @@ public:
     enum class Audience {
         EverySession,
         DomainUsers,
-        AddressedDomainUser, ///< the domain user whose uid stands in the message
+        AddressedDomainUser, ///< the domain user whose uid is in the message
     };
     Q_ENUM(Audience)
     enum class Action {
-        Forward, ///< not for the agent: the session policy service carries it out
+        Forward, ///< the session policy service carries it out, not the agent
         LeaveDomain,
         WarnThenLogOut,
         Notify,
@@ -29,11 +29,11 @@ public:
 
     Action action = Action::Forward;
     Audience audience = Audience::EverySession;
-    QString text; ///< shown to the user; empty where the action has a text of its own or none
+    QString text; ///< shown to the user; empty if the action needs no text or has its own
 };
 
-/// The policy of a code; every code that the table does not hold is forwarded.
+/// The policy of a code; codes that are not in the table are forwarded.
 SessionPolicy sessionPolicy(int code);
 
-/// The message object that a pushed payload holds; nothing if it is no JSON object with a "type".
+/// The JSON object in a pushed payload; nothing if the payload holds no JSON object with a "type".
 std::optional<QJsonObject> parsePolicyMessage(const QString& payload);

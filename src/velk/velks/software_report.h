@@ -6,10 +6,10 @@
 
 struct SoftwareInfo;
 
-/// What the platform is told of one software change.
+/// The report of one software change.
 struct SoftwareChange
 {
-    int change = 0; ///< as softwareChange() gives it
+    int change = 0; ///< from softwareChange()
     QString machineId;
     QString ipAddress;
     QString hardwareAddress;
@@ -19,7 +19,7 @@ struct SoftwareChange
     QDateTime time; ///< local
 };
 
-/// The platform's code of an action of the launcher: 1 for "created", 2 for "update", 0 for any other.
+/// The platform's code for an action of the launcher: 1 for "created", 2 for "update", 0 for any other.
 int softwareChange(const QString& action);
 
 /// The reports as compact JSON with sorted keys.

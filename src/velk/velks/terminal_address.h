@@ -4,20 +4,20 @@
 #include <QNetworkInterface>
 #include <QString>
 
-/// What a network interface is known by.
+/// A network interface's state and hardware address.
 struct InterfaceState
 {
     QNetworkInterface::InterfaceFlags flags;
     QString hardwareAddress;
 };
 
-/// The last IPv4 address that is not 127.0.0.1; empty without one.
+/// The last IPv4 address other than 127.0.0.1; empty if there is none.
 QString lastIpv4Address(const QList<QHostAddress>& addresses);
 
-/// The greatest hardware address, as text, of the interfaces that are up and running, the loopback interface
-/// included; empty without one.
+/// The greatest hardware address, compared as text, of all interfaces that are up and running, including the
+/// loopback interface; empty if there is none.
 QString greatestHardwareAddress(const QList<InterfaceState>& interfaces);
 
-/// The same of this terminal's addresses and interfaces, as the system lists them now.
+/// The same for this terminal's current addresses and interfaces.
 QString terminalAddress();
 QString terminalHardwareAddress();
