@@ -1,4 +1,4 @@
-"""A complete simulated terminal: file view, buses, desktop services and platform around the real agent."""
+"""A complete simulated terminal around the real agent: files, buses, desktop services and platform."""
 
 from pathlib import Path
 

@@ -1,4 +1,5 @@
-"""`run` enters a box, `inside` is its first process; `demo`, `box` and `soak` are for people."""
+"""The entry point: `run` enters a box, `init` is the box's first process; users start `demo`, `box` and
+`soak`."""
 
 from __future__ import annotations
 
@@ -40,18 +41,18 @@ def _enter(arguments: list[str]) -> None:
     os.execvp(argv[0], argv)
 
 
-def _run_for_people(verb: str, arguments: list[str]) -> int:
-    from sandbox.box import outside
+def _run_for_user(verb: str, arguments: list[str]) -> int:
+    from sandbox.box import host
     from sandbox.demo import main as demo
     from sandbox.prompt import main as prompt
     from sandbox.soak import main as soak
 
-    # A box is deaf to Ctrl+C (see outside.enter), and so are at first the programs in it.
+    # host.enter makes the box ignore Ctrl+C, and its programs inherit that.
     signal.signal(signal.SIGINT, signal.default_int_handler)
     try:
         return {"demo": demo.run, "box": prompt.run, "soak": soak.run}[verb](arguments)
-    except outside.Trouble as trouble:
-        print(f"{verb}: {trouble}", file=sys.stderr)
+    except host.CannotRun as error:
+        print(f"{verb}: {error}", file=sys.stderr)
         return 1
     except KeyboardInterrupt:
         return _INTERRUPTED
@@ -60,12 +61,12 @@ def _run_for_people(verb: str, arguments: list[str]) -> int:
 def main() -> int:
     """Entry point."""
     verb, *arguments = sys.argv[1:] or ["run"]
-    if verb == "inside":
-        from sandbox.box import inside  # needs D-Bus, which only the box must have
+    if verb == "init":
+        from sandbox.box import init  # needs D-Bus, which the host may lack
 
-        return inside.run(arguments[1:])
+        return init.run(arguments[1:])
     if verb in ("demo", "box", "soak"):
-        return _run_for_people(verb, arguments)
+        return _run_for_user(verb, arguments)
     _enter(arguments)
     return 0
 

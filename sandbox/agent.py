@@ -1,4 +1,4 @@
-"""The session agent: the real binary, started and watched."""
+"""The session agent: starts the real binary, reads its log, ends it."""
 
 from __future__ import annotations
 
@@ -17,12 +17,13 @@ from sandbox.bus.senders import Senders
 from sandbox.events import PATIENCE, Events
 from sandbox.machine.clock import Clock, RealTime
 
-# For instrumented agents: the sanitizer's library need not come before the preloaded clock (preloading both
-# would make the agent's child processes hang), and its leak check, which a stopped clock breaks, stays off.
+# For instrumented agents: the preloaded clock may come before the sanitizer's library (if both were
+# preloaded, the agent's child processes would hang), and the leak check is off because it fails with a
+# stopped clock.
 _ASAN_WITH_PRELOAD = "verify_asan_link_order=0:detect_leaks=0"
 _NEVER_STARTED = "the agent was never started"
-# A record starts and ends with control characters of its own: a message may hold line breaks, and what is not
-# a record (a sanitizer's report, a crash) must stay apart from the messages.
+# Control characters delimit a record: messages may contain line breaks, and other output (a sanitizer's
+# report, a crash) must not be taken for a message.
 _START, _FIELD, _END = "\x1e", "\x1f", "\x1d"
 _PATTERN = _START + _FIELD.join(("%{type}", "%{file}", "%{line}", "%{function}", "%{message}")) + _END
 _FIELDS = 5
@@ -37,14 +38,14 @@ def default_binary() -> Path:
 
 
 class StillRunning(Exception):
-    """The agent did not end when it was asked to; it has been killed."""
+    """The agent did not end on SIGTERM; it has been killed."""
 
 
 class Agent:
-    """One agent process at a time; it may be started again after it has ended."""
+    """At most one agent process at a time; it can be started again after it has ended."""
 
-    def __init__(self, events: Events, senders: Senders, binary: Path | None = None) -> None:
-        self.binary = binary or default_binary()
+    def __init__(self, events: Events, senders: Senders) -> None:
+        self.binary = default_binary()
         self._events = events
         self._senders = senders
         self._process: subprocess.Popen[bytes] | None = None
@@ -57,7 +58,7 @@ class Agent:
         extra_env: Mapping[str, str] | None = None,
         extra_argv: Sequence[str] = (),
     ) -> None:
-        """Start the process; returns at once."""
+        """Start the process and return at once."""
         assert not self.alive, "the agent runs already"
         env = {**os.environ, "QT_MESSAGE_PATTERN": _PATTERN, **(clock or RealTime()).environment()}
         if "LD_PRELOAD" in env:
@@ -84,35 +85,35 @@ class Agent:
 
     @property
     def pid(self) -> int:
-        """Process id of the agent that was started last."""
+        """Process id of the agent started last."""
         assert self._process, _NEVER_STARTED
         return self._process.pid
 
     @property
     def log(self) -> str:
-        """Everything that the agent wrote to its standard error, as a person reads it."""
+        """The agent's standard error so far, in a readable form."""
         return self._log.text if self._log else ""
 
     @property
     def died_unexpectedly(self) -> bool:
-        """Whether it ended without being told to."""
+        """Whether the process ended although neither `stop`, `kill` nor `wait` was called."""
         return self._process is not None and not self.alive and not self._ending_wanted
 
     @property
     def exit_status(self) -> int | None:
-        """How it ended: its status, minus the number of the signal, None while it runs."""
+        """The exit status, negative for a signal, None while the process runs."""
         return self._process.poll() if self._process else None
 
     def stop(self) -> None:
-        """End the agent as the end of the session does, and wait until it has gone and its log is read."""
+        """Send SIGTERM, as the end of a session does, and wait for the end of the process and its log."""
         self._end(lambda process: process.terminate())
 
     def kill(self) -> None:
-        """End the agent at once."""
+        """Send SIGKILL, and wait for the end of the process and its log."""
         self._end(lambda process: process.kill())
 
     def wait(self, timeout: float = PATIENCE) -> int:
-        """Wait for the agent to end by itself, which is then no surprise; the result is its exit status."""
+        """Wait until the agent ends by itself, as expected; returns its exit status."""
         assert self._process and self._log, _NEVER_STARTED
         self._ending_wanted = True
         status = self._process.wait(timeout)
@@ -121,7 +122,7 @@ class Agent:
         return status
 
     def resident_bytes(self) -> int:
-        """Memory that the process holds."""
+        """The process's resident memory."""
         pages = int(Path(f"/proc/{self.pid}/statm").read_text().split()[1])
         return pages * os.sysconf("SC_PAGE_SIZE")
 
@@ -130,7 +131,7 @@ class Agent:
         return bus.names_of(self.pid)
 
     def _end_children(self) -> None:
-        """End what the agent's scripts have left behind, as the end of a session does."""
+        """Kill processes left behind by the agent's scripts, as the end of a session does."""
         with contextlib.suppress(ProcessLookupError):
             os.killpg(self.pid, signal.SIGKILL)
 
@@ -148,10 +149,10 @@ class Agent:
 
 
 class LogReader:
-    """Turns an agent's log into events while it is written, until the writer has gone.
+    """Turns an agent's log into events while it is written, until the writer ends.
 
-    Messages become events of kind "log" with the level as member, the message as only argument and file, line
-    and function as detail; other lines events of kind "output".
+    A message becomes an event of kind "log" with the level as member, the message as its only argument, and
+    file, line and function as detail; any other line becomes an event of kind "output".
     """
 
     def __init__(self, source: str, stream: IO[bytes], events: Events) -> None:
@@ -166,7 +167,7 @@ class LogReader:
 
     @property
     def text(self) -> str:
-        """The whole log so far, as a person reads it."""
+        """The log so far, in a readable form."""
         return "\n".join(self._lines)
 
     def finish(self) -> None:

@@ -1,8 +1,8 @@
-"""The JSON contracts: what crosses a wire of the terminal is held against the schemas of contracts/json/.
+"""The JSON contracts: checks what crosses the terminal's wires against the schemas in contracts/json/.
 
     /usr/bin/python3 -m sandbox.contracts CONTRACT FILE...
 
-checks messages of one's own; the status is 0 if all keep to the contract.
+checks your own messages; the exit status is 0 if all of them are valid.
 """
 
 from __future__ import annotations
@@ -23,7 +23,7 @@ from sandbox.events import Event, Events
 
 FOLDER = REPOSITORY / "contracts" / "json"
 _SUFFIX = ".schema.json"
-_BYTE_ORDER_MARK = "\ufeff"  # at the beginning of a text it does not reach the agent
+_BYTE_ORDER_MARK = "\ufeff"  # Qt drops it at the beginning of a text
 
 _UPLOADS = {
     "https://%1:%2/uim/v3/client/upinfo_log": "software-change-report",
@@ -51,13 +51,13 @@ def schema_file(name: str) -> Path:
 
 
 def violation(name: str, value: Any) -> str | None:
-    """In what a JSON value breaks a contract, None when it keeps to it."""
+    """How a JSON value breaks a contract; None if it is valid."""
     error = best_match(_validator(name).iter_errors(value))
     return f"{error.json_path}: {error.message}" if error else None
 
 
 def violation_of_text(name: str, text: str) -> str | None:
-    """In what a text breaks a contract; one that is no JSON breaks every one."""
+    """How a text breaks a contract; None if it is valid JSON that keeps to it."""
     try:
         value = json.loads(text, parse_constant=_no_number)
     except ValueError as error:
@@ -66,30 +66,30 @@ def violation_of_text(name: str, text: str) -> str | None:
 
 
 def require(name: str, value: Any) -> None:
-    """AssertionError if a value that the box itself made up breaks its contract."""
+    """Raise AssertionError if a value made by the sandbox itself breaks its contract."""
     broken = violation(name, value)
     assert broken is None, f"the box breaks the contract {name}: {broken}"
 
 
 class Contracts:
-    """Watches the terminal's wires. Everything that the agent says in JSON must keep to its contract, and so
-    must what the platform answers by itself; what breaks one is kept in `violations`.
+    """Checks all JSON of the agent, and the platform's own replies, against the contracts; collects the
+    `violations`.
 
-    What a test has the services say instead, texts and bytes as they stand, may be anything.
+    Raw texts and bytes that a test sends through a fake or the platform are not checked.
     """
 
     def __init__(self, events: Events) -> None:
         self.violations: list[str] = []
-        self._excused: set[str] = set()
+        self._allowed: set[str] = set()
         self._pushed: Counter[str] = Counter()
         events.subscribe(self._look_at)
 
-    def excuse(self, name: str) -> None:
-        """From now on the agent may break this contract, as one that relays garbage does."""
-        self._excused.add(name)
+    def allow_violations(self, name: str) -> None:
+        """Stop checking this contract, for an agent that has to relay garbage."""
+        self._allowed.add(name)
 
     def _look_at(self, event: Event) -> None:
-        # What fits none of these in the number or type of its arguments breaks the D-Bus contract already.
+        # An event with other arguments matches no case; it has already broken its D-Bus contract.
         match event.kind, event.source, event.target, event.member, event.args:
             case "signal", "daemon", _, "pushPolicyMsg", (_, text):
                 self._pushed[text.removeprefix(_BYTE_ORDER_MARK)] += 1
@@ -104,7 +104,9 @@ class Contracts:
 
     def _look_at_forwarded(self, text: str) -> None:
         if self._pushed[text] < 1:
-            self.violations.append(f"the agent forwarded what was not pushed, or once too often: {text}")
+            self.violations.append(
+                f"the agent forwarded a text that was not pushed, or once too often: {text}"
+            )
         self._pushed[text] -= 1
         self._hold("the agent", "forwarded-policy", text)
 
@@ -112,7 +114,7 @@ class Contracts:
         if address in _UPLOADS:
             self._hold("the agent", _UPLOADS[address], text)
         else:
-            self.violations.append(f"the agent wants an upload to {address}, which no contract describes")
+            self.violations.append(f"the agent asks for an upload to {address}, which no contract describes")
 
     def _look_at_request(self, route: str, line: str, body: str) -> None:
         contract = _REQUESTS.get(route)
@@ -122,7 +124,7 @@ class Contracts:
             self.violations.append(f"the agent's request '{line}' with body '{body}' fits no contract")
 
     def _hold(self, who: str, contract: str, text: str) -> None:
-        broken = None if contract in self._excused else violation_of_text(contract, text)
+        broken = None if contract in self._allowed else violation_of_text(contract, text)
         if broken:
             self.violations.append(f"{who} breaks the contract {contract}: {broken}; it said: {text}")
 
@@ -135,14 +137,14 @@ def _schemas() -> dict[str, Any]:
 
 @cache
 def _validator(name: str) -> Any:
-    """Made once: reading and checking the schemas takes longer than checking a message."""
+    """Cached: reading the schemas takes longer than checking a message."""
     schema = _schemas()[name]
     return Draft202012Validator(schema, **_references(schema))
 
 
 def _references(schema: dict[str, Any]) -> dict[str, Any]:
-    """The argument that lets a validator find the other schemas: older libraries know no registry, newer ones
-    are about to know nothing else."""
+    """The argument that lets a validator find the other schemas: a registry, or a resolver for libraries
+    without registries."""
     known = {each["$id"]: each for each in _schemas().values()}
     try:
         from referencing import Registry
@@ -158,7 +160,7 @@ def _no_number(constant: str) -> None:
 
 
 def main() -> int:
-    """Entry point for people who check their own messages."""
+    """Entry point of the command-line check."""
     parser = argparse.ArgumentParser(prog="python3 -m sandbox.contracts")
     parser.add_argument("contract", choices=names())
     parser.add_argument("file", nargs="+", type=Path)
@@ -166,7 +168,7 @@ def main() -> int:
     try:
         broken = {file: violation_of_text(arguments.contract, file.read_text()) for file in arguments.file}
     except (OSError, UnicodeDecodeError) as error:
-        parser.error(f"cannot read what is to be checked: {error}")
+        parser.error(f"cannot read the file: {error}")
     for file, complaint in broken.items():
         print(f"{file}: {complaint or 'keeps to the contract'}")
     return 1 if any(broken.values()) else 0

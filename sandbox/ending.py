@@ -1,7 +1,8 @@
-"""How programs for people end."""
+"""The end of command-line programs."""
 
 from __future__ import annotations
 
+import signal
 import sys
 from typing import Callable, NoReturn
 
@@ -9,7 +10,8 @@ _INTERRUPTED = 130
 
 
 def exit_with(main: Callable[[], int]) -> NoReturn:
-    """End with the status of `main`; Ctrl+C is a person's wish and no error that one would want to trace."""
+    """Exit with the status of `main`; Ctrl+C and SIGTERM end the program without a traceback."""
+    signal.signal(signal.SIGTERM, signal.default_int_handler)
     try:
         sys.exit(main())
     except KeyboardInterrupt:

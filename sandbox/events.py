@@ -1,4 +1,4 @@
-"""Everything that happens in a box, as one list in the order in which it happened."""
+"""Everything that happens in a terminal, as one list in order."""
 
 from __future__ import annotations
 
@@ -9,10 +9,10 @@ from typing import Any, Callable, Mapping
 
 Predicate = Callable[["Event"], bool]
 _SHOWN_CHARACTERS = 300
-# Seconds until something that does not come counts as missing: far more than even a busy machine takes.
+# Seconds until an expected event counts as missing: far more than even a busy machine needs.
 PATIENCE = 120.0
-# How the texts begin that the terminal has the daemon push for its own sake: no policies, so that the agent
-# does nothing about them.
+# The terminal synchronises with the agent by pushes that begin like this. They are no policies; the agent
+# logs and ignores them.
 SYNC, WAKE_UP = "sync ", "wake up"
 
 
@@ -20,9 +20,9 @@ SYNC, WAKE_UP = "sync ", "wake up"
 class Event:
     """One thing that happened.
 
-    `kind` is "call", "signal", "log", "output", "http", "reply" (of the platform), "post" (to it), "command",
-    "life", or "file" and "inbox" for what was found there; `member` the D-Bus member, log level, route or
-    command; `args` plain Python values, whose exact types `detail["signature"]` tells.
+    `kind` is "call", "signal", "log", "output", "http", "reply" (of the platform), "post" (to it), "upload",
+    "command", "life", or "file" and "inbox" for content found there; `member` is the D-Bus member, log level,
+    route or command. `args` are plain Python values; `detail["signature"]` has their D-Bus types.
     """
 
     time: float
@@ -41,11 +41,11 @@ class Event:
 
 
 class NotSeen(AssertionError):
-    """An event that was waited for did not come; the text lists what came instead."""
+    """An awaited event did not come; the message lists the events that came instead."""
 
 
 class Events:
-    """Thread-safe, append-only list of events that can be waited for."""
+    """A thread-safe, append-only list of events, with waiting."""
 
     def __init__(self) -> None:
         self._events: list[Event] = []
@@ -62,7 +62,7 @@ class Events:
         args: tuple[Any, ...] = (),
         detail: Mapping[str, Any] | None = None,
     ) -> Event:
-        """Add an event and wake up those who wait for it; subscribers are called on this thread."""
+        """Add an event, wake up waiting threads and call the subscribers on this thread."""
         with self._changed:
             event = Event(time.monotonic(), source, target, kind, member, args, detail or {})
             self._events.append(event)
@@ -73,22 +73,22 @@ class Events:
         return event
 
     def subscribe(self, subscriber: Callable[[Event], None]) -> None:
-        """Call `subscriber` with every event from now on, on the thread where it happens."""
+        """Call `subscriber` with every later event, on the thread that records it."""
         with self._changed:
             self._subscribers.append(subscriber)
 
     def forget(self) -> None:
-        """Drop what has happened so far; marks taken before mean nothing any more."""
+        """Drop all events so far; earlier marks become invalid."""
         with self._changed:
             self._events.clear()
 
     def mark(self) -> int:
-        """A place in the list: what comes `after` it has not happened yet."""
+        """The current end of the list: pass it as `after` to see only later events."""
         with self._changed:
             return len(self._events)
 
     def all(self, predicate: Predicate | None = None, *, after: int = 0, **fields: Any) -> list[Event]:
-        """Events so far that have these field values and satisfy `predicate`."""
+        """The events so far with these field values that satisfy `predicate`."""
         with self._changed:
             return [event for event in self._events[after:] if _matches(event, predicate, fields)]
 
@@ -101,9 +101,9 @@ class Events:
         timeout: float = PATIENCE,
         **fields: Any,
     ) -> Event:
-        """The `count`th event after mark `after` that has these field values and satisfies `predicate`.
+        """Wait for the `count`th event after mark `after` with these field values that satisfies `predicate`.
 
-        Waits for it if need be; raises NotSeen after `timeout` seconds.
+        Raises NotSeen after `timeout` seconds.
         """
         found: list[Event] = []
         looked_at = after
@@ -120,7 +120,7 @@ class Events:
         return found[count - 1]
 
     def report(self, after: int = 0) -> str:
-        """The events as text, one a line, with seconds since the box was opened."""
+        """The events as text, one per line, with the seconds since the start of the terminal."""
         with self._changed:
             return "\n".join(f"{event.time - self._start:9.3f} {event}" for event in self._events[after:])
 

@@ -1,4 +1,4 @@
-"""The policies that the agent itself carries out, as their contract lists them."""
+"""The policies that the agent carries out itself, read from their contract."""
 
 from __future__ import annotations
 
@@ -9,7 +9,7 @@ from sandbox import contracts
 
 
 class Policy(NamedTuple):
-    """One entry of the contract; audience and action have the names that the agent's table gives them."""
+    """One entry of the contract; audience and action are named as in the agent's table."""
 
     code: int
     meaning: str
@@ -36,7 +36,7 @@ def _policy(audience: str, entry: dict[str, Any]) -> Policy:
 
 
 POLICIES = {policy.code: policy for policy in sorted(_own_policies())}
-# Some of all other codes: those beside the agent's own, and a few more.
+# A sample of all other codes: the neighbours of the agent's own, and a few more.
 FORWARDED_CODES = tuple(
     sorted({0, 5, 1100}.union(*({code - 1, code + 1} for code in POLICIES)) - POLICIES.keys())
 )
@@ -48,10 +48,10 @@ def with_action(*actions: str) -> list[Policy]:
 
 
 def for_one_account() -> list[Policy]:
-    """The policies whose payload names the user that they are for."""
+    """The policies whose payload names the user concerned."""
     return [policy for policy in POLICIES.values() if policy.audience == "AddressedDomainUser"]
 
 
 def for_domain_users() -> list[Policy]:
-    """The policies that leave local users out."""
+    """The policies that do not apply to local users."""
     return [policy for policy in POLICIES.values() if policy.audience != "EverySession"]

@@ -1,4 +1,4 @@
-"""A whole terminal: buses, services, files, platform and agent of the box that this program runs in."""
+"""The simulated terminal: buses, fakes, files, platform and agent of the box that this program runs in."""
 
 from __future__ import annotations
 
@@ -28,15 +28,15 @@ from sandbox.machine.clock import Clock, ManualClock, MovableClock
 from sandbox.machine.files import FileView
 from sandbox.machine.package_tools import Tools
 from sandbox.machine.packages import Packages
-from sandbox.machine.users import User, current_user
+from sandbox.machine.users import current_user
 from sandbox.platform.server import Platform, trust
 
 
 class Terminal:
-    """Fresh buses with every service on them but those named in `absent`, fresh files, an agent that is not
-    started yet. As a context manager it is closed at the end.
+    """A new Terminal has fresh files, fresh buses with all fakes on them except those in `absent`, and an
+    agent that is not started. As a context manager it closes itself.
 
-    A Terminal must be made inside a box and by one program at a time.
+    Needs a box; only one program at a time may open a Terminal there.
     """
 
     daemon: Daemon
@@ -49,12 +49,10 @@ class Terminal:
     dock: Dock
     launcher: Launcher
 
-    def __init__(
-        self, user: User | None = None, clock: Clock | None = None, absent: Collection[str] = ()
-    ) -> None:
+    def __init__(self, clock: Clock | None = None, absent: Collection[str] = ()) -> None:
         self.user = current_user()
-        assert user in (None, self.user), f"this box was entered as {self.user.name}"
         self.events = Events()
+        self.patience = PATIENCE  # seconds that `sync` waits
         self.contracts = Contracts(self.events)
         self.clock: Clock = clock or ManualClock()
         self.files = FileView(self.user)
@@ -96,14 +94,15 @@ class Terminal:
     def __exit__(
         self, kind: type[BaseException] | None, error: BaseException | None, trace: TracebackType | None
     ) -> None:
-        problems = self.shut_down()
-        if problems and error is None:
-            raise AssertionError(self._complaint(problems))
+        if error:
+            self.shut_down()
+        else:
+            self.close()
 
     @cached_property
     def platform(self) -> Platform:
-        """The platform, which starts serving when it is first looked at; the terminal then knows its address
-        and has its certificates. Until then no poll falls into what a test watches."""
+        """The platform. It starts on first use, when the terminal also gets its address and certificates; a
+        test that does not use it sees no polls."""
         known = trust()
         self.files.write_certificates(
             known.authority.certificate, known.terminal.certificate, known.terminal.key
@@ -115,10 +114,9 @@ class Terminal:
     def start_agent(
         self, ready: Callable[[], object] | None = None, extra_env: Mapping[str, str] | None = None
     ) -> None:
-        """Start the agent and wait until it has announced the session to the daemon and handles messages.
+        """Start the agent and wait until it has reported the session to the daemon and handles messages.
 
-        Without a daemon it is ready once it has logged the user's name; `ready` replaces all of that by a
-        wait of the caller's own.
+        Without a daemon, wait until it has logged the user's name instead; `ready` replaces the whole wait.
         """
         mark = self.events.mark()
         self.agent.start(self.clock, extra_env)
@@ -133,21 +131,22 @@ class Terminal:
             )
             self.receive_all()
 
-    def sync(self, timeout: float = PATIENCE) -> None:
-        """Return once the agent has handled everything that was sent to it so far, and what it sent to the
-        services because of that is recorded.
+    def sync(self, timeout: float | None = None) -> None:
+        """Return once the agent has handled everything that was sent to it so far, and everything that it
+        sent in response is recorded.
 
-        The daemon pushes a policy that is no JSON, which the agent logs and ignores.
+        To see that, the daemon pushes a policy that is no JSON, which the agent logs and ignores.
         """
         token = f"{SYNC}{uuid4()}"
         mark = self.events.mark()
         self.daemon.push_policy(token)
-        self.events.wait_for(lambda event: token in event.args[0], kind="log", after=mark, timeout=timeout)
+        limit = timeout or self.patience
+        self.events.wait_for(lambda event: token in event.args[0], kind="log", after=mark, timeout=limit)
         self.receive_all()
 
     def receive_all(self) -> None:
-        """Return once all that the agent has sent so far, to services that are there or not, is through the
-        buses and recorded."""
+        """Return once everything that the agent has sent so far, to present or absent services, is
+        recorded."""
         for bus in (self.system_bus, self.session_bus):
             bus.receive_all_from(self.agent.pid)
         for fake in self.fakes.values():
@@ -159,8 +158,8 @@ class Terminal:
     def advance(self, seconds: int) -> None:
         """Move the agent's clock ahead and return once the timers that became due have fired.
 
-        Before, all that was sent to the agent is handled, so that its timers run from now. After the jump the
-        first message wakes the agent up, the second one is handled after the timers.
+        The agent first handles everything that was sent to it, so its timers start from now. After the jump,
+        one message wakes it up; it handles the next one after the timers.
         """
         self.sync()
         self.jump(seconds)
@@ -168,14 +167,14 @@ class Terminal:
         self.sync()
 
     def jump(self, seconds: int) -> None:
-        """Move the agent's clock ahead and wake the agent up, but do not wait for it: it may be blocked."""
+        """Move the agent's clock ahead and wake the agent up without waiting for it: it may be blocked."""
         assert isinstance(self.clock, MovableClock), "this clock cannot be moved"
         self.clock.jump(seconds)
         self.daemon.push_policy(WAKE_UP)
 
     def violations(self) -> list[str]:
-        """In what contracts were broken so far: interfaces by a caller, JSON by the agent or the platform, or
-        all of them by the agent that asked for what nobody serves."""
+        """Contract violations so far: wrong D-Bus calls, wrong JSON, and calls to services without a
+        contract."""
         return [
             *self.contracts.violations,
             *(found for fake in self.fakes.values() for found in fake.violations),
@@ -183,17 +182,17 @@ class Terminal:
         ]
 
     def report(self) -> str:
-        """The agent's log and all events, for a person who looks for the cause of a failure."""
+        """The agent's log and all events, to find the cause of a failure."""
         return f"agent's log:\n{self.agent.log}\n\nevents:\n{self.events.report()}"
 
     def close(self) -> None:
-        """End everything; an AssertionError tells when the agent broke a contract or died."""
+        """End everything; raises AssertionError if a contract was broken or the agent died."""
         problems = self.shut_down()
         if problems:
-            raise AssertionError(self._complaint(problems))
+            raise AssertionError("\n".join([*problems, self.report()]))
 
     def shut_down(self) -> list[str]:
-        """End everything; the result is what was wrong."""
+        """End everything; returns the problems found."""
         problems = []
         if self.agent.died_unexpectedly:
             problems.append(f"the agent died: exit status {self.agent.exit_status}")
@@ -211,9 +210,6 @@ class Terminal:
             self.platform.close()
         return problems
 
-    def _complaint(self, problems: list[str]) -> str:
-        return "\n".join([*problems, self.report()])
-
 
 FAKES: dict[str, type[Fake]] = get_type_hints(Terminal)
-"""The services of a terminal, which are its declared attributes."""
+"""The fakes of a terminal by name: its declared attributes."""

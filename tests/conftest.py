@@ -16,6 +16,7 @@ from typing import Any, Generator, Iterator
 
 import pytest
 
+from sandbox.bus.stranger import Stranger
 from sandbox.machine import layout
 from sandbox.machine.clock import ManualClock, RealTime
 from sandbox.terminal import Terminal
@@ -39,6 +40,22 @@ def session(terminal: Terminal) -> Terminal:
     """A terminal whose agent is ready."""
     terminal.start_agent()
     return terminal
+
+
+@pytest.fixture
+def on_system(terminal: Terminal) -> Iterator[Stranger]:
+    """A stranger on the system bus."""
+    stranger = Stranger(terminal.system_bus)
+    yield stranger
+    stranger.close()
+
+
+@pytest.fixture
+def on_session(terminal: Terminal) -> Iterator[Stranger]:
+    """A stranger on the session bus."""
+    stranger = Stranger(terminal.session_bus)
+    yield stranger
+    stranger.close()
 
 
 def pytest_configure(config: pytest.Config) -> None:

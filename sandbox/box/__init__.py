@@ -1,1 +1,1 @@
-"""The box that a terminal is: its command line, its first process, and the way in from outside."""
+"""The box that contains a terminal: its command line, its first process, and how the host enters it."""

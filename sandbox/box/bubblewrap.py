@@ -1,6 +1,6 @@
-"""Builds the bubblewrap command that a box consists of.
+"""Builds the bubblewrap command line of a box.
 
-The root is put together from /usr upwards instead of binding the host's root read-only: a read-only bind
+It mounts the parts of the root one by one instead of binding the host's root read-only: a read-only bind
 allows no new mount points, and the terminal has its own /etc, /var, /home and /usr/share/velk.
 """
 
@@ -16,7 +16,7 @@ from sandbox import REPOSITORY
 from sandbox.machine import layout
 from sandbox.machine.users import USERS, User
 
-# Parts of the host's /etc that programs need to run and that say nothing of the host.
+# Parts of the host's /etc that programs need to run and that reveal nothing about the host.
 _HOST_ETC = ("alternatives", "ld.so.cache", "ssl/openssl.cnf")
 _WRITABLE = ("/etc", "/home", "/run", "/tmp", "/var", str(layout.SHARE), str(layout.APPLICATIONS))
 _PASSED_ON = (
@@ -30,16 +30,16 @@ _PASSED_ON = (
     "VELK_BUILD_DIR",
 )
 _NAMESPACES = ("user", "pid", "ipc", "uts")
-# The box's network belongs to the box's own user, which one made by bubblewrap would not: the first process
-# makes it, sets it up and gives the powers for that up (see sandbox/machine/network.py).
-_POWERS = ("CAP_SYS_ADMIN", "CAP_NET_ADMIN")
+# A network namespace made by bubblewrap would not belong to the box's user. The first process makes and sets
+# up the namespace itself, then drops the capabilities for that (see sandbox/machine/network.py).
+_CAPABILITIES = ("CAP_SYS_ADMIN", "CAP_NET_ADMIN")
 _OWN_NETWORK = ("/usr/bin/unshare", "--net")
-# Tries these powers and that network, and names the cause where they are refused.
+# Tries these capabilities and the namespace; prints the cause if the host refuses them.
 _CAN_BOX = REPOSITORY / "sandbox" / "can-box"
 
 
 class BoxUnavailable(Exception):
-    """This host cannot run a box; the text says what to do."""
+    """This host cannot run a box; the message says what to do."""
 
 
 def command(
@@ -48,10 +48,10 @@ def command(
     env: Mapping[str, str] | None = None,
     shown: Mapping[Path, Path] | None = None,
 ) -> list[str]:
-    """The command line that runs `argv` as `user` in a box, with `env` added to the box's environment and
-    files of the host's `shown` at other places.
+    """The command line that runs `argv` as `user` in a box, with `env` added to the environment and the
+    host's files `shown` at the given places.
 
-    It refers to files that are open in this process and that the child must inherit.
+    It refers to open files of this process, which the child must inherit.
     """
     return [
         "bwrap",
@@ -59,21 +59,21 @@ def command(
         *(f"--unshare-{namespace}" for namespace in _NAMESPACES),
         *("--hostname", "terminal"),
         *("--uid", str(user.uid), "--gid", str(user.uid)),
-        *_powers(),
+        *(word for capability in _CAPABILITIES for word in ("--cap-add", capability)),
         *_file_system(),
         *(word for place, file in (shown or {}).items() for word in ("--bind", str(file), str(place))),
         *_environment(user, env or {}),
         *("--chdir", _working_folder()),
         "--",
         *_OWN_NETWORK,
-        *("/usr/bin/python3", "-P", "-m", "sandbox", "inside", "--"),
+        *("/usr/bin/python3", "-P", "-m", "sandbox", "init", "--"),
         *argv,
     ]
 
 
 def require() -> None:
-    """Raise BoxUnavailable when bubblewrap is missing, the kernel forbids user namespaces, or the box would
-    lack the agent that is to run."""
+    """Raise BoxUnavailable if bubblewrap is missing, the kernel forbids user namespaces, or the agent would
+    not be visible in the box."""
     if not shutil.which("bwrap"):
         raise BoxUnavailable("bubblewrap is missing; install it with: apt-get install bubblewrap")
     attempt = subprocess.run([_CAN_BOX], stdin=subprocess.DEVNULL, capture_output=True, text=True)
@@ -83,14 +83,7 @@ def require() -> None:
     if agent and not os.access(agent, os.X_OK):
         raise BoxUnavailable(f"VELK_AGENT names no program: {agent}")
     if agent and str(Path(agent).resolve().parent) in ("/", *_WRITABLE):
-        raise BoxUnavailable(
-            f"the box has a {Path(agent).parent} of its own; put the agent into another folder"
-        )
-
-
-def _powers() -> Iterator[str]:
-    for power in _POWERS:
-        yield from ("--cap-add", power)
+        raise BoxUnavailable(f"the box has its own {Path(agent).parent}; put the agent into another folder")
 
 
 def _file_system() -> Iterator[str]:
@@ -120,7 +113,7 @@ def _children(folder: Path, without: Collection[str]) -> Iterator[str]:
 
 
 def _package_tools() -> Iterator[str]:
-    """Copies that can be written over, in the places of the real ones."""
+    """Writable copies in the places of the real tools."""
     for tool in layout.PACKAGE_TOOLS:
         if tool.exists():
             copied = os.open(tool, os.O_RDONLY)
@@ -135,9 +128,9 @@ def _repository() -> Iterator[str]:
 
 
 def _build_folders() -> list[Path]:
-    """Folders of built programs, which stay writable for coverage counters and test output.
+    """Folders of built programs, writable for coverage counters and test output.
 
-    An installed agent is seen with the rest of /usr, which stays as it is.
+    An installed agent is visible with the rest of /usr, read-only.
     """
     chosen = [Path(os.environ[name]) for name in ("VELK_BUILD_DIR",) if os.environ.get(name)]
     if os.environ.get("VELK_AGENT") and not os.environ["VELK_AGENT"].startswith("/usr/"):

@@ -1,4 +1,4 @@
-"""A connection to a bus without a library between, which would answer and check messages by itself."""
+"""A connection to a bus without a library, which would answer and check messages on its own."""
 
 from __future__ import annotations
 
@@ -15,11 +15,11 @@ from sandbox.events import PATIENCE
 BUS = "org.freedesktop.DBus"
 _BUS_PATH = "/org/freedesktop/DBus"
 _CHUNK = 1 << 16
-_HEAD = 16  # the first bytes of a message, which tell how long it is
+_HEAD = 16  # the first bytes of a message, which hold its length
 
 
 class BareConnection:
-    """Sends bytes as they are, and shows what comes; nothing is answered that the owner does not answer."""
+    """Sends bytes unchanged and returns what arrives; it answers nothing by itself."""
 
     def __init__(self, bus: Bus) -> None:
         self._socket = socket.socket(socket.AF_UNIX)
@@ -32,17 +32,17 @@ class BareConnection:
         self.send(call_of_bus(BUS, "Hello"))
 
     def send(self, content: bytes) -> None:
-        """Send one or more messages; waits as long as the bus does not take them."""
+        """Send one or more messages; blocks while the bus does not accept them."""
         self._socket.sendall(content)
 
     def received(self) -> Iterator[bytes]:
-        """What comes, in pieces, until the connection ends."""
+        """The incoming bytes, in pieces, until the connection ends."""
         with contextlib.suppress(ConnectionResetError):
             while piece := self._socket.recv(_CHUNK):
                 yield piece
 
     def messages(self) -> Iterator[Gio.DBusMessage]:
-        """What comes, message by message, until the connection ends."""
+        """The incoming messages, until the connection ends."""
         unread = bytearray()
         for piece in self.received():
             unread += piece
@@ -51,22 +51,22 @@ class BareConnection:
                 del unread[:size]
 
     def end(self) -> None:
-        """Send nothing more; the bus ends the connection once it has taken everything."""
+        """Send nothing more; the bus closes the connection once it has read everything."""
         with contextlib.suppress(OSError):
             self._socket.shutdown(socket.SHUT_WR)
 
     def close(self) -> None:
-        """Free the socket."""
+        """Close the socket."""
         self._socket.close()
 
 
 def call_of_bus(interface: str, member: str, body: GLib.Variant | None = None, serial: int = 1) -> bytes:
-    """A call of the bus itself, as it goes through the wire."""
+    """The bytes of a call to the bus itself."""
     return as_bytes(Gio.DBusMessage.new_method_call(BUS, _BUS_PATH, interface, member), body, serial)
 
 
 def as_bytes(message: Gio.DBusMessage, body: GLib.Variant | None, serial: int = 1) -> bytes:
-    """A message as it goes through the wire. The bus does not mind numbers that come again."""
+    """The bytes of a message. The bus accepts repeated serial numbers."""
     if body is not None:
         message.set_body(body)
     message.set_serial(serial)

@@ -1,4 +1,4 @@
-"""The system and the session bus: real bus daemons on the sockets where programs look for them."""
+"""The system and the session bus: real bus daemons on the usual sockets."""
 
 from __future__ import annotations
 
@@ -45,7 +45,7 @@ _SERVICE = ("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DB
 _STOP_SECONDS = 10
 _PING_SECONDS = 60.0
 
-# Never freed: the binding breaks when a connection's end is dispatched after its Python object has gone.
+# Never freed: the binding crashes when a connection's end is dispatched after its Python object is gone.
 _every_connection: list[Any] = []
 
 
@@ -55,8 +55,8 @@ BusKind = Literal["system", "session"]
 class Bus:
     """One message bus with Debian's limits and no access rules.
 
-    It is known by its socket and its pid file alone, so that any process of the box can stop and restart it.
-    `run` changes whenever all connections are lost.
+    Its state is its socket and its pid file, so any process of the box can stop and restart it. `run` changes
+    with each stop, which ends all connections.
     """
 
     def __init__(self, kind: BusKind, user: User) -> None:
@@ -69,12 +69,12 @@ class Bus:
         self._daemon: subprocess.Popen[bytes] | None = None
         self._control: Any = None
         self._listeners: list[Callable[[], None]] = []
-        # Unique names are never used again while the bus runs.
+        # Safe to keep: a running bus never reuses a unique name.
         self._processes: dict[str, int] = {}
 
     @property
     def address(self) -> str:
-        """Address to connect to."""
+        """The address that programs connect to."""
         return f"unix:path={self._socket}"
 
     @property
@@ -110,10 +110,10 @@ class Bus:
                 stdin=subprocess.DEVNULL,
                 stdout=subprocess.DEVNULL,
                 stderr=log_file,
-                # Its own group: Ctrl+C at a prompt must not take the buses away from the fakes.
+                # Its own process group: Ctrl+C at a prompt must not end the buses.
                 start_new_session=True,
             )
-        # The daemon would write it only after it has said that it is ready.
+        # The daemon itself would write this file only after it has reported that it is ready.
         self._pid_file.write_text(str(self._daemon.pid))
         os.close(writing)
         with open(reading) as printed:
@@ -123,7 +123,7 @@ class Bus:
             listener()
 
     def stop(self) -> None:
-        """End the bus daemon, if it runs, and with it every connection."""
+        """End the bus daemon, if it runs, and so every connection."""
         pid = self.pid
         if pid is not None:
             _end(pid)
@@ -135,25 +135,25 @@ class Bus:
             Path(left).unlink(missing_ok=True)
 
     def restart(self) -> None:
-        """Replace the bus daemon by a fresh one that nobody is connected to, and that can start nothing."""
+        """Replace the bus daemon by a new one without connections and without services that it can start."""
         self.stop()
         for service in self._services.glob("*.service"):
             service.unlink()
         self.start()
 
     def offer(self, bus_name: str, command: str) -> None:
-        """Let the bus run a command when `bus_name` is called and nobody owns it."""
+        """Let the bus run a command when `bus_name` is called and has no owner."""
         service = self._services / f"{bus_name}.service"
         service.write_text(f"[D-BUS Service]\nName={bus_name}\nExec={command}\n")
         self.ask("ReloadConfig", "")
 
     def when_started(self, listener: Callable[[], None]) -> None:
-        """Call `listener` now, when the bus runs, and again after each start."""
+        """Call `listener` now (the bus must be running) and again after each start."""
         self._listeners.append(listener)
         listener()
 
     def connect(self) -> Any:
-        """A new private connection with a unique name of its own; to be used on the main loop's thread."""
+        """A new private connection; use it on the main loop's thread only."""
         return MainLoop.call(self._connect)
 
     def owner(self, name: str) -> str | None:
@@ -170,24 +170,23 @@ class Bus:
         return [str(name) for name in self.ask("ListNames", "")]
 
     def process_of(self, unique_name: str) -> int | None:
-        """Process id behind a connection; None when it had gone before anybody asked."""
+        """Process id behind a connection; None if it ended before the first question about it."""
         return self._processes.get(unique_name) or MainLoop.call(self._ask_for_process, unique_name)
 
     def names_of(self, pid: int) -> list[str]:
-        """Unique names of the connections that a process has open."""
+        """Unique names of a process's open connections."""
         return [name for name in self.names() if name.startswith(":") and self.process_of(name) == pid]
 
     def receive_all_from(self, pid: int) -> None:
         """Return once everything that a process has sent so far has reached the bus."""
-        names = self.names_of(pid)
-        await_pings(self._control, names)
+        await_pings(self._control, self.names_of(pid))
 
     def ask(self, member: str, signature: str, *args: Any) -> Any:
         """Call a method of the bus itself."""
         return MainLoop.call(self._ask, member, signature, args)
 
     def _ask_for_process(self, unique_name: str) -> int | None:
-        # The connection may have ended since somebody else has asked.
+        # Another thread may have asked meanwhile, and the connection may have ended since.
         if unique_name not in self._processes:
             try:
                 process = int(self._ask("GetConnectionUnixProcessID", "s", (unique_name,)))
@@ -197,7 +196,8 @@ class Bus:
         return self._processes[unique_name]
 
     def _forget(self) -> None:
-        """On the main loop's thread, where no question to the bus that has ended is half asked."""
+        """Drop the state of the ended bus. Runs on the main loop's thread, so no call to it is in
+        progress."""
         self.run += 1
         self._control = None
         self._processes.clear()
@@ -215,10 +215,10 @@ class Bus:
 
 
 def await_pings(connection: Any, unique_names: Iterable[str]) -> None:
-    """Return once `connection` has received what these connections have sent to it so far, and the bus what
-    they have sent to anybody.
+    """Return once `connection` has received everything that these connections have sent to it so far, and the
+    bus everything that they have sent to any destination.
 
-    Their answer to a ping goes the same road after it; D-Bus libraries give it even while their program is
+    Their reply to a ping follows on the same connection; D-Bus libraries send it even while their program is
     busy.
     """
     pings = [MainLoop.call(_ping, connection, name) for name in unique_names]

@@ -1,4 +1,4 @@
-"""A stranger on a bus who sends as fast as the bus can take it."""
+"""A stranger that sends as fast as the bus accepts it."""
 
 from __future__ import annotations
 
@@ -7,43 +7,33 @@ from typing import Sequence
 
 from gi.repository import Gio, GLib
 
-from sandbox.bus.bareconnection import BUS, BareConnection, as_bytes, call_of_bus
+from sandbox.bus.bareconnection import BareConnection, as_bytes
 from sandbox.bus.buses import Bus
 from sandbox.events import PATIENCE
 
 
 class Flooder:
-    """Messages are made once and sent as bytes, as often as one likes, and need not be such that a library
-    would send them. What comes is taken and forgotten: to callers, the owner of `name` is a service that
-    hangs."""
+    """Sends prepared messages as bytes, any number of times, including messages that a library would refuse
+    to send. Incoming messages are read and dropped."""
 
-    def __init__(self, bus: Bus, name: str = "") -> None:
+    def __init__(self, bus: Bus) -> None:
         self._connection = BareConnection(bus)
         self._has_ended = threading.Event()
-        threading.Thread(target=self._take_all, name="flooder", daemon=True).start()
-        if name:
-            do_not_queue = 4
-            self.send([call_of_bus(BUS, "RequestName", GLib.Variant("(su)", (name, do_not_queue)))])
-            while bus.owner(name) is None:
-                pass
+        threading.Thread(target=self._drop_all, name="flooder", daemon=True).start()
 
     def send(self, messages: Sequence[bytes], times: int = 1) -> None:
-        """Send these messages one after the other, and all of them so many times."""
+        """Send the messages in order, `times` times over."""
         block = b"".join(messages)
         for _ in range(times):
             self._connection.send(block)
 
     def close(self) -> None:
-        """Leave the bus, once it has taken everything that was sent."""
+        """Leave the bus once it has accepted everything that was sent."""
         self._connection.end()
-        assert self._has_ended.wait(PATIENCE), "the bus did not take everything"
+        assert self._has_ended.wait(PATIENCE), "the bus did not accept everything"
         self._connection.close()
 
-    def is_shown_out(self) -> bool:
-        """Whether the bus has closed the connection by itself; waits for it."""
-        return self._has_ended.wait(PATIENCE)
-
-    def _take_all(self) -> None:
+    def _drop_all(self) -> None:
         for _ in self._connection.received():
             pass
         self._has_ended.set()
@@ -52,7 +42,7 @@ class Flooder:
 def signal(
     path: str, interface: str, member: str, body: GLib.Variant | None = None, destination: str | None = None
 ) -> bytes:
-    """A signal as it goes through the wire, to everyone or to one `destination`."""
+    """The bytes of a signal, broadcast or to one `destination`."""
     message = Gio.DBusMessage.new_signal(path, interface, member)
     if destination:
         message.set_destination(destination)

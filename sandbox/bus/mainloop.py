@@ -1,4 +1,4 @@
-"""The one event loop on which all fakes of a box live."""
+"""The single event loop that all fakes of a box run on."""
 
 from __future__ import annotations
 
@@ -15,9 +15,9 @@ _CALL_SECONDS = 60.0
 
 
 class MainLoop:
-    """A GLib loop in a background thread of its own, started on first use.
+    """A GLib loop in its own background thread, started on first use.
 
-    All D-Bus objects are made and used on that thread; `call` carries work over from any other.
+    All D-Bus objects are created and used on that thread; `call` runs work there for any other thread.
     """
 
     _lock = threading.Lock()
@@ -59,6 +59,6 @@ class MainLoop:
 def _settle(result: Future[T], function: Callable[..., T], args: tuple[Any, ...]) -> bool:
     try:
         result.set_result(function(*args))
-    except BaseException as error:  # carried over to the caller's thread, whatever it is
+    except BaseException as error:  # raised in the caller's thread instead
         result.set_exception(error)
     return bool(GLib.SOURCE_REMOVE)

@@ -1,4 +1,4 @@
-"""What the agent asks for on a bus, whether it reaches a service or nobody."""
+"""Records every call that the agent makes on a bus, also those to names without an owner."""
 
 from __future__ import annotations
 
@@ -16,15 +16,15 @@ from sandbox.bus.buses import Bus
 from sandbox.bus.senders import Senders
 from sandbox.events import PATIENCE
 
-# Signals and replies, the bulk of a flood, are none of its business.
+# Calls only: signals and replies, the bulk of a flood, are not needed.
 _RULES = ["type='method_call'"]
 _MONITORING = f"{BUS}.Monitoring"
 _SERIAL = 2
 
 
 @dataclass(frozen=True, slots=True)
-class Overheard:
-    """One call; its arguments are kept of questions to the bus alone."""
+class MonitoredCall:
+    """A call of the agent; `args` is recorded only for calls to the bus itself."""
 
     destination: str
     member: str
@@ -32,57 +32,58 @@ class Overheard:
 
 
 class BusMonitor:
-    """Overhears the calls on a bus for as long as the terminal lives, also after the bus was restarted.
+    """Monitors the calls on a bus during the life of the terminal, across restarts of the bus.
 
-    `calls` are the agent's. One to a name that none of the `served` contracts knows is kept in `violations`,
-    whether somebody owns the name or not.
+    `calls` holds the agent's calls. A call to a name that is not in `served` becomes a violation, whether or
+    not the name has an owner.
     """
 
     def __init__(self, bus: Bus, senders: Senders, served: Collection[str]) -> None:
-        self.calls: list[Overheard] = []
+        self.calls: list[MonitoredCall] = []
         self.violations: list[str] = []
         self._bus = bus
         self._senders = senders
         self._known = {BUS, *served}
-        self._tokens = (f"com.norix.box.heard{number}" for number in count(1))
+        self._tokens = (f"com.norix.box.seen{number}" for number in count(1))
         self._awaited: dict[str, threading.Event] = {}
-        self._line: BareConnection | None = None
+        self._connection: BareConnection | None = None
         bus.when_started(self._listen)
 
     def receive_all(self) -> None:
-        """Return once everything that the bus was sent so far has been overheard."""
+        """Return once the monitor has seen everything that was sent to the bus so far."""
         token = next(self._tokens)
-        heard = self._awaited[token] = threading.Event()
+        seen = self._awaited[token] = threading.Event()
         self._bus.ask("NameHasOwner", "s", token)
-        assert heard.wait(PATIENCE), f"the monitor of the {self._bus.kind} bus has stopped"
+        assert seen.wait(PATIENCE), f"the monitor of the {self._bus.kind} bus has stopped"
 
     def close(self) -> None:
-        """Overhear what has been sent so far, and then no more."""
-        with contextlib.suppress(dbus.DBusException):  # the bus may have gone
+        """Read what was sent so far, then stop."""
+        with contextlib.suppress(dbus.DBusException):  # the bus may be gone
             self.receive_all()
-        if self._line:
-            self._line.end()
+        if self._connection:
+            self._connection.end()
 
     def _listen(self) -> None:
-        self._line = line = BareConnection(self._bus)
-        line.send(call_of_bus(_MONITORING, "BecomeMonitor", GLib.Variant("(asu)", (_RULES, 0)), _SERIAL))
+        self._connection = connection = BareConnection(self._bus)
+        rules = GLib.Variant("(asu)", (_RULES, 0))
+        connection.send(call_of_bus(_MONITORING, "BecomeMonitor", rules, _SERIAL))
         ready = threading.Event()
-        arguments = (line, self._bus.run, ready)
-        threading.Thread(target=self._overhear, args=arguments, name="bus-monitor", daemon=True).start()
+        arguments = (connection, self._bus.run, ready)
+        threading.Thread(target=self._read, args=arguments, name="bus-monitor", daemon=True).start()
         assert ready.wait(PATIENCE), f"the {self._bus.kind} bus allows no monitor"
 
-    def _overhear(self, line: BareConnection, run: int, ready: threading.Event) -> None:
+    def _read(self, connection: BareConnection, run: int, ready: threading.Event) -> None:
         labels: dict[str, str | None] = {}
         try:
-            for message in line.messages():
+            for message in connection.messages():
                 if message.get_message_type() == Gio.DBusMessageType.METHOD_CALL:
                     self._look_at(message, run, labels)
                 elif message.get_reply_serial() == _SERIAL:
-                    message.to_gerror()  # raises what the bus refuses
+                    message.to_gerror()  # raises if the bus refused
                     ready.set()
-        except Exception as error:  # the thread's own mistake must fail the test
+        except Exception as error:  # a bug in this thread must fail the test
             self.violations.append(f"the monitor of the {self._bus.kind} bus broke: {error!r}")
-        line.close()
+        connection.close()
 
     def _look_at(self, message: Gio.DBusMessage, run: int, labels: dict[str, str | None]) -> None:
         sender, destination, member = message.get_sender(), message.get_destination(), message.get_member()
@@ -92,15 +93,15 @@ class BusMonitor:
         if sender not in labels:
             labels[sender] = self._label(sender, run)
         if labels[sender] == "velks":
-            self.calls.append(Overheard(destination, member, args))
+            self.calls.append(MonitoredCall(destination, member, args))
             if destination not in self._known:
-                asked = f"{destination} for {message.get_interface()}.{member}"
+                called = f"{message.get_interface()}.{member} of {destination}"
                 self.violations.append(
-                    f"the agent asks {asked}; no contract has that on the {self._bus.kind} bus"
+                    f"the agent calls {called}; no contract has that on the {self._bus.kind} bus"
                 )
 
     def _label(self, sender: str, run: int) -> str | None:
-        """Who that is; unknown when the bus was restarted, whose fresh connections have the same names."""
+        """The sender's name; None after a restart of the bus, which gives the unique names out again."""
         label = self._senders.label(self._bus, sender)
         return label if self._bus.run == run else None
 

@@ -1,4 +1,4 @@
-"""Who is who on the buses."""
+"""Names the programs that send on the buses."""
 
 from __future__ import annotations
 
@@ -10,19 +10,20 @@ from sandbox.bus.buses import Bus
 
 
 class Senders:
-    """Names the process behind a connection: "velks" is the agent, "box" the controlling program itself."""
+    """Names the process behind a connection: "velks" is the agent, "box" the process that runs the
+    terminal."""
 
     def __init__(self) -> None:
         self.lock = threading.Lock()
         self._known = {os.getpid(): "box"}
 
     def register(self, pid: int, name: str) -> None:
-        """Give a process its name; callers hold `lock` from before the process starts."""
+        """Name a process; the caller must hold `lock` from before the process starts."""
         self._known[pid] = name
 
     def label(self, bus: Bus, unique_name: str) -> str:
-        """Name of a connection's process; that of its program for an unknown one, its unique name for a dead
-        one."""
+        """Name of a connection's process: as registered, else its program's name, else (the process has
+        ended) the connection's unique name."""
         pid = bus.process_of(unique_name)
         if pid is None:
             return unique_name

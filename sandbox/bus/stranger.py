@@ -1,4 +1,4 @@
-"""A stranger on a bus, who may send anything and take any name."""
+"""A stranger on a bus: it may send anything and own any name."""
 
 from __future__ import annotations
 
@@ -16,7 +16,7 @@ _CALL_SECONDS = 30.0
 
 
 class Stranger:
-    """A connection of its own, for messages that no well-behaved service would send."""
+    """A separate connection, for messages that no correct service would send."""
 
     def __init__(self, bus: Bus) -> None:
         self._connection = bus.connect()
@@ -36,7 +36,7 @@ class Stranger:
         signature: str = "",
         destination: str | None = None,
     ) -> None:
-        """Send a signal, to everyone or to one `destination`."""
+        """Send a signal, broadcast or to one `destination`."""
         message = dbus.lowlevel.SignalMessage(path, interface, member)
         if destination:
             message.set_destination(destination)
@@ -44,8 +44,8 @@ class Stranger:
         MainLoop.call(self._send, message)
 
     def call(self, name: str, path: str, interface: str, member: str, *args: Any, signature: str = "") -> Any:
-        """Call a method and return its reply; raises dbus.DBusException. Not to be used on the main loop's
-        thread, where the fakes could not answer."""
+        """Call a method and return its reply; raises dbus.DBusException. Must not run on the main loop's
+        thread, because the fakes answer there."""
         result: Future[Any] = Future()
 
         def succeed(*values: Any) -> None:
@@ -55,21 +55,19 @@ class Stranger:
         MainLoop.call(self._connection.call_async, *request)
         return result.result(_CALL_SECONDS)
 
-    def own(self, name: str, queue: bool = False, replace: bool = False, let_replace: bool = False) -> int:
-        """Ask for a bus name; the result is the bus's answer (1 owner, 2 in the queue, 3 taken)."""
+    def own(self, name: str, queue: bool = False) -> int:
+        """Request a bus name; returns the bus's answer (1 owner, 2 in the queue, 3 taken)."""
         flags = 0 if queue else dbus.bus.NAME_FLAG_DO_NOT_QUEUE
-        flags |= dbus.bus.NAME_FLAG_REPLACE_EXISTING if replace else 0
-        flags |= dbus.bus.NAME_FLAG_ALLOW_REPLACEMENT if let_replace else 0
         self._names.add(name)
         return int(MainLoop.call(self._connection.request_name, name, flags))
 
     def release(self, name: str) -> None:
-        """Give a bus name back."""
+        """Release a bus name."""
         self._names.discard(name)
         MainLoop.call(self._connection.release_name, name)
 
     def close(self) -> None:
-        """Leave the bus; the names are free on return."""
+        """Release all names and leave the bus."""
         for name in list(self._names):
             self.release(name)
         MainLoop.call(self._connection.close)

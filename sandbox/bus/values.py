@@ -23,7 +23,7 @@ _BASIC: dict[str, Callable[[Any], Any]] = {
 
 
 def typed(signature: str, value: Any) -> Any:
-    """`value` as the D-Bus type that `signature`, one complete type, names."""
+    """`value` as the D-Bus type of `signature`, a single complete type."""
     if signature in _BASIC:
         return _BASIC[signature](value)
     if signature.startswith("a{"):
@@ -36,7 +36,7 @@ def typed(signature: str, value: Any) -> Any:
 
 
 def signature_in_variant(value: Any) -> str:
-    """The type of what a received variant holds."""
+    """The type of a received variant's content."""
     return "v" if getattr(value, "variant_level", 0) > 1 else _signature(value)
 
 

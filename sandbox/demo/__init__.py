@@ -1,1 +1,1 @@
-"""A guided tour: the agent does its main job in a simulated terminal, before the viewer's eyes."""
+"""A guided tour: shows the agent's main tasks in a simulated terminal."""

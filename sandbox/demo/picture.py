@@ -1,4 +1,4 @@
-"""The tour as a picture that needs nothing but itself: no fonts from elsewhere."""
+"""The tour as a self-contained SVG picture, without web fonts."""
 
 from __future__ import annotations
 
@@ -13,13 +13,13 @@ _FONTS = '"DejaVu Sans Mono", Menlo, Consolas, "Noto Sans Mono CJK SC", monospac
 
 
 def svg(recorded: Console) -> str:
-    """What the console has recorded, as SVG."""
+    """The console's recording as SVG."""
     drawn = recorded.export_svg(title="./dev demo", unique_id="demo")
     return _WEB_FONT.sub("", drawn).replace("Fira Code, monospace", _FONTS)
 
 
 class PictureFile:
-    """Receives the picture from the box; the file changes only when the picture is complete."""
+    """Receives the picture from the box; writes the file only if the picture is complete."""
 
     def __init__(self, path: Path) -> None:
         self._path = path
@@ -30,6 +30,6 @@ class PictureFile:
         self._content = stream.read()
 
     def keep(self) -> None:
-        """Put it into the file."""
+        """Write the file."""
         if self._content:
             self._path.write_bytes(self._content)

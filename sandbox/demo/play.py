@@ -1,4 +1,4 @@
-"""The tour inside the box, from the opening of the terminal to the table at the end."""
+"""The tour inside the box, from opening the terminal to the final table."""
 
 from __future__ import annotations
 
@@ -8,31 +8,31 @@ from typing import Sequence
 from rich.console import Console
 from rich.text import Text
 
-from sandbox.box import outside
-from sandbox.box.outside import Trouble
+from sandbox.box import host
+from sandbox.box.host import CannotRun
 from sandbox.box.preconditions import clock, require_agent
 from sandbox.demo import picture, result
 from sandbox.demo.scene import Scene
 from sandbox.demo.scenes import SCENES
 from sandbox.demo.tour import Outcome, Tour
 from sandbox.terminal import Terminal
-from sandbox.timeline.agenttime import AgentTime
-from sandbox.timeline.timeline import Timeline, console_for_people, console_for_picture
+from sandbox.timeline.agent_time import AgentTime
+from sandbox.timeline.timeline import Timeline, picture_console, screen_console
 
 _WHAT_NEXT = (
-    "Try it yourself: ./dev box. What was expected and seen, one by one: ./dev demo --table. "
+    "Try it yourself: ./dev box. Everything expected and seen: ./dev demo --table. "
     "How it works: docs/architecture.md."
 )
 
 
 def play(options: Namespace) -> int:
-    """Play the scenes that the options ask for; the result is the exit status."""
+    """Play the chosen scenes; returns the exit status."""
     scenes = _chosen(options.only)
     require_agent()
-    result_stream = outside.result_stream()
-    person = console_for_people()
-    recorder = console_for_picture() if options.svg else None
-    consoles = [person, recorder] if recorder else [person]
+    result_stream = host.result_stream()
+    screen = screen_console()
+    recorder = picture_console() if options.svg else None
+    consoles = [screen, recorder] if recorder else [screen]
     outcomes, problems = _tour(options, scenes, consoles)
     if recorder:
         drawn = picture.svg(recorder).encode()
@@ -44,18 +44,18 @@ def play(options: Namespace) -> int:
 
 
 def _chosen(numbers: set[int] | None) -> dict[int, Scene]:
-    """The scenes by number; the first one, which starts the agent, is always among them."""
+    """The chosen scenes by number, always with the first one, which starts the agent."""
     known = dict(enumerate(SCENES, 1))
     unknown = (numbers or set()) - known.keys()
     if unknown:
-        raise Trouble(f"there is no scene {min(unknown)}; there are {len(known)}")
+        raise CannotRun(f"there is no scene {min(unknown)}; there are {len(known)}")
     return {number: scene for number, scene in known.items() if not numbers or number in {1, *numbers}}
 
 
 def _tour(
     options: Namespace, scenes: dict[int, Scene], consoles: Sequence[Console]
 ) -> tuple[list[Outcome], list[str]]:
-    # In a picture time passes only where something is waited for: the same code gives the same picture.
+    # For a picture, time passes only during waits, so that the same code draws the same picture.
     speed = 0 if options.svg else options.speed
     time = AgentTime(speed)
     terminal = Terminal(clock=clock(speed))

@@ -1,4 +1,4 @@
-"""The table at the end of a tour: what was expected and what was seen."""
+"""The result of a tour: what was expected and what was seen."""
 
 from __future__ import annotations
 
@@ -8,13 +8,13 @@ from rich.table import Table
 from rich.text import Text
 
 from sandbox.demo.tour import Outcome
-from sandbox.timeline.agenttime import AgentTime, minutes
+from sandbox.timeline.agent_time import AgentTime, minutes
 
 _STYLES = {"as expected": "green", "missing": "bold red", "forbidden": "bold red", "not played": "yellow"}
 
 
 def table(outcomes: Sequence[Outcome], time: AgentTime) -> Table:
-    """One row for each expectation, under the title of its scene."""
+    """A table with one row per expectation, grouped by scene."""
     shown = Table(expand=True, title="Expected and seen", title_justify="left", header_style="bold")
     shown.add_column("Scene", ratio=5, overflow="fold")
     shown.add_column("Expected", ratio=9, overflow="fold")
@@ -36,7 +36,7 @@ def table(outcomes: Sequence[Outcome], time: AgentTime) -> Table:
 
 
 def scenes(outcomes: Sequence[Outcome]) -> Table:
-    """One line for each scene."""
+    """A summary with one line per scene."""
     shown = Table.grid(padding=(0, 2, 0, 0))
     for scene in dict.fromkeys(outcome.scene for outcome in outcomes):
         verdicts = [outcome.verdict for outcome in outcomes if outcome.scene == scene]
@@ -48,10 +48,10 @@ def scenes(outcomes: Sequence[Outcome]) -> Table:
 
 
 def summary(outcomes: Sequence[Outcome]) -> Text:
-    """The tour's result in a line."""
+    """The tour's result in one line."""
     good = sum(outcome.verdict == "as expected" for outcome in outcomes)
     style = "bold green" if good == len(outcomes) else "bold red"
-    return Text(f"{good} of {len(outcomes)} expectations came out as they should.", style)
+    return Text(f"{good} of {len(outcomes)} expectations met.", style)
 
 
 def _seen(outcome: Outcome, time: AgentTime) -> str:

@@ -1,4 +1,4 @@
-"""The desktop's restriction switches, as they stand in the user's file."""
+"""The desktop's restriction switches in the user's file."""
 
 from __future__ import annotations
 
@@ -11,7 +11,7 @@ FILE = Path(".config/norix/desktop-control.ini")
 
 
 def look_at_switches(terminal: Terminal) -> None:
-    """Record each switch as an event of kind "file"; none where there is no file."""
+    """Record each switch of the file, if it exists, as an event of kind "file"."""
     parser = ConfigParser(interpolation=None)
     parser.optionxform = str  # type: ignore[assignment]  # keys are case-sensitive
     parser.read(Path(terminal.user.home, FILE), encoding="utf-8")

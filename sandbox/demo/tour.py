@@ -1,4 +1,4 @@
-"""Plays scenes and compares what is expected with what is seen."""
+"""Plays scenes and compares the expected with the actual events."""
 
 from __future__ import annotations
 
@@ -20,8 +20,8 @@ Verdict = Literal["as expected", "missing", "forbidden", "not played"]
 
 @dataclass(frozen=True)
 class Outcome:
-    """What became of an expectation of a scene: its verdict, the event that was seen, and how many seconds of
-    the agent's time after the cue."""
+    """The result of an expectation: its verdict, the event seen, and its delay after the cue in agent
+    time."""
 
     scene: str
     expectation: Expectation
@@ -30,16 +30,16 @@ class Outcome:
     delay: float = 0.0
 
 
-# Nobody wants to watch minutes go by, however fast: so much of them is left out at a time, in seconds.
+# Waits longer than _LONG_WAIT are shortened: the clock skips some seconds at a time.
 _LONG_WAIT, _SKIP = 60, 5
 _INDENTED = (0, 0, 0, 7)
-_STILL_THERE = Expectation("the agent handles what comes", "velks", "log", "info")
+_RESPONSIVE = Expectation("the agent handles messages", "velks", "log", "info")
 
 
 class Tour:
-    """Plays scenes until one step does not go as expected; what comes after it is then not played.
+    """Plays scenes until a step fails; the later ones are then not played.
 
-    `patience` is the real time in seconds that an event may take beyond its due time.
+    `patience` is the real time in seconds by which an event may be late.
     """
 
     def __init__(self, terminal: Terminal, timeline: Timeline, patience: float) -> None:
@@ -51,55 +51,55 @@ class Tour:
         self._cue = 0.0
 
     def play(self, scenes: Mapping[int, Scene], drawn: Container[int]) -> list[Outcome]:
-        """Play the scenes, which are given by number, and draw some; one outcome for each expectation of each
-        scene."""
+        """Play the scenes, given by number, and draw some of them; returns an outcome for each
+        expectation."""
         self._terminal.events.subscribe(self._end_at_reboot)
         for scene in scenes.values():
             scene.beforehand(self._terminal)
         for place, (number, scene) in enumerate(scenes.items(), 1):
             self._timeline.draw(number in drawn)
-            if self._goes_well:
-                self._announce(f"{number}. {scene.title}", f"  {place} of {len(scenes)}", scene.sentence)
+            if self._as_expected:
+                self._print_heading(f"{number}. {scene.title}", f"  {place} of {len(scenes)}", scene.sentence)
             self._play_scene(f"{number}. {scene.title}", scene)
         return self._outcomes
 
     def _end_at_reboot(self, event: Event) -> None:
-        """On a real terminal nobody would see what comes after it."""
+        """Stop showing events, since a real terminal would reboot now."""
         if REBOOT.matches(event):
             self._timeline.end()
 
     @property
-    def _goes_well(self) -> bool:
+    def _as_expected(self) -> bool:
         return all(outcome.verdict == "as expected" for outcome in self._outcomes)
 
-    def _announce(self, title: str, place: str, sentence: str) -> None:
+    def _print_heading(self, title: str, place: str, sentence: str) -> None:
         self._timeline.print()
         self._timeline.print(Rule(Text.assemble((title, "bold"), (place, "dim")), align="left", style="dim"))
         self._timeline.print(Text(sentence))
 
     def _play_scene(self, title: str, scene: Scene) -> None:
         for step in scene.steps:
-            if self._goes_well:
+            if self._as_expected:
                 self._outcomes += self._play_step(title, step)
             else:
                 self._outcomes += [Outcome(title, expected, "not played") for expected in step.then]
-        if self._goes_well and scene.remark:
+        if self._as_expected and scene.remark:
             self._timeline.print(Text(scene.remark, "dim"))
 
     def _play_step(self, title: str, step: Step) -> list[Outcome]:
         if step.cue:
             self._mark, self._cue = self._terminal.events.mark(), time.monotonic()
             step.cue(self._terminal)
-        is_silent = self._all_come(step) and not self._settles()
+        is_stuck = self._all_come(step) and not self._settles()
         outcomes = self._judge(title, step)
-        if is_silent:
-            outcomes.append(Outcome(title, _STILL_THERE, "missing"))
+        if is_stuck:
+            outcomes.append(Outcome(title, _RESPONSIVE, "missing"))
         elif not step.wanted and all(outcome.verdict == "as expected" for outcome in outcomes):
-            self._tell_of_silence(step)
+            self._print_silence(step)
         return outcomes
 
     def _all_come(self, step: Step) -> bool:
-        """Wait for what is wanted, until something does not come."""
+        """Wait for the wanted events; returns False at the first that does not come."""
         place = self._mark
         for expectation in step.wanted:
             event = self._wait_for(expectation, place)
@@ -121,7 +121,7 @@ class Tour:
                 return None
 
     def _let_pass(self, expectation: Expectation, place: int, step: int) -> None:
-        """Move the clock ahead step by step until what is expected has come or is overdue."""
+        """Move the clock ahead step by step until the expected event has come or is overdue."""
         for _ in range(0, expectation.within, step):
             if self._first(expectation, place) or not self._settles():
                 return
@@ -130,19 +130,20 @@ class Tour:
         self._settles()
 
     def _next_place(self, step: Step, event: Event) -> int:
-        """Where to look for what comes next."""
+        """The mark from which to look for the next event."""
         return self._terminal.events.all().index(event) + 1 if step.in_order else self._mark
 
     def _settles(self) -> bool:
-        """Whether the agent has handled everything, so that what has not come by now will not come."""
+        """Wait until the agent has handled everything, so that a missing event will not come any more;
+        returns whether it has."""
         try:
             self._terminal.sync()
         except NotSeen:
             return False
         return True
 
-    def _tell_of_silence(self, step: Step) -> None:
-        """Say what the timeline cannot show."""
+    def _print_silence(self, step: Step) -> None:
+        """Print what did not happen, which the timeline cannot show."""
         words = "; ".join(expectation.words for expectation in step.then)
         self._timeline.print(Padding(Text(f"Nothing follows: {words}.", "italic"), _INDENTED))
 

@@ -1,1 +1,1 @@
-"""The services that the agent talks to on the buses, one module each."""
+"""The fakes of the services that the agent uses on the buses, one module each."""

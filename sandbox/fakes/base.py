@@ -1,4 +1,4 @@
-"""What all services have in common: a connection of their own, faults, a record, a contract."""
+"""The base of all fakes: connection, faults, recording, contract checks."""
 
 from __future__ import annotations
 
@@ -23,17 +23,19 @@ _FAILED = "org.freedesktop.DBus.Error.Failed"
 
 
 class Fake:
-    """A service on a bus, under a bus name and a connection of its own.
+    """A service on a bus, with its own bus name and connection.
 
-    Every call that reaches it is recorded as an event and checked against the contract of its interface; what
-    breaks the contract is kept in `violations`. `fault` says how it treats all calls, `faults` how it treats
-    those of a member or reads and writes of a property, `answers` replaces a method's reply, which may be of
-    a wrong type. The objects whose paths are in `withdrawn` do not exist for callers.
+    Records every call that reaches it as an event and checks it against the interface's contract;
+    `violations` holds the calls that broke it. `fault` applies to all calls, an entry of `faults` to one
+    member or one property, an entry of `answers` replaces a method's reply, even by one of a wrong type.
+    Objects whose paths are in `withdrawn` do not exist for callers. `properties` are the initial values of
+    the main object.
     """
 
     name = ""
     bus_name = ""
     bus_kind: BusKind = "session"
+    properties: Mapping[str, Any] = {}
 
     def __init__(self, bus: Bus, events: Events, senders: Senders) -> None:
         self.bus = bus
@@ -50,8 +52,12 @@ class Fake:
         self._held: list[Any] = []
 
     def exports(self) -> list[ExportedObject]:
-        """The service's objects, the main one first."""
-        raise NotImplementedError
+        """The service's objects, the main one first: by default one with the interface and path of its
+        name."""
+        main = ExportedObject(f"/{self.bus_name.replace('.', '/')}", self.bus_name)
+        for name, value in self.properties.items():
+            main.set(name, value)
+        return [main]
 
     @property
     def present(self) -> bool:
@@ -60,15 +66,15 @@ class Fake:
 
     @property
     def unique_name(self) -> str | None:
-        """Unique name of the service's connection, another one after each `appear`."""
+        """Unique name of the service's connection; it changes with each `appear`."""
         return str(self._connection.get_unique_name()) if self.present else None
 
     def appear(self) -> None:
-        """Connect and take the bus name."""
+        """Connect and own the bus name."""
         MainLoop.call(self._appear)
 
     def leave(self) -> None:
-        """Close the connection; calls that were not answered end as the bus ends them."""
+        """Close the connection; the bus then answers the unanswered calls with an error."""
         MainLoop.call(self._leave)
 
     def restart(self) -> None:
@@ -77,21 +83,21 @@ class Fake:
         self.appear()
 
     def release(self) -> None:
-        """Answer the calls held so far, in their order, and hold no more."""
+        """Answer the calls held so far, in order, and hold no more."""
         MainLoop.call(self._release)
 
     def set(self, name: str, value: Any, signature: str | None = None, path: str | None = None) -> None:
-        """Change a property and announce it; with `signature`, to a value of a wrong type."""
+        """Change a property and announce it; `signature` allows a value of a wrong type."""
         MainLoop.call(self._set, self._object(path), name, value, signature)
 
     def value(self, name: str, path: str | None = None) -> Any:
-        """Plain value of a property."""
+        """A property as a plain value."""
         return MainLoop.call(self._object(path).value, name)
 
-    def emit(self, interface: str, member: str, *args: Any, path: str | None = None) -> None:
-        """Broadcast a signal of one of the service's interfaces."""
-        known = self._object(path)
-        signature = known.contracts[interface].signals[member]
+    def emit(self, interface: str, member: str, *args: Any) -> None:
+        """Broadcast a signal of the main object."""
+        known = self._object(None)
+        signature = known.contract.signals[member]
         MainLoop.call(self._emit, known.path, interface, member, signature, args)
 
     def receive_all_from(self, pid: int) -> None:
@@ -116,7 +122,7 @@ class Fake:
             return
         connection, self._connection = self._connection, None
         self._held.clear()
-        # The bus notices a closed connection a moment later, but the name must be free at once.
+        # The bus notices a closed connection only a moment later, but the name must be free at once.
         connection.release_name(self.bus_name)
         connection.close()
         self._record("life", "leaves", ())
@@ -134,13 +140,13 @@ class Fake:
             self._announce(known, name)
 
     def _announce(self, known: ExportedObject, name: str) -> None:
-        """Tell everyone that a property has changed."""
+        """Announce a property's new value on the bus."""
         self._announce_properties(known, name, {name: known.typed_value(name)}, [])
 
     def _announce_properties(
         self, known: ExportedObject, name: str, changed: Mapping[str, Any], invalidated: list[str]
     ) -> None:
-        args = (known.interface_of(name), dbus.Dictionary(changed, signature="sv"), invalidated)
+        args = (known.contract.name, dbus.Dictionary(changed, signature="sv"), invalidated)
         self._emit(known.path, PROPERTIES, "PropertiesChanged", "sa{sv}as", args)
 
     def _emit(self, path: str, interface: str, member: str, signature: str, args: tuple[Any, ...]) -> None:
@@ -162,7 +168,7 @@ class Fake:
         if fault.kind == "none":
             self._answer(message)
         elif fault.kind == "fail":
-            self._refuse(message, fault.error_name, "told to fail")
+            self._refuse(message, fault.error_name, "simulated failure")
         elif fault.kind == "slow":
             MainLoop.later(fault.seconds, lambda: self._answer(message))
         elif fault.kind == "hold":
@@ -189,7 +195,7 @@ class Fake:
         return simple
 
     def _check(self, message: Any) -> None:
-        """CallRefused if a call breaks the contract of the object that it is for."""
+        """Raise CallRefused if a call breaks the contract of its object."""
         known = self.objects.get(message.get_path())
         if known is None:
             raise CallRefused("UnknownObject", f"no object {message.get_path()}")
@@ -208,7 +214,7 @@ class Fake:
             reply = self._carry_out(message)
         except CallRefused as refused:
             self._refuse(message, refused.error_name, str(refused))
-        except Exception as error:  # a fake's own mistake must fail the test and not vanish in the loop
+        except Exception as error:  # a bug in a fake must fail the test instead of vanishing in the loop
             self.violations.append(f"{self.name}: {message.get_member()} broke: {error!r}")
             self._refuse(message, _FAILED, repr(error))
         else:

@@ -1,4 +1,4 @@
-"""The interfaces' XML files, read as contracts that every call is checked against."""
+"""D-Bus contracts, read from the interfaces' XML files."""
 
 from __future__ import annotations
 
@@ -15,7 +15,7 @@ FOLDERS = (REPOSITORY / "contracts" / "dbus", REPOSITORY / "src" / "velk" / "dbu
 
 @dataclass(frozen=True)
 class Method:
-    """Signatures of a method's arguments and of its reply."""
+    """The signatures of a method's arguments and reply."""
 
     arguments: str
     reply: str
@@ -23,7 +23,7 @@ class Method:
 
 @dataclass(frozen=True)
 class Property:
-    """Type and access ("read", "write", "readwrite") of a property."""
+    """A property's type and access ("read", "write", "readwrite")."""
 
     signature: str
     access: str
@@ -31,7 +31,7 @@ class Property:
 
 @dataclass(frozen=True)
 class Contract:
-    """What one interface offers; `xml` is its <interface> element."""
+    """One interface; `xml` is its <interface> element."""
 
     name: str
     methods: dict[str, Method]
@@ -42,7 +42,7 @@ class Contract:
 
 @cache
 def load(interface: str) -> Contract:
-    """The contract of an interface, from the file named after it."""
+    """Read the contract of an interface from the file named after it."""
     element = ElementTree.parse(_file(interface)).getroot().find(f"interface[@name='{interface}']")
     assert element is not None, f"{interface}.xml describes another interface"
     return Contract(

@@ -1,4 +1,4 @@
-"""The system daemon, which passes the platform's policies to the sessions and takes their reports."""
+"""The fake of the system daemon, which pushes policies to the sessions and receives their reports."""
 
 from __future__ import annotations
 
@@ -41,22 +41,22 @@ class Daemon(Fake):
         return [exported]
 
     def appear(self, announce: bool = False) -> None:
-        """Appear on the bus; with `announce`, push online as a daemon that has just started does."""
+        """Appear on the bus; with `announce`, push the online signal as a freshly started daemon does."""
         super().appear()
         if announce:
             self.push_online()
 
     def uploads_to(self, platform: Platform) -> None:
-        """From now on, upload what the sessions hand over, without letting them wait."""
+        """From now on, upload the sessions' reports, without blocking the callers."""
         self.objects[PATH].handlers["onUploadFinished"] = Uploader(self._events, platform.port).upload
 
     def push_online(self) -> None:
-        """Ask the sessions to announce themselves."""
+        """Ask the sessions to report themselves."""
         self.emit(INTERFACE, "pushOnlineMsg")
 
     def push_policy(self, payload: str | Mapping[str, Any], app_id: str = "box") -> None:
-        """Broadcast a policy. A mapping keeps to its contract and goes out as JSON with characters outside
-        ASCII as they are; a text may be anything."""
+        """Broadcast a policy: a mapping, which must keep to its contract, as JSON (not restricted to ASCII),
+        or any text unchanged."""
         if isinstance(payload, str):
             text = payload
         else:

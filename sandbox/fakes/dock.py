@@ -1,4 +1,4 @@
-"""The desktop's dock, which knows the applications that run or are kept on it."""
+"""The fake of the desktop's dock, which lists the applications that run or are pinned."""
 
 from __future__ import annotations
 
@@ -21,7 +21,7 @@ ENTRIES = f"{PATH}/entries"
 
 Announcement = Literal["values", "invalidated", "signal"]
 
-# What docks of different versions keep of a window, by the type of WindowInfos.
+# What docks of different versions store for a window, by the type of WindowInfos.
 WINDOW_TYPES: dict[str, Callable[[str], Any]] = {
     "a{uv}": lambda title: title,
     "a{us}": lambda title: title,
@@ -34,9 +34,9 @@ _CHANGE_SIGNALS = {"WindowInfos": "WindowInfosChanged", "Name": "NameChanged"}
 class Dock(Fake):
     """Owns com.norix.kpx.daemon.Dock on the session bus; empty at first.
 
-    `announces` says in which ways, one after the other, it tells that an entry has changed: PropertiesChanged
-    with values or with invalidated names, or the entry's own signal. `window_type` is one of WINDOW_TYPES,
-    for the windows set from then on. The objects of entries that have gone do not exist for callers.
+    `announces` lists the ways in which it announces a change of an entry, in order: PropertiesChanged with
+    values or with invalidated names, or the entry's own signal. `window_type`, one of WINDOW_TYPES, applies
+    to windows set from then on. The objects of removed entries do not exist for callers.
     """
 
     name = "dock"
@@ -50,31 +50,31 @@ class Dock(Fake):
         self._window_ids = count(1)
 
     def exports(self) -> list[ExportedObject]:
-        """The dock itself; its entries come and go."""
+        """The dock itself; its entries are added and removed later."""
         exported = ExportedObject(PATH, INTERFACE)
         exported.set("Entries", [])
         return [exported]
 
     @property
     def apps(self) -> dict[str, str]:
-        """The paths of the entries by their identifiers, in the dock's order; the newer one of two with the
-        same identifier."""
+        """The paths of the entries by identifier, in the dock's order; of two with the same identifier, the
+        newer one."""
         return {self.value("Id", path): path for path in self.value("Entries")}
 
     def open_app(self, app: str, name: str, docked: bool = False, windows: int = 1) -> str:
-        """Add an entry for an application and tell so; the result is its object's path."""
+        """Add and announce an entry for an application; returns its object path."""
         return MainLoop.call(self._open_app, app, name, docked, windows)
 
     def close_app(self, app: str) -> None:
-        """Remove an application's entry, whatever windows it has, and tell so."""
+        """Remove an application's entry, with any windows that it has, and announce that."""
         MainLoop.call(self._close_app, app)
 
     def set_windows(self, app: str, number: int) -> None:
-        """Let an application have this many windows, none of them one that it had."""
+        """Replace an application's windows by this many new ones."""
         self.set("WindowInfos", self._new_windows(number), self.window_type, self.apps[app])
 
     def windows(self, app: str) -> int:
-        """How many windows an application has."""
+        """The number of an application's windows."""
         return len(self.value("WindowInfos", self.apps[app]))
 
     def rename(self, app: str, name: str) -> None:
@@ -82,11 +82,11 @@ class Dock(Fake):
         self.set("Name", name, path=self.apps[app])
 
     def pin(self, app: str, docked: bool = True) -> None:
-        """Keep an application on the dock, or no longer."""
+        """Pin an application to the dock, or unpin it."""
         self.set("IsDocked", docked, path=self.apps[app])
 
     def is_docked(self, app: str) -> bool:
-        """Whether an application is kept on the dock."""
+        """Whether an application is pinned to the dock."""
         return bool(self.value("IsDocked", self.apps[app]))
 
     def _open_app(self, app: str, name: str, docked: bool, windows: int) -> str:

@@ -1,4 +1,4 @@
-"""One object that a service exports: its interfaces, property values and method handlers."""
+"""An object that a fake exports: its interface, property values and method handlers."""
 
 from __future__ import annotations
 
@@ -8,7 +8,6 @@ from xml.sax.saxutils import quoteattr
 
 from sandbox.bus.values import plain, signature_in_variant, typed
 from sandbox.fakes import contract
-from sandbox.fakes.contract import Contract
 
 PROPERTIES = "org.freedesktop.DBus.Properties"
 INTROSPECTABLE = "org.freedesktop.DBus.Introspectable"
@@ -24,7 +23,7 @@ Handler = Callable[..., Any]
 
 
 class CallRefused(Exception):
-    """The call gets a D-Bus error; `error_name` is the full name of it."""
+    """The call is answered with a D-Bus error; `error_name` is the error's full name."""
 
     def __init__(self, error_name: str, text: str) -> None:
         super().__init__(text)
@@ -33,47 +32,42 @@ class CallRefused(Exception):
 
 @dataclass(frozen=True)
 class Reply:
-    """Values and signature of a method's reply."""
+    """The values and signature of a method's reply."""
 
     signature: str
     values: tuple[Any, ...]
 
 
 class ExportedObject:
-    """Dispatches calls by the contracts of its interfaces.
+    """Dispatches calls by the contract of its interface.
 
-    `handlers` maps a method to what it does: a function of the plain arguments that returns the reply's only
-    value, or None where the method has no reply value.
+    `handlers` maps a method to a function of the plain arguments, which returns the single value of the
+    reply, or None if the reply has no value.
     """
 
-    def __init__(self, path: str, *interfaces: str) -> None:
+    def __init__(self, path: str, interface: str) -> None:
         self.path = path
-        self.contracts: dict[str, Contract] = {name: contract.load(name) for name in interfaces}
+        self.contract = contract.load(interface)
         self.handlers: dict[str, Handler] = {}
         self._values: dict[str, Any] = {}
 
     def value(self, name: str) -> Any:
-        """Plain value of a property."""
+        """A property as a plain value."""
         return plain(self._values[name])
 
     def set(self, name: str, value: Any, signature: str | None = None) -> None:
-        """Change a property; with `signature`, to a value of another type than its contract's."""
-        _, known = self._property(name)
-        self._values[name] = typed(signature or known.signature, value)
-
-    def interface_of(self, name: str) -> str:
-        """The interface that a property belongs to."""
-        return self._property(name)[0].name
+        """Change a property; `signature` allows a type other than the contract's."""
+        self._values[name] = typed(signature or self._property(name).signature, value)
 
     def typed_value(self, name: str) -> Any:
-        """Value of a property as it goes out on the bus."""
+        """A property as a D-Bus value."""
         return self._values[name]
 
     def check(self, interface: str, member: str, signature: str, args: Sequence[Any]) -> None:
-        """CallRefused if a call, with its arguments as they came, breaks the contract."""
+        """Raise CallRefused if a call breaks the contract; `args` are its D-Bus values."""
         expected = _STANDARD_METHODS.get((interface, member))
         if expected is None:
-            methods = self.contracts[interface].methods if interface in self.contracts else {}
+            methods = self.contract.methods if interface == self.contract.name else {}
             if member not in methods:
                 raise CallRefused("UnknownMethod", f"{self.path} has no method {interface}.{member}")
             expected = methods[member].arguments
@@ -87,19 +81,16 @@ class ExportedObject:
     def call(self, interface: str, member: str, args: tuple[Any, ...]) -> Reply:
         """Carry out a call that keeps to the contract."""
         if interface == INTROSPECTABLE:
-            return Reply("s", (self._introspection(),))
+            return Reply("s", (f"<node name={quoteattr(self.path)}>{self.contract.xml}</node>",))
         if interface == PROPERTIES:
             return self._property_call(member, args)
-        signature = self.contracts[interface].methods[member].reply
+        signature = self.contract.methods[member].reply
         result = self.handlers[member](*args) if member in self.handlers else None
         return Reply(signature, (result,) if signature else ())
 
     def _property_call(self, member: str, args: tuple[Any, ...]) -> Reply:
         if member == "GetAll":
-            values = {
-                name: value for name, value in self._values.items() if self.interface_of(name) == args[0]
-            }
-            return Reply("a{sv}", (values,))
+            return Reply("a{sv}", (self._values,))
         _, name, *rest = args
         if member == "Get":
             return Reply("v", (self._values[name],))
@@ -107,13 +98,11 @@ class ExportedObject:
         return Reply("", ())
 
     def _check_property_call(self, interface: str, name: str | None = None, *values: Any) -> None:
-        if interface not in self.contracts:
+        if interface != self.contract.name:
             raise CallRefused("UnknownInterface", f"{self.path} has no interface {interface}")
         if name is None:
             return
-        known = self.contracts[interface].properties.get(name)
-        if known is None:
-            raise CallRefused("UnknownProperty", f"{self.path} has no property {interface}.{name}")
+        known = self._property(name)
         if values:
             self._check_change(f"{interface}.{name}", known, signature_in_variant(values[0]))
 
@@ -123,12 +112,7 @@ class ExportedObject:
         if signature != known.signature:
             raise CallRefused("InvalidArgs", f"{name} is ({known.signature}), set to ({signature})")
 
-    def _property(self, name: str) -> tuple[Contract, contract.Property]:
-        for candidate in self.contracts.values():
-            if name in candidate.properties:
-                return candidate, candidate.properties[name]
-        raise CallRefused("UnknownProperty", f"{self.path} has no property {name}")
-
-    def _introspection(self) -> str:
-        interfaces = "".join(known.xml for known in self.contracts.values())
-        return f"<node name={quoteattr(self.path)}>{interfaces}</node>"
+    def _property(self, name: str) -> contract.Property:
+        if name not in self.contract.properties:
+            raise CallRefused("UnknownProperty", f"{self.path} has no property {self.contract.name}.{name}")
+        return self.contract.properties[name]

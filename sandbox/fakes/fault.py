@@ -1,4 +1,4 @@
-"""Ways in which a service may misbehave."""
+"""The ways in which a service can misbehave."""
 
 from __future__ import annotations
 
@@ -10,7 +10,7 @@ Kind = Literal["none", "hang", "fail", "slow", "hold"]
 
 @dataclass(frozen=True)
 class Fault:
-    """What a service does with the calls that reach it."""
+    """How a service treats the calls that reach it."""
 
     kind: Kind
     error_name: str = ""
@@ -33,7 +33,7 @@ class Fault:
 
     @staticmethod
     def slow(seconds: float) -> Fault:
-        """Answer late, by real time."""
+        """Answer after so many real seconds."""
         return Fault("slow", seconds=seconds)
 
     @staticmethod
@@ -43,8 +43,8 @@ class Fault:
 
 
 class FirstCalls(dict[str, Fault]):
-    """Faults for the first call of each member, or of each property, alone."""
+    """Faults that apply only to the first call of each member or property."""
 
     def get(self, name: str, default: Any = None) -> Any:
-        """The fault of a call, which is used up."""
+        """The fault of a call; it is removed."""
         return self.pop(name, default)

@@ -1,4 +1,4 @@
-"""The desktop's launcher, which lists the installed applications."""
+"""The fake of the desktop's launcher, which lists the installed applications."""
 
 from __future__ import annotations
 
@@ -16,8 +16,8 @@ PATH = "/com/norix/kpx/daemon/Launcher"
 
 @dataclass(frozen=True)
 class LauncherItem:
-    """An installed application, in the order of its fields on the wire: its desktop file, its display name
-    and what else the launcher knows of it."""
+    """An installed application, its fields in the order of the wire: desktop file, display name, and details
+    that the agent does not use."""
 
     path: str
     name: str
@@ -39,26 +39,26 @@ class Launcher(Fake):
 
     def exports(self) -> list[ExportedObject]:
         """The service's only object."""
-        exported = ExportedObject(PATH, INTERFACE)
-        exported.handlers["GetAllItemInfos"] = lambda: [astuple(item) for item in self.items]
-        return [exported]
+        (main,) = super().exports()
+        main.handlers["GetAllItemInfos"] = lambda: [astuple(item) for item in self.items]
+        return [main]
 
     def install(self, item: LauncherItem) -> None:
-        """List a new application and tell so."""
+        """Add an application to the list and announce it."""
         self.items.append(item)
         self.announce("created", item)
 
     def update(self, item: LauncherItem) -> None:
-        """Replace the application with the same desktop file and tell so."""
+        """Replace the application with the same desktop file and announce it."""
         self.items = [item if known.path == item.path else known for known in self.items]
         self.announce("update", item)
 
     def remove(self, item: LauncherItem) -> None:
-        """List an application no longer and tell so."""
+        """Remove an application from the list and announce that."""
         self.items.remove(item)
         self.announce("deleted", item)
 
     def announce(self, action: str, item: LauncherItem, category: int = 0) -> None:
-        """Broadcast a change of an item, if the service is there; the list stays as it is."""
+        """Announce a change of an item if the service is on the bus; the list does not change."""
         if self.present:
             self.emit(INTERFACE, "ItemChanged", action, astuple(item), category)

@@ -1,4 +1,4 @@
-"""The desktop's notification service."""
+"""The fake of the desktop's notification service."""
 
 from __future__ import annotations
 
@@ -18,7 +18,7 @@ class Notifications(Fake):
 
     def exports(self) -> list[ExportedObject]:
         """The service's only object."""
-        exported = ExportedObject("/com/norix/kpx/Notification", INTERFACE)
+        (main,) = super().exports()
         ids = count(1)
-        exported.handlers["Notify"] = lambda *_args: next(ids)
-        return [exported]
+        main.handlers["Notify"] = lambda *_args: next(ids)
+        return [main]

@@ -1,9 +1,8 @@
-"""The session policy service, which carries out the policies that the agent forwards."""
+"""The fake of the session policy service, which carries out forwarded policies."""
 
 from __future__ import annotations
 
 from sandbox.fakes.base import Fake
-from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.velk.prys"
 
@@ -13,7 +12,3 @@ class PolicyService(Fake):
 
     name = "policy_service"
     bus_name = INTERFACE
-
-    def exports(self) -> list[ExportedObject]:
-        """The service's only object."""
-        return [ExportedObject("/com/norix/velk/prys", INTERFACE)]

@@ -1,9 +1,8 @@
-"""The desktop's screen saver."""
+"""The fake of the desktop's screen saver."""
 
 from __future__ import annotations
 
 from sandbox.fakes.base import Fake
-from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.ScreenSaver"
 
@@ -13,12 +12,7 @@ class ScreenSaver(Fake):
 
     name = "screensaver"
     bus_name = INTERFACE
-
-    def exports(self) -> list[ExportedObject]:
-        """The service's only object."""
-        exported = ExportedObject("/com/norix/ScreenSaver", INTERFACE)
-        exported.set("isRunning", False)
-        return [exported]
+    properties = {"isRunning": False}
 
     def run(self, running: bool = True) -> None:
         """Start or end the screen saver."""

@@ -1,9 +1,8 @@
-"""The desktop's session manager."""
+"""The fake of the desktop's session manager."""
 
 from __future__ import annotations
 
 from sandbox.fakes.base import Fake
-from sandbox.fakes.exported import ExportedObject
 
 INTERFACE = "com.norix.SessionManager"
 
@@ -13,12 +12,7 @@ class SessionManager(Fake):
 
     name = "session_manager"
     bus_name = INTERFACE
-
-    def exports(self) -> list[ExportedObject]:
-        """The service's only object."""
-        exported = ExportedObject("/com/norix/SessionManager", INTERFACE)
-        exported.set("Locked", False)
-        return [exported]
+    properties = {"Locked": False}
 
     def lock(self, locked: bool = True) -> None:
         """Lock or unlock the session."""

@@ -1,1 +1,1 @@
-"""What the terminal's machine consists of: files, users, packages, commands, clock and network."""
+"""The terminal's machine: files, users, packages, commands, clock and network."""

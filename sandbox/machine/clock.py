@@ -11,26 +11,26 @@ from sandbox.machine import layout
 
 
 class Clock(Protocol):
-    """Tells which environment makes a program live by this clock."""
+    """The time that a program sees."""
 
     def environment(self) -> dict[str, str]:
-        """Variables to start the program with."""
+        """Environment variables that make a program use this clock."""
 
 
 class RealTime:
     """The host's time, unchanged."""
 
     def environment(self) -> dict[str, str]:
-        """Nothing to add."""
+        """No variables."""
         return {}
 
 
 class MovableClock:
-    """Time that can be moved ahead. A sleeping program does not see a move before it wakes up: see
+    """Time that can be moved ahead. A sleeping program notices that only when it wakes up; see
     Terminal.advance."""
 
     def environment(self) -> dict[str, str]:
-        """Preloads the clock, which looks up the time each time that it is asked."""
+        """Preload libfaketime, which reads the time from a file at each call."""
         return {
             "LD_PRELOAD": _library(),
             "FAKETIME_TIMESTAMP_FILE": str(layout.CLOCK),
@@ -48,7 +48,7 @@ class MovableClock:
 
 
 class Accelerated(MovableClock):
-    """Time that runs `factor` times as fast, time limits of D-Bus calls and transfers included."""
+    """Time that runs `factor` times as fast, including the timeouts of D-Bus calls and transfers."""
 
     def __init__(self, factor: int) -> None:
         self.factor = factor
@@ -56,7 +56,7 @@ class Accelerated(MovableClock):
         self.jump(0)
 
     def jump(self, seconds: int) -> None:
-        """Move the clock ahead; it runs on."""
+        """Move the clock ahead; it continues to run."""
         self._ahead += seconds
         self._set(f"+{self._ahead} x{self.factor}")
 
@@ -64,7 +64,7 @@ class Accelerated(MovableClock):
 class ManualClock(MovableClock):
     """Time that stands still until it is moved, so that a timer fires at its exact second or not at all.
 
-    It begins at the host's time, unless another is given; certificates must be valid then.
+    It begins at `begin`, by default the host's time; certificates must be valid then.
     """
 
     def __init__(self, begin: datetime | None = None) -> None:

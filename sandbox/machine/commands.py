@@ -1,4 +1,4 @@
-"""External commands of the terminal, replaced by recorders that come first in PATH."""
+"""External commands, replaced by recorders that come first in PATH."""
 
 from __future__ import annotations
 
@@ -19,8 +19,8 @@ RECORDER = Path(__file__).with_name("recorder")
 
 @dataclass(frozen=True)
 class Answer:
-    """What a command does: its output and exit status, or minus the number of the signal that ends it; or the
-    program that is run instead, with the same arguments."""
+    """What a command does: its output and exit status (negative: the signal that ends it), or the `program`
+    that it executes with the same arguments."""
 
     status: int = 0
     stdout: bytes = b""
@@ -29,14 +29,14 @@ class Answer:
 
 
 def install(name: str) -> None:
-    """Put a recorder in the place of command `name`."""
+    """Replace command `name` by a recorder."""
     link = layout.COMMANDS / name
     if not link.is_symlink():
         link.symlink_to(RECORDER)
 
 
 def install_defaults() -> None:
-    """Put the recorders of a fresh box in place, and no others."""
+    """Install the recorders of a fresh box and remove all others."""
     layout.COMMANDS.mkdir(parents=True, exist_ok=True)
     for left_over in layout.COMMANDS.iterdir():
         left_over.unlink()
@@ -45,13 +45,14 @@ def install_defaults() -> None:
 
 
 class Commands:
-    """Records each call of a replaced command as an event of kind "command" and decides how it ends."""
+    """Records each call of a replaced command as an event of kind "command" and decides what the command
+    does."""
 
     def __init__(self, events: Events) -> None:
         self._events = events
         self._answers: dict[str, Answer] = {}
         self._gates: dict[str, threading.Event] = {}
-        self._passed_on: dict[str, tuple[str, Answer]] = {}
+        self._delegated: dict[str, tuple[str, Answer]] = {}
         self._held: dict[str, list[_Call]] = {}
         layout.COMMAND_SOCKET.unlink(missing_ok=True)
         self._server = _Server(str(layout.COMMAND_SOCKET), _Call)
@@ -61,46 +62,45 @@ class Commands:
         ).start()
 
     def answer(self, name: str, answer: Answer) -> None:
-        """Let command `name`, replaced if it was not yet, end with `answer` from now on."""
+        """Replace command `name`; its calls end with `answer` from now on."""
         install(name)
         self._answers[name] = answer
 
     def hold(self, name: str) -> None:
-        """Let command `name`, replaced if it was not yet, hang until `release`."""
+        """Replace command `name`; its calls hang until `release`."""
         install(name)
         self._gates[name] = threading.Event()
 
     def release(self, name: str) -> None:
-        """Let the held calls of command `name` end, and later ones pass."""
+        """Let the held calls of command `name` end, and hold no more."""
         gate = self._gates.pop(name, None)
         if gate:
             gate.set()
 
     def nudge(self, name: str, printed: bytes = b"") -> int:
-        """Let the held calls of command `name` write `printed` to their standard output and a blank line to
-        their standard error, which makes those who wait for them look at the clock again. Returns when all is
-        read: the number of calls, without those that were ended meanwhile."""
+        """Make the held calls of command `name` write `printed` to their standard output and an empty line to
+        their standard error, so that their callers wake up and read the clock. Returns the number of calls
+        that are still alive, once their output is read."""
         self._held[name] = [call for call in self._held.pop(name, []) if call.nudge(printed)]
         return len(self._held[name])
 
-    def pass_on(self, name: str, unless: str, program: str) -> None:
-        """Let `program` answer those calls of command `name` that lack the argument `unless`; they are not
-        recorded."""
-        self._passed_on[name] = (unless, Answer(program=program))
+    def delegate(self, name: str, unless: str, program: str) -> None:
+        """Let calls of command `name` without the argument `unless` run `program`; they are not recorded."""
+        self._delegated[name] = (unless, Answer(program=program))
 
     def close(self) -> None:
-        """Let every held call end and stop listening."""
+        """Release all held calls and stop listening."""
         for name in list(self._gates):
             self.release(name)
         self._server.shutdown()
         self._server.server_close()
         layout.COMMAND_SOCKET.unlink(missing_ok=True)
 
-    def called(self, name: str, args: tuple[str, ...], detail: Mapping[str, Any], call: _Call) -> Answer:
+    def handle_call(self, name: str, args: tuple[str, ...], detail: Mapping[str, Any], call: _Call) -> Answer:
         """Record one call; returns once the command may end."""
-        wanted, elsewhere = self._passed_on.get(name, ("", None))
-        if elsewhere and wanted not in args:
-            return elsewhere
+        wanted, delegate = self._delegated.get(name, ("", None))
+        if delegate and wanted not in args:
+            return delegate
         gate = self._gates.get(name)
         if gate:
             self._held.setdefault(name, []).append(call)
@@ -122,8 +122,8 @@ class _Call(socketserver.StreamRequestHandler):
         args = tuple(os.fsdecode(bytes.fromhex(arg)) for arg in call["argv"])
         assert isinstance(self.server, _Server)
         detail = {"environment": _environment(bytes.fromhex(call["environ"])), "pid": call["pid"]}
-        answer = self.server.commands.called(call["name"], args, detail, self)
-        self._tell(
+        answer = self.server.commands.handle_call(call["name"], args, detail, self)
+        self._send(
             status=answer.status,
             stdout=answer.stdout.hex(),
             stderr=answer.stderr.hex(),
@@ -131,18 +131,18 @@ class _Call(socketserver.StreamRequestHandler):
         )
 
     def nudge(self, printed: bytes) -> bool:
-        """Let the held command print this and write to its standard error; false if it was ended before
-        somebody read it."""
-        return self._tell(nudge=True, stdout=printed.hex()) and self.rfile.readline() != b""
+        """Make the held command write its output; returns whether the output was read before the command was
+        killed."""
+        return self._send(nudge=True, stdout=printed.hex()) and self.rfile.readline() != b""
 
-    def _tell(self, **what: Any) -> bool:
+    def _send(self, **answer: Any) -> bool:
         try:
-            self.wfile.write(json.dumps(what).encode() + b"\n")
+            self.wfile.write(json.dumps(answer).encode() + b"\n")
         except BrokenPipeError:
-            return False  # the caller was ended while it was held
+            return False  # the command was killed while it was held
         return True
 
 
 def _environment(content: bytes) -> dict[str, str]:
-    """What a process was started with, from the text that the system keeps of it."""
+    """The variables in a process's /proc/PID/environ."""
     return dict(os.fsdecode(entry).split("=", 1) for entry in content.split(b"\0") if b"=" in entry)

@@ -1,4 +1,4 @@
-"""The files that the daemon keeps for the session agents, as the box shows them."""
+"""The terminal's files: those that the daemon writes for the session agents, and the accounts."""
 
 from __future__ import annotations
 
@@ -33,13 +33,13 @@ _SYSTEM_ACCOUNTS = (
 
 
 class FileView:
-    """Writes the terminal's files; every test may change them, `reset` brings back the default."""
+    """Writes the terminal's files; tests may change them, `reset` restores the defaults."""
 
     def __init__(self, user: User) -> None:
         self._user = user
 
     def reset(self) -> None:
-        """Bring all files of the terminal back to their default; certificates are gone afterwards."""
+        """Restore the defaults of all files; this removes the certificates."""
         for folder in (
             layout.CONFIG,
             layout.SHARE,
@@ -60,7 +60,7 @@ class FileView:
             self.write_software_list(path, [])
 
     def write(self, path: Path | str, content: str | bytes) -> None:
-        """Put a file in place, at once and whole, as the daemon does."""
+        """Replace a file atomically, as the daemon does."""
         target = Path(path)
         target.parent.mkdir(parents=True, exist_ok=True)
         fresh = target.with_name(target.name + ".new")
@@ -68,16 +68,16 @@ class FileView:
         fresh.replace(target)
 
     def remove(self, path: Path | str) -> None:
-        """Remove a file, which may be missing already."""
+        """Remove a file if it exists."""
         Path(path).unlink(missing_ok=True)
 
     def write_accounts(self, *users: User) -> None:
-        """Fill /etc/passwd with the system's accounts and these users."""
+        """Write /etc/passwd with the system's accounts and these users."""
         self.write("/etc/passwd", _SYSTEM_ACCOUNTS + "".join(user.passwd_line for user in users))
 
     def write_userinfo(self, content: str | bytes | None = None, **keys: Any) -> None:
-        """Write the daemon's information file: the default with `keys` changed, which keeps to its contract,
-        or `content` as it stands."""
+        """Write the daemon's information file: any `content`, or else the default with `keys` changed, which
+        must keep to its contract."""
         if content is None:
             known = {**DEFAULT_USERINFO, **keys}
             contracts.require("user-info", known)
@@ -85,7 +85,7 @@ class FileView:
         self.write(layout.USERINFO, content)
 
     def write_platform_address(self, port: int) -> None:
-        """Record where the platform is; without it the agent never asks the platform for anything."""
+        """Write the platform's address; without it the agent sends no requests."""
         self.write_userinfo(server_host=layout.PLATFORM_HOST, server_port=str(port))
 
     def write_machine_id(self, text: str) -> None:
@@ -93,15 +93,16 @@ class FileView:
         self.write(layout.MACHINE_ID, f"{text}\n")
 
     def write_restore_script(self, body: str = DEFAULT_RESTORE_SCRIPT) -> None:
-        """Write the restore script; the default one reports that it ran as command `restore_config`."""
+        """Write the restore script; the default one runs the command `restore_config`, which records its
+        calls."""
         self.write(layout.RESTORE_SCRIPT, body)
 
     def write_control_center_list(self, modules: Sequence[str]) -> None:
-        """Write the control-center modules that were in force before the domain changed them."""
+        """Write the list of control-center modules from before the terminal joined the domain."""
         self.write(layout.BACKUP_CONFIG, f"[config]\nControlCenterList={', '.join(modules)}\n")
 
     def write_software_list(self, path: Path, records: Sequence[Mapping[str, Any]]) -> None:
-        """Write one of the two inventory files: software that the platform knows."""
+        """Write one of the daemon's two inventory files."""
         contracts.require("software-list", list(records))
         self.write(path, json.dumps(list(records), ensure_ascii=False, indent=4))
 

@@ -1,4 +1,4 @@
-"""Where things lie inside the box."""
+"""The paths and addresses inside a box."""
 
 from __future__ import annotations
 
@@ -27,10 +27,9 @@ RESTORE_SCRIPT = SCRIPTS / "restore_config.bash"
 BOX = Path("/run/box")
 COMMANDS = BOX / "bin"
 COMMAND_SOCKET = BOX / "commands.sock"
-COMMAND_RECORD = BOX / "commands.jsonl"
 REAL_TOOLS = BOX / "real"
 CLOCK = BOX / "clock"
-HISTORY = Path("/run/history")  # of the prompt; only a person's box has it
+HISTORY = Path("/run/history")  # of the prompt; only `./dev box` shows it
 SYSTEM_BUS_SOCKET = Path("/run/dbus/system_bus_socket")
 
 PLATFORM_HOST = "platform.box"
@@ -43,7 +42,7 @@ def runtime_folder(uid: int) -> Path:
 
 
 def session_bus_socket(uid: int) -> Path:
-    """Socket of the user's session bus."""
+    """The socket of the user's session bus."""
     return runtime_folder(uid) / "bus"
 
 

@@ -1,4 +1,4 @@
-"""The network of a box, which is always the same and reaches nothing outside.
+"""The network of a box, which is always the same and isolated from the host's.
 
 | Interface | State           | Hardware address  | Addresses            |
 |-----------|-----------------|-------------------|----------------------|
@@ -19,7 +19,7 @@ import subprocess
 import time
 from typing import Sequence
 
-# The end that is named last is made first and comes first in the system's lists.
+# The kernel creates the end named last first, and lists it first.
 _CABLES = (
     "link add eth1 address f4:0b:93:00:00:07 type veth peer name eth0 address 00:1a:4b:00:00:05",
     "link add eth2 address fe:ed:00:00:00:02 type veth peer name wlan0 address fa:ce:00:00:00:03",
@@ -37,15 +37,13 @@ _SETTLE_SECONDS = 5.0
 _PR_CAP_AMBIENT, _PR_CAP_AMBIENT_CLEAR_ALL = 47, 4
 
 
-class NetworkTrouble(Exception):
-    """What the system said instead of making the network."""
+class NetworkUnavailable(Exception):
+    """The network could not be set up; the message is the system's."""
 
 
 def set_up() -> None:
-    """Make the interfaces of a fresh box, then give up the power to change them.
-
-    Whatever this thread starts from then on is without it.
-    """
+    """Create the interfaces of a fresh box, then drop the capability to change them, also for all programs
+    that this thread starts afterwards."""
     try:
         _run_ip("".join(f"{command}\n" for command in _INTERFACES))
         _settle()
@@ -57,23 +55,23 @@ def _run_ip(commands: str) -> None:
     try:
         done = subprocess.run(["ip", "-batch", "-"], input=commands, capture_output=True, text=True)
     except FileNotFoundError:
-        raise NetworkTrouble("ip is missing; install it with: apt-get install iproute2") from None
+        raise NetworkUnavailable("ip is missing; install it with: apt-get install iproute2") from None
     if done.returncode:
-        raise NetworkTrouble(done.stderr.strip())
+        raise NetworkUnavailable(done.stderr.strip())
 
 
 def _settle() -> None:
-    """Wait until each interface that is up runs if and only if it has a carrier, which the kernel sees to a
-    moment later."""
+    """Wait until the kernel has updated the flags of all interfaces that are up: each either has a carrier or
+    is marked as having none."""
     end = time.monotonic() + _SETTLE_SECONDS
-    while not all(_is_settled(flags) for flags in _flags_of_those_up()):
+    while not all(_is_settled(flags) for flags in _flags_of_up_interfaces()):
         if time.monotonic() > end:
-            raise NetworkTrouble("the interfaces do not settle")
+            raise NetworkUnavailable("the interfaces do not settle")
 
 
-def _flags_of_those_up() -> list[Sequence[str]]:
+def _flags_of_up_interfaces() -> list[Sequence[str]]:
     shown = subprocess.run(["ip", "-json", "link", "show", "up"], capture_output=True, check=True)
-    # An interface that is left out is an empty object.
+    # ip prints an empty object for an interface that it filters out.
     return [link["flags"] for link in json.loads(shown.stdout) if link]
 
 

@@ -1,4 +1,4 @@
-"""The package tools dpkg, dpkg-query and dpkg-architecture, each of which a test may replace."""
+"""The package tools dpkg, dpkg-query and dpkg-architecture, which a test can replace."""
 
 from __future__ import annotations
 
@@ -12,16 +12,16 @@ from sandbox.machine import layout
 from sandbox.machine.commands import RECORDER, Answer, Commands
 
 _PATHS = {path.name: path for path in layout.PACKAGE_TOOLS}
-# How the agent calls each of them. The real tools call one another in other ways, and reach the real ones.
+# Marks the agent's calls. The real tools call one another with other arguments and must reach the real ones.
 _AGENTS_ARGUMENT = {"dpkg": "-S", "dpkg-query": "-W", "dpkg-architecture": "-q"}
 _BUSY_SECONDS = 5.0
 
 
 class Tools:
-    """Stands for /usr/bin/dpkg and the like; in each terminal they begin as the real ones.
+    """Replaces /usr/bin/dpkg and the like; a new terminal begins with the real ones.
 
-    Each call of a tool that was replaced by other means than `write` is an event of kind "command", whose
-    detail has the call's "environment" and "pid".
+    Each call of a tool replaced by any method but `write` becomes an event of kind "command", with the call's
+    "environment" and "pid" as detail.
     """
 
     def __init__(self, commands: Commands) -> None:
@@ -31,26 +31,26 @@ class Tools:
             self.restore(name)
 
     def record(self, name: str) -> None:
-        """Let a tool do its work and record its calls."""
+        """Let a tool work normally, but record its calls."""
         self.answer(name, Answer(program=str(_real(name))))
 
     def answer(self, name: str, answer: Answer) -> None:
-        """Let a tool end with `answer` from now on."""
+        """Replace a tool; its calls end with `answer` from now on."""
         self._replace(name)
         self._commands.answer(name, answer)
 
     def hold(self, name: str) -> None:
-        """Let a tool hang until `release`; it then ends as `answer` said, or else with no output."""
+        """Replace a tool; its calls hang until `release`, then end as set by `answer`, by default without
+        output."""
         self._replace(name)
         self._commands.hold(name)
 
     def release(self, name: str) -> None:
-        """Let the held calls of a tool end, and later ones pass."""
+        """Let the held calls of a tool end, and hold no more."""
         self._commands.release(name)
 
     def nudge(self, name: str, printed: bytes = b"") -> int:
-        """Wake up those who wait for the held calls of a tool, which print this and go on; how many still
-        wait."""
+        """Wake up the callers of a tool's held calls by output; returns the number of calls still alive."""
         return self._commands.nudge(name, printed)
 
     def write(self, name: str, script: str) -> None:
@@ -58,7 +58,7 @@ class Tools:
         _overwrite(_PATHS[name], script.encode())
 
     def forbid(self, name: str) -> None:
-        """Let nobody run a tool."""
+        """Make a tool not executable."""
         _PATHS[name].chmod(0o644)
 
     def restore(self, name: str) -> None:
@@ -71,7 +71,7 @@ class Tools:
             _overwrite(path, real.read_bytes())
 
     def _replace(self, name: str) -> None:
-        self._commands.pass_on(name, unless=_AGENTS_ARGUMENT[name], program=str(_real(name)))
+        self._commands.delegate(name, unless=_AGENTS_ARGUMENT[name], program=str(_real(name)))
         _overwrite(_PATHS[name], RECORDER.read_bytes())
 
 
@@ -80,7 +80,7 @@ def _real(name: str) -> Path:
 
 
 def _overwrite(path: Path, content: bytes) -> None:
-    """Change the file where it is mounted, as soon as nobody runs it any more."""
+    """Overwrite a mounted file in place, as soon as no process executes it."""
     end = time.monotonic() + _BUSY_SECONDS
     while True:
         try:

@@ -1,4 +1,4 @@
-"""The terminal's package database, which the real package tools read, and the files of its packages."""
+"""The terminal's package database, which the real package tools read, and the packages' files."""
 
 from __future__ import annotations
 
@@ -22,7 +22,7 @@ MultiArch = Literal["same", "foreign", "allowed"]
 
 @dataclass(frozen=True)
 class Package:
-    """What the database knows of an installed package."""
+    """The database entry of an installed package."""
 
     name: str
     version: str
@@ -41,30 +41,33 @@ class Package:
 
     @property
     def file_list(self) -> Path:
-        """Where the database lists the package's files."""
+        """The database's list of the package's files."""
         qualified = self.name + (f":{self.architecture}" if self.multi_arch == "same" else "")
         return _INFO / f"{qualified}.list"
 
 
 def desktop_file(name: str) -> str:
-    """Path of the desktop file of an application."""
+    """The path of an application's desktop file."""
     return str(layout.APPLICATIONS / f"{name}.desktop")
 
 
 @lru_cache(maxsize=None)
 def native_architecture() -> str:
-    """The architecture that the package tools of this host are made for."""
+    """The architecture of this host's package tools."""
     shown = subprocess.run(["dpkg", "--print-architecture"], capture_output=True, text=True, check=True)
     return shown.stdout.strip()
 
 
 class Packages:
-    """The installed packages; a fresh one removes those of the terminal before, with their files.
+    """The installed packages; a new instance first removes those of the previous terminal, with their files.
 
     Files may lie under /usr/share/applications and wherever else the box is writable, such as /var and /etc.
+    `others` is the folder of a database ("status" and "info") whose packages are installed as well, without
+    their files.
     """
 
-    def __init__(self) -> None:
+    def __init__(self, others: Path | None = None) -> None:
+        self._others = (others / "status").read_text() if others else ""
         self._packages: dict[tuple[str, str], Package] = {}
         self._diversions: list[str] = []
         for file_list in _INFO.glob("*.list"):
@@ -72,6 +75,8 @@ class Packages:
         shutil.rmtree(_DATABASE, ignore_errors=True)
         (_DATABASE / "updates").mkdir(parents=True)
         _INFO.mkdir()
+        if others:
+            shutil.copytree(others / "info", _INFO, dirs_exist_ok=True)
         (_INFO / "format").write_text("1\n")
         self._write()
 
@@ -83,10 +88,10 @@ class Packages:
         architecture: str | None = None,
         multi_arch: MultiArch | None = None,
     ) -> None:
-        """Install a package, or update it when it is installed: its files are then those given now.
+        """Install a package, or update it and replace its files.
 
-        Without `files` it brings a desktop file of its own name, without `architecture` it is made for the
-        terminal's own. Packages with `multi_arch` "same" may be installed for several architectures at once.
+        By default its only file is a desktop file of its own name, and its architecture is the terminal's.
+        Packages with `multi_arch` "same" can be installed for several architectures at once.
         """
         if not _NAME.fullmatch(name):
             raise ValueError(f"no package can be called {name!r}")
@@ -98,7 +103,7 @@ class Packages:
         self._write()
 
     def remove(self, name: str, architecture: str | None = None) -> None:
-        """Remove a package and its files, for one architecture or for all; it may be gone already."""
+        """Remove a package and its files, for one architecture or for all, if it is installed."""
         for key, package in list(self._packages.items()):
             if name == package.name and architecture in (None, package.architecture):
                 _remove_files(package.file_list)
@@ -107,7 +112,7 @@ class Packages:
         self._write()
 
     def divert(self, path: str, to: str, by: str | None = None) -> None:
-        """Let package `by`, or the administrator, move other packages' file `path` out of its way."""
+        """Divert other packages' file `path`, by package `by` or (by default) by the administrator."""
         self._diversions += [path, to, by or ":"]
         self._write()
 
@@ -116,7 +121,7 @@ class Packages:
         architectures = [native_architecture(), *sorted(foreign - {native_architecture()})]
         (_DATABASE / "arch").write_text("".join(f"{name}\n" for name in architectures))
         (_DATABASE / "diversions").write_text("".join(f"{line}\n" for line in self._diversions))
-        _STATUS.write_text("".join(package.stanza for package in self._packages.values()))
+        _STATUS.write_text(self._others + "".join(package.stanza for package in self._packages.values()))
 
 
 def _write_files(file_list: Path, name: str, paths: Sequence[str]) -> None:

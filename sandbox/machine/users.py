@@ -1,4 +1,4 @@
-"""The users that a box can be entered as."""
+"""The users of a box."""
 
 from __future__ import annotations
 
@@ -10,7 +10,7 @@ FIRST_DOMAIN_UID = 10001
 
 @dataclass(frozen=True)
 class User:
-    """An account of the terminal; domain accounts carry uids above 10000 and a name that begins with "@"."""
+    """An account of the terminal; domain accounts have uids above 10000 and names that begin with "@"."""
 
     name: str
     uid: int
@@ -22,12 +22,12 @@ class User:
 
     @property
     def is_domain_user(self) -> bool:
-        """Whether the account belongs to the domain rather than to the terminal alone."""
+        """Whether this is a domain account, not a local one."""
         return self.uid >= FIRST_DOMAIN_UID
 
     @property
     def plain_name(self) -> str:
-        """The name as the agent reports it: without any "@"."""
+        """The name without any "@", as the agent reports it."""
         return self.name.replace("@", "")
 
     @property

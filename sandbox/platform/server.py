@@ -2,20 +2,17 @@
 
 from __future__ import annotations
 
-import socket
-import ssl
 import threading
 from dataclasses import dataclass, field
 from functools import cache
-from http.server import BaseHTTPRequestHandler, ThreadingHTTPServer
 from pathlib import Path
 from tempfile import mkdtemp
 from typing import Any, Literal, Mapping
-from urllib.parse import urlsplit
 
 from sandbox.events import Events
 from sandbox.machine import layout
 from sandbox.platform.certificates import Authority, CertificateFiles
+from sandbox.platform.https import Conversation, Listener, Request, reply, server_context
 from sandbox.platform.store import HttpReply, Route, Store
 
 _ADMINISTRATOR = "administrator"
@@ -26,17 +23,12 @@ DAEMON_AGENT = "daemon"
 
 @dataclass(frozen=True)
 class HttpFault:
-    """What the platform does with a request instead of serving it."""
+    """What the platform does with a request instead of serving it; by default it does serve it."""
 
-    kind: Literal["none", "reply", "hang", "close", "cut"]
+    kind: Literal["none", "reply", "hang", "close", "cut"] = "none"
     status: int = 200
     body: bytes = b""
     headers: Mapping[str, str] = field(default_factory=dict)
-
-    @staticmethod
-    def none() -> HttpFault:
-        """Serve it."""
-        return HttpFault("none")
 
     @staticmethod
     def reply(status: int = 200, body: bytes = b"", headers: Mapping[str, str] | None = None) -> HttpFault:
@@ -90,36 +82,30 @@ class Platform:
     ) -> None:
         self.port = port
         self.store = Store()
-        self.fault = HttpFault.none()
+        self.fault = HttpFault()
         self.faults: dict[Route, HttpFault] = {}
         self.events = events
-        self.released = threading.Event()
-        self._identity = server or trust().server
-        self._server: _Server | None = None
+        self._released = threading.Event()
+        self._context = server_context(server or trust().server, trust().authority.certificate)
+        self._listener: Listener | None = None
         self.appear()
 
     @property
     def present(self) -> bool:
         """Whether it serves."""
-        return self._server is not None
+        return self._listener is not None
 
     def appear(self) -> None:
         """Begin to serve."""
         assert not self.present, "the platform serves already"
-        server = _Server((layout.PLATFORM_HOST, self.port), _Handler)
-        server.platform = self
-        server.socket = self._context(self._identity).wrap_socket(
-            server.socket, server_side=True, do_handshake_on_connect=False
-        )
-        threading.Thread(target=server.serve_forever, args=(0.02,), name="platform", daemon=True).start()
-        self._server = server
+        address = (layout.PLATFORM_HOST, self.port)
+        self._listener = Listener(address, self._context, self._answer, self._on_failed_handshake)
 
     def leave(self) -> None:
         """Stop listening; connections that are open break when they are used."""
-        server, self._server = self._server, None
-        if server:
-            server.shutdown()
-            server.server_close()
+        listener, self._listener = self._listener, None
+        if listener:
+            listener.close()
 
     def post_message(self, uid: str, title: str, content: str, sender: str = "admin") -> str:
         """Leave a message for a user; the result is its uuid."""
@@ -143,116 +129,53 @@ class Platform:
         """The terminal's software as it was reported last, None before the first report."""
         return self.store.inventory()
 
-    def fault_for(self, route: Route) -> HttpFault:
-        """What happens to a request of this route now."""
-        return self.faults.get(route, self.fault)
-
-    def release(self, then: HttpFault = HttpFault("none")) -> None:
+    def release(self, then: HttpFault = HttpFault()) -> None:
         """Let hanging requests go on; they and later ones get `then`, or are served."""
         self.fault = then
         self.faults.clear()
-        self.released.set()
-        self.released = threading.Event()
+        self._released.set()
+        self._released = threading.Event()
 
     def close(self) -> None:
         """Stop serving, and let nothing hang."""
-        self.released.set()
+        self._released.set()
         self.leave()
 
-    def _context(self, identity: CertificateFiles) -> ssl.SSLContext:
-        context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
-        context.load_cert_chain(identity.certificate, identity.key)
-        context.load_verify_locations(trust().authority.certificate)
-        context.verify_mode = ssl.CERT_REQUIRED
-        return context
+    def _on_failed_handshake(self, error: OSError) -> None:
+        self.events.record("velks", "platform", "http", "tls", (str(error),))
 
-
-class _Server(ThreadingHTTPServer):
-    daemon_threads = True
-    platform: Platform
-
-    def handle_error(self, request: Any, client_address: Any) -> None:
-        """A connection that broke is no failure of the box: the request's own events tell."""
-
-
-class _Handler(BaseHTTPRequestHandler):
-    raw_requestline: bytes
-    protocol_version = "HTTP/1.1"
-    disable_nagle_algorithm = True  # the body must not wait until the headers have been acknowledged
-
-    def setup(self) -> None:
-        connection = self.request
-        assert isinstance(connection, ssl.SSLSocket)
-        try:
-            connection.do_handshake()
-        except (ssl.SSLError, OSError) as error:
-            self._platform.events.record("velks", "platform", "http", "tls", (str(error),))
-            raise
-        super().setup()
-
-    def do_GET(self) -> None:  # the name is the base class's
-        self._serve("GET")
-
-    def do_PUT(self) -> None:
-        self._serve("PUT")
-
-    def do_POST(self) -> None:
-        self._serve("POST")
-
-    def log_message(self, format: str, *args: Any) -> None:  # events tell more
-        pass
-
-    @property
-    def _platform(self) -> Platform:
-        assert isinstance(self.server, _Server)
-        return self.server.platform
-
-    @property
-    def _client(self) -> str:
-        return "daemon" if self.headers.get("User-Agent") == DAEMON_AGENT else "velks"
-
-    def _serve(self, method: str) -> None:
-        body = self.rfile.read(int(self.headers.get("Content-Length", 0)))
-        url = urlsplit(self.path)
-        route = self._platform.store.route(method, url.path)
-        if not self._platform.present:
-            self._hang_up()
-            return
-        fault, released = self._platform.fault_for(route), self._platform.released
-        self._record(route, body)
+    def _answer(self, conversation: Conversation, request: Request) -> None:
+        route = self.store.route(request.method, request.path)
+        if not self.present:
+            conversation.break_off()
+        fault, released = self._fault_for(route), self._released
+        client = "daemon" if request.headers.get("User-Agent") == DAEMON_AGENT else "velks"
+        args = (request.line, request.body.decode())
+        detail = {"headers": request.headers.items(), "client": conversation.client}
+        self.events.record(client, "platform", "http", route, args, detail)
         if fault.kind == "hang":
             released.wait()
-            fault = self._platform.fault_for(route)
+            fault = self._fault_for(route)
+        if fault.kind == "close":
+            conversation.break_off()
+        answer = HttpReply(fault.status, fault.body, fault.headers)
         if fault.kind == "none":
-            reply = self._platform.store.serve(route, url.query, body)
-            self._reply(route, reply, own=True)
-        elif fault.kind == "close":
-            self._hang_up()
-        else:
-            reply = HttpReply(fault.status, fault.body, fault.headers)
-            self._reply(route, reply, missing=1000 if fault.kind == "cut" else 0)
+            answer = self.store.serve(route, request.query, request.body)
+        self._record_reply(client, route, answer, own=fault.kind == "none")
+        conversation.send(_on_the_wire(answer, missing=1000 if fault.kind == "cut" else 0))
+        if fault.kind == "cut":
+            conversation.break_off()
 
-    def _record(self, route: Route, body: bytes) -> None:
-        line = self.raw_requestline.decode("latin-1").rstrip("\r\n")
-        assert isinstance(self.connection, ssl.SSLSocket)
-        subject = (self.connection.getpeercert() or {}).get("subject", ())
-        detail = {"headers": list(self.headers.items()), "client": subject}
-        self._platform.events.record(self._client, "platform", "http", route, (line, body.decode()), detail)
+    def _record_reply(self, client: str, route: Route, answer: HttpReply, own: bool) -> None:
+        args = (route, answer.status, answer.body.decode(errors="replace"))
+        detail = {"headers": answer.headers, "own": own}
+        self.events.record("platform", client, "reply", "reply", args, detail)
 
-    def _reply(self, route: Route, reply: HttpReply, own: bool = False, missing: int = 0) -> None:
-        args = (route, reply.status, reply.body.decode(errors="replace"))
-        detail = {"headers": reply.headers, "own": own}
-        self._platform.events.record("platform", self._client, "reply", "reply", args, detail)
-        self.send_response(reply.status)
-        for name, value in {"Content-Type": "application/json", **reply.headers}.items():
-            self.send_header(name, value)
-        self.send_header("Content-Length", str(len(reply.body) + missing))
-        self.end_headers()
-        self.wfile.write(reply.body)
-        if missing:
-            self._hang_up()
+    def _fault_for(self, route: Route) -> HttpFault:
+        return self.faults.get(route, self.fault)
 
-    def _hang_up(self) -> None:
-        self.close_connection = True
-        self.wfile.flush()
-        self.connection.shutdown(socket.SHUT_RDWR)
+
+def _on_the_wire(answer: HttpReply, missing: int) -> bytes:
+    headers = {"Content-Type": "application/json", **answer.headers}
+    lines = [f"{name}: {value}".encode("latin-1") for name, value in headers.items()]
+    return reply(answer.body, *lines, status=answer.status, missing=missing)

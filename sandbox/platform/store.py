@@ -8,7 +8,6 @@ from dataclasses import dataclass, field
 from datetime import datetime
 from itertools import islice
 from typing import Any, Literal, Mapping
-from urllib.parse import parse_qs
 from uuid import uuid4
 
 Route = Literal["list", "read", "tips", "software_change", "inventory", "other"]
@@ -87,10 +86,10 @@ class Store:
         with self._lock:
             return self._inventory
 
-    def serve(self, route: Route, query: str, body: bytes) -> HttpReply:
+    def serve(self, route: Route, query: Mapping[str, str], body: bytes) -> HttpReply:
         """Answer a request."""
         if route == "list":
-            return self._list({key: values[0] for key, values in parse_qs(query).items()})
+            return self._list(query)
         if route == "read":
             return self._mark_read(_json_object(body).get("uuid"))
         if route == "tips":

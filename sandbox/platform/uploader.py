@@ -17,8 +17,8 @@ _HEADERS = {"Content-Type": "application/json", "User-Agent": DAEMON_AGENT}
 class Uploader:
     """Posts texts to the platform, one after the other, with the terminal's certificate.
 
-    Nobody waits for an upload. What becomes of it shows in the platform's events; one that the platform never
-    saw is an event of kind "upload", member "failed". It is not tried again.
+    No caller waits for an upload. Its result shows in the platform's events; one that the platform never saw
+    is an event of kind "upload", member "failed". It is not tried again.
     """
 
     def __init__(self, events: Events, port: int) -> None:

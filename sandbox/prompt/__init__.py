@@ -1,1 +1,2 @@
-"""The simulated terminal with a prompt, for people who integrate a daemon or a platform with the agent."""
+"""The simulated terminal with a prompt, for developers who integrate a daemon or a platform with the
+agent."""

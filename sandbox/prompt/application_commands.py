@@ -1,4 +1,4 @@
-"""What a person can do with applications at the prompt."""
+"""The prompt's commands about applications."""
 
 from __future__ import annotations
 
@@ -12,7 +12,7 @@ from sandbox.prompt.registry import command, number
 
 @command("open", "APPLICATION", "the user opens an application, or one more window of it")
 def open_application(context: Context, app: str) -> str:
-    """Without the dock nobody will see it."""
+    """The agent notices only if the dock is on the bus."""
     dock = context.terminal.dock
     if app in dock.apps:
         dock.set_windows(app, dock.windows(app) + 1)
@@ -23,17 +23,17 @@ def open_application(context: Context, app: str) -> str:
 
 @command("close", "APPLICATION", "the user closes an application with all its windows")
 def close_application(context: Context, app: str) -> str:
-    """It must be on the dock."""
+    """The application must be on the dock."""
     _have_windows(_dock_with(context, app), app, 0)
     return f"{app} is closed."
 
 
-@command("windows", "APPLICATION COUNT", "the user opens or closes windows until there are so many")
+@command("windows", "APPLICATION COUNT", "the user opens or closes windows until the application has COUNT")
 def windows(context: Context, app: str, count: str) -> str:
     """The application must be on the dock."""
     wanted = int(number(count, int))
     if wanted < 0:
-        raise CommandRefused(f"{wanted} is no number of windows")
+        raise CommandRefused(f"an application cannot have {wanted} windows")
     dock = _dock_with(context, app)
     _have_windows(dock, app, wanted)
     return f"{app} has {_count(dock, app)}."
@@ -41,7 +41,7 @@ def windows(context: Context, app: str, count: str) -> str:
 
 @command("dock", "APPLICATION", "the user keeps an application on the dock, whether or not it runs")
 def dock_application(context: Context, app: str) -> str:
-    """One that is not there yet comes without a window."""
+    """An application that is not on the dock yet is added without a window."""
     dock = context.terminal.dock
     if app in dock.apps:
         dock.pin(app)
@@ -52,7 +52,7 @@ def dock_application(context: Context, app: str) -> str:
 
 @command("undock", "APPLICATION", "the user takes an application off the dock, where it stays while it runs")
 def undock_application(context: Context, app: str) -> str:
-    """It must be on the dock."""
+    """The application must be on the dock."""
     dock = _dock_with(context, app)
     dock.pin(app, False)
     if not dock.windows(app):
@@ -62,7 +62,7 @@ def undock_application(context: Context, app: str) -> str:
 
 @command("apps", "", "the applications on the dock")
 def applications(context: Context) -> None:
-    """In the dock's order."""
+    """The table is in the dock's order."""
     dock = context.terminal.dock
     table = Table("Application", "Windows", "Kept on the dock")
     for app in dock.apps:

@@ -1,4 +1,5 @@
-"""What a person can do at the prompt. A further command is one more decorated function."""
+"""The prompt's commands about the daemon, the session, the services and the prompt itself. To add a command,
+add a decorated function."""
 
 from __future__ import annotations
 
@@ -10,13 +11,16 @@ from rich.table import Table
 from sandbox.fakes.base import Fake
 from sandbox.fakes.fault import Fault
 from sandbox.machine import layout
+from sandbox.periods import STATE_REPORT
 from sandbox.policies import POLICIES
-from sandbox.prompt import application_commands, help_page, platform_commands, software_commands
+from sandbox.prompt import application_commands  # noqa: F401  registers its commands
+from sandbox.prompt import software_commands  # noqa: F401  registers its commands
+from sandbox.prompt import help_page, platform_commands
 from sandbox.prompt.context import Context, CommandRefused, guess
 from sandbox.prompt.registry import COMMANDS, command, number
 
-assert application_commands and software_commands, "importing the modules makes their commands known"
 
+_NEXT_REPORT = f"the agent reports the state every five minutes: advance {STATE_REPORT}"
 _WAIT_SECONDS = "20"
 _LONGEST_ADVANCE = 86_400
 
@@ -35,7 +39,7 @@ def _on_off(_context: Context) -> Mapping[str, str]:
 
 @command("policy", "CODE [UID] | {JSON}", "the daemon pushes a policy to the sessions", _codes)
 def policy(context: Context, code: str, uid: str | None = None) -> str:
-    """A text in braces goes out as it stands, whatever it is; so does a code that lacks its uid."""
+    """Text in braces is pushed unchanged and may be invalid; so may a code without the uid that it needs."""
     text = code
     if not code.startswith("{"):
         payload: dict[str, Any] = {"type": number(code, int)}
@@ -47,37 +51,37 @@ def policy(context: Context, code: str, uid: str | None = None) -> str:
     return "The daemon has pushed it."
 
 
-@command("online", "", "the daemon asks the sessions to announce themselves")
+@command("online", "", "the daemon asks the sessions to report themselves")
 def online(context: Context) -> str:
-    """The daemon must be on the bus for that."""
+    """The daemon must be on the bus."""
     context.present("daemon")
     context.terminal.daemon.push_online()
-    return "The daemon has asked who is there."
+    return "The daemon has asked the sessions to report themselves."
 
 
 @command("lock", "", "the user locks the screen")
 def lock(context: Context) -> str:
-    """Without the session manager nobody will see it."""
+    """The agent notices only if the session manager is on the bus."""
     context.terminal.session_manager.lock()
-    return "The screen is locked; the agent looks every five minutes: advance 300"
+    return f"The screen is locked; {_NEXT_REPORT}"
 
 
 @command("unlock", "", "the user unlocks the screen")
 def unlock(context: Context) -> str:
-    """The counterpart of `lock`."""
+    """The agent notices only if the session manager is on the bus."""
     context.terminal.session_manager.lock(False)
-    return "The screen is unlocked; the agent looks every five minutes: advance 300"
+    return f"The screen is unlocked; {_NEXT_REPORT}"
 
 
 @command("saver", "on|off", "the screen saver starts or ends", _on_off)
 def saver(context: Context, wanted: str) -> str:
-    """Without the screen saver's service nobody will see it."""
+    """The agent notices only if the screen saver is on the bus."""
     context.terminal.screensaver.run(_is_on(wanted))
-    return f"The screen saver is {wanted}; the agent looks every five minutes: advance 300"
+    return f"The screen saver is {wanted}; {_NEXT_REPORT}"
 
 
 def _come(context: Context, fake: Fake) -> None:
-    """A daemon knows nobody at first."""
+    """Put a fake on the bus; the daemon then asks for the sessions."""
     if fake is context.terminal.daemon:
         context.terminal.daemon.appear(announce=True)
     else:
@@ -86,14 +90,14 @@ def _come(context: Context, fake: Fake) -> None:
 
 @command("leave", "SERVICE", "a service leaves its bus", _services)
 def leave(context: Context, name: str) -> str:
-    """It must be on the bus."""
+    """The service must be on the bus."""
     context.present(name).leave()
     return f"{name} has left its bus; it comes back with: appear {name}"
 
 
-@command("appear", "SERVICE", "a service comes to its bus; a daemon then asks who is there", _services)
+@command("appear", "SERVICE", "a service joins its bus; the daemon then asks for the sessions", _services)
 def appear(context: Context, name: str) -> str:
-    """It must not be on the bus yet."""
+    """The service must be off the bus."""
     fake = context.fake(name)
     if fake.present:
         raise CommandRefused(f"{name} is on the bus already")
@@ -101,83 +105,83 @@ def appear(context: Context, name: str) -> str:
     return f"{name} is on its bus."
 
 
-@command("restart", "SERVICE", "a service leaves its bus and comes back as another connection", _services)
+@command("restart", "SERVICE", "a service leaves its bus and joins it again with a new connection", _services)
 def restart(context: Context, name: str) -> str:
-    """It must be on the bus."""
+    """The service must be on the bus."""
     context.present(name).leave()
     _come(context, context.fake(name))
-    return f"{name} is another connection now."
+    return f"{name} has a new connection now."
 
 
 @command("hang", "SERVICE", "a service no longer answers", _services)
 def hang(context: Context, name: str) -> str:
-    """Until `well`."""
+    """It stays so until `recover`."""
     context.fake(name).fault = Fault.hang()
-    return f"{name} no longer answers; it does again with: well {name}"
+    return f"{name} no longer answers; it does again with: recover {name}"
 
 
 @command("slow", "SERVICE SECONDS", "a service answers late", _services)
 def slow(context: Context, name: str, seconds: str) -> str:
-    """Real seconds, whatever the agent's time."""
+    """The seconds are real time, not agent time."""
     context.fake(name).fault = Fault.slow(number(seconds, float))
-    return f"{name} answers {seconds} s late; it is itself again with: well {name}"
+    return f"{name} answers {seconds} s late; it answers normally again with: recover {name}"
 
 
 @command("fail", "SERVICE", "a service answers every call with an error", _services)
 def fail(context: Context, name: str) -> str:
-    """Until `well`."""
+    """It stays so until `recover`."""
     context.fake(name).fault = Fault.fail()
-    return f"{name} answers with errors; it is itself again with: well {name}"
+    return f"{name} answers with errors; it answers normally again with: recover {name}"
 
 
-@command("well", "SERVICE", "a service does its work again", _services)
-def well(context: Context, name: str) -> str:
-    """Calls that hung before stay without an answer."""
+@command("recover", "SERVICE", "a service works normally again", _services)
+def recover(context: Context, name: str) -> str:
+    """Calls that hung before remain unanswered."""
     context.fake(name).fault = Fault.none()
-    return f"{name} does its work."
+    return f"{name} works normally."
 
 
-@command("login", "", "the session ends and begins anew, and the agent with it")
+@command("login", "", "the session ends, and a new one begins with a new agent")
 def login(context: Context) -> str:
-    """Returns at once: what the agent then does shows in the traffic."""
+    """The prompt does not wait for the agent's start."""
     context.terminal.agent.stop()
     context.terminal.start_agent(ready=lambda: None)
-    return "Another session begins."
+    return "A new session begins."
 
 
-@command("log", "on|off", "show the agent's own log lines or not", _on_off)
+@command("log", "on|off", "show or hide the agent's log lines", _on_off)
 def log(context: Context, wanted: str) -> str:
-    """For the lines to come."""
+    """This applies to later lines."""
     context.timeline.show_log = _is_on(wanted)
     return f"The agent's log lines are {'shown' if context.timeline.show_log else 'hidden'}."
 
 
-@command("advance", "SECONDS", "so much of the agent's time passes at once")
+@command("advance", "SECONDS", "move the agent's clock ahead")
 def advance(context: Context, seconds: str) -> str:
-    """What becomes due happens, in its order."""
+    """Timers that become due fire in order."""
     wanted = int(number(seconds, int))
     if not 1 <= wanted <= _LONGEST_ADVANCE:
-        raise CommandRefused(f"{wanted} s is no time to pass at once (1 to {_LONGEST_ADVANCE})")
+        raise CommandRefused(f"cannot advance by {wanted} s (1 to {_LONGEST_ADVANCE})")
     context.advance(wanted)
-    return f"{wanted} s of the agent's time have passed."
+    return f"The agent's clock is {wanted} s ahead."
 
 
-@command("wait", "MEMBER [SECONDS]", f"go on once the traffic comes to this ({_WAIT_SECONDS} s at the most)")
+@command("wait", "MEMBER [SECONDS]", f"wait for an event with this member (at most {_WAIT_SECONDS} s)")
 def wait(context: Context, member: str, seconds: str = _WAIT_SECONDS) -> None:
-    """Each wait goes on in the traffic where the one before ended."""
+    """The search begins after the event that the previous wait found."""
     context.follow(member, number(seconds, float))
 
 
-@command("state", "", "the services and the platform: whether they are there, and how they behave")
+@command("state", "", "the services, the platform and the agent: present or not, and how they behave")
 def state(context: Context) -> None:
-    """And the agent."""
-    table = Table("Service", "Bus", "Name there", "Present", "Behaves", pad_edge=False)
+    """A service that is not present has left its bus."""
+    table = Table("Service", "Bus", "Bus name", "Present", "Behaviour", pad_edge=False)
     table.columns[0].no_wrap = True
     table.columns[2].overflow = "fold"
     for name, fake in context.terminal.fakes.items():
         fault = fake.fault
         manner = f"slow ({fault.seconds:g} s)" if fault.kind == "slow" else fault.kind
-        manner = "well" if fault.kind == "none" else manner
+        manner = "ok" if fault.kind == "none" else manner
         table.add_row(name, fake.bus.kind, fake.bus_name, "yes" if fake.present else "no", manner)
     platform = context.terminal.platform
     address = f"{layout.PLATFORM_HOST}:{platform.port}"
@@ -189,9 +193,9 @@ def state(context: Context) -> None:
     context.show(f"The agent {'runs' if running else 'has ended'}; the user is {user.name}, uid {user.uid}.")
 
 
-@command("help", "[COMMAND]", "what there is, or more about one command", help_page.topics)
+@command("help", "[COMMAND]", "all commands, or the details of one", help_page.topics)
 def help_table(context: Context, name: str | None = None) -> None:
-    """By groups."""
+    """Without a command, the page groups them by subject."""
     if name is not None and name not in COMMANDS:
         raise CommandRefused(f"there is no command '{name}'; {guess(name, COMMANDS) or 'see: help'}")
     context.show(help_page.about(context, COMMANDS[name]) if name else help_page.overview())
@@ -199,7 +203,7 @@ def help_table(context: Context, name: str | None = None) -> None:
 
 @command("quit", "", "end the terminal (Ctrl+D too)")
 def end(_context: Context) -> None:
-    """As the end of the input does."""
+    """The end of a script has the same effect."""
     raise EOFError
 
 

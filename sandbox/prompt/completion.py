@@ -1,4 +1,4 @@
-"""What Tab offers at the prompt: commands and what may be given to them, each with its meaning beside it."""
+"""Tab completion at the prompt: commands and their arguments, each shown with its meaning."""
 
 from __future__ import annotations
 
@@ -12,13 +12,13 @@ from sandbox.prompt.registry import COMMANDS
 
 
 class CommandCompleter(Completer):
-    """Completes the first word to a command and the second one to one of the command's choices."""
+    """Completes the first word to a command, and the second to one of the command's choices."""
 
     def __init__(self, context: Context) -> None:
         self._context = context
 
     def get_completions(self, document: Document, _event: CompleteEvent) -> Iterator[Completion]:
-        """The words that go on as the line ends."""
+        """The possible completions of the line's last word."""
         *before, begun = document.text_before_cursor.split(" ")
         for word, meaning in self._offered(before).items():
             if word.startswith(begun):

@@ -1,4 +1,4 @@
-"""What the commands of the prompt work with."""
+"""The context in which the prompt's commands run."""
 
 from __future__ import annotations
 
@@ -6,7 +6,6 @@ from difflib import get_close_matches
 from typing import Iterable
 
 from rich.console import RenderableType
-from rich.text import Text
 
 from sandbox.events import Event, NotSeen
 from sandbox.fakes.base import Fake
@@ -18,17 +17,17 @@ _STEP = 10
 
 
 class CommandRefused(Exception):
-    """A command that cannot be carried out; the text is the line that says why."""
+    """The command cannot be carried out; the message is one line with the reason."""
 
 
 def guess(word: str, known: Iterable[str]) -> str:
-    """A question whether one of these was meant, empty if none is like the word."""
+    """A suggestion of the most similar known word; empty if none is similar."""
     like = get_close_matches(word, known, 1)
     return f"did you mean {like[0]}?" if like else ""
 
 
 class Context:
-    """The terminal, its timeline, and how far the person has followed the traffic."""
+    """The terminal, its timeline, and the event up to which `wait` commands have looked."""
 
     def __init__(self, terminal: Terminal, timeline: Timeline) -> None:
         self.terminal = terminal
@@ -36,15 +35,11 @@ class Context:
         self._followed = 0
 
     def show(self, what: RenderableType) -> None:
-        """Print something for the person."""
+        """Print something for the user."""
         self.timeline.print(what)
 
-    def tell(self, line: str) -> None:
-        """Say in a line what became of a command."""
-        self.show(Text(line, "dim"))
-
     def fake(self, name: str) -> Fake:
-        """A service by its name."""
+        """The fake with this name."""
         known = self.terminal.fakes
         if name not in known:
             hint = guess(name, known) or f"there are: {', '.join(known)}"
@@ -52,16 +47,16 @@ class Context:
         return known[name]
 
     def present(self, name: str) -> Fake:
-        """A service that is on the bus."""
+        """The fake with this name, which must be on the bus."""
         fake = self.fake(name)
         if not fake.present:
             raise CommandRefused(f"{name} is not on the bus; bring it back with: appear {name}")
         return fake
 
     def advance(self, seconds: int) -> None:
-        """Let some of the agent's time pass, step by step: one long one would let timers that come again miss
-        their turns. Where the agent is blocked, the rest passes at once."""
-        self.present("daemon")  # what wakes the agent up
+        """Move the agent's clock ahead in small steps, so that periodic timers fire at each interval. If the
+        agent is blocked, move the rest at once."""
+        self.present("daemon")  # it wakes the agent up
         while seconds:
             step = min(seconds, _STEP) if self._answers() else seconds
             self.timeline.time.move(step)
@@ -77,7 +72,7 @@ class Context:
         return True
 
     def follow(self, member: str, seconds: float) -> None:
-        """Wait until the traffic, from where it was followed to last, comes to a line with this member."""
+        """Wait for the next event with this member that the timeline shows, after the one found last."""
 
         def is_wanted(event: Event) -> bool:
             return event.member == member and self.timeline.shows(event)

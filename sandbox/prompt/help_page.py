@@ -1,4 +1,4 @@
-"""What `help` shows: the commands by groups, or one of them with what may be given to it."""
+"""The output of `help`: all commands by group, or one command with its arguments."""
 
 from __future__ import annotations
 
@@ -17,24 +17,24 @@ GROUPS = {
     "Applications": ("open", "close", "windows", "dock", "undock", "apps"),
     "Software": ("install", "update", "uninstall", "software"),
     "The platform": ("message", "messages", "tip", "platform"),
-    "Services": ("leave", "appear", "restart", "hang", "slow", "fail", "well", "state"),
+    "Services": ("leave", "appear", "restart", "hang", "slow", "fail", "recover", "state"),
     "The prompt": ("advance", "wait", "log", "help", "quit"),
 }
 _WIDTH = 64  # beside the groups, on a terminal of 80 columns
 _EXAMPLES = {
     "policy 1201": "disable the terminal, then: advance 60",
-    "message Hello Lunch": "a message, which comes with: advance 180",
+    "message Hello Lunch": "post a message, then: advance 180",
     "hang notifications": "see how long the agent waits for a service",
 }
 
 
 def topics(_context: Context) -> Mapping[str, str]:
-    """What there is help for."""
+    """The choices of `help`."""
     return {name: known.help for name, known in COMMANDS.items()}
 
 
 def overview() -> RenderableType:
-    """All commands, and some to begin with."""
+    """All commands, and some examples."""
     table = Table.grid(padding=(0, 2, 0, 0))
     for group, names in GROUPS.items():
         table.add_row(Text(group, "bold"), Text(_filled([COMMANDS[name].usage for name in names])))
@@ -46,7 +46,7 @@ def overview() -> RenderableType:
 
 
 def _filled(usages: Sequence[str]) -> str:
-    """As many of them in a line as find room; none is broken."""
+    """The usages, as many per line as fit."""
     lines = [""]
     for usage in usages:
         if lines[-1] and len(lines[-1] + usage) > _WIDTH:
@@ -56,7 +56,7 @@ def _filled(usages: Sequence[str]) -> str:
 
 
 def about(context: Context, known: Command) -> RenderableType:
-    """One command: how it is typed, what happens, and what may be given to it."""
+    """One command: usage, effect, and possible arguments."""
     lines = [Text.assemble((known.usage, "bold"), f"\n  {known.help}.")]
     if known.run.__doc__:
         lines.append(Text(f"  {known.run.__doc__}", "dim"))

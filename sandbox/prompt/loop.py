@@ -1,4 +1,4 @@
-"""Takes commands from a person at a terminal or from a script, until they end."""
+"""Reads and runs commands, interactively or from a script."""
 
 from __future__ import annotations
 
@@ -13,16 +13,16 @@ from sandbox.machine import layout
 from sandbox.prompt.completion import CommandCompleter
 from sandbox.prompt.context import Context, CommandRefused
 from sandbox.prompt.registry import run_line
-from sandbox.timeline.agenttime import minutes
+from sandbox.timeline.agent_time import minutes
 
 _WELCOME = (
-    "A simulated terminal with the real agent; what it says and hears goes above.",
+    "A simulated terminal with the real agent; its traffic appears above the prompt.",
     "Try: policy 1201, then: advance 60. Type help for the commands, Ctrl+D to end.",
 )
 
 
 def run_prompt(context: Context) -> int:
-    """Ask for commands while the traffic scrolls by above; Ctrl+C drops the line, Ctrl+D ends."""
+    """Read commands while events scroll by above the prompt; Ctrl+C drops the line, Ctrl+D ends."""
     for line in _WELCOME:
         context.show(Text(line, "bold"))
     session: PromptSession[str] = PromptSession(
@@ -44,12 +44,12 @@ def run_prompt(context: Context) -> int:
 
 
 def _history() -> History:
-    """That of the runs before, where the person's own folder is shown in the box."""
+    """The history of earlier runs, if the host's file is visible in the box."""
     return FileHistory(str(layout.HISTORY)) if layout.HISTORY.exists() else InMemoryHistory()
 
 
 def run_script(context: Context, lines: Iterable[str]) -> int:
-    """Carry out the lines; the result is 1 when one of them was refused, else 0."""
+    """Run the lines; returns 1 if one of them was refused, else 0."""
     status = 0
     for line in lines:
         try:

@@ -1,4 +1,4 @@
-"""Command line of the terminal with a prompt."""
+"""The command line of the terminal with a prompt."""
 
 from __future__ import annotations
 
@@ -8,41 +8,37 @@ import sys
 from pathlib import Path
 from typing import Sequence
 
-from sandbox.box import outside
-from sandbox.box.outside import Consumer, Trouble
+from sandbox.box import host
+from sandbox.box.host import Consumer, CannotRun
 from sandbox.machine import layout
 from sandbox.machine.users import DOMAIN_USER, LOCAL_USER
 
 
 def run(arguments: Sequence[str]) -> int:
-    """Open a terminal, in a box, and take commands for it; the result is the exit status."""
+    """Open a terminal in a box and run commands; returns the exit status."""
     options = _parser().parse_args(arguments)
     if layout.inside_box():
-        from sandbox.prompt import session  # needs D-Bus, which only the box must have
+        from sandbox.prompt import session  # needs D-Bus, which the host may lack
 
         return session.run(options)
     user = LOCAL_USER if options.local else DOMAIN_USER
     relay = desktop_relay() if options.mirror else None
-    return outside.enter(user, ["box", *arguments], relay, _history())
+    return host.enter(user, ["box", *arguments], relay, history())
 
 
 def _parser() -> argparse.ArgumentParser:
-    parser = argparse.ArgumentParser(
-        prog="./dev box", description="The simulated terminal with a prompt; commands may also be piped in."
-    )
-    parser.add_argument("--local", action="store_true", help="a local user instead of a domain user")
-    parser.add_argument(
-        "--speed", type=outside.positive, default=1, metavar="N", help="the agent's time runs N times as fast"
-    )
-    parser.add_argument("--log", action="store_true", help="show the agent's own log lines from the start")
-    parser.add_argument(
-        "--mirror", action="store_true", help="show each notification on your own desktop as well"
-    )
+    """The options that dev.d/help/box.txt explains."""
+    parser = argparse.ArgumentParser(prog="./dev box")
+    parser.add_argument("--local", action="store_true")
+    parser.add_argument("--speed", type=host.positive, default=1)
+    parser.add_argument("--log", action="store_true")
+    parser.add_argument("--mirror", action="store_true")
     return parser
 
 
-def _history() -> dict[Path, Path]:
-    """Where the box shows the file that keeps what was typed; nowhere if there is none or nobody types."""
+def history() -> dict[Path, Path]:
+    """The user's history file and its place in the box; none if it cannot be written or the input is a
+    script."""
     state = Path(os.environ.get("XDG_STATE_HOME") or Path.home() / ".local" / "state")
     kept = state / "velks" / "box-history"
     try:
@@ -54,11 +50,12 @@ def _history() -> dict[Path, Path]:
 
 
 def desktop_relay() -> Consumer | None:
-    """What shows notifications on the desktop outside; None, after a line on why, where nothing can."""
-    from sandbox.prompt.desktop import Desktop  # needs D-Bus, which only this option must have
+    """Shows notifications on the host's desktop; if that is impossible, prints the reason and returns
+    None."""
+    from sandbox.prompt.host_desktop import HostDesktop  # only this option needs D-Bus on the host
 
     try:
-        return Desktop().relay
-    except Trouble as trouble:
-        print(f"box: {trouble}; the box goes on without your desktop", file=sys.stderr)
+        return HostDesktop().relay
+    except CannotRun as error:
+        print(f"box: {error}; the box goes on without your desktop", file=sys.stderr)
         return None

@@ -1,4 +1,4 @@
-"""The way of the agent's notifications from the box to the person's own desktop, as JSON lines."""
+"""Sends the agent's notifications from the box to the host's desktop, as JSON lines."""
 
 from __future__ import annotations
 
@@ -9,7 +9,7 @@ from sandbox.events import Event, Events
 
 
 class Mirror:
-    """Writes each notification that reaches the box's desktop."""
+    """Writes each notification of the agent to a stream."""
 
     def __init__(self, events: Events, stream: IO[bytes]) -> None:
         self._stream = stream
@@ -19,6 +19,6 @@ class Mirror:
         if (event.target, event.member) != ("notifications", "Notify"):
             return
         app_name, _, _, summary, body, _, _, timeout = event.args
-        # Its actions stay behind: nobody outside could carry them out.
+        # Without the actions, which would have no effect on the host.
         shown = {"app_name": app_name, "summary": summary, "body": body, "timeout": timeout}
         self._stream.write(json.dumps(shown).encode() + b"\n")

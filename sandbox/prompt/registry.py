@@ -1,4 +1,4 @@
-"""The commands of the prompt by name, and how a typed line becomes a call of one."""
+"""The prompt's commands by name, and the parsing of a typed line."""
 
 from __future__ import annotations
 
@@ -7,16 +7,18 @@ import shlex
 from dataclasses import dataclass
 from typing import Any, Callable, Mapping
 
+from rich.text import Text
+
 from sandbox.prompt.context import Context, CommandRefused, guess
 
-# What may be offered for an argument, each word with its meaning.
+# The possible values of an argument, each with its meaning.
 Choices = Callable[[Context], Mapping[str, str]]
 
 
 @dataclass(frozen=True)
 class Command:
-    """One command: its name, the arguments it takes, what it does, and what may be offered for its first
-    argument. `run` gets the context and the words after the name; it may return a line on what it did."""
+    """A command, with the choices for its first argument. `run` takes the context and the words after the
+    name; it may return a line that states the result. Its docstring is part of the help."""
 
     name: str
     arguments: str
@@ -26,7 +28,7 @@ class Command:
 
     @property
     def usage(self) -> str:
-        """The command as it is typed."""
+        """The command with its arguments."""
         return f"{self.name} {self.arguments}".rstrip()
 
 
@@ -36,7 +38,7 @@ COMMANDS: dict[str, Command] = {}
 def command(
     name: str, arguments: str, help: str, choices: Choices = lambda context: {}
 ) -> Callable[[Callable[..., str | None]], Callable[..., str | None]]:
-    """Make a function of the context and some words a command of the prompt."""
+    """Register a function as a command."""
 
     def register(run: Callable[..., str | None]) -> Callable[..., str | None]:
         COMMANDS[name] = Command(name, arguments, help, choices, run)
@@ -46,7 +48,7 @@ def command(
 
 
 def run_line(context: Context, line: str) -> None:
-    """Carry out a typed line or raise CommandRefused. Empty lines and remarks ("#") do nothing."""
+    """Run a typed line; raises CommandRefused. Empty lines and comments ("#") do nothing."""
     name, _, rest = line.strip().partition(" ")
     if not name or name.startswith("#"):
         return
@@ -58,13 +60,13 @@ def run_line(context: Context, line: str) -> None:
         call = inspect.signature(known.run).bind(context, *words)
     except TypeError:
         raise CommandRefused(f"usage: {known.usage}") from None
-    told = known.run(*call.args)
-    if told:
-        context.tell(told)
+    result = known.run(*call.args)
+    if result:
+        context.show(Text(result, "dim"))
 
 
 def number(text: str, kind: Callable[[str], Any]) -> Any:
-    """A word as a number of this kind."""
+    """Parse a word as a number."""
     try:
         return kind(text)
     except ValueError:
@@ -72,7 +74,7 @@ def number(text: str, kind: Callable[[str], Any]) -> Any:
 
 
 def _words(rest: str) -> list[str]:
-    """The arguments; one that begins with "{" is taken as it stands."""
+    """Split the arguments; a text that begins with "{" is a single one."""
     if rest.startswith("{"):
         return [rest]
     try:

@@ -1,4 +1,4 @@
-"""The terminal with a prompt inside the box, from its opening to its end."""
+"""A session of the terminal with a prompt, inside the box."""
 
 from __future__ import annotations
 
@@ -7,27 +7,26 @@ from argparse import Namespace
 
 from rich.text import Text
 
-from sandbox.box import outside
-from sandbox.box.outside import Trouble
+from sandbox.box import host
+from sandbox.box.host import CannotRun
 from sandbox.box.preconditions import clock, require_agent
 from sandbox.events import NotSeen
-from sandbox.prompt import commands, loop, session_end
+from sandbox.prompt import commands  # noqa: F401  registers all commands
+from sandbox.prompt import loop, session_end
 from sandbox.prompt.context import Context
 from sandbox.prompt.mirror import Mirror
 from sandbox.terminal import Terminal
-from sandbox.timeline.agenttime import AgentTime
-from sandbox.timeline.timeline import Timeline, console_for_people
-
-assert commands, "importing the module makes its commands known"
+from sandbox.timeline.agent_time import AgentTime
+from sandbox.timeline.timeline import Timeline, screen_console
 
 
 def run(options: Namespace) -> int:
-    """Take commands until they end; the result is 0 when all were carried out and the agent did well."""
+    """Run commands until their end; returns 0 if none was refused and the agent made no mistake."""
     require_agent()
-    result_stream = outside.result_stream()
+    result_stream = host.result_stream()
     terminal = Terminal(clock=clock(options.speed))
     terminal.daemon.uploads_to(terminal.platform)
-    console = console_for_people()
+    console = screen_console()
     timeline = Timeline(terminal.events, AgentTime(options.speed), [console], options.log)
     if result_stream:
         Mirror(terminal.events, result_stream)
@@ -46,5 +45,5 @@ def _serve(context: Context) -> int:
     try:
         context.terminal.start_agent()
     except NotSeen:
-        raise Trouble("the agent did not announce itself to the daemon") from None
+        raise CannotRun("the agent did not report its session to the daemon") from None
     return loop.run_prompt(context) if sys.stdin.isatty() else loop.run_script(context, sys.stdin)

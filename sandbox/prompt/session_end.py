@@ -1,4 +1,4 @@
-"""Says where the session would have ended: the simulated login manager only takes note."""
+"""Prints where a real session would end: the simulated login manager only records that."""
 
 from __future__ import annotations
 
@@ -14,7 +14,7 @@ _ENDS = {
 
 
 def watch(context: Context) -> None:
-    """From now on, a line under each forced action."""
+    """From now on, print a line after each forced action."""
 
     def take(event: Event) -> None:
         if (event.source, event.target) == ("velks", "logind") and event.member in _ENDS:

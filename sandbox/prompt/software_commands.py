@@ -1,4 +1,4 @@
-"""What a person can do with installed software at the prompt."""
+"""The prompt's commands about installed software."""
 
 from __future__ import annotations
 
@@ -16,7 +16,7 @@ def install(context: Context, package: str, version: str) -> str:
     """The launcher then lists the application under the package's name."""
     if _item(package) in context.terminal.launcher.items:
         raise CommandRefused(
-            f"{package} is installed already; a new version comes with: update {package} VERSION"
+            f"{package} is installed already; install a new version with: update {package} VERSION"
         )
     _put_in_place(context, package, version)
     context.terminal.launcher.install(_item(package))
@@ -25,7 +25,7 @@ def install(context: Context, package: str, version: str) -> str:
 
 @command("update", "PACKAGE VERSION", "a package is updated")
 def update(context: Context, package: str, version: str) -> str:
-    """It must be installed."""
+    """The package must be installed."""
     _require_installed(context, package)
     _put_in_place(context, package, version)
     context.terminal.launcher.update(_item(package))
@@ -34,7 +34,7 @@ def update(context: Context, package: str, version: str) -> str:
 
 @command("uninstall", "PACKAGE", "a package is removed, and its application with it")
 def uninstall(context: Context, package: str) -> str:
-    """It must be installed."""
+    """The package must be installed."""
     _require_installed(context, package)
     context.terminal.packages.remove(package)
     context.terminal.launcher.remove(_item(package))
@@ -43,7 +43,7 @@ def uninstall(context: Context, package: str) -> str:
 
 @command("software", "", "the terminal's software as the platform knows it")
 def software(context: Context) -> None:
-    """From the inventory that came last."""
+    """The table shows the last inventory."""
     table = Table("Application", "Package", "Version", "Architecture")
     for known in context.terminal.platform.inventory() or ():
         table.add_row(*(Text(known[key]) for key in ("name", "package_name", "version", "arch")))
@@ -56,7 +56,7 @@ def _item(package: str) -> LauncherItem:
 
 def _require_installed(context: Context, package: str) -> None:
     if _item(package) not in context.terminal.launcher.items:
-        raise CommandRefused(f"{package} is not installed; do it with: install {package} VERSION")
+        raise CommandRefused(f"{package} is not installed; install it with: install {package} VERSION")
 
 
 def _put_in_place(context: Context, package: str, version: str) -> None:

@@ -5,50 +5,39 @@ from __future__ import annotations
 import json
 import threading
 from collections import Counter
-from typing import Any
+from typing import Any, Iterable
 
 from sandbox.events import Event, Events
 
-FORWARDED = "policies forwarded"
-NOTICES = "notices of policies"
-LOGOUTS = "forced log-outs"
-MESSAGES = "messages shown"
-RECEIPTS = "messages marked read"
-LISTS = "message lists read"
-APPLICATIONS = "applications opened, closed"
-STATUSES = "status reports"
-USERS = "user announcements"
-CHANGES = "software changes"
-INVENTORIES = "inventory reports"
 KINDS = (
-    FORWARDED,
-    NOTICES,
-    LOGOUTS,
-    MESSAGES,
-    RECEIPTS,
-    LISTS,
-    APPLICATIONS,
-    STATUSES,
-    USERS,
-    CHANGES,
-    INVENTORIES,
+    FORWARDED := "policies forwarded",
+    NOTICES := "notices of policies",
+    LOGOUTS := "forced log-outs",
+    MESSAGES := "messages shown",
+    RECEIPTS := "messages marked read",
+    LISTS := "message lists read",
+    APPLICATIONS := "applications opened, closed",
+    STATUSES := "status reports",
+    USERS := "user announcements",
+    CHANGES := "software changes",
+    INVENTORIES := "inventory reports",
 )
 
 _REMINDER = "提醒"
 _LIST_READ = "getPlatformMsg ----nCode: 200 "
-_PATIENCE = 20.0
 _SHOWN_PIECES = 3
 
 Piece = tuple[Any, ...]
 
 
 class Accounting:
-    """Counts pieces by kind and content: those that must come, noted by who causes them, and those that came.
+    """Counts pieces by kind and content: those expected, which their cause notes, and those that came.
 
     Message lists are noted by themselves: the platform's answers are what is sent.
     """
 
-    def __init__(self, events: Events) -> None:
+    def __init__(self, events: Events, patience: float = 20.0) -> None:
+        self.patience = patience  # seconds until what does not come is missing
         self._changed = threading.Condition()
         self._sent: dict[str, Counter[Piece]] = {kind: Counter() for kind in KINDS}
         self._arrived: dict[str, Counter[Piece]] = {kind: Counter() for kind in KINDS}
@@ -76,18 +65,18 @@ class Accounting:
         missing then shows in `differences`."""
         with self._changed:
             self._changed.wait_for(
-                lambda: all(self.arrived(kind) >= self.sent(kind) for kind in kinds), _PATIENCE
+                lambda: all(self.arrived(kind) >= self.sent(kind) for kind in kinds), self.patience
             )
 
-    def differences(self) -> list[str]:
+    def differences(self, due: Iterable[str] = KINDS) -> list[str]:
         """One line for each kind of which not exactly those pieces arrived that were sent."""
-        return [line for kind in KINDS for line in self._differences(kind)]
+        return [line for kind in due for line in self._differences(kind)]
 
     def _differences(self, kind: str) -> list[str]:
+        if self._sent[kind] == self._arrived[kind]:
+            return []
         missing = self._sent[kind] - self._arrived[kind]
         surplus = self._arrived[kind] - self._sent[kind]
-        if not missing and not surplus:
-            return []
         counts = f"{kind}: {self.sent(kind)} sent, {self.arrived(kind)} arrived"
         named = [
             f"{len(pieces)} {word}, such as {', '.join(map(str, list(pieces)[:_SHOWN_PIECES]))}"

@@ -4,56 +4,71 @@ from __future__ import annotations
 
 import sys
 from argparse import Namespace
-from datetime import datetime, time
 
 from rich.console import Console
 from rich.table import Table
 from rich.text import Text
 
 from sandbox.box.preconditions import require_agent
-from sandbox.machine.clock import ManualClock
-from sandbox.soak.day import BEGIN, Day
+from sandbox.events import NotSeen
 from sandbox.soak.accounting import KINDS, Accounting
-from sandbox.soak.usage import Usage, growth, usage
-from sandbox.terminal import Terminal
+from sandbox.soak.day import live
+from sandbox.soak.search import SECONDS, shortest_history
+from sandbox.soak.session import Lost, Session
+from sandbox.soak.usage import growth
 
 _COLUMNS = ("hour", "resident, KiB", "private dirty, KiB", "descriptors", "threads", "sent", "arrived")
 _SWITCH_SECONDS = 0.0001  # the services' threads share one interpreter and hand over often
 
 
 def soak(options: Namespace) -> int:
-    """Live through a day; the status is 0 if all arrived that was sent and nothing grew."""
+    """Live through a day or replay a history; the status is 0 if nothing was lost and nothing grew."""
     require_agent()
     sys.setswitchinterval(_SWITCH_SECONDS)
     console = Console(highlight=False, soft_wrap=True)
-    terminal = Terminal(clock=ManualClock(datetime.combine(datetime.now(), time(BEGIN))))
-    accounting = Accounting(terminal.events)
+    session = Session()
+    lost = []
     try:
-        samples = _live(terminal, accounting, options, console)
+        problems = _live(session, options, console) if options.replay is None else _replay(session, options)
+    except (Lost, NotSeen) as error:
+        problems = lost = str(error).splitlines() if isinstance(error, Lost) else str(error).splitlines()[:1]
     finally:
-        problems = terminal.shut_down()
-    problems += [*accounting.differences(), *growth(samples, options.allowance)]
-    console.print(_counts(accounting))
+        ending = session.terminal.shut_down()
+    problems += [problem for problem in ending if problem not in problems]
+    console.print(_counts(session.accounting))
     for problem in problems:
         console.print(Text(problem, "bold red"))
+    if lost and options.replay is None:
+        _search(console, options)
     console.print("soak: something was lost or grew" if problems else "soak: all arrived, nothing grew")
     return 1 if problems else 0
 
 
-def _live(terminal: Terminal, accounting: Accounting, options: Namespace, console: Console) -> list[Usage]:
-    """Live through the day and say each hour how the agent does; its usage after each hour."""
-    day = Day(terminal, accounting, options.seed)
-    day.begin()
+def _live(session: Session, options: Namespace, console: Console) -> list[str]:
+    """Live through the day and say each hour how the agent does; in what it has grown."""
     samples = []
     console.print(_row(*_COLUMNS))
-    for hour in range(options.hours + 1):
-        day.live_hour()
-        sample = usage(terminal.agent.pid)
+    for hour, sample in enumerate(live(session, options.hours, options.seed)):
         samples.append(sample)
         held = (sample.resident, sample.private_dirty, sample.descriptors, sample.threads)
-        console.print(_row(hour or "warm-up", *held, *accounting.totals()))
-    day.end()
-    return samples
+        console.print(_row(hour or "warm-up", *held, *session.accounting.totals()))
+    return growth(samples, options.allowance)
+
+
+def _replay(session: Session, options: Namespace) -> list[str]:
+    session.log_in()
+    session.replay(options.replay.split())
+    return []
+
+
+def _search(console: Console, options: Namespace) -> None:
+    console.print(f"looking for a short history that fails, for at most {SECONDS} seconds ...")
+    history = shortest_history(options.seed)
+    if history is None:
+        console.print("none was found: only the day as a whole fails")
+    else:
+        local = " --local" if options.local else ""
+        console.print(f"the shortest that failed: ./dev soak{local} --replay '{' '.join(history)}'")
 
 
 def _row(*cells: object) -> str:

@@ -1,1 +1,1 @@
-"""The traffic of a terminal, shown to people line by line while it happens."""
+"""Shows the events of a terminal line by line while they happen."""

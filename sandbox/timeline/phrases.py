@@ -1,4 +1,4 @@
-"""Puts an event into words: what was said and what it means."""
+"""The wording of an event: its content and its meaning."""
 
 from __future__ import annotations
 
@@ -22,19 +22,19 @@ _NAMES = {
 
 
 def who(name: str) -> str:
-    """A participant's name for people."""
+    """The displayed name of a participant."""
     return _NAMES.get(name, name)
 
 
 def what(event: Event) -> str:
-    """What was said, in a line."""
+    """The event's content in one line."""
     known = _WHAT.get(event.member)
     text = known(event) if known else _WHAT_OF_KIND.get(event.kind, _call)(event)
     return text if len(text) <= _LONGEST else text[: _LONGEST - 1] + "…"
 
 
 def meaning(event: Event) -> str:
-    """What it means, empty when what was said speaks for itself."""
+    """The event's meaning; empty if the content is clear by itself."""
     if event.kind == "http":
         return translations.REQUESTS.get(event.member, "")
     known = _MEANING.get(event.member)
@@ -55,8 +55,8 @@ def _notify(event: Event) -> str:
 
 
 def _request(event: Event) -> str:
-    """Without the query, which is long and stands in the agent's log, and without what the daemon was just
-    handed to upload."""
+    """Leaves out the query, which is long and in the agent's log, and the body of the daemon's uploads, which
+    the event before shows."""
     line, body = event.args
     method, target = line.split()[:2]
     path, query, _ = target.partition("?")
@@ -73,7 +73,7 @@ def _reply(event: Event) -> str:
 def _property_change(event: Event) -> str:
     _, values, invalidated = event.args
     changes = [f"{name} = {_value(value)}" for name, value in values.items()]
-    return ", ".join(changes + [f"{name} is another" for name in invalidated])
+    return ", ".join(changes + [f"{name} has changed" for name in invalidated])
 
 
 _WHAT: dict[str, Callable[[Event], str]] = {
@@ -113,10 +113,10 @@ def _policy_meaning(args: tuple[Any, ...]) -> str:
     try:
         policy = json.loads(args[1])
         own = POLICIES.get(policy["type"])
-        words = own.meaning if own else "a policy that the session agent passes on"
+        words = own.meaning if own else "a policy that the agent forwards"
         concerned = policy.get("payload", {}).get("uid")
     except (ValueError, KeyError, TypeError, AttributeError):
-        return "no policy"
+        return "not a policy"
     return words if concerned is None else f"{words}: uid {concerned}"
 
 
@@ -145,12 +145,12 @@ def _window_count(infos: Sized) -> str:
 
 _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
     "appears": lambda args: "on the bus",
-    "leaves": lambda args: "gone from the bus",
+    "leaves": lambda args: "off the bus",
     "UpdateUserInfo": lambda args: "whose session this is",
     "SendUserStatus": lambda args: translations.STATUSES.get(args[0], ""),
     "pushPolicyMsg": _policy_meaning,
-    "pushOnlineMsg": lambda args: "sessions, announce yourselves",
-    "onPolicyMsg": lambda args: "passed on for the policy service to carry out",
+    "pushOnlineMsg": lambda args: "asks all sessions to report themselves",
+    "onPolicyMsg": lambda args: "forwarded to the policy service, which carries it out",
     "onDomainConfig": lambda args: "take the terminal out of the domain's configuration",
     "Notify": _notice_meaning,
     "PropertiesChanged": _change_meaning,
@@ -162,8 +162,8 @@ _MEANING: dict[str, Callable[[tuple[Any, ...]], str]] = {
     "restore_config": lambda args: "what the daemon changed on the terminal is undone",
     "message": lambda args: f"for {args[0]}, from {args[3]}",
     "tip": lambda args: f"for {args[0]}: the password is about to expire" if args[1] else f"for {args[0]}",
-    "EntryAdded": lambda args: "an application comes to the dock",
-    "EntryRemoved": lambda args: "an application is gone from the dock",
+    "EntryAdded": lambda args: "an application was added to the dock",
+    "EntryRemoved": lambda args: "an application was removed from the dock",
     "WindowInfosChanged": lambda args: _window_count(args[0]),
     "NameChanged": lambda args: translations.APPLICATIONS.get(args[0], ""),
     "sendAppOpenState": _application_meaning,

@@ -1,4 +1,4 @@
-"""Prints the traffic as a table that grows while it happens."""
+"""Prints events as a table that grows while they happen."""
 
 from __future__ import annotations
 
@@ -15,19 +15,19 @@ from rich.text import Text
 
 from sandbox.events import SYNC, WAKE_UP, Event, Events
 from sandbox.timeline import phrases
-from sandbox.timeline.agenttime import AgentTime, minutes
-from sandbox.timeline.breaking import breakable
+from sandbox.timeline.agent_time import AgentTime, minutes
+from sandbox.timeline.line_breaks import breakable
 
 _PLAIN_WIDTH = 136
-_PICTURE_WIDTH = 115  # still read where a page shows it at two thirds of its size
+_PICTURE_WIDTH = 115  # still readable when a page scales it to two thirds
 _WIDE = 110
 _TIME, _ROUTE, _GAP = 5, 27, 2
 _REMARK = "dim italic"
 _LOG_KINDS = ("log", "output")
 
 
-def console_for_people() -> Console:
-    """Standard output: as wide as the terminal, or plain text of a readable width where there is none."""
+def screen_console() -> Console:
+    """Standard output: as wide as the terminal window, or plain text of a readable width without one."""
     if sys.stdout.isatty():
         return Console(highlight=False)
     return Console(
@@ -35,7 +35,7 @@ def console_for_people() -> Console:
     )
 
 
-def console_for_picture() -> Console:
+def picture_console() -> Console:
     """A console that only records, with colours."""
     return Console(
         width=_PICTURE_WIDTH, highlight=False, record=True, file=io.StringIO(), force_terminal=True
@@ -43,22 +43,22 @@ def console_for_picture() -> Console:
 
 
 class _WithoutTrailingBlanks(io.TextIOBase):
-    """Hands on what is printed but for the blanks that fill lines up."""
+    """Removes the blanks that pad printed lines."""
 
     def __init__(self, stream: IO[str]) -> None:
         self._stream = stream
 
     def write(self, text: str) -> int:
-        """Whole lines come at once."""
+        """Write text that consists of whole lines."""
         return self._stream.write(re.sub(r" +$", "", text, flags=re.MULTILINE))
 
     def flush(self) -> None:
-        """As that of the stream."""
+        """Flush the underlying stream."""
         self._stream.flush()
 
 
 class Timeline:
-    """Shows each event in a line: agent time, who to whom, what, and what it means."""
+    """Shows each event in a line: agent time, sender and receiver, content, meaning."""
 
     def __init__(
         self, events: Events, time: AgentTime, consoles: Sequence[Console], show_log: bool = False
@@ -67,18 +67,18 @@ class Timeline:
         self.show_log = show_log
         self._consoles = consoles
         self._is_open = True
-        # Events come on several threads; one amid the start or end of the status line would tear it.
+        # Several threads record events; output during the start or end of the status line would garble it.
         self._output = threading.Lock()
         events.subscribe(self._take)
 
     def print(self, what: RenderableType = "") -> None:
-        """Print something between the lines."""
+        """Print something between the events."""
         with self._output:
             for console in self._consoles:
                 console.print(what)
 
     def draw(self, wanted: bool) -> None:
-        """Whether what comes now belongs into the picture."""
+        """Include the following lines in the picture or not."""
         for console in self._consoles[1:]:
             console.quiet = not wanted
 
@@ -88,7 +88,7 @@ class Timeline:
 
     @contextmanager
     def waiting(self, words: str) -> Iterator[None]:
-        """On a terminal, show under the last line what is waited for, and the running agent time."""
+        """While waiting, show a status line with the awaited event and the agent time (interactive only)."""
         console = self._consoles[0]
         if not console.is_terminal:
             yield
@@ -103,7 +103,7 @@ class Timeline:
                 status.stop()
 
     def shows(self, event: Event) -> bool:
-        """Whether an event makes a line."""
+        """Whether an event is shown."""
         if event.kind in _LOG_KINDS:
             return self.show_log
         return not _is_probe(event)
@@ -130,21 +130,21 @@ class Timeline:
             line.add_column(width=half - _GAP, overflow="fold")
             line.add_column(max_width=rest - half, overflow="fold")
             words = breakable(phrases.what(event), half - _GAP)
-            cells += [Text(words), Text(phrases.meaning(event), _REMARK)]
+            cells += [Text(words), Text(breakable(phrases.meaning(event), rest - half), _REMARK)]
         line.add_row(*cells)
         return line
 
 
 def _stacked(event: Event, width: int) -> Text:
-    """What was said and, under it, what it means."""
+    """The content, and the meaning below it."""
     style = "dim" if event.kind in _LOG_KINDS else ""
-    means = phrases.meaning(event)
+    means = breakable(phrases.meaning(event), width)
     words = breakable(phrases.what(event), width)
     return Text.assemble((words, style), ("\n" + means if means else "", _REMARK))
 
 
 class _Waiting:
-    """Rendered afresh with each refresh of the status line."""
+    """The status line, rendered again at each refresh."""
 
     def __init__(self, words: str, time: AgentTime) -> None:
         self._words = words
@@ -167,5 +167,5 @@ def _participant(name: str) -> Text:
 
 
 def _is_probe(event: Event) -> bool:
-    """Whether this is a push for the terminal's own sake."""
+    """Whether the terminal pushed this only to synchronise with the agent."""
     return event.member == "pushPolicyMsg" and event.args[1].startswith((SYNC, WAKE_UP))

@@ -1,4 +1,4 @@
-"""English for the texts that the agent shows, and words for codes."""
+"""English translations of the agent's texts, and the meanings of codes."""
 
 from __future__ import annotations
 
@@ -6,7 +6,7 @@ from sandbox.policies import POLICIES
 
 NOTICES = {
     **{policy.notice: policy.english_notice for policy in POLICIES.values()},
-    # What the platform says in the tour.
+    # The platform's texts in the tour.
     "您的密码将在3天后过期，请及时修改": "your password will expire in 3 days; change it in time",
     "今晚22:00停机，请保存文件": "shutdown tonight at 22:00; save your files",
     '请读 "须知", 周五前回复': 'read the "rules" and answer by Friday',
@@ -17,9 +17,9 @@ ACTIONS = {"重启": "reboot", "查看": "view"}
 STATUSES = {1: "the session is active", 2: "the session is locked", 3: "the screen saver is running"}
 REQUESTS = {
     "list": "are there unread messages? (one at a time)",
-    "read": "this one is being shown to the user",
+    "read": "this message is being shown to the user",
     "tips": "is the user's password about to expire?",
-    "software_change": "what was installed or updated",
+    "software_change": "which software was installed or updated",
     "inventory": "all software of the terminal",
 }
 PROPERTIES = {
@@ -31,7 +31,7 @@ PROPERTIES = {
     ("com.norix.kpx.daemon.Dock.Entry", "Id"): "which application is this?",
     ("com.norix.kpx.daemon.Dock.Entry", "Name"): "what is the application called?",
     ("com.norix.kpx.daemon.Dock.Entry", "IsDocked"): "is it kept on the dock?",
-    ("com.norix.kpx.daemon.Dock.Entry", "WindowInfos"): "which windows has it?",
+    ("com.norix.kpx.daemon.Dock.Entry", "WindowInfos"): "which windows does it have?",
 }
 CHANGES = {
     ("isRunning", True): "the screen saver starts",

@@ -14,7 +14,7 @@ _FORMAT_VALUE = re.compile(r"%l*[a-z]")
 
 
 class LogLine(NamedTuple):
-    """A level as Qt calls it, and a text in which each row of values is an ellipsis."""
+    """A level as Qt calls it, and a text in which successive values are one ellipsis."""
 
     level: str
     text: str
@@ -43,7 +43,7 @@ def _text(statement: str) -> str:
         form = _FORM.match(statement)
         assert form, f"the log call's form is no literal: {statement}"
         return _FORMAT_VALUE.sub(_VALUE, "".join(_LITERAL.findall(form[0])))
-    # Parts are told apart by a blank, as the stream does; values that follow one another are one row.
+    # The stream separates parts by a blank; successive values are one ellipsis.
     parts = [_part(piece) for piece in statement.split("<<")[1:]]
     return re.sub(f"{_VALUE}( {_VALUE})+", _VALUE, " ".join(parts))
 

@@ -1,4 +1,4 @@
-"""The JSON contracts are sound, and their examples tell what keeps to them and what does not."""
+"""The JSON contracts are sound, and their examples are valid or invalid as their names say."""
 
 from __future__ import annotations
 
@@ -105,3 +105,16 @@ def test_people_can_check_their_own_messages(names: list[str], status: int, said
     )
     assert ended.returncode == status
     assert [line.rpartition(": ")[2] for line in ended.stdout.splitlines()] == said
+
+
+def test_a_message_that_is_not_there_is_named_without_a_traceback() -> None:
+    ended = subprocess.run(
+        ["/usr/bin/python3", "-m", "sandbox.contracts", "policy-message", "/nowhere.json"],
+        cwd=REPOSITORY,
+        capture_output=True,
+        text=True,
+    )
+
+    assert ended.returncode == 2
+    assert "cannot read the file" in ended.stderr.splitlines()[-1]
+    assert "Traceback" not in ended.stderr

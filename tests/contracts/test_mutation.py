@@ -2,13 +2,20 @@
 
 from __future__ import annotations
 
+import os
+import threading
+from concurrent.futures import ThreadPoolExecutor
+from pathlib import Path
+
 import pytest
 
 from sandbox import REPOSITORY
-from tests.mutation import explanations
+from tests.mutation import explanations, workshop
 from tests.mutation.areas import AREAS, Area, area_of, chosen
 from tests.mutation.explanations import Key
 from tests.mutation.mutants import mutants
+from tests.mutation.mutate import Task, report
+from tests.mutation.workshop import Workshop, WorkshopTrouble
 
 FUNCTION = "void Thing::act()\n{{\n    {}\n}}\n"
 
@@ -42,13 +49,7 @@ def test_conditions_and_constants_are_changed_one_at_a_time(statement: str, expe
 
 @pytest.mark.parametrize(
     "statement",
-    [
-        'send("");',
-        "QList<int> list;",
-        "auto&& all = list;",
-        "call();",
-        "// if (a == b) { true; }",
-    ],
+    ['send("");', "QList<int> list;", "auto&& all = list;", "call();", "// if (a == b) { true; }"],
 )
 def test_what_would_change_nothing_is_left_alone(statement: str) -> None:
     assert changes(statement) == []
@@ -95,7 +96,7 @@ def test_sources_are_chosen_by_name_or_pattern() -> None:
         chosen(["nothing.cpp"])
 
 
-def test_an_explanation_of_a_mutant_that_is_gone_is_told() -> None:
+def test_an_explanation_of_a_mutant_that_is_gone_is_found() -> None:
     (mutant,) = mutants("thing.cpp", FUNCTION.format("set(true);"))[0]
     of_it = explanations.key_of(mutant)
     gone = Key("thing.cpp act", "set(false);", "set(true);")
@@ -111,3 +112,32 @@ def test_an_explanation_is_for_the_mutants_below_it() -> None:
         ("a.cpp", "c;", "d;"): "A reason, in two lines.",
         ("b.cpp", "e;", "f;"): "Another.",
     }
+
+
+@pytest.mark.parametrize(("is_sample", "status"), [(False, 1), (True, 0)])
+def test_a_sample_is_not_judged(is_sample: bool, status: int) -> None:
+    (mutant, *_), _ = mutants("thing.cpp", FUNCTION.format("set(true);"))
+
+    assert report([Task(mutant, AREAS[0])], ["survived"], 0, is_sample) == status
+
+
+def test_what_a_workshop_runs_ends_when_it_is_to_stop(
+    tmp_path: Path, monkeypatch: pytest.MonkeyPatch
+) -> None:
+    monkeypatch.setattr(workshop, "stopping", threading.Event())
+    monkeypatch.setattr(workshop, "FOLDER", tmp_path)
+    monkeypatch.setattr(workshop, "_copy_tree", Path.mkdir)
+    pipe = tmp_path / "pipe"
+    os.mkfifo(pipe)
+    program = tmp_path / "cmake"
+    program.write_text(f"#!/bin/sh\nexec 9>{pipe}; sleep 1000")
+    program.chmod(0o755)
+    monkeypatch.setenv("PATH", str(tmp_path), prepend=":")
+
+    with ThreadPoolExecutor() as workers:
+        preparing = workers.submit(Workshop("tree").prepare, [])
+        with pipe.open("rb") as held:
+            workshop.stopping.set()
+            assert held.read() == b""
+        with pytest.raises(WorkshopTrouble, match="interrupted"):
+            preparing.result()

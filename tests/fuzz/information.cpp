@@ -17,7 +17,7 @@ bool operator==(const UserInfo& left, const UserInfo& right)
 
 } // namespace
 
-/// What the daemon, or whoever writes in its place, leaves in the information files.
+/// What the daemon, or another program in its place, leaves in the information files.
 void tryInput(const QByteArray& input)
 {
     writeBytes(kUserInfo, input);

@@ -1,4 +1,4 @@
-"""Runs the fuzz targets one after the other, each in a box of its own, and tells in a line what came of each.
+"""Runs the fuzz targets one after the other, each in a box of its own, with a line on the outcome of each.
 
 What libFuzzer learns stays in the build folder, so that the next run goes on from there. An input that a
 target fell over is put into the target's corpus, where the ordinary tests replay it.
@@ -75,7 +75,7 @@ def _statistic(log: str, name: str) -> str:
 
 
 def _run(target: str, seconds: int) -> bool:
-    """Fuzz one target, and tell whether it stood."""
+    """Fuzz one target; whether it stood."""
     shutil.rmtree(_findings(target), ignore_errors=True)
     for folder in (_learnt(target), _findings(target)):
         folder.mkdir(parents=True, exist_ok=True)
@@ -86,17 +86,17 @@ def _run(target: str, seconds: int) -> bool:
             _command(target, seconds), env=_environment(), stdout=file, stderr=subprocess.STDOUT
         ).returncode
     log = path.read_text(errors="replace")
-    told = (
+    outcome = (
         f"{target}: {_statistic(log, 'number_of_executed_units')} inputs, "
         f"{_statistic(log, 'average_exec_per_sec')}/s, {_statistic(log, 'peak_rss_mb')} MB at most, "
         f"{len(list(_learnt(target).iterdir())) - known} new in the corpus"
     )
     if status == 0:
-        print(f"{told}, nothing found", flush=True)
+        print(f"{outcome}, nothing found", flush=True)
         return True
     kept = [shutil.copy(found, _HERE / "corpus" / target) for found in sorted(_findings(target).iterdir())]
     where = " ".join(str(Path(each).relative_to(_REPOSITORY)) for each in kept) or "no input"
-    print(f"{told}, FELL over {where}; see {path.relative_to(_REPOSITORY)}", flush=True)
+    print(f"{outcome}, FELL over {where}; see {path.relative_to(_REPOSITORY)}", flush=True)
     return False
 
 

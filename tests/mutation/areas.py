@@ -66,14 +66,7 @@ AREAS = (
         ("message_transfer_test",),
         ("startup", "start_order", "daemon_life", "session_state", "hung_services"),
         ("local_user", "startup"),
-        (
-            "statusOf",
-            "readLoginUser",
-            "startTimers",
-            "announceAgain",
-            "getUserState",
-            "getScreenState",
-        ),
+        ("statusOf", "readLoginUser", "startTimers", "reportAgain", "getUserState", "getScreenState"),
     ),
     Area(
         f"{_FOLDER}session_state.cpp",

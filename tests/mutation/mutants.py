@@ -23,7 +23,6 @@ _SWAPPED_TEXTS = {
 }
 # Those that do something else without blanks around them: templates, references.
 _BETWEEN_BLANKS = ("<", ">", "&&", "?")
-_COMPARISONS = ("==", "!=", "<", "<=", ">", ">=")
 _REMARK = re.compile(r"(?<!:)//[^\n]*")
 _FUNCTION = re.compile(
     r"^(?!namespace|using|struct|class|enum|const|inline)[^\s#/{}][^;]*?(\w+)\(", re.MULTILINE
@@ -106,7 +105,7 @@ def _is_between_blanks(source: str, token: Token) -> bool:
 
 
 def _negations(source: str, all_tokens: list[Token]) -> Iterator[_Change]:
-    """Whole conditions; a lone comparison for equality or a lone "!" is turned round by its own change."""
+    """Negate whole conditions, except those that another change negates: a single comparison or "!"."""
     for place, token in enumerate(all_tokens):
         if token.text not in ("if", "while"):
             continue

@@ -1,6 +1,6 @@
 """Changes the agent's sources in single places and looks which changes the tests do not notice.
 
-    ./dev mutate [FILE...] [--limit N] [--seed S] [--jobs N] [--quick] [--again]
+    ./dev mutate [--limit N] [--seed S] [--jobs N] [--quick] [--again] [FILE...]
 
 Works in copies of the tree under build/mutate. Each mutant is built and meets the unit tests of its file, and
 only if it survives them the end-to-end tests (see areas.py).
@@ -21,7 +21,7 @@ from sandbox.ending import exit_with
 from tests.mutation import explanations
 from tests.mutation.areas import Area, area_of, chosen
 from tests.mutation.mutants import Mutant, mutants
-from tests.mutation.workshop import FOLDER, REPOSITORY, WorkshopTrouble, Verdict, Workshop
+from tests.mutation.workshop import FOLDER, REPOSITORY, Verdict, Workshop, WorkshopTrouble, stopping
 
 _LEAST_CAUGHT = 90  # per cent of a component's mutants that are not explained
 _VERDICTS = FOLDER / "verdicts.txt"  # of the last run, a line each
@@ -77,7 +77,11 @@ def judge_all(
         return verdict
 
     with ThreadPoolExecutor(jobs) as workers:
-        return list(workers.map(judge, tasks))
+        try:
+            return list(workers.map(judge, tasks))
+        except KeyboardInterrupt:
+            stopping.set()
+            raise
 
 
 def report(tasks: Sequence[Task], outcomes: Sequence[Outcome], left_out: int, is_sample: bool) -> int:

@@ -22,7 +22,7 @@ _LOG = ("qDebug", "qInfo", "qWarning", "qCritical")
 
 @dataclass(frozen=True)
 class Token:
-    """A piece of a source that means something; `log` if it stands in a log statement."""
+    """A token of a source; `log` if it is part of a log statement."""
 
     kind: str
     text: str

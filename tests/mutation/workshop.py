@@ -5,6 +5,8 @@ from __future__ import annotations
 import os
 import signal
 import subprocess
+import threading
+import time
 from pathlib import Path
 from typing import Callable, Literal, Sequence
 
@@ -22,6 +24,12 @@ _UNIT_SECONDS = 90.0  # for the unit tests of an area
 _TEST_SECONDS = 600.0  # for its end-to-end tests, or for the unit tests of all areas
 _NO_TESTS = 5  # exit status of pytest when no test was chosen
 _PYTHON = "/usr/bin/python3"
+_GLANCE_SECONDS = 0.2  # how often a running program is looked at
+
+_GRACE_SECONDS = 1.0
+
+# Set to end the programs of all workshops, which ignore Ctrl+C.
+stopping = threading.Event()
 
 
 class WorkshopTrouble(Exception):
@@ -126,11 +134,31 @@ class Workshop:
                 arguments, cwd=self._tree, env=env, stdout=log, stderr=log, start_new_session=True
             )
             try:
-                return program.wait(seconds)
+                return _wait(program, time.monotonic() + seconds)
+            finally:
+                _end(program)
+
+
+def _end(program: subprocess.Popen[bytes]) -> None:
+    """End it if it still runs. ninja forwards the first signal to its children, each in its own group."""
+    for number in (signal.SIGTERM, signal.SIGKILL):
+        if program.poll() is None:
+            os.killpg(program.pid, number)
+            try:
+                program.wait(_GRACE_SECONDS)
             except subprocess.TimeoutExpired:
-                os.killpg(program.pid, signal.SIGKILL)
-                program.wait()
-                return -1
+                pass
+
+
+def _wait(program: subprocess.Popen[bytes], deadline: float) -> int:
+    while time.monotonic() < deadline:
+        if stopping.is_set():
+            raise WorkshopTrouble("interrupted")
+        try:
+            return program.wait(_GLANCE_SECONDS)
+        except subprocess.TimeoutExpired:
+            pass
+    return -1
 
 
 def _copy_tree(folder: Path) -> None:

@@ -9,10 +9,13 @@ from pathlib import Path
 from subprocess import PIPE, CompletedProcess
 from tempfile import TemporaryFile
 
+import pytest
+
 from sandbox.agent import default_binary
 from sandbox.fakes.daemon import INTERFACE as VELKG
 from sandbox.fakes.policy_service import INTERFACE as PRYS
 from sandbox.machine import layout
+from sandbox.terminal import Terminal
 
 _TALK = f"""
 import dbus, ssl
@@ -67,11 +70,19 @@ def rude_agent(folder: Path) -> Path:
     return _program(folder, f"/usr/bin/python3 -c 'import dbus; {call}' 2>/dev/null", f"exec {real}")
 
 
-def talking_agent(folder: Path, deeds: str) -> Path:
+def talking_agent(folder: Path, actions: str) -> Path:
     """An agent that does what is written in Python, with the calls below, and ends."""
-    script = folder / "deeds.py"
-    script.write_text(_TALK + deeds + "\n")
+    script = folder / "actions.py"
+    script.write_text(_TALK + actions + "\n")
     return _program(folder, f"exec /usr/bin/python3 {script}")
+
+
+def play(terminal: Terminal, folder: Path, actions: str) -> None:
+    """Let an agent do this to its end."""
+    terminal.agent.binary = talking_agent(folder, actions)
+    terminal.start_agent(ready=terminal.agent.wait)
+    if terminal.agent.exit_status != 0:
+        pytest.fail(terminal.report())
 
 
 def _program(folder: Path, *lines: str) -> Path:

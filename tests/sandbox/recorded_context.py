@@ -1,14 +1,17 @@
-"""The context of a person whose output tests can read."""
+"""The context of a person at the prompt, whose output tests can read."""
 
 from __future__ import annotations
 
 import io
 
+import pytest
 from rich.console import Console
 
-from sandbox.prompt.context import Context
+from sandbox.prompt import commands  # noqa: F401  registers all commands
+from sandbox.prompt.context import CommandRefused, Context
+from sandbox.prompt.registry import run_line
 from sandbox.terminal import Terminal
-from sandbox.timeline.agenttime import AgentTime
+from sandbox.timeline.agent_time import AgentTime
 from sandbox.timeline.timeline import Timeline
 
 
@@ -23,3 +26,11 @@ class RecordedContext(Context):
     def lines_with(self, text: str) -> list[str]:
         """The printed lines that hold a text."""
         return [line for line in self.context.getvalue().splitlines() if text in line]
+
+    def refusal(self, line: str) -> str:
+        """Why a line is refused; nothing happens in the terminal."""
+        mark = self.terminal.events.mark()
+        with pytest.raises(CommandRefused) as refused:
+            run_line(self, line)
+        assert not self.terminal.events.all(after=mark)
+        return str(refused.value)

@@ -1,4 +1,4 @@
-"""Whoever breaks a JSON contract fails the test: the agent, and the box itself."""
+"""A broken JSON contract fails the test, whether the agent or the box breaks it."""
 
 from __future__ import annotations
 
@@ -11,7 +11,7 @@ import pytest
 from sandbox import contracts
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.sandbox.programs import talking_agent
+from tests.sandbox import programs
 
 CHANGES = "https://%1:%2/uim/v3/client/upinfo_log"
 INVENTORY = "https://%1:%2/uim/v3/client/upload_info"
@@ -72,15 +72,12 @@ BADLY_DONE = [
 ]
 
 
-def play(terminal: Terminal, folder: Path, deeds: str) -> None:
+def play(terminal: Terminal, folder: Path, actions: str) -> None:
     """Let an agent do this, with two policies pushed before."""
     assert terminal.platform
-    terminal.agent.binary = talking_agent(folder, deeds)
     for policy in (FORWARDED, '{"type": 1201}'):
         terminal.daemon.push_policy(policy)
-    terminal.start_agent(ready=terminal.agent.wait)
-    if terminal.agent.exit_status != 0:
-        pytest.fail(terminal.report())
+    programs.play(terminal, folder, actions)
 
 
 def test_an_agent_that_keeps_to_all_contracts_passes(terminal: Terminal, tmp_path: Path) -> None:
@@ -90,14 +87,14 @@ def test_an_agent_that_keeps_to_all_contracts_passes(terminal: Terminal, tmp_pat
     assert len(terminal.events.all(source="velks", kind="http")) == 3
 
 
-@pytest.mark.parametrize(("deeds", "complaint"), BADLY_DONE, ids=range(len(BADLY_DONE)))
-def test_an_agent_that_breaks_a_contract_fails_the_test(tmp_path: Path, deeds: str, complaint: str) -> None:
+@pytest.mark.parametrize(("actions", "complaint"), BADLY_DONE, ids=range(len(BADLY_DONE)))
+def test_an_agent_that_breaks_a_contract_fails_the_test(tmp_path: Path, actions: str, complaint: str) -> None:
     with pytest.raises(AssertionError, match=f"(?s)^the agent.* {complaint}"), Terminal() as terminal:
-        play(terminal, tmp_path, deeds)
+        play(terminal, tmp_path, actions)
 
 
 def test_an_agent_that_relays_garbage_can_be_excused(terminal: Terminal, tmp_path: Path) -> None:
-    terminal.contracts.excuse("read-receipt")
+    terminal.contracts.allow_violations("read-receipt")
 
     play(terminal, tmp_path, request("PUT", READ, '{"uuid":"""}'))
 
@@ -128,7 +125,7 @@ def test_a_platform_that_breaks_a_contract_by_itself_fails_the_test(tmp_path: Pa
         play(terminal, tmp_path, request("GET", TIPS, '{"username": "zhang"}'))
 
 
-def test_a_platform_that_is_told_to_break_a_contract_may_do_so(terminal: Terminal, tmp_path: Path) -> None:
+def test_a_platform_with_a_fault_may_break_a_contract(terminal: Terminal, tmp_path: Path) -> None:
     terminal.platform.faults["tips"] = HttpFault.reply(200, b'{"code": "0"}')
 
     play(terminal, tmp_path, request("GET", TIPS, '{"username": "zhang"}'))

@@ -1,4 +1,4 @@
-"""The tour tells what it saw, and its status whether that was as it should be."""
+"""The tour shows what it saw; its status says whether that was as expected."""
 
 from __future__ import annotations
 
@@ -15,7 +15,7 @@ from sandbox.demo.tour import Outcome, Tour
 from sandbox.events import Event
 from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
-from sandbox.timeline.agenttime import AgentTime
+from sandbox.timeline.agent_time import AgentTime
 from sandbox.timeline.timeline import Timeline
 from tests.sandbox.programs import idle_agent, rude_agent, run_program
 
@@ -34,7 +34,7 @@ def _play(terminal: Terminal, patience: float, *steps: Step) -> list[Outcome]:
 def _says(*members: str) -> Callable[[Terminal], None]:
     def cue(terminal: Terminal) -> None:
         for member in members:
-            terminal.events.record("velks", "somebody", "call", member)
+            terminal.events.record("velks", "fake", "call", member)
 
     return cue
 
@@ -79,7 +79,7 @@ def test_chosen_scenes_are_played_after_the_first_one() -> None:
     assert "---getusername:" in ended.stdout
 
 
-def test_waiting_messages_and_the_password_warning_are_told_with_what_they_mean() -> None:
+def test_waiting_messages_and_the_password_warning_are_shown_with_their_meaning() -> None:
     ended = run_program("demo", *UNHURRIED, "--only", "2,3")
 
     assert ended.returncode == 0, ended.stdout
@@ -90,14 +90,14 @@ def test_waiting_messages_and_the_password_warning_are_told_with_what_they_mean(
     assert any("are there unread messages?" in line for line in lines)
 
 
-def test_the_end_tells_what_came_of_each_scene_and_what_to_try_next() -> None:
+def test_the_end_lists_the_outcome_of_each_scene_and_what_to_try_next() -> None:
     ended = run_program("demo", *UNHURRIED, "--only", "8")
 
     assert f"8. {SCENES[7].title}  2 of 2 ──" in ended.stdout
     *_, first, eighth, summary, next_steps = ended.stdout.splitlines()
     assert first.split() == ["good", "1.", *SCENES[0].title.split(), "3", "of", "3"]
     assert eighth.startswith(f"good  8. {SCENES[7].title}")
-    assert summary.endswith("expectations came out as they should.")
+    assert summary.endswith("expectations met.")
     assert next_steps.startswith("Try it yourself: ./dev box.")
     assert "Expected and seen" not in ended.stdout
 
@@ -149,7 +149,7 @@ def test_the_picture_shows_the_chosen_scenes_alone(tmp_path: Path) -> None:
     assert "SendUserStatus" in ended.stdout and "SendUserStatus" not in drawn
 
 
-def test_the_picture_needs_nothing_from_elsewhere_and_tells_nothing_of_the_machine(tmp_path: Path) -> None:
+def test_the_picture_needs_nothing_from_elsewhere_and_shows_nothing_of_the_machine(tmp_path: Path) -> None:
     picture = tmp_path / "demo.svg"
 
     ended = run_program("demo", "--only", "8", "--svg", str(picture))
@@ -161,7 +161,7 @@ def test_the_picture_needs_nothing_from_elsewhere_and_tells_nothing_of_the_machi
     assert str(Path.cwd()) not in drawn and str(tmp_path) not in drawn
 
 
-def test_what_is_forbidden_is_told_when_it_comes(terminal: Terminal) -> None:
+def test_forbidden_event_is_named_when_it_comes(terminal: Terminal) -> None:
     announcement = never("no name", "daemon", "UpdateUserInfo")
 
     outcomes = _play(
@@ -198,7 +198,7 @@ def test_the_order_counts_where_it_matters(
     terminal: Terminal, said: tuple[str, ...], in_order: bool, verdicts: list[str]
 ) -> None:
     terminal.start_agent()
-    then = (from_agent("a list", "somebody", "list"), from_agent("a receipt", "somebody", "read"))
+    then = (from_agent("a list", "fake", "list"), from_agent("a receipt", "fake", "read"))
 
     outcomes = _play(terminal, _NO_PATIENCE, Step(_says(*said), then, in_order))
 
@@ -210,7 +210,7 @@ def test_what_is_expected_twice_in_order_must_come_twice(
     terminal: Terminal, times: int, verdict: str
 ) -> None:
     terminal.start_agent()
-    twice = (from_agent("a list", "somebody", "list"),) * 2
+    twice = (from_agent("a list", "fake", "list"),) * 2
 
     outcomes = _play(terminal, _NO_PATIENCE, Step(_says(*["list"] * times), twice, in_order=True))
 
@@ -224,10 +224,8 @@ def test_a_step_without_a_cue_looks_at_what_followed_the_last_one(terminal: Term
     outcomes = _play(
         terminal,
         _NO_PATIENCE,
-        Step(_says("list", "read"), (from_agent("a list", "somebody", "list"),)),
-        Step(
-            None, (from_agent("a receipt", "somebody", "read"), never("nothing old", "somebody", "too early"))
-        ),
+        Step(_says("list", "read"), (from_agent("a list", "fake", "list"),)),
+        Step(None, (from_agent("a receipt", "fake", "read"), never("nothing old", "fake", "too early"))),
     )
 
     assert _verdicts(outcomes) == ["as expected"] * 3

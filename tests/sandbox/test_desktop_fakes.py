@@ -2,7 +2,7 @@
 
 from __future__ import annotations
 
-from typing import Any, Iterator, Sequence
+from typing import Any, Sequence
 
 import dbus
 import pytest
@@ -17,67 +17,59 @@ PROPERTIES = "org.freedesktop.DBus.Properties"
 EDITOR = LauncherItem("/usr/share/applications/editor.desktop", "编辑器", "a", "b", 3, 1 << 40)
 
 
-@pytest.fixture
-def caller(terminal: Terminal) -> Iterator[Stranger]:
-    """A client of the session bus."""
-    stranger = Stranger(terminal.session_bus)
-    yield stranger
-    stranger.close()
-
-
-def of_dock(caller: Stranger, name: str) -> Any:
+def of_dock(on_session: Stranger, name: str) -> Any:
     """A property of the dock."""
-    return caller.call(dock.INTERFACE, dock.PATH, PROPERTIES, "Get", dock.INTERFACE, name, signature="ss")
+    return on_session.call(dock.INTERFACE, dock.PATH, PROPERTIES, "Get", dock.INTERFACE, name, signature="ss")
 
 
-def of_entry(caller: Stranger, path: str, name: str) -> Any:
+def of_entry(on_session: Stranger, path: str, name: str) -> Any:
     """A property of one of the dock's entries."""
-    return caller.call(dock.INTERFACE, path, PROPERTIES, "Get", dock.ENTRY, name, signature="ss")
+    return on_session.call(dock.INTERFACE, path, PROPERTIES, "Get", dock.ENTRY, name, signature="ss")
 
 
-def told(terminal: Terminal, after: int) -> list[tuple[Any, ...]]:
+def signals(terminal: Terminal, after: int) -> list[tuple[Any, ...]]:
     """Members and arguments of the signals since a mark."""
     return [(event.member, *event.args) for event in terminal.events.all(kind="signal", after=after)]
 
 
-def test_a_dock_has_no_entries_at_first(caller: Stranger) -> None:
-    assert of_dock(caller, "Entries") == []
+def test_a_dock_has_no_entries_at_first(on_session: Stranger) -> None:
+    assert of_dock(on_session, "Entries") == []
 
 
-def test_an_open_application_is_an_entry_of_its_own(terminal: Terminal, caller: Stranger) -> None:
+def test_an_open_application_is_an_entry_of_its_own(terminal: Terminal, on_session: Stranger) -> None:
     path = terminal.dock.open_app("editor", "编辑器", docked=True, windows=2)
 
-    assert of_dock(caller, "Entries") == [path]
-    properties = {name: of_entry(caller, path, name) for name in ("Id", "Name", "IsDocked")}
+    assert of_dock(on_session, "Entries") == [path]
+    properties = {name: of_entry(on_session, path, name) for name in ("Id", "Name", "IsDocked")}
     assert properties == {"Id": "editor", "Name": "编辑器", "IsDocked": True}
-    assert len(of_entry(caller, path, "WindowInfos")) == 2
+    assert len(of_entry(on_session, path, "WindowInfos")) == 2
 
 
-def test_entries_are_told_of_with_their_place_and_keep_their_order(
-    terminal: Terminal, caller: Stranger
+def test_entries_are_announced_with_their_place_and_keep_their_order(
+    terminal: Terminal, on_session: Stranger
 ) -> None:
     mark = terminal.events.mark()
 
     paths = [terminal.dock.open_app(app, app) for app in ("a", "b", "c")]
     terminal.dock.close_app("b")
 
-    assert told(terminal, mark) == [
+    assert signals(terminal, mark) == [
         ("EntryAdded", paths[0], 0),
         ("EntryAdded", paths[1], 1),
         ("EntryAdded", paths[2], 2),
         ("EntryRemoved", "b"),
     ]
-    assert of_dock(caller, "Entries") == [paths[0], paths[2]]
+    assert of_dock(on_session, "Entries") == [paths[0], paths[2]]
 
 
 def test_an_entry_that_has_gone_is_no_object_but_asking_for_it_no_mistake(
-    terminal: Terminal, caller: Stranger
+    terminal: Terminal, on_session: Stranger
 ) -> None:
     path = terminal.dock.open_app("editor", "Editor")
     terminal.dock.close_app("editor")
 
     with pytest.raises(dbus.DBusException) as raised:
-        of_entry(caller, path, "Id")
+        of_entry(on_session, path, "Id")
 
     assert raised.value.get_dbus_name() == "org.freedesktop.DBus.Error.UnknownObject"
     assert terminal.violations() == []
@@ -94,8 +86,8 @@ def test_an_entry_that_has_gone_is_no_object_but_asking_for_it_no_mistake(
     ],
     ids=str,
 )
-def test_a_change_is_told_in_the_ways_that_the_dock_knows(
-    terminal: Terminal, caller: Stranger, announces: Sequence[Announcement], members: list[str]
+def test_a_change_is_announced_in_the_ways_that_the_dock_knows(
+    terminal: Terminal, on_session: Stranger, announces: Sequence[Announcement], members: list[str]
 ) -> None:
     path = terminal.dock.open_app("editor", "Editor")
     terminal.dock.announces = tuple(announces)
@@ -103,8 +95,8 @@ def test_a_change_is_told_in_the_ways_that_the_dock_knows(
 
     terminal.dock.set_windows("editor", 3)
 
-    assert [member for member, *_ in told(terminal, mark)] == members
-    assert len(of_entry(caller, path, "WindowInfos")) == 3
+    assert [member for member, *_ in signals(terminal, mark)] == members
+    assert len(of_entry(on_session, path, "WindowInfos")) == 3
 
 
 def test_invalidated_names_come_without_values(terminal: Terminal) -> None:
@@ -114,28 +106,28 @@ def test_invalidated_names_come_without_values(terminal: Terminal) -> None:
 
     terminal.dock.rename("editor", "Text")
 
-    assert told(terminal, mark) == [("PropertiesChanged", dock.ENTRY, {}, ["Name"])]
+    assert signals(terminal, mark) == [("PropertiesChanged", dock.ENTRY, {}, ["Name"])]
 
 
-def test_a_name_is_told_by_the_entrys_own_signal(terminal: Terminal) -> None:
+def test_a_name_is_announced_by_the_entrys_own_signal(terminal: Terminal) -> None:
     terminal.dock.open_app("editor", "Editor")
     terminal.dock.announces = ("signal",)
     mark = terminal.events.mark()
 
     terminal.dock.rename("editor", "Text")
 
-    assert told(terminal, mark) == [("NameChanged", "Text")]
+    assert signals(terminal, mark) == [("NameChanged", "Text")]
 
 
-def test_being_kept_on_the_dock_has_no_signal_of_its_own(terminal: Terminal, caller: Stranger) -> None:
+def test_being_kept_on_the_dock_has_no_signal_of_its_own(terminal: Terminal, on_session: Stranger) -> None:
     path = terminal.dock.open_app("editor", "Editor")
     terminal.dock.announces = ("signal",)
     mark = terminal.events.mark()
 
     terminal.dock.pin("editor")
 
-    assert told(terminal, mark) == []
-    assert of_entry(caller, path, "IsDocked") is True
+    assert signals(terminal, mark) == []
+    assert of_entry(on_session, path, "IsDocked") is True
 
 
 @pytest.mark.parametrize("window_type", dock.WINDOW_TYPES)
@@ -153,13 +145,13 @@ def test_windows_are_of_the_type_that_the_dock_knows(terminal: Terminal, window_
     assert [len(signal.args[0]) for signal in signals] == [2, 0]
 
 
-def test_other_windows_are_other_identifiers(terminal: Terminal, caller: Stranger) -> None:
+def test_other_windows_are_other_identifiers(terminal: Terminal, on_session: Stranger) -> None:
     path = terminal.dock.open_app("editor", "Editor", windows=2)
-    before = of_entry(caller, path, "WindowInfos")
+    before = of_entry(on_session, path, "WindowInfos")
 
     terminal.dock.set_windows("editor", 2)
 
-    assert set(before).isdisjoint(of_entry(caller, path, "WindowInfos"))
+    assert set(before).isdisjoint(of_entry(on_session, path, "WindowInfos"))
 
 
 def test_what_happens_on_an_absent_dock_is_there_when_it_appears() -> None:
@@ -172,20 +164,20 @@ def test_what_happens_on_an_absent_dock_is_there_when_it_appears() -> None:
 
         terminal.dock.appear()
 
-        caller = Stranger(terminal.session_bus)
-        assert (silent, of_dock(caller, "Entries")) == ([], [path])
-        caller.close()
+        client = Stranger(terminal.session_bus)
+        assert (silent, of_dock(client, "Entries")) == ([], [path])
+        client.close()
 
 
-def test_a_launcher_lists_its_items(terminal: Terminal, caller: Stranger) -> None:
+def test_a_launcher_lists_its_items(terminal: Terminal, on_session: Stranger) -> None:
     terminal.launcher.items = [EDITOR]
 
-    items = caller.call(launcher.INTERFACE, launcher.PATH, launcher.INTERFACE, "GetAllItemInfos")
+    items = on_session.call(launcher.INTERFACE, launcher.PATH, launcher.INTERFACE, "GetAllItemInfos")
 
     assert items == [("/usr/share/applications/editor.desktop", "编辑器", "a", "b", 3, 1 << 40)]
 
 
-def test_a_launcher_tells_of_each_change(terminal: Terminal) -> None:
+def test_a_launcher_announces_each_change(terminal: Terminal) -> None:
     newer = LauncherItem(EDITOR.path, "Editor 2")
     mark = terminal.events.mark()
 
@@ -194,7 +186,7 @@ def test_a_launcher_tells_of_each_change(terminal: Terminal) -> None:
     terminal.launcher.remove(newer)
     terminal.launcher.announce("moved", EDITOR, category=7)
 
-    changes = [(action, item[1], category) for _, action, item, category in told(terminal, mark)]
+    changes = [(action, item[1], category) for _, action, item, category in signals(terminal, mark)]
     assert changes == [
         ("created", "编辑器", 0),
         ("update", "Editor 2", 0),

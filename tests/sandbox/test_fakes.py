@@ -1,10 +1,10 @@
-"""The services on the buses: what they record, how they fail, what they hold against a caller."""
+"""The services on the buses: what they record, how they fail, what they hold against a client."""
 
 from __future__ import annotations
 
 import re
 from concurrent.futures import ThreadPoolExecutor
-from typing import Any, Iterator
+from typing import Any
 
 import dbus
 import pytest
@@ -32,25 +32,8 @@ def property_call(bus: Bus, known: tuple[str, ...], member: str, *args: Any) -> 
         client.close()
 
 
-@pytest.fixture
-def caller(terminal: Terminal) -> Iterator[Stranger]:
-    """A client of the system bus."""
-    stranger = Stranger(terminal.system_bus)
-    yield stranger
-    stranger.close()
-
-
-def screensaver_runs(terminal: Terminal) -> Any:
-    """The screen saver's property as any client reads it."""
-    stranger = Stranger(terminal.session_bus)
-    try:
-        return stranger.call(*SCREEN_SAVER, "Get", "com.norix.ScreenSaver", "isRunning", signature="ss")
-    finally:
-        stranger.close()
-
-
-def test_a_call_is_recorded_with_its_exact_signature(terminal: Terminal, caller: Stranger) -> None:
-    caller.call(*DAEMON, "SendUserStatus", 3, "zhang", signature="is")
+def test_a_call_is_recorded_with_its_exact_signature(terminal: Terminal, on_system: Stranger) -> None:
+    on_system.call(*DAEMON, "SendUserStatus", 3, "zhang", signature="is")
 
     call = terminal.events.wait_for(target="daemon", member="SendUserStatus")
     assert (call.source, call.args, call.detail["signature"]) == ("box", (3, "zhang"), "is")
@@ -128,25 +111,25 @@ def test_a_property_may_be_read_and_set_as_its_contract_says(terminal: Terminal)
     assert property_call(terminal.system_bus, IDENTITY, "GetAll", IDENTITY[0]) == {"Enable": False}
 
 
-def test_a_failing_service_answers_with_its_error(terminal: Terminal, caller: Stranger) -> None:
+def test_a_failing_service_answers_with_its_error(terminal: Terminal, on_system: Stranger) -> None:
     terminal.daemon.fault = Fault.fail("com.norix.Error.Broken")
 
     with pytest.raises(dbus.DBusException) as raised:
-        caller.call(*DAEMON, "GetMachineID")
+        on_system.call(*DAEMON, "GetMachineID")
 
     assert raised.value.get_dbus_name() == "com.norix.Error.Broken"
 
 
-def test_a_fault_of_one_member_spares_the_others(terminal: Terminal, caller: Stranger) -> None:
+def test_a_fault_of_one_member_spares_the_others(terminal: Terminal, on_system: Stranger) -> None:
     terminal.daemon.faults["GetServerIP"] = Fault.fail()
 
-    assert caller.call(*DAEMON, "GetMachineID") == "box-machine-0001"
+    assert on_system.call(*DAEMON, "GetMachineID") == "box-machine-0001"
 
 
-def test_a_held_call_is_answered_on_release(terminal: Terminal, caller: Stranger) -> None:
+def test_a_held_call_is_answered_on_release(terminal: Terminal, on_system: Stranger) -> None:
     terminal.daemon.fault = Fault.hold()
     with ThreadPoolExecutor() as pool:
-        answer = pool.submit(caller.call, *DAEMON, "GetMachineID")
+        answer = pool.submit(on_system.call, *DAEMON, "GetMachineID")
         terminal.events.wait_for(target="daemon", member="GetMachineID")
         held = not answer.done()
         terminal.daemon.release()
@@ -154,10 +137,10 @@ def test_a_held_call_is_answered_on_release(terminal: Terminal, caller: Stranger
     assert (held, answer.result()) == (True, "box-machine-0001")
 
 
-def test_a_hanging_call_ends_with_the_service(terminal: Terminal, caller: Stranger) -> None:
+def test_a_hanging_call_ends_with_the_service(terminal: Terminal, on_system: Stranger) -> None:
     terminal.daemon.fault = Fault.hang()
     with ThreadPoolExecutor() as pool:
-        answer = pool.submit(caller.call, *DAEMON, "GetMachineID")
+        answer = pool.submit(on_system.call, *DAEMON, "GetMachineID")
         terminal.events.wait_for(target="daemon", member="GetMachineID")
         terminal.daemon.leave()
 
@@ -182,7 +165,8 @@ def test_a_restarted_bus_has_lost_its_services(terminal: Terminal) -> None:
 def test_a_property_may_have_a_wrong_type(terminal: Terminal) -> None:
     terminal.screensaver.set("isRunning", "yes", signature="s")
 
-    assert screensaver_runs(terminal) == "yes"
+    running = property_call(terminal.session_bus, SCREEN_SAVER, "Get", SCREEN_SAVER[0], "isRunning")
+    assert running == "yes"
 
 
 def test_an_absent_service_has_no_owner() -> None:

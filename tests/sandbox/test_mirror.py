@@ -41,7 +41,7 @@ class FakeDesktop(dbus.service.Object):
 
     @dbus.service.method(_NAME, in_signature="", out_signature="as")
     def GetCapabilities(self) -> Any:
-        """As told."""
+        """As set."""
         return self._capabilities
 
     @dbus.service.method(_NAME, in_signature="susssasa{sv}i", out_signature="u")
@@ -128,7 +128,7 @@ def test_a_session_bus_without_the_service_is_one_line(session_bus: str) -> None
     assert ended.stderr.endswith("the box goes on without your desktop\n") and ended.stderr.count("\n") == 1
 
 
-def test_a_person_without_a_session_bus_is_told_in_one_line(tmp_path: Path) -> None:
+def test_a_missing_session_bus_is_one_line(tmp_path: Path) -> None:
     ended = _relay(f"unix:path={tmp_path}/nothing")
 
     assert ended.returncode == 0

@@ -1,4 +1,4 @@
-"""The network of a box is as its description says, and nobody in the box can change it."""
+"""The network of a box is as its description says, and programs in the box cannot change it."""
 
 from __future__ import annotations
 

@@ -7,13 +7,9 @@ import subprocess
 import pytest
 
 from sandbox.machine.packages import desktop_file
-from sandbox.prompt import commands
-from sandbox.prompt.context import CommandRefused
 from sandbox.prompt.registry import run_line
 from sandbox.terminal import Terminal
 from tests.sandbox.recorded_context import RecordedContext
-
-assert commands, "importing the module makes its commands known"
 
 
 @pytest.fixture
@@ -42,7 +38,7 @@ def installed() -> dict[str, str]:
     ],
     ids=str,
 )
-def test_packages_and_launcher_are_as_told(
+def test_packages_and_launcher_follow_the_commands(
     context: RecordedContext, lines: list[str], versions: dict[str, str], actions: list[str]
 ) -> None:
     for line in lines:
@@ -76,15 +72,22 @@ def test_what_the_agent_reports_has_a_meaning(context: RecordedContext) -> None:
     run_line(context, "install editor 2.1")
     context.terminal.events.wait_for(kind="reply", target="daemon", count=2)
 
-    for meaning in ("an application was installed", "what was installed or updated", "all software of the"):
+    for meaning in (
+        "an application was installed",
+        "which software was installed or updated",
+        "all software of the",
+    ):
         assert context.lines_with(meaning), meaning
 
 
 @pytest.mark.parametrize(
     ("line", "reason"),
     [
-        ("install editor 3", "editor is installed already; a new version comes with: update editor VERSION"),
-        ("update mail 1", "mail is not installed; do it with: install mail VERSION"),
+        (
+            "install editor 3",
+            "editor is installed already; install a new version with: update editor VERSION",
+        ),
+        ("update mail 1", "mail is not installed; install it with: install mail VERSION"),
         ("uninstall mail", "mail is not installed"),
         ("install Editor 1", "no package can be called 'Editor'"),
         ("install mail", "usage: install PACKAGE VERSION"),
@@ -94,10 +97,6 @@ def test_what_cannot_be_done_is_refused_with_a_reason(
     context: RecordedContext, line: str, reason: str
 ) -> None:
     run_line(context, "install editor 2.1")
-    mark = context.terminal.events.mark()
 
-    with pytest.raises(CommandRefused) as refused:
-        run_line(context, line)
-
-    assert reason in str(refused.value)
-    assert installed() == {"editor": "2.1"} and not context.terminal.events.all(after=mark)
+    assert reason in context.refusal(line)
+    assert installed() == {"editor": "2.1"}

@@ -1,4 +1,4 @@
-"""A day in a few minutes tells what was lost and what grew, and its status whether anything did."""
+"""A day in a few minutes names what was lost and what grew; its status says whether anything did."""
 
 from __future__ import annotations
 
@@ -6,13 +6,17 @@ import os
 import re
 from dataclasses import replace
 from pathlib import Path
-from random import Random
+from typing import Iterator
 
 import pytest
+from hypothesis.stateful import RuleBasedStateMachine
 
 from sandbox.agent import default_binary
-from sandbox.soak.activities import Activities
-from sandbox.soak.accounting import FORWARDED, KINDS, RECEIPTS, Accounting
+from sandbox.box.host import CannotRun
+from sandbox.soak.accounting import FORWARDED, KINDS, MESSAGES, RECEIPTS, Accounting
+from sandbox.soak.activity import activity
+from sandbox.soak.search import shortest_history
+from sandbox.soak.session import Lost, Session
 from sandbox.soak.usage import Usage, growth, usage
 from sandbox.terminal import Terminal
 from tests.sandbox.programs import run_program, talking_agent
@@ -50,6 +54,7 @@ def test_what_arrives_without_being_sent_fails_the_day_and_is_named(tmp_path: Pa
     assert ended.returncode == 1
     named = r"""^policies forwarded: \d+ sent, \d+ arrived; 1 too many, such as \('{"type":5}',\)$"""
     assert re.search(named, ended.stdout, re.MULTILINE), ended.stdout
+    assert "the shortest that failed: ./dev soak --replay ''\n" in ended.stdout
     assert ended.stdout.endswith("soak: something was lost or grew\n")
 
 
@@ -62,17 +67,65 @@ def test_memory_beyond_the_allowance_fails_the_day_and_is_named() -> None:
     )
 
 
-def test_what_is_lost_on_the_way_is_named(terminal: Terminal) -> None:
-    accounting = Accounting(terminal.events)
-    activities = Activities(terminal, accounting, Random(1))
-    activities.log_in()
-    terminal.policy_service.leave()
-    activities.push_forwarded_policies()
+@pytest.fixture
+def session() -> Iterator[Session]:
+    """A session that begins, in a terminal of its own."""
+    begun = Session()
+    begun.log_in()
+    yield begun
+    begun.teardown()
 
-    sent = accounting.sent(FORWARDED)
-    assert sent > 0
-    (lost,) = [line for line in accounting.differences() if line.startswith(FORWARDED)]
-    assert lost.startswith(f'{FORWARDED}: {sent} sent, 0 arrived; {sent} missing, such as (\'{{"type": ')
+
+def test_what_is_lost_on_the_way_is_named(session: Session) -> None:
+    session.terminal.policy_service.leave()
+    session.accounting.patience = 0
+    session.push_forwarded(count=3)
+
+    with pytest.raises(Lost) as lost:
+        session.nothing_is_lost()
+    assert str(lost.value).startswith(f'{FORWARDED}: 3 sent, 0 arrived; 3 missing, such as (\'{{"type": ')
+
+
+def test_messages_may_wait_for_the_user_and_the_platform(session: Session) -> None:
+    session.replay(["go_away", "post_messages:2", "wait:10", "come_back", "stop_platform", "wait:10"])
+    assert session.accounting.arrived(MESSAGES) == 0
+
+    session.replay(["start_platform", "wait:10"])
+    assert session.accounting.arrived(MESSAGES) == session.accounting.arrived(RECEIPTS) == 2
+
+
+class Shelf(RuleBasedStateMachine):
+    """Loses something when one of two things is taken down again."""
+
+    def __init__(self) -> None:
+        super().__init__()
+        self.history: list[str] = []
+        self.model: set[str] = set()
+
+    @activity(name=lambda model: [name for name in ("book", "clock", "vase") if name not in model])
+    def put(self, name: str) -> None:
+        self.model.add(name)
+
+    @activity(name=lambda model: sorted(model))
+    def take(self, name: str) -> None:
+        if len(self.model) == 2:
+            raise Lost(name)
+        self.model.remove(name)
+
+
+def test_a_failing_history_is_shortened() -> None:
+    assert shortest_history(1, Shelf) == ["put:book", "put:clock", "take:book"]
+
+
+def test_where_nothing_fails_there_is_no_shortest_history() -> None:
+    assert shortest_history(1, seconds=2) is None
+
+
+@pytest.mark.parametrize("step", ["dance", "come_back", "wait:3", "wait", "go_away:1"])
+def test_step_that_cannot_be_replayed_is_named(session: Session, step: str) -> None:
+    with pytest.raises(CannotRun) as refused:
+        session.replay(["wait:1", step])
+    assert str(refused.value) == f"'{step}' is not possible after: wait:1"
 
 
 def test_another_piece_than_the_one_that_was_sent_counts_as_lost(terminal: Terminal) -> None:
@@ -112,7 +165,7 @@ def test_descriptors_that_are_given_back_later_have_grown_all_the_same() -> None
     ]
 
 
-def test_vitals_are_those_of_the_process() -> None:
+def test_usage_is_that_of_the_process() -> None:
     before = usage(os.getpid())
     opened = [os.open("/dev/null", os.O_RDONLY) for _ in range(3)]
     held = bytearray(os.urandom(4 << 20))

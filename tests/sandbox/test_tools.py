@@ -27,7 +27,7 @@ def run(*argv: str, **environment: str) -> subprocess.CompletedProcess[bytes]:
     "answer", [Answer(3, b"\xff\xfe"), Answer(0, b""), Answer(-9), Answer(-11, b"half")], ids=str
 )
 @pytest.mark.parametrize("tool", CALLS)
-def test_replaced_tool_answers_as_told(terminal: Terminal, tool: str, answer: Answer) -> None:
+def test_replaced_tool_gives_its_answer(terminal: Terminal, tool: str, answer: Answer) -> None:
     terminal.tools.answer(tool, answer)
 
     ended = run(*CALLS[tool])

@@ -19,7 +19,6 @@ import ssl
 import sys
 import threading
 import warnings
-from itertools import count
 from pathlib import Path
 
 from cryptography.hazmat.primitives import serialization
@@ -27,31 +26,13 @@ from cryptography.hazmat.primitives import serialization
 sys.path.insert(0, str(Path(__file__).resolve().parents[2]))
 
 from sandbox.platform.certificates import Authority, CertificateFiles, write_secret  # noqa: E402
-from tests.support.https_scripts import Conversation, Over, answer  # noqa: E402
+from sandbox.platform.https import Conversation, Listener, Request, server_context  # noqa: E402
+from tests.support.https_scripts import answer  # noqa: E402
 
 _HOST = "127.0.0.1"
-_LISTEN_BACKLOG = 64
+_REPORTED_BODY = 16 * 1024  # bytes; the reader of the reports may be waiting for the answer just now
 
 _print_lock = threading.Lock()
-_handshakes = count(1)
-
-
-def _converse(raw: socket.socket, context: ssl.SSLContext) -> None:
-    try:
-        with context.wrap_socket(raw, server_side=True) as tls:
-            conversation = Conversation(tls, next(_handshakes))
-            while request := conversation.read_request():
-                _print_json(conversation.describe(request))
-                answer(conversation, request)
-    except (OSError, Over):
-        pass  # refused certificates and clients that leave are what the scripts are for
-
-
-def _serve(listener: socket.socket, context: ssl.SSLContext) -> None:
-    while True:
-        raw, _ = listener.accept()
-        raw.setsockopt(socket.IPPROTO_TCP, socket.TCP_NODELAY, 1)
-        threading.Thread(target=_converse, args=(raw, context), daemon=True).start()
 
 
 def _print_json(value: object) -> None:
@@ -59,24 +40,28 @@ def _print_json(value: object) -> None:
         print(json.dumps(value), flush=True)
 
 
-def _context(identity: CertificateFiles, clients: Authority, demand: ssl.VerifyMode) -> ssl.SSLContext:
-    context = ssl.SSLContext(ssl.PROTOCOL_TLS_SERVER)
-    context.load_cert_chain(identity.certificate, identity.key)
-    context.load_verify_locations(clients.certificate)
-    context.verify_mode = demand
-    # HTTP/2 is offered first and never spoken: a client that accepts it gets nowhere.
-    context.set_alpn_protocols(["h2", "http/1.1"])
-    return context
+def _report_and_answer(conversation: Conversation, request: Request) -> None:
+    _print_json(
+        {
+            "line": request.line,
+            "headers": request.headers.items(),
+            "body": request.body[:_REPORTED_BODY].decode(errors="backslashreplace"),
+            "handshake": conversation.handshake,
+            "resumed": conversation.tls.session_reused,
+            "tls": conversation.tls.version(),
+            "protocol": conversation.tls.selected_alpn_protocol(),
+            "client": conversation.client,
+        }
+    )
+    answer(conversation, request)
 
 
-def _older_context(identity: CertificateFiles, clients: Authority) -> ssl.SSLContext:
-    context = _context(identity, clients, ssl.CERT_REQUIRED)
+def _older(context: ssl.SSLContext) -> ssl.SSLContext:
     context.maximum_version = ssl.TLSVersion.TLSv1_2
     return context
 
 
-def _outdated_context(identity: CertificateFiles, clients: Authority) -> ssl.SSLContext:
-    context = _context(identity, clients, ssl.CERT_OPTIONAL)
+def _outdated(context: ssl.SSLContext) -> ssl.SSLContext:
     with warnings.catch_warnings():
         warnings.simplefilter("ignore", DeprecationWarning)
         context.minimum_version = context.maximum_version = ssl.TLSVersion.TLSv1_1
@@ -84,19 +69,23 @@ def _outdated_context(identity: CertificateFiles, clients: Authority) -> ssl.SSL
     return context
 
 
-def _doors(
-    platform: Authority, stranger: Authority, proper: CertificateFiles
-) -> dict[str, ssl.SSLContext | None]:
-    """The doors' names and TLS sides; None: nothing is ever said there."""
+def _doors(platform: Authority, stranger: Authority, proper: CertificateFiles) -> dict[str, ssl.SSLContext]:
+    """The TLS side of each door on which anything is ever said."""
+
+    def context(identity: CertificateFiles, demand: ssl.VerifyMode = ssl.CERT_OPTIONAL) -> ssl.SSLContext:
+        made = server_context(identity, platform.certificate, demand)
+        # HTTP/2 is offered first and never spoken: a client that accepts it gets nowhere.
+        made.set_alpn_protocols(["h2", "http/1.1"])
+        return made
+
     return {
-        "proper": _context(proper, platform, ssl.CERT_OPTIONAL),
-        "demanding": _context(proper, platform, ssl.CERT_REQUIRED),
-        "demanding older": _older_context(proper, platform),
-        "stranger": _context(stranger.issue_server(_HOST), platform, ssl.CERT_OPTIONAL),
-        "misnamed": _context(platform.issue_server("elsewhere.invalid"), platform, ssl.CERT_OPTIONAL),
-        "expired": _context(platform.issue_server(_HOST, expired=True), platform, ssl.CERT_OPTIONAL),
-        "outdated": _outdated_context(proper, platform),
-        "silent": None,
+        "proper": context(proper),
+        "demanding": context(proper, ssl.CERT_REQUIRED),
+        "demanding older": _older(context(proper, ssl.CERT_REQUIRED)),
+        "stranger": context(stranger.issue_server(_HOST)),
+        "misnamed": context(platform.issue_server("elsewhere.invalid")),
+        "expired": context(platform.issue_server(_HOST, expired=True)),
+        "outdated": _outdated(context(proper)),
     }
 
 
@@ -137,15 +126,12 @@ def main() -> None:
     platform, stranger = Authority(folder, "platform"), Authority(folder, "stranger")
     proper = platform.issue_server(_HOST, "localhost")
     doors = _doors(platform, stranger, proper)
-    sockets = {name: socket.create_server((_HOST, 0), backlog=_LISTEN_BACKLOG) for name in doors}
-    for name, context in doors.items():
-        if context:
-            threading.Thread(target=_serve, args=(sockets[name], context), daemon=True).start()
-    # Bound but not listening: connections are refused, and no other program gets the port.
-    sockets["refusing"] = socket.socket()
-    sockets["refusing"].bind((_HOST, 0))
+    ports = {name: Listener((_HOST, 0), doors[name], _report_and_answer).port for name in doors}
+    # Accepts connections and says nothing; and one that refuses them, which no other program gets meanwhile.
+    silent, refusing = socket.create_server((_HOST, 0)), socket.socket()
+    refusing.bind((_HOST, 0))
+    ports |= {"silent": silent.getsockname()[1], "refusing": refusing.getsockname()[1]}
 
-    ports = {name: listener.getsockname()[1] for name, listener in sockets.items()}
     _print_json({"ports": ports, "files": _files(platform, stranger, proper)})
     sys.stdin.buffer.read()
 

@@ -1,11 +1,11 @@
-"""The scenes of the tour. A further scene is one more entry of SCENES."""
+"""The scenes of the tour; to add one, extend SCENES."""
 
 from __future__ import annotations
 
 from sandbox.demo.scene import Scene
 from sandbox.demo.scenes import applications, domain_exit, messages, policies, session, software
 
-# The first one starts the agent; any of the others can be left out.
+# The first scene starts the agent; all others are optional.
 SCENES: tuple[Scene, ...] = (
     session.BEGIN,
     messages.PASSWORD_EXPIRES,

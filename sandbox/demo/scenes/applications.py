@@ -1,4 +1,4 @@
-"""What the agent tells of the user's applications."""
+"""The agent reports the user's applications."""
 
 from __future__ import annotations
 
@@ -17,7 +17,7 @@ def _on_dock(change: Callable[[Dock], object], then: Expectation) -> Step:
     return Step(lambda terminal: change(terminal.dock), (then,))
 
 
-def _told(state: int, name: str, words: str) -> Expectation:
+def _reported(state: int, name: str, words: str) -> Expectation:
     return from_agent(f"state {state}, “{name}”: {words}", "daemon", "sendAppOpenState", state, name)
 
 
@@ -32,14 +32,16 @@ def _keep_browser(terminal: Terminal) -> None:
 
 APPLICATIONS = Scene(
     "Applications open and close",
-    "The agent follows the desktop's dock. The browser, which the user keeps there, is told of when it gets "
-    "its first window, the editor when it comes to the dock.",
+    "The agent watches the desktop's dock. It reports the browser, which the user keeps there, when its "
+    "first window opens, and the editor when it appears on the dock.",
     (
-        _on_dock(lambda dock: dock.open_app("editor", _EDITOR), _told(_OPENED, _EDITOR, "opened")),
-        _on_dock(lambda dock: dock.set_windows("browser", 1), _told(_OPENED, _BROWSER, "opened")),
-        _on_dock(lambda dock: dock.set_windows("browser", 2), _told(_OPENED, _BROWSER, "a further window")),
-        _on_dock(_close_renamed, _told(_CLOSED, _EDITOR_WITH_FILE, "closed under its last name")),
-        _on_dock(lambda dock: dock.set_windows("browser", 0), _told(_CLOSED, _BROWSER, "closed")),
+        _on_dock(lambda dock: dock.open_app("editor", _EDITOR), _reported(_OPENED, _EDITOR, "opened")),
+        _on_dock(lambda dock: dock.set_windows("browser", 1), _reported(_OPENED, _BROWSER, "opened")),
+        _on_dock(
+            lambda dock: dock.set_windows("browser", 2), _reported(_OPENED, _BROWSER, "a further window")
+        ),
+        _on_dock(_close_renamed, _reported(_CLOSED, _EDITOR_WITH_FILE, "closed under its last name")),
+        _on_dock(lambda dock: dock.set_windows("browser", 0), _reported(_CLOSED, _BROWSER, "closed")),
     ),
     beforehand=_keep_browser,
 )

@@ -1,4 +1,4 @@
-"""What the agent does when the terminal leaves the domain."""
+"""The terminal leaves the domain."""
 
 from __future__ import annotations
 
@@ -7,7 +7,7 @@ from sandbox.demo.switches import FILE, look_at_switches
 from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
 
-# It tries to read: what waits for an input that never ends would keep the agent from the reboot.
+# Reads its standard input: if the agent left it open, the script would hang and delay the reboot.
 _RESTORE_SCRIPT = """#!/bin/bash
 read -r line && exec restore_config "read: $line"
 exec restore_config "(standard input is at its end)"
@@ -32,7 +32,7 @@ _UNDONE = (
         "(standard input is at its end)",
     ),
     from_agent("the policy service is stopped", "systemctl", "systemctl", "--global", "stop", "prys"),
-    from_agent("the daemon is told", "daemon", "onDomainConfig", "remove"),
+    from_agent("the report to the daemon", "daemon", "onDomainConfig", "remove"),
     from_agent("the identity service is off", "identity", "Set", ..., "Enable", False),
 )
 
@@ -45,12 +45,12 @@ _SWITCHES = (
 
 DOMAIN_EXIT = Scene(
     "The terminal leaves the domain",
-    "A warning; then everything that the domain had changed is undone; after the minute, the reboot.",
-    # What there is to see comes before the reboot, since nobody sees anything after it.
+    "The agent warns, undoes everything that the domain had changed, and reboots after a minute.",
+    # The reboot comes last: the timeline ends with it.
     (
         Step(_remove_from_domain, _UNDONE),
         Step(look_at_switches, _SWITCHES),
         Step(None, (REBOOT, NO_LOGOUT)),
     ),
-    f"The desktop's switches stand in the user's file ~/{FILE}. {NOT_REALLY}",
+    f"The desktop's switches are in the user's file ~/{FILE}. {NOT_REALLY}",
 )

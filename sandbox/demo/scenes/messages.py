@@ -1,4 +1,4 @@
-"""What the platform has for the user."""
+"""The platform's messages for the user."""
 
 from __future__ import annotations
 
@@ -41,16 +41,16 @@ _ALL_READ = tuple(
 
 PASSWORD_EXPIRES = Scene(
     "The password is about to expire",
-    "So the platform answered at the start; a minute later the user is told.",
+    "The platform said so at the start; a minute later the agent notifies the user.",
     (Step(None, (notice(_TIP, within=_NOTICE_DELAY),)),),
     beforehand=_warn_of_password,
 )
 
 WAITING = Scene(
     "Messages wait on the platform",
-    "One or two minutes after the start the agent asks for messages; each is marked read and shown before "
-    "the next one is asked for.",
+    "One or two minutes after the start the agent requests messages. It marks each one read and shows it "
+    "before it requests the next one.",
     (Step(None, _ONE_AFTER_THE_OTHER, in_order=True), Step(_look_at_inbox, _ALL_READ)),
-    "From now on it asks every one to three minutes.",
+    "From now on it polls every one to three minutes.",
     beforehand=_post_messages,
 )

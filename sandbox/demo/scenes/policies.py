@@ -1,4 +1,4 @@
-"""What becomes of the policies that the daemon pushes."""
+"""The policies that the daemon pushes."""
 
 from __future__ import annotations
 
@@ -22,7 +22,7 @@ from sandbox.machine.users import DOMAIN_USER as USER
 from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
 
-_SOMEBODY_ELSE = USER.uid + 1
+_OTHER_UID = USER.uid + 1
 _POLICY = '{"type":2101,"payload":{"wallpaper":"/usr/share/backgrounds/校园.jpg"}}'
 
 
@@ -39,20 +39,20 @@ def _stranger_pushes(terminal: Terminal) -> None:
     stranger = Stranger(terminal.system_bus)
     terminal.events.record("stranger", "*", "signal", "pushPolicyMsg", args)
     stranger.emit("/com/norix/velk/velkg", daemon.INTERFACE, "pushPolicyMsg", *args, signature="ss")
-    # The bus answers once it has passed on what came before.
+    # The bus replies after it has delivered the signal.
     stranger.call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", "GetId")
     stranger.close()
 
 
 FORWARDED = Scene(
     "A policy for the policy service",
-    "Policies that do not concern the session itself are passed on, letter for letter.",
+    "The agent forwards other policies to the policy service, unchanged.",
     (_push(_POLICY, from_agent("the same text", "policy_service", "onPolicyMsg", _POLICY), NOTHING_SHOWN),),
 )
 
 NOTICES = Scene(
     "Shutdown and reboot notices",
-    "The user is told; shutting down is somebody else's work.",
+    "The agent notifies the user; another program does the shutdown.",
     (
         _push({"type": 1300}, _notice_of(1300), NOTHING_FORWARDED),
         _push({"type": 1301}, _notice_of(1301), NOTHING_FORWARDED),
@@ -61,15 +61,15 @@ NOTICES = Scene(
 
 PASSWORD = Scene(
     "New password rules",
-    "The user, who belongs to the domain, is asked to change the password.",
+    "The agent asks a domain user to change the password.",
     (_push({"type": 1304}, _notice_of(1304), NOTHING_FORWARDED),),
 )
 
 ACCOUNT_DISABLED = Scene(
     "An account is disabled",
-    f"First another user's (uid {_SOMEBODY_ELSE}), which is no concern of this session; then this user's.",
+    f"First another user's (uid {_OTHER_UID}), which does not affect this session; then this user's.",
     (
-        _push({"type": 1203, "payload": {"uid": _SOMEBODY_ELSE}}, NOTHING_SHOWN, NOTHING_FORWARDED),
+        _push({"type": 1203, "payload": {"uid": _OTHER_UID}}, NOTHING_SHOWN, NOTHING_FORWARDED),
         _push(
             {"type": 1203, "payload": {"uid": USER.uid}},
             _notice_of(1203),
@@ -83,13 +83,13 @@ ACCOUNT_DISABLED = Scene(
 
 TERMINAL_DISABLED = Scene(
     "The terminal is disabled",
-    "A warning, a minute to save one's work, then the forced log-out.",
+    "A warning, a minute to save all work, then the forced log-out.",
     (_push({"type": 1201}, _notice_of(1201), LOGOUT, NO_REBOOT),),
     NOT_REALLY,
 )
 
 STRANGER = Scene(
-    "A stranger gives orders",
-    "Only the daemon is listened to: the same signal from any other program does nothing.",
+    "A stranger pushes a policy",
+    "The agent obeys only the daemon; it ignores the same signal from any other program.",
     (Step(_stranger_pushes, (NOTHING_SHOWN, NOTHING_FORWARDED)),),
 )

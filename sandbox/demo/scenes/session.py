@@ -1,4 +1,4 @@
-"""What the agent reports of the session."""
+"""The agent reports the session."""
 
 from __future__ import annotations
 
@@ -10,7 +10,7 @@ from sandbox.terminal import Terminal
 _MESSAGE = ("打印机", "三楼打印机已修好")
 
 _IDENTITY = from_agent("the user's name and uid", "daemon", "UpdateUserInfo", USER.plain_name, USER.uid)
-_PASSWORD_CHECK = from_agent("a question about the password", "platform", "tips")
+_PASSWORD_CHECK = from_agent("a request for the password tips", "platform", "tips")
 
 
 def _status(code: int, words: str, within: int = 0) -> Expectation:
@@ -39,19 +39,19 @@ def _restart_daemon(terminal: Terminal) -> None:
 
 BEGIN = Scene(
     "The session begins",
-    "The agent tells the daemon whose session this is, and that the user is active; it asks the platform "
-    "about the user's password.",
+    "The agent reports the user and the state of the session to the daemon, and asks the platform about the "
+    "user's password.",
     (Step(_start, (_IDENTITY, _status(1, "active"), _PASSWORD_CHECK)),),
     beforehand=lambda terminal: terminal.daemon.uploads_to(terminal.platform),
 )
 
 STATES = Scene(
     "Locked, behind the screen saver, active again",
-    "Every five minutes the agent looks at the screen and reports what it finds. The platform's messages "
-    "wait until somebody is there.",
+    "Every five minutes the agent reports the state of the screen. The platform's messages wait until the "
+    "session is active again.",
     (
         Step(lambda terminal: terminal.session_manager.lock(), (_status(2, "locked", STATE_REPORT),)),
-        # Longer than any poll interval, and locked all the time.
+        # The session is inactive for longer than any poll interval.
         Step(_walk_away, (_status(3, "screen saver", STATE_REPORT), NOTHING_ASKED)),
         Step(
             _unlock,
@@ -62,6 +62,6 @@ STATES = Scene(
 
 DAEMON_RESTART = Scene(
     "The daemon restarts",
-    "A fresh daemon knows nobody and asks; the session announces itself again.",
+    "A new daemon knows no sessions and asks for them; the agent reports its session again.",
     (Step(_restart_daemon, (_IDENTITY, _status(1, "active"))),),
 )

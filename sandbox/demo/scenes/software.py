@@ -1,4 +1,4 @@
-"""What the platform learns of the terminal's software."""
+"""The agent reports the terminal's software."""
 
 from __future__ import annotations
 
@@ -59,7 +59,7 @@ def _look_at_platform(terminal: Terminal) -> None:
 
 SOFTWARE = Scene(
     "Software is installed and updated",
-    "The agent asks the package tools what the launcher's application is, and hands the daemon two reports: "
+    "The agent asks the package tools for the application's package, and sends two reports to the daemon: "
     "the change and the whole inventory. The daemon uploads them.",
     (
         Step(_install_editor, _CHANGE_AND_INVENTORY, in_order=True),

@@ -1,4 +1,4 @@
-"""The time that the agent lives by."""
+"""The time that the agent sees."""
 
 from __future__ import annotations
 
@@ -8,8 +8,8 @@ from sandbox.events import Event
 
 
 class AgentTime:
-    """Seconds since the start of the agent, which run `speed` times as fast as real ones; with a speed of 0
-    they only pass when they are moved."""
+    """Seconds since the agent's start, `speed` times as fast as real ones; if `speed` is 0, only `move`
+    advances them."""
 
     def __init__(self, speed: int) -> None:
         self.speed = speed
@@ -17,24 +17,24 @@ class AgentTime:
         self._moves: list[tuple[float, int]] = []
 
     def started(self, event: Event) -> None:
-        """Count from this event."""
+        """Restart the count at this event."""
         self._start = event.time
         self._moves.clear()
 
     def move(self, seconds: int) -> None:
-        """Let so much time have passed as of now."""
+        """Add seconds from now on."""
         self._moves.append((time.monotonic(), seconds))
 
     def of(self, event: Event) -> float:
-        """Agent time of an event, 0 before the agent's start."""
+        """The agent time of an event, 0 before the agent's start."""
         return self.at(event.time)
 
     def now(self) -> float:
-        """Agent time of this moment."""
+        """The current agent time."""
         return self.at(time.monotonic())
 
     def at(self, moment: float) -> float:
-        """Agent time of a moment of the host's monotonic clock."""
+        """The agent time of a moment on the host's monotonic clock."""
         if self._start is None:
             return 0.0
         moved = sum(seconds for when, seconds in self._moves if when <= moment)

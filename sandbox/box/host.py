@@ -1,4 +1,4 @@
-"""The way of a person's command into a box, and of what the box has for the person's own system out of it."""
+"""The host's side of a box: runs a command in it and reads the result that the command sends back."""
 
 from __future__ import annotations
 
@@ -19,16 +19,15 @@ _PYTHON = ("/usr/bin/python3", "-P", "-m", "sandbox")
 Consumer = Callable[[IO[bytes]], object]
 
 
-class Trouble(Exception):
-    """What keeps a person's command from going on, in one line that says what to do."""
+class CannotRun(Exception):
+    """The command cannot run; the message is one line that says what to do."""
 
 
 def positive(text: str) -> int:
-    """A whole number from 1 upwards, for a command line."""
-    number = int(text)
-    if number < 1:
-        raise argparse.ArgumentTypeError(f"{number} is not a number from 1 upwards")
-    return number
+    """Parse a command-line argument that is a whole number from 1 upwards."""
+    if not text.isdecimal() or int(text) < 1:
+        raise argparse.ArgumentTypeError(f"'{text}' is not a whole number of at least 1")
+    return int(text)
 
 
 def enter(
@@ -37,17 +36,17 @@ def enter(
     consumer: Consumer | None = None,
     shown: Mapping[Path, Path] | None = None,
 ) -> int:
-    """Run this program with `arguments` in a box of `user`, which shows these files of the person's at places
-    of its own; the result is its exit status.
+    """Run this program with `arguments` in a box of `user`, with the host's files `shown` at the given
+    places; returns its exit status.
 
-    With a `consumer` the program has a result stream (see `result_stream`), which the consumer reads to its
-    end; without one this process becomes the box and nothing is returned.
+    With a `consumer`, the program has a result stream (see `result_stream`), which the consumer reads to its
+    end. Without one, the box replaces this process and the function does not return.
     """
     try:
         bubblewrap.require()
     except bubblewrap.BoxUnavailable as error:
-        raise Trouble(str(error)) from error
-    # Ctrl+C is for the program in the box: bubblewrap would die of it and take the box along.
+        raise CannotRun(str(error)) from error
+    # Ctrl+C is for the program in the box; it would kill bubblewrap and so the box.
     signal.signal(signal.SIGINT, signal.SIG_IGN)
     sys.stdout.flush()
     env: Mapping[str, str] = {_MARK: "1"} if consumer else {}
@@ -64,10 +63,11 @@ def enter(
 
 
 def result_stream() -> IO[bytes] | None:
-    """Inside: the stream that the consumer outside reads, None where there is no consumer.
+    """In the box: the stream that the host's consumer reads; None without a consumer.
 
-    The box keeps no open file but the three standard ones. With a consumer the first of these two that are
-    written to is the result and the other one the person's; from here on both lead to the person again.
+    A box inherits only the three standard streams. With a consumer, its standard output is the result stream
+    and only its standard error reaches the user's terminal; this function makes both reach the terminal
+    again.
     """
     if not os.environ.pop(_MARK, ""):
         return None

@@ -1,4 +1,4 @@
-"""The notification service of the person's own desktop, outside the box."""
+"""The notification service of the host's desktop."""
 
 from __future__ import annotations
 
@@ -9,28 +9,30 @@ from typing import IO, Any
 
 import dbus
 
-from sandbox.box.outside import Trouble
+from sandbox.box.host import CannotRun
 
 _NAME = "org.freedesktop.Notifications"
 _PATH = "/org/freedesktop/Notifications"
 
 
-class Desktop:
-    """Shows what comes from the box; Trouble when this desktop has no notification service."""
+class HostDesktop:
+    """Shows the box's notifications; raises CannotRun if the desktop has no notification service."""
 
     def __init__(self) -> None:
         try:
             self._service = self._find(dbus.SessionBus(private=True))
             self._reads_markup = "body-markup" in self._service.GetCapabilities()
         except dbus.DBusException as error:
-            raise Trouble(f"cannot reach {_NAME} on your session bus: {error.get_dbus_message()}") from error
+            raise CannotRun(
+                f"cannot reach {_NAME} on your session bus: {error.get_dbus_message()}"
+            ) from error
 
     def relay(self, stream: IO[bytes]) -> None:
         """Show the notifications until the stream ends."""
         failed = False
         for line in stream:
             if failed:
-                continue  # the box must never wait for a reader
+                continue  # read on: the box must never block on a full pipe
             try:
                 self._show(**json.loads(line))
             except dbus.DBusException as error:

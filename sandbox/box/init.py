@@ -1,4 +1,4 @@
-"""The first process inside a box: prepares the file view, starts the buses, runs the command."""
+"""The first process inside a box: prepares network, files and buses, then runs the command."""
 
 from __future__ import annotations
 
@@ -17,8 +17,8 @@ _NOT_RUNNABLE = 127
 
 
 def run(argv: Sequence[str]) -> int:
-    """Run `argv` with the terminal's files and two empty buses; the result is its exit status, 128+n for
-    signal n."""
+    """Run `argv` with the terminal's files and two empty buses; returns its exit status, 128+n for signal
+    n."""
     user = current_user()
     _set_up_network()
     FileView(user).reset()
@@ -37,8 +37,8 @@ def run(argv: Sequence[str]) -> int:
 def _set_up_network() -> None:
     try:
         network.set_up()
-    except network.NetworkTrouble as trouble:
-        print(f"in-box: this box has no network but the loopback: {trouble}", file=sys.stderr)
+    except network.NetworkUnavailable as error:
+        print(f"in-box: this box has no network but the loopback: {error}", file=sys.stderr)
 
 
 def _run_command(argv: Sequence[str]) -> int:
@@ -51,7 +51,7 @@ def _run_command(argv: Sequence[str]) -> int:
     def pass_on(number: int, _frame: FrameType | None) -> None:
         child.send_signal(number)
 
-    # Ctrl+C reaches the whole foreground group by itself; here it must only not end this process first.
+    # Ctrl+C reaches the whole foreground group by itself, and this process must outlive its child.
     signal.signal(signal.SIGINT, lambda number, frame: None)
     signal.signal(signal.SIGTERM, pass_on)
     status = child.wait()
