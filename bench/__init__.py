@@ -1,1 +1,1 @@
-"""What the agent costs, measured in the simulated terminal against floors that do the bare minimum."""
+"""Measures the agent's costs in the simulated terminal, against floors that do the bare minimum."""

@@ -3,15 +3,16 @@
 from __future__ import annotations
 
 import argparse
+import sys
 from pathlib import Path
-from typing import Sequence
 
 from rich.console import Console
 from rich.progress import BarColumn, MofNCompleteColumn, Progress, TaskID, TextColumn, TimeElapsedColumn
 
 from bench import comparison, figures, runner, table
 from bench.figures import Figure, Report
-from bench.runner import GROUPS, Options
+from bench.noise import Noise
+from bench.runner import GROUPS, ON_DEMAND, Options
 from sandbox import REPOSITORY
 from sandbox.ending import exit_with
 
@@ -25,7 +26,7 @@ _QUICK_GROUPS = ("start", "memory", "forwarding", "drain", "dock")
 def _parser() -> argparse.ArgumentParser:
     parser = argparse.ArgumentParser(prog="./dev bench", description="Measure the agent against bare floors.")
     parser.add_argument("figures", nargs="*", metavar="FIGURE", help=f"{', '.join(GROUPS)}; else all")
-    parser.add_argument("--runs", type=int, default=5, help="runs of each figure (default: 5)")
+    parser.add_argument("--runs", type=int, default=5, help="least runs of each figure (default: 5)")
     parser.add_argument("--records", type=int, default=100_000, help="length of the inventory file; 0: none")
     parser.add_argument(
         "--quick", action="store_true", help="only instructions and memory, judged by bench/baseline.json"
@@ -42,11 +43,11 @@ def _report(name: str) -> Report:
     try:
         return figures.load(Path(name))
     except (OSError, ValueError, KeyError, TypeError) as error:
-        raise argparse.ArgumentTypeError(f"{name} is no report of a run ({error})") from error
+        raise argparse.ArgumentTypeError(f"{name} is not a report of a run ({error})") from error
 
 
 def _options(arguments: argparse.Namespace) -> Options:
-    default = _QUICK_GROUPS if arguments.quick else tuple(GROUPS)
+    default = _QUICK_GROUPS if arguments.quick else tuple(group for group in GROUPS if group not in ON_DEMAND)
     return Options(
         arguments.figures or default,
         1 if arguments.quick else arguments.runs,
@@ -62,9 +63,9 @@ def _measure(options: Options, report: Report, path: Path, console: Console) -> 
     with Progress(*columns, console=console) as progress:
         task = progress.add_task("", total=len(options.boxes))
         for group in options.groups:
-            circumstances = {**report.circumstances, group: runner.circumstances(options)}
-            measured, failed = _measure_group(options, group, progress, task)
+            measured, noise, failed = _measure_group(options, group, progress, task)
             failures += failed
+            circumstances = {**report.circumstances, group: runner.circumstances(noise)}
             report = _merged(report, Report(circumstances, measured))
             report.save(path)
     return report, failures
@@ -72,19 +73,21 @@ def _measure(options: Options, report: Report, path: Path, console: Console) -> 
 
 def _measure_group(
     options: Options, group: str, progress: Progress, task: TaskID
-) -> tuple[list[Figure], list[str]]:
-    """The group's figures, and what went wrong."""
+) -> tuple[list[Figure], Noise, list[str]]:
+    """The group's figures, what else the machine did, and what went wrong."""
     measured: list[Figure] = []
+    noise = Noise()
     failures = []
     for user in GROUPS[group]:
         try:
-            measured += runner.measure(
+            found, other = runner.measure(
                 options, group, user, lambda step: progress.update(task, description=step)
             )
+            measured, noise = [*measured, *found], noise + other
         except runner.Failure as failure:
             failures.append(str(failure))
         progress.advance(task)
-    return measured, failures
+    return measured, noise, failures
 
 
 def _merged(known: Report, fresh: Report) -> Report:
@@ -119,27 +122,51 @@ def _steady(report: Report) -> Report:
     return Report(report.circumstances, steady)
 
 
-def main(argv: Sequence[str] | None = None) -> int:
+def _refuse(reason: str) -> int:
+    print(f"bench: {reason}", file=sys.stderr)
+    return 2
+
+
+def main() -> int:
     """Entry point; the status is 0 if all was measured and nothing rose that is judged."""
-    arguments = _parser().parse_args(argv)
+    arguments = _parser().parse_args()
     unknown = set(arguments.figures) - set(GROUPS)
     console = Console(highlight=False)
     if unknown:
-        console.print(f"there is no figure called {', '.join(sorted(unknown))}; see ./dev bench --help")
-        return 2
+        return _refuse(f"there is no figure called {', '.join(sorted(unknown))}; see ./dev bench --help")
     options = _options(arguments)
     path = arguments.json or (_QUICK_REPORT if arguments.quick else _REPORT)
-    report = (
-        figures.load(path) if path.exists() and (arguments.no_measure or not arguments.quick) else Report({})
-    )
+    if arguments.no_measure and not path.exists():
+        return _refuse(f"there are no figures in {path} yet; measure first")
+    report = Report({})
+    if path.exists() and (arguments.no_measure or not arguments.quick):
+        try:
+            report = _report(str(path))
+        except argparse.ArgumentTypeError as error:
+            return _refuse(f"{error}; remove it")
     failures: list[str] = []
     if not arguments.no_measure:
         report, failures = _measure(options, report, path, console)
-    console.print(table.terminal_table(report.figures))
+    _show(report, options, console)
     status = _after(arguments, report, console)
     for failure in failures:
         console.print(f"failed: {failure}")
     return 1 if failures else status
+
+
+def _show(report: Report, options: Options, console: Console) -> None:
+    """The figures, and how far they can be trusted."""
+    console.print(table.terminal_table(report.figures))
+    measured = [figure for figure in report.figures if figure.kind not in comparison.STEADY_KINDS]
+    for line in table.unstable(measured):
+        console.print(line)
+    for group in options.groups:
+        known = report.circumstances.get(group)
+        if known:
+            others, stolen = (f"{known[name]:.0%}" for name in ("others", "stolen"))
+            console.print(
+                f"noise, {group}: other programs used {others} of the processors, the host {stolen}"
+            )
 
 
 def _after(arguments: argparse.Namespace, report: Report, console: Console) -> int:

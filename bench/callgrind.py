@@ -1,4 +1,4 @@
-"""Instruction counts, which other programs on the machine do not change."""
+"""Instruction counts, which do not depend on the machine's other load."""
 
 from __future__ import annotations
 
@@ -14,18 +14,18 @@ _SECONDS = 120.0
 _TOTALS = re.compile(r"^totals: (\d+)", re.MULTILINE)
 
 
-def of_start(program: Program, env: Mapping[str, str] | None = None) -> float:
-    """Instructions of a program, all its threads but no children, from exec until its start ends."""
+def of_start(program: Program) -> float:
+    """A program's instructions from exec to the end of its start, in all threads but no child processes."""
     with tempfile.TemporaryDirectory() as folder:
         out = Path(folder, "out")
-        with Process(_argv(out, program, program.start_ends), env):
+        with Process(_argv(out, program, program.start_ends)):
             return _total(out.with_name("out.1"))
 
 
 def of_work(
     program: Program, work: Callable[[Process], object], env: Mapping[str, str] | None = None
 ) -> float:
-    """Instructions of a program from exec until `work` is done and the program is ended."""
+    """A program's instructions from exec until `work` returns and the program ends."""
     with tempfile.TemporaryDirectory() as folder:
         out = Path(folder, "out")
         with Process(_argv(out, program), env) as process:

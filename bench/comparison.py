@@ -1,4 +1,4 @@
-"""What changed between two runs of the bench."""
+"""The changes between two runs of the bench."""
 
 from __future__ import annotations
 
@@ -7,7 +7,7 @@ from typing import Iterable
 
 from bench.figures import Figure, Kind
 
-# What does not depend on how busy the machine is: CI judges these and no others.
+# Figures of these kinds do not depend on the machine's load: CI judges only them.
 STEADY_KINDS: tuple[Kind, ...] = ("instructions", "memory")
 TOLERATED_RISE = 0.10
 
@@ -21,31 +21,39 @@ class Change:
 
     @property
     def factor(self) -> float | None:
-        """How many times as much as before."""
+        """The figure as a multiple of the earlier one."""
         if self.before is None or self.before.middle == 0:
             return None
         return self.figure.middle / self.before.middle
 
     @property
     def is_judged(self) -> bool:
-        """Whether it is a figure that can be judged."""
+        """Whether CI judges the figure."""
         return self.figure.kind in STEADY_KINDS
 
     @property
     def is_rise(self) -> bool:
-        """Whether the agent costs more than is tolerated, in a figure that can be judged."""
+        """Whether CI judges the figure and it exceeds the tolerated rise. On a machine with
+        other libraries the floor costs more, too: then the ratio says that the agent is not the cause."""
         if self.before is None or not self.is_judged:
             return False
-        return self.figure.middle > self.before.middle * (1 + TOLERATED_RISE)
+        before, now = self.before, self.figure
+        return _has_risen(before.middle, now.middle) and (
+            not before.ratio or not now.ratio or _has_risen(before.ratio, now.ratio)
+        )
+
+
+def _has_risen(before: float, now: float) -> bool:
+    return now > before * (1 + TOLERATED_RISE)
 
 
 def changes(now: Iterable[Figure], before: Iterable[Figure]) -> list[Change]:
-    """The figures of now, each beside the earlier one of its name."""
+    """The current figures, each with the earlier figure of the same name."""
     known = {figure.name: figure for figure in before}
     return [Change(figure, known.get(figure.name)) for figure in now]
 
 
 def missing(now: Iterable[Figure], before: Iterable[Figure]) -> list[str]:
-    """Names of earlier figures that are not among those of now."""
+    """The names of the earlier figures that are not among the current ones."""
     measured = {figure.name for figure in now}
     return [figure.name for figure in before if figure.name not in measured]

@@ -1,4 +1,4 @@
-"""What was measured: values of the agent beside those of a floor, and what they are to reach."""
+"""The figures: the agent's values, those of a floor, and the goals."""
 
 from __future__ import annotations
 
@@ -8,17 +8,20 @@ from pathlib import Path
 from statistics import median
 from typing import Any, Literal, Sequence
 
+from bench.stability import uncertainty
+
 Kind = Literal["time", "rate", "instructions", "memory", "count"]
 
 
 @dataclass(frozen=True)
 class Goal:
-    """What a figure is to reach: at most or at least so much, as a multiple of the floor, as a value, or as
-    what it is above the floor."""
+    """The bound of a figure: a limit for its multiple of the floor, its value, or its difference from the
+    floor. `otherwise` says why it may be missed and what would reach it."""
 
     bound: Literal["at most", "at least"]
     limit: float
     of: Literal["floor", "value", "above floor"] = "floor"
+    otherwise: str = ""
 
     def is_met(self, figure: Figure) -> bool:
         """Whether the figure keeps to the bound."""
@@ -28,11 +31,11 @@ class Goal:
         return reached <= self.limit if self.bound == "at most" else reached >= self.limit
 
     def text(self, unit: str) -> str:
-        """For a table."""
+        """The goal as text for a table."""
         sign = "≤" if self.bound == "at most" else "≥"
         if self.of == "floor":
             return f"{sign} {self.limit:g} ×"
-        above = "floor + " if self.of == "above floor" else ""
+        above = "+" if self.of == "above floor" else ""
         return f"{sign} {above}{number(self.limit)} {unit}".rstrip()
 
     def _reached(self, figure: Figure) -> float | None:
@@ -45,7 +48,8 @@ class Goal:
 
 @dataclass(frozen=True)
 class Figure:
-    """One figure: the agent's values, one of each run, and the floor's of the same runs, which may be none.
+    """One figure: the agent's values, one per run, and the floor's values of the same runs, if there is a
+    floor.
 
     `name` is "group.figure" and stays the same from run to run. `series` and `x` place the figure in a plot:
     figures of one series differ in x alone.
@@ -73,7 +77,7 @@ class Figure:
 
     @property
     def ratio(self) -> float | None:
-        """How many times the floor; two nothings are equal."""
+        """The figure as a multiple of the floor; 1 if both are 0."""
         floor = self.floor_middle
         if floor is None:
             return None
@@ -82,20 +86,25 @@ class Figure:
         return self.middle / floor
 
     @property
+    def uncertainty(self) -> float:
+        """The uncertainty of the agent's or the floor's median, whichever is larger."""
+        return max(uncertainty(values) for values in (self.values, self.floor) if values)
+
+    @property
     def is_met(self) -> bool | None:
-        """Whether the goal is reached; None where there is none."""
+        """Whether the goal is reached; None without a goal."""
         return self.goal.is_met(self) if self.goal else None
 
 
 @dataclass(frozen=True)
 class Report:
-    """The figures of one bench, and the circumstances."""
+    """The figures of a run of the bench, and the circumstances of each group."""
 
     circumstances: dict[str, Any]
     figures: list[Figure] = field(default_factory=list)
 
     def save(self, path: Path) -> None:
-        """Write it as JSON."""
+        """Write the report as JSON."""
         path.parent.mkdir(parents=True, exist_ok=True)
         path.write_text(json.dumps(asdict(self), ensure_ascii=False, indent=1) + "\n")
 
@@ -103,6 +112,8 @@ class Report:
 def load(path: Path) -> Report:
     """Read what `save` wrote."""
     known = json.loads(path.read_text())
+    if not all("others" in group for group in known["circumstances"].values()):
+        raise ValueError("it is of an older form")
     return Report(known["circumstances"], [figure_of(figure) for figure in known["figures"]])
 
 
@@ -113,14 +124,8 @@ def figure_of(known: dict[str, Any]) -> Figure:
     return Figure(**fields)
 
 
-def spread(values: Sequence[float]) -> float:
-    """How far the values lie apart, relative to their median."""
-    middle = median(values)
-    return (max(values) - min(values)) / abs(middle) if middle else 0.0
-
-
 def number(value: float) -> str:
-    """A number as people read it: three digits that count, thousands apart."""
+    """A number with three significant digits and separated thousands."""
     if value == int(value) or abs(value) >= 100:
         return f"{value:,.0f}"
     return f"{value:.3g}"

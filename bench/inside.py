@@ -1,4 +1,4 @@
-"""Measures one group inside a box; what it finds goes out as JSON, one object a line."""
+"""Measures one group inside a box; prints steps and figures as JSON, one object per line."""
 
 from __future__ import annotations
 
@@ -9,11 +9,12 @@ import sys
 from dataclasses import asdict
 from typing import Any
 
+from bench import noise
 from bench.plan import Plan
 
 
-def tell(**known: Any) -> None:
-    """Send an object to the program outside."""
+def send(**known: Any) -> None:
+    """Send an object to bench.runner on the host."""
     print(json.dumps(known, ensure_ascii=False), flush=True)
 
 
@@ -25,9 +26,11 @@ def main() -> int:
     parser.add_argument("--records", type=int, required=True)
     parser.add_argument("--quick", action="store_true")
     arguments = parser.parse_args()
-    plan = Plan(arguments.runs, arguments.quick, arguments.records, lambda text: tell(step=text))
+    plan = Plan(arguments.runs, arguments.quick, arguments.records, lambda text: send(step=text))
+    before = noise.processors()
     for figure in importlib.import_module(f"bench.groups.{arguments.group}").measure(plan):
-        tell(figure=asdict(figure))
+        send(figure=asdict(figure))
+    send(noise=asdict(noise.processors().noise_since(before)))
     return 0
 
 

@@ -1,4 +1,4 @@
-"""Programs that are measured or that the measured ones talk to; everything here runs inside a box."""
+"""The measured programs and the load generators; everything here runs inside a box."""
 
 from __future__ import annotations
 
@@ -9,21 +9,21 @@ import subprocess
 import threading
 import time
 from dataclasses import dataclass
-from pathlib import Path
 from types import TracebackType
 from typing import IO, Any, Mapping, Self, Sequence
 
+from bench.processes import Running
 from sandbox.agent import default_binary
 from sandbox.machine.users import current_user
 
 _SECONDS = 60.0
-_CALM = 0.3  # seconds without work that are taken for idleness
+_CALM = 0.3  # seconds without CPU time after which a process counts as idle
 
 
 @dataclass(frozen=True)
 class Program:
-    """A program to be measured: the agent or a floor. `start_ends` is the option by which callgrind knows the
-    function where its start ends."""
+    """A measured program: the agent or a floor. `start_ends` is callgrind's option for the function at which
+    the start ends."""
 
     name: str
     argv: Sequence[str]
@@ -31,8 +31,8 @@ class Program:
 
 
 def agent() -> Program:
-    """The agent under test. For a local user its start ends when the daemon has been told of the user, for a
-    domain user when the password tips have been handled."""
+    """The agent under test. For a local user its start ends after the report of the user to the daemon, for a
+    domain user after the handling of the password tips."""
     is_domain = current_user().is_domain_user
     end = (
         "after=HandleEvent::getPasswdExpiredTime*" if is_domain else "before=velkgInterface::SendUserStatus*"
@@ -41,17 +41,17 @@ def agent() -> Program:
 
 
 def bench_program(name: str) -> str:
-    """Path of one of the programs under bench/, which the agent's build folder holds too."""
+    """The path of a program of bench/, in the agent's build folder."""
     return str(default_binary().parent.parent / "bench" / f"bench_{name}")
 
 
 def floor(name: str, *arguments: str) -> Program:
-    """A floor."""
+    """The floor with this name."""
     return Program("floor", [bench_program(name), *arguments])
 
 
-class Process:
-    """A program that runs until `stop` or the end of the context; its output is not looked at."""
+class Process(Running):
+    """A program that runs until `stop` or the end of the context; its output is dropped."""
 
     def __init__(self, argv: Sequence[str], env: Mapping[str, str] | None = None) -> None:
         self.began = time.monotonic_ns()
@@ -62,6 +62,7 @@ class Process:
             stdout=subprocess.DEVNULL,
             stderr=subprocess.DEVNULL,
         )
+        super().__init__(self._process.pid)
 
     def __enter__(self) -> Self:
         return self
@@ -71,59 +72,32 @@ class Process:
     ) -> None:
         self.stop()
 
-    @property
-    def pid(self) -> int:
-        """Process id."""
-        return self._process.pid
-
     def stop(self) -> None:
-        """End it as the end of a session does."""
+        """End the process as the end of a session does."""
         if self._process.poll() is None:
             self._process.send_signal(signal.SIGTERM)
         self._process.wait(_SECONDS)
 
     def wait(self, timeout: float) -> None:
-        """Wait until it ends by itself."""
+        """Wait until the process ends by itself."""
         self._process.wait(timeout)
 
     def await_calm(self, seconds: float = _CALM) -> None:
-        """Wait until it has had nothing to do for so long."""
+        """Wait until the process has used no CPU time for `seconds`."""
         worked = -1
         while worked != (worked := self.cpu_nanoseconds()):
             time.sleep(seconds)
 
-    def memory(self, name: str) -> float:
-        """A line of the kernel's sum over all of the process's memory, in KiB: "Rss", "Private_Dirty"..."""
-        return _kibibytes(Path(f"/proc/{self.pid}/smaps_rollup"), name)
-
-    def status(self, name: str) -> float:
-        """A line of the process's status in KiB: "VmStk", "VmHWM"..."""
-        return _kibibytes(Path(f"/proc/{self.pid}/status"), name)
-
-    def voluntary_switches(self) -> int:
-        """How often its threads have gone to sleep so far."""
-        return sum(_field(task / "status", "voluntary_ctxt_switches") for task in self._tasks())
-
-    def cpu_nanoseconds(self) -> int:
-        """How long its threads have run so far."""
-        return sum(int((task / "schedstat").read_text().split()[0]) for task in self._tasks())
-
-    def threads(self) -> int:
-        """How many threads it has now."""
-        return len(self._tasks())
-
-    def _tasks(self) -> list[Path]:
-        return list(Path(f"/proc/{self.pid}/task").iterdir())
-
 
 class LoadGenerator(Process):
-    """One of the programs under bench/load: it takes commands and tells what happens, a line each."""
+    """A program of bench/load: it reads commands and prints what happens, one per line."""
 
     def __init__(self, name: str, *arguments: str) -> None:
         self.began = time.monotonic_ns()
         self._process = subprocess.Popen(
             [bench_program(name), *arguments], stdin=subprocess.PIPE, stdout=subprocess.PIPE, text=True
         )
+        Running.__init__(self, self._process.pid)
         assert self._process.stdin and self._process.stdout
         self._commands: IO[str] = self._process.stdin
         self._lines: queue.Queue[list[str]] = queue.Queue()
@@ -131,23 +105,24 @@ class LoadGenerator(Process):
         self.wait_for("ready")
 
     def stop(self) -> None:
-        """End it."""
+        """Close the program's input, which ends it."""
         self._commands.close()
         self._process.wait(_SECONDS)
 
-    def tell(self, command: str) -> None:
+    def send(self, command: str) -> None:
         """Give a command."""
         self._commands.write(f"{command}\n")
         self._commands.flush()
 
     def wait_for(self, word: str, timeout: float = _SECONDS) -> list[int]:
-        """The numbers of the next line that begins with `word`; others before it are dropped."""
+        """Wait for the next line that begins with `word` and return its numbers; drops the lines before
+        it."""
         numbers = self.await_line(word, timeout)
         assert numbers is not None, f"'{word}' did not come within {timeout:g} s"
         return numbers
 
     def await_line(self, word: str, timeout: float) -> list[int] | None:
-        """The same, but None when no such line came."""
+        """As `wait_for`, but returns None if no such line comes."""
         end = time.monotonic() + timeout
         while True:
             try:
@@ -165,14 +140,3 @@ class LoadGenerator(Process):
     def _read(self, stream: IO[str]) -> None:
         for line in stream:
             self._lines.put(line.split())
-
-
-def _kibibytes(path: Path, name: str) -> float:
-    return float(_field(path, name))
-
-
-def _field(path: Path, name: str) -> int:
-    for line in path.read_text().splitlines():
-        if line.startswith(f"{name}:"):
-            return int(line.split()[1])
-    raise AssertionError(f"no {name} in {path}")

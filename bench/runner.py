@@ -1,4 +1,4 @@
-"""Runs the groups of figures, each in a box of its own."""
+"""Runs each group of figures in its own box."""
 
 from __future__ import annotations
 
@@ -12,11 +12,12 @@ from pathlib import Path
 from typing import Any, Callable, Iterator, Sequence
 
 from bench.figures import Figure, figure_of
+from bench.noise import Noise
 from sandbox import REPOSITORY
 
 _IN_BOX = REPOSITORY / "sandbox" / "in-box"
 
-# In which users' boxes each group is measured.
+# The users in whose boxes each group is measured.
 GROUPS: dict[str, tuple[str, ...]] = {
     "start": ("local", "domain"),
     "memory": ("local", "domain"),
@@ -27,16 +28,20 @@ GROUPS: dict[str, tuple[str, ...]] = {
     "dock": ("local",),
     "many_agents": ("local",),
     "wire": ("domain",),
+    "day": ("local", "domain"),
+    "neighbours": ("local",),
 }
+# What is measured only if it is asked for: it needs packages that nothing else does.
+ON_DEMAND = ("neighbours",)
 
 
 class Failure(Exception):
-    """A group could not be measured; the text says which."""
+    """A group could not be measured; the message names it."""
 
 
 @dataclass(frozen=True)
 class Options:
-    """What is measured how often."""
+    """The groups to measure, and how often."""
 
     groups: Sequence[str]
     runs: int
@@ -45,13 +50,16 @@ class Options:
 
     @property
     def boxes(self) -> list[tuple[str, str]]:
-        """Groups with the user whose box they are measured in."""
+        """The groups, each with the user whose box it is measured in."""
         return [(group, user) for group in self.groups for user in GROUPS[group]]
 
 
-def measure(options: Options, group: str, user: str, tell: Callable[[str], None]) -> list[Figure]:
-    """The figures of a group; `tell` is called with each step."""
+def measure(
+    options: Options, group: str, user: str, show_step: Callable[[str], None]
+) -> tuple[list[Figure], Noise]:
+    """The figures of a group; `show_step` is called with each step."""
     figures: list[Figure] = []
+    noise = Noise()
     argv = [
         *(str(_IN_BOX), "--user", user, "--", "/usr/bin/python3", "-P", "-m", "bench.inside", group),
         *("--runs", str(options.runs), "--records", str(options.records)),
@@ -61,20 +69,21 @@ def measure(options: Options, group: str, user: str, tell: Callable[[str], None]
         assert box.stdout
         for known in _objects(box.stdout):
             if "step" in known:
-                tell(known["step"])
+                show_step(known["step"])
+            elif "noise" in known:
+                noise = Noise(**known["noise"])
             else:
                 figures.append(figure_of(known["figure"]))
     if box.returncode:
         raise Failure(f"{group}, {user} user: exit status {box.returncode}")
-    return figures
+    return figures, noise
 
 
-def circumstances(options: Options) -> dict[str, Any]:
-    """What a reader of the figures should know of the machine, as it is now."""
+def circumstances(noise: Noise) -> dict[str, Any]:
+    """The state of the machine and its other load, for readers of the figures."""
     return {
         "date": datetime.now(timezone.utc).isoformat(timespec="minutes"),
-        "runs": options.runs,
-        "load": os.getloadavg()[0],
+        **noise.shares(),
         "processors": os.cpu_count(),
         "processor": _processor(),
         "kernel": platform.release(),

@@ -1,4 +1,4 @@
-"""Where the agent and the floors are measured: real buses, real files, and fast load generators."""
+"""The environment of the measurements: real buses, real files, and fast load generators."""
 
 from __future__ import annotations
 
@@ -18,7 +18,7 @@ ADDRESS = f"{layout.PLATFORM_HOST}:{layout.PLATFORM_PORT}"
 
 
 class Testbed:
-    """The desktop's services, and with `platform` the platform, which a domain user's agent asks."""
+    """Runs the desktop's services and, on request, the platform, which a domain user's agent needs."""
 
     def __init__(self, items: int = 0, entries: int = 0, platform: bool = False) -> None:
         self._stack = ExitStack()
@@ -47,7 +47,7 @@ class Testbed:
         return Process(program.argv, env)
 
     def start_and_wait(self, program: Program, env: Mapping[str, str] | None = None) -> Process:
-        """Start a program and wait until it has announced itself and is idle."""
+        """Start a program and wait until it has reported the user and is idle."""
         process = self.start(program, env)
         self.desktop.wait_for("UpdateUserInfo", _PROGRAM_SECONDS)
         if self._platform:
@@ -62,14 +62,14 @@ class Testbed:
             self._platform.forget()
 
     def policies(self, count: int, size: int = 200, window: int = 1) -> list[int]:
-        """Push policies and wait until all have been forwarded; begin, end and latencies in nanoseconds."""
-        self.desktop.tell(f"policies {count} {size} {window}")
+        """Push policies, wait until all are forwarded, and return begin, end and latencies in nanoseconds."""
+        self.desktop.send(f"policies {count} {size} {window}")
         return self.desktop.wait_for("done", _PROGRAM_SECONDS + count * 0.01)
 
     def move_clock(self, clock: ManualClock, seconds: int) -> None:
         """Move a program's clock ahead and wake it up."""
         clock.jump(seconds)
-        self.desktop.tell("wake")
+        self.desktop.send("wake")
 
     def _start_platform(self) -> LoadGenerator:
         known = trust()

@@ -1,1 +1,1 @@
-"""What a fleet of agents means for the platform."""
+"""The load of a fleet of agents on the platform."""

@@ -1,5 +1,5 @@
-/// Prints for each second of a day the agent's poll intervals, in milliseconds, as they are drawn at it: the
-/// one after a start, and a later one.
+/// Prints the poll intervals that the agent draws at each second of a day, in milliseconds: the first one
+/// after a start, and a later one.
 
 #include <QCoreApplication>
 
@@ -12,12 +12,12 @@
 namespace {
 
 constexpr int kSecondsOfDay = 24 * 60 * 60;
-// NOLINTNEXTLINE(cppcoreguidelines-avoid-non-const-global-variables): the clock below has no other way
+// NOLINTNEXTLINE(cppcoreguidelines-avoid-non-const-global-variables): the clock below takes no other argument
 int second = 0;
 
 } // namespace
 
-/// The clock that Qt looks at, instead of the C library's.
+/// The clock that Qt reads, in place of the C library's.
 // NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name): the header's are reserved
 extern "C" int gettimeofday(timeval* now, void* /*zone*/) noexcept
 {

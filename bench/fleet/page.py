@@ -1,4 +1,4 @@
-"""Writes docs/scale.md and its plot: what fleets of different sizes mean for the platform."""
+"""Writes docs/scale.md and its plot: the load of fleets of different sizes on the platform."""
 
 from __future__ import annotations
 
@@ -23,7 +23,7 @@ _DOCS = REPOSITORY / "docs"
 
 
 def write(report: Report) -> list[Path]:
-    """docs/scale.md and its plot; the bytes on the wire are the report's."""
+    """Write docs/scale.md and its plot, with the bytes on the wire from the report; returns their paths."""
     drawn = drawn_intervals(bench_program("intervals"))
     loads = {title: simulate(drawn, span) for title, span in _START_SPANS.items()}
     page, plot = _DOCS / "scale.md", _DOCS / "scale.svg"
@@ -59,7 +59,7 @@ def _page(drawn: Intervals, loads: dict[str, Load], report: Report) -> str:
 
 
 def _handshakes(drawn: Intervals, known: dict[str, float]) -> list[tuple[str, ...]]:
-    """By how long a platform keeps connections: what a million agents mean for it in a second."""
+    """The load of a million agents per second, by how long the platform keeps connections."""
     rows: list[tuple[str, ...]] = [
         ("connections are kept", "polls with a handshake", "measured", "handshakes", "kB on the wire")
     ]
@@ -73,7 +73,7 @@ def _handshakes(drawn: Intervals, known: dict[str, float]) -> list[tuple[str, ..
 
 
 def _peaks(load: Load) -> tuple[str, str, str]:
-    """The busiest seconds of a million agents."""
+    """The requests of a million agents in the busiest seconds."""
     parts = max(load.starts), max(load.polls[:3600]), max(load.polls[_SETTLED:])
     starting, first, settled = (number(1e6 * share) for share in parts)
     return starting, first, settled

@@ -6,14 +6,14 @@
 
 #include <memory>
 
-/// libcurl's easy interface with one handle for all requests to the platform, and the one header that tells
-/// how many messages are unread.
+/// libcurl's easy interface with one handle for all requests to the platform; reads only the header with the
+/// number of unread messages.
 class BareClient
 {
 public:
     BareClient();
 
-    /// The number of unread messages that the reply tells of, 0 where it tells none.
+    /// Returns the number of unread messages in the reply, 0 if the reply has none.
     int get(const QByteArray& url, const QByteArray& body = {});
     void put(const QByteArray& url, const QByteArray& body);
 

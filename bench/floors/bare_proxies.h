@@ -11,7 +11,7 @@ class BareDaemon : public QDBusAbstractInterface
 public:
     BareDaemon();
 
-    /// Announces the session as the agent does.
+    /// Reports the session as the agent does.
     void announce();
 
 Q_SIGNALS:
@@ -27,5 +27,5 @@ public:
     BarePolicyService();
 };
 
-/// Does nothing: its symbol is where the count of a start's instructions ends.
+/// Does nothing: callgrind ends its count of a start's instructions at this symbol.
 extern "C" void startEnds();

@@ -1,5 +1,6 @@
-/// Floor of the platform's messages: one request for the password tips; then as many rows of GET,
-/// notification and PUT as messages are unread; a poll every three minutes.
+/// Floor of the platform's messages: a start with the one child that it must run, and a request for the
+/// password tips; then GET, notification and PUT for each unread message; a poll every three minutes.
+///
 /// usage: bench_drain HOST:PORT
 
 #include <QCoreApplication>
@@ -15,6 +16,7 @@
 
 #include "bare_client.h"
 #include "bare_proxies.h"
+#include "package_tools.h"
 
 namespace {
 
@@ -99,6 +101,7 @@ int main(int argc, char* argv[])
     const QCoreApplication application(argc, argv);
     BareDaemon daemon;
     const BarePolicyService policyService;
+    askArchitecture();
     daemon.announce();
 
     Reader reader("https://" + QByteArray(argc > 1 ? argv[1] : "") + '/');

@@ -5,7 +5,7 @@
 class BareDaemon;
 class QDBusMessage;
 
-/// Hands each change of a dock entry's windows to the daemon by one asynchronous call.
+/// Reports each change of a dock entry's windows to the daemon by one asynchronous call.
 class WindowChanges : public QObject
 {
     Q_OBJECT

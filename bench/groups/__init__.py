@@ -1,1 +1,1 @@
-"""The figures by group; each module measures one group inside a box: see bench.inside."""
+"""The groups of figures; each module measures one group inside a box (see bench.inside)."""

@@ -1,4 +1,4 @@
-"""A dock with very many entries, and very many changes of their windows."""
+"""A dock with very many entries and very many window changes."""
 
 from __future__ import annotations
 
@@ -19,38 +19,38 @@ _GOAL = Goal("at most", 1.2)
 
 
 def measure(plan: Plan) -> Iterator[Figure]:
-    """From exec until all entries are read; a change until the daemon is told of it."""
+    """Measures the time from exec until all entries are read, and from a change to its report."""
     if not plan.quick:
         yield from _times(plan)
     programs = agent(), floor("dock")
-    values, floors = plan.pairs("instructions of a dock's entry", *programs, _instructions_of_entry)
+    values, floors = plan.counts("instructions of a dock's entry", *programs, _instructions_of_entry)
     yield Figure("dock.entry.instructions", "one entry", "instructions", "thousand", values, floors)
-    values, floors = plan.pairs("instructions of a window's change", *programs, _instructions_of_change)
+    values, floors = plan.counts("instructions of a window's change", *programs, _instructions_of_change)
     yield Figure("dock.change.instructions", "one window change", "instructions", "thousand", values, floors)
 
 
 def _times(plan: Plan) -> Iterator[Figure]:
-    programs = agent(), floor("dock")
-    reads: dict[str, list[float]] = {"agent": [], "floor": []}
-    changes: dict[str, list[float]] = {"agent": [], "floor": []}
-    for run in plan.times():
-        plan.tell(f"dock with {_ENTRIES:,} entries, run {run + 1} of {plan.runs}")
-        for program in programs:
-            with Testbed(entries=_ENTRIES) as testbed, testbed.start(program) as process:
-                (read,) = testbed.desktop.wait_for("entries", _SECONDS)
-                reads[program.name].append((read - process.began) / 1e9)
-                begin, end, *_ = _change(testbed, process, _CHANGES)
-                changes[program.name].append((end - begin) / 1e9)
     title = f"dock with {_ENTRIES:,} entries"
-    yield Figure("dock.entries", title, "time", "s", reads["agent"], reads["floor"], _GOAL)
+    reads, changes, floor_reads, floor_changes = plan.repeat(
+        title, lambda: (*_seconds(agent()), *_seconds(floor("dock")))
+    )
+    yield Figure("dock.entries", title, "time", "s", reads, floor_reads, _GOAL)
     title = f"{_CHANGES:,} window changes"
-    yield Figure("dock.changes", title, "time", "s", changes["agent"], changes["floor"], _GOAL)
+    yield Figure("dock.changes", title, "time", "s", changes, floor_changes, _GOAL)
+
+
+def _seconds(program: Program) -> tuple[float, float]:
+    """Until all entries are read, and for the changes after that."""
+    with Testbed(entries=_ENTRIES) as testbed, testbed.start(program) as process:
+        (read,) = testbed.desktop.wait_for("entries", _SECONDS)
+        begin, end, *_ = _change(testbed, process, _CHANGES)
+    return (read - process.began) / 1e9, (end - begin) / 1e9
 
 
 def _change(testbed: Testbed, process: Process, count: int) -> list[int]:
-    """Until it is calm, the agent may read again what changes."""
+    """Change windows once the agent is calm; before, it may still read the entries."""
     process.await_calm()
-    testbed.desktop.tell(f"windows {count} {_WINDOW}")
+    testbed.desktop.send(f"windows {count} {_WINDOW}")
     return testbed.desktop.wait_for("done", _SECONDS)
 
 

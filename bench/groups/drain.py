@@ -1,4 +1,4 @@
-"""Rows of unread messages that the platform has for a domain user."""
+"""Backlogs of unread messages for a domain user."""
 
 from __future__ import annotations
 
@@ -16,33 +16,36 @@ _ROW = 3_000
 _LENGTHS = (100, 10_000, 100_000)
 _FEW, _MANY = 20, 220
 _SECONDS_PER_MESSAGE = 0.05
+_COUNTED_SECONDS = 300.0
 _AFTER_BREAK = 50
 _FLAT = Goal("at most", 1.05)
+_NO_LOG = {"QT_LOGGING_RULES": "*=false"}
+_HANDLES = (
+    "most of the difference is the fresh libcurl handle of each request; a reused one would reach it, but "
+    "libcurl 7.88 reads freed memory then"
+)
 
 
 def measure(plan: Plan) -> Iterator[Figure]:
-    """How fast, over how many connections, and with how much memory."""
+    """Measures rate, instructions, connections and memory."""
     programs = agent(), floor("drain", ADDRESS)
     with Testbed(platform=True) as testbed:
         if not plan.quick:
             values, floors = plan.pairs(
                 f"drain of {_ROW:,} messages", *programs, lambda program: _rate(testbed, program)
             )
-            goal = Goal("at least", 0.9)
+            goal = Goal("at least", 0.9, otherwise=_HANDLES)
             yield Figure("drain.rate", "messages over TLS", "rate", "per s", values, floors, goal)
-        values, floors = plan.pairs(
-            "instructions of a message", *programs, lambda program: _instructions(testbed, program)
-        )
-        yield Figure("drain.instructions", "one message", "instructions", "thousand", values, floors)
+        yield from _all_instructions(plan, testbed, programs)
         if not plan.quick:
-            plan.tell("connections of a drain")
+            plan.show_step("connections of a drain")
             yield from _connections(testbed)
             yield from _lengths(plan, testbed)
 
 
 def _drain(testbed: Testbed, program: Program, messages: int) -> tuple[float, dict[str, float]]:
-    """Seconds, and the memory at the end."""
-    testbed.platform.tell(f"messages {messages}")
+    """The duration in seconds, and the memory at the end."""
+    testbed.platform.send(f"messages {messages}")
     with testbed.start(program) as process:
         begin, end = testbed.platform.wait_for("drained", 60 + messages * _SECONDS_PER_MESSAGE)
         memory = {"VmStk": process.status("VmStk"), "Rss": process.memory("Rss")}
@@ -54,29 +57,43 @@ def _rate(testbed: Testbed, program: Program) -> float:
     return _ROW / seconds
 
 
-def _instructions(testbed: Testbed, program: Program) -> float:
+def _all_instructions(plan: Plan, testbed: Testbed, programs: tuple[Program, Program]) -> Iterator[Figure]:
+    goal = Goal("at most", 1 / 0.95, otherwise=_HANDLES)
+    logs: dict[str, dict[str, str]] = {"one message": {}, "one message, nothing logged": _NO_LOG}
+    for title, env in logs.items():
+        if plan.quick and env:
+            return
+        values, floors = plan.counts(
+            f"instructions of {title}", *programs, lambda program: _instructions(testbed, program, env)
+        )
+        name = "drain.instructions.silent" if env else "drain.instructions"
+        judged = goal if env else None
+        yield Figure(name, title, "instructions", "thousand", values, floors, judged)
+
+
+def _instructions(testbed: Testbed, program: Program, env: dict[str, str]) -> float:
     def total(messages: int) -> float:
         def work(process: Process) -> None:
-            testbed.platform.wait_for("drained")
+            testbed.platform.wait_for("drained", _COUNTED_SECONDS)
             process.await_calm()
 
         testbed.forget()
-        testbed.platform.tell(f"messages {messages}")
-        return callgrind.of_work(program, work)
+        testbed.platform.send(f"messages {messages}")
+        return callgrind.of_work(program, work, env)
 
     return (total(_MANY) - total(_FEW)) / (_MANY - _FEW) / 1e3
 
 
 def _connections(testbed: Testbed) -> Iterator[Figure]:
-    """Handshakes of a row of 1,000, and of one after the server has closed the idle connection."""
+    """Handshakes for a backlog of 1,000, and for one after the server has closed the idle connection."""
     clock = ManualClock()
-    testbed.platform.tell("messages 1000")
+    testbed.platform.send("messages 1000")
     before = _counts(testbed)
     with testbed.start(agent(), clock.environment()):
         testbed.platform.wait_for("drained")
         drained = _counts(testbed)
-        testbed.platform.tell("close")
-        testbed.platform.tell(f"messages {_AFTER_BREAK}")
+        testbed.platform.send("close")
+        testbed.platform.send(f"messages {_AFTER_BREAK}")
         testbed.move_clock(clock, SURELY_NEXT_POLL)
         testbed.platform.wait_for("drained")
         reconnected = _counts(testbed)
@@ -97,15 +114,16 @@ def _count(name: str, title: str, value: int, goal: Goal) -> Figure:
 
 
 def _counts(testbed: Testbed) -> list[int]:
-    testbed.platform.tell("counts")
+    testbed.platform.send("counts")
     return testbed.platform.wait_for("counts")
 
 
 def _lengths(plan: Plan, testbed: Testbed) -> Iterator[Figure]:
-    """The floor is the shortest row, which fills the same buffers."""
+    """Memory by the length of the backlog. The floor is the shortest backlog, which fills the same
+    buffers."""
     at_first: dict[str, float] = {}
     for length in _LENGTHS:
-        plan.tell(f"drain of {length:,} messages")
+        plan.show_step(f"drain of {length:,} messages")
         _, memory = _drain(testbed, agent(), length)
         at_first = at_first or memory
         for line, title in {"VmStk": "stack", "Rss": "resident"}.items():

@@ -1,4 +1,4 @@
-"""What the agent does in a minute in which no timer is due."""
+"""The agent's activity in a minute in which no timer is due."""
 
 from __future__ import annotations
 
@@ -11,20 +11,20 @@ from bench.plan import Plan
 from bench.programs import agent, floor
 from sandbox.machine.users import current_user
 
-_CALM = 2.0  # seconds until the start is over for certain
+_CALM = 2.0  # seconds after which the start is certainly over
 # The first poll of a domain user may come a minute after the start.
 _SECONDS = {"local": 60, "domain": 56}
 
 
 def measure(plan: Plan) -> Iterator[Figure]:
-    """Both programs sleep through the same minute."""
+    """Measures both programs during the same minute."""
     is_domain = current_user().is_domain_user
     who = "domain" if is_domain else "local"
     seconds = _SECONDS[who]
     bare = floor("drain", ADDRESS) if is_domain else floor("start")
     with Testbed(platform=is_domain) as testbed, testbed.start_and_wait(agent()) as one:
         with testbed.start_and_wait(bare) as other:
-            plan.tell(f"idle for {seconds} s")
+            plan.show_step(f"idle for {seconds} s")
             time.sleep(_CALM)
             switches = [process.voluntary_switches() for process in (one, other)]
             busy = [process.cpu_nanoseconds() for process in (one, other)]

@@ -1,10 +1,12 @@
-"""What the package tools report of the launcher's items and of the daemon's inventory file."""
+"""Inventories of the launcher's items and of the daemon's inventory file."""
 
 from __future__ import annotations
 
 import json
+import time
 from typing import Any, Iterator
 
+from bench import packages
 from bench.testbed import Testbed
 from bench.figures import Figure, Goal
 from bench.plan import Plan
@@ -12,26 +14,35 @@ from bench.programs import Program, agent, floor
 from sandbox.machine import layout
 from sandbox.machine.packages import Packages
 
-_ITEMS = (10, 100, 300)
-_SECONDS_PER_CHILD = 0.1
+_ITEMS = (10,)
+_UPGRADED, _UPGRADED_ITEMS = 2, 5  # packages of an upgrade, items of the launcher meanwhile
+_LOG_OUT = 1201
+_BEHIND = 0.5  # seconds until the agent has all changes in its queue
+_MINUTE = 60
+_SECONDS_PER_CHILD = 0.5
 _ASKED = 1_000  # records of the file that the tools are asked about
 _MEGABYTES = 10
+_CHILDREN = Goal("at most", 1.05)
+_FORKS = Goal(
+    "at most",
+    1.02,
+    otherwise="QProcess forks, which takes the longer the larger the agent is; posix_spawn would reach it",
+)
 
 
 def measure(plan: Plan) -> Iterator[Figure]:
-    """From exec until the daemon has the inventory."""
+    """Measures the time from exec until the daemon has the inventory."""
     if plan.quick:
         return
-    packages = Packages()
+    installed = Packages(packages.database())
+    for number in range(max(_ITEMS)):
+        installed.install(_package(number), "1")
     for count in _ITEMS:
-        for number in range(count):
-            packages.install(_package(number), "1")
         yield _items(plan, count)
-    yield _parsing(plan)
+    yield from _upgrade(plan)
     if plan.records:
-        packages = Packages()
-        packages.install(_package(0), "1")
         yield from _file(plan)
+    yield _parsing(plan)
 
 
 def _package(number: int) -> str:
@@ -39,23 +50,47 @@ def _package(number: int) -> str:
 
 
 def _items(plan: Plan, count: int) -> Figure:
+    title = f"inventory of {count} items"
     with Testbed(items=count) as testbed:
         values, floors = plan.pairs(
-            f"inventory of {count} items",
+            title,
             agent(),
             floor("inventory", "items", str(count)),
-            lambda program: _seconds(testbed, program, 2 * count) * 1e3,
+            lambda program: _seconds(testbed, program, 2 * count),
         )
     name = f"inventory.items.{count}"
-    goal = Goal("at most", 1.05)
-    title = f"inventory of {count} items"
-    return Figure(name, title, "time", "ms", values, floors, goal, "inventory.items", count)
+    return Figure(name, title, "time", "s", values, floors, _CHILDREN, "inventory.items", count)
 
 
 def _seconds(testbed: Testbed, program: Program, children: int) -> float:
     with testbed.start(program) as process:
-        (told,) = testbed.desktop.wait_for("onUploadFinished", 60 + children * _SECONDS_PER_CHILD)
-    return (told - process.began) / 1e9
+        (reported,) = testbed.desktop.wait_for("onUploadFinished", 60 + children * _SECONDS_PER_CHILD)
+    return (reported - process.began) / 1e9
+
+
+def _upgrade(plan: Plan) -> Iterator[Figure]:
+    """Thirty changes at once, and right after them the policy that logs the user out a minute later. It takes
+    minutes, and as many children that are all alike: once is enough."""
+    title = f"{_UPGRADED} changes in a row, {_UPGRADED_ITEMS} items"
+    children = _UPGRADED * (2 * _UPGRADED_ITEMS + 3)
+    patience = 60 + children * _SECONDS_PER_CHILD
+    with Testbed(items=_UPGRADED_ITEMS) as testbed:
+        plan.show_step(title)
+        with testbed.start(agent()) as process:
+            testbed.desktop.wait_for("UpdateUserInfo", patience)
+            process.await_calm()
+            testbed.desktop.send(f"changes {_UPGRADED}")
+            time.sleep(_BEHIND)
+            testbed.desktop.send(f"policy {_LOG_OUT}")
+            begin, end, *_ = testbed.desktop.wait_for("done", patience)
+            (ended,) = testbed.desktop.wait_for("Terminate", 2 * _MINUTE)
+        plan.show_step(f"{title}, the tools alone")
+        arguments = ("changes", str(_UPGRADED), str(_UPGRADED_ITEMS))
+        alone = _seconds(testbed, floor("inventory", *arguments), children)
+    values = [(end - begin) / 1e9]
+    yield Figure("inventory.upgrade", title, "time", "s", values, [alone], _CHILDREN)
+    late = [(ended - begin) / 1e9 - _BEHIND - _MINUTE]
+    yield Figure("inventory.upgrade.logout", "a forced log-out behind them, late by", "time", "s", late)
 
 
 def _record(package: str, number: int) -> dict[str, Any]:
@@ -63,24 +98,24 @@ def _record(package: str, number: int) -> dict[str, Any]:
 
 
 def _parsing(plan: Plan) -> Figure:
-    """A file of records without a package, which no tool is asked about, against no file."""
-    seconds = []
+    """Compares a file of records without a package, about which no tool is asked, with an empty file."""
     with Testbed() as testbed:
 
         def to_announcement() -> float:
             with testbed.start(agent()) as process:
-                (told,) = testbed.desktop.wait_for("UpdateUserInfo")
-            return (told - process.began) / 1e9
+                (reported,) = testbed.desktop.wait_for("UpdateUserInfo")
+            return (reported - process.began) / 1e9
 
-        for _ in plan.times():
-            plan.tell(f"parsing of {_MEGABYTES} MB")
+        def seconds() -> float:
             testbed.files.write_software_list(layout.SOFTWARE_LIST, [])
             without = to_announcement()
             testbed.files.write(layout.SOFTWARE_LIST, json.dumps(_long_list(), indent=4))
             megabytes = layout.SOFTWARE_LIST.stat().st_size / 1e6
-            seconds.append((to_announcement() - without) * _MEGABYTES / megabytes)
-    goal = Goal("at most", 1, "value")
-    return Figure("inventory.parsing", "parsing of 10 MB, with its log lines", "time", "s", seconds, (), goal)
+            return (to_announcement() - without) * _MEGABYTES / megabytes
+
+        title = f"parsing of {_MEGABYTES} MB, with its log lines"
+        (values,) = plan.repeat(title, lambda: (seconds(),))
+    return Figure("inventory.parsing", title, "time", "s", values, (), Goal("at most", 1, "value"))
 
 
 def _long_list() -> list[dict[str, Any]]:
@@ -93,19 +128,18 @@ def _file(plan: Plan) -> Iterator[Figure]:
     multiplied; every child is the same, and a hundred thousand of them would take many minutes."""
     records, asked = plan.records, min(plan.records, _ASKED)
     times = records / asked
-    values: list[float] = []
-    floors: list[float] = []
+    title = f"inventory file of {records:,} records"
     with Testbed(items=1) as testbed:
 
         def seconds(program: Program, packages: int) -> float:
             known = [_record(_package(0) if number < packages else "", number) for number in range(records)]
             testbed.files.write(layout.SOFTWARE_LIST, json.dumps(known, indent=4))
-            return _seconds(testbed, program, packages)
+            return _seconds(testbed, program, asked)
 
-        for run in plan.times():
-            plan.tell(f"inventory file of {records:,} records, run {run + 1} of {plan.runs}")
+        def whole() -> tuple[float, float]:
             parsing = seconds(agent(), 0)
-            values.append(parsing + (seconds(agent(), asked) - parsing) * times)
-            floors.append(seconds(floor("inventory", "records", str(asked)), 0) * times)
-    name, title = f"inventory.file.{records}", f"inventory file of {records:,} records"
-    yield Figure(name, title, "time", "s", values, floors, Goal("at most", 1.02))
+            bare = seconds(floor("inventory", "records", str(asked)), 0)
+            return parsing + (seconds(agent(), asked) - parsing) * times, bare * times
+
+        values, floors = plan.repeat(title, whole)
+    yield Figure(f"inventory.file.{records}", title, "time", "s", values, floors, _FORKS)

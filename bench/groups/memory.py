@@ -1,4 +1,4 @@
-"""Memory after the start, and how much it grows with polls and policies."""
+"""Memory after the start, and its growth with polls and policies."""
 
 from __future__ import annotations
 
@@ -23,7 +23,7 @@ _LINES = {"Rss": "resident", "Private_Dirty": "private dirty"}
 
 
 def measure(plan: Plan) -> Iterator[Figure]:
-    """The figures of this box's user."""
+    """Measures the figures of this box's user."""
     yield from _after_start(plan)
     if current_user().is_domain_user and not plan.quick:
         yield from _after_polls(plan)
@@ -34,28 +34,21 @@ def _after_start(plan: Plan) -> Iterator[Figure]:
     is_domain = current_user().is_domain_user
     who = "domain" if is_domain else "local"
     programs = agent(), floor("drain", ADDRESS) if is_domain else floor("start")
-    taken: dict[str, list[dict[str, float]]] = {"agent": [], "floor": []}
     with Testbed(platform=is_domain) as testbed:
-        for _ in plan.times():
-            plan.tell(f"memory of a {who} user's agent")
-            for program in programs:
-                taken[program.name].append(_memory_after_start(testbed, program))
-    goals = {"Rss": Goal("at most", 1.25), "Private_Dirty": Goal("at most", _MOST_DIRTY, "value")}
-    for line, title in _LINES.items():
-        yield Figure(
-            f"memory.{who}.{line}",
-            f"{title} after start, {who} user",
-            "memory",
-            "KiB",
-            [memory[line] for memory in taken["agent"]],
-            [memory[line] for memory in taken["floor"]],
-            goals[line],
+        columns = plan.repeat(
+            f"memory of a {who} user's agent",
+            lambda: [known for program in programs for known in _memory_after_start(testbed, program)],
         )
+    values, floors = columns[: len(_LINES)], columns[len(_LINES) :]
+    goals = {"Rss": Goal("at most", 1.25), "Private_Dirty": Goal("at most", _MOST_DIRTY, "value")}
+    for (line, title), value, bare in zip(_LINES.items(), values, floors):
+        name = f"memory.{who}.{line}"
+        yield Figure(name, f"{title} after start, {who} user", "memory", "KiB", value, bare, goals[line])
 
 
-def _memory_after_start(testbed: Testbed, program: Program) -> dict[str, float]:
+def _memory_after_start(testbed: Testbed, program: Program) -> list[float]:
     with testbed.start_and_wait(program) as process:
-        return {line: process.memory(line) for line in _LINES}
+        return [process.memory(line) for line in _LINES]
 
 
 def _after_polls(plan: Plan) -> Iterator[Figure]:
@@ -70,7 +63,7 @@ def _after_polls(plan: Plan) -> Iterator[Figure]:
                 while testbed.platform.await_line("listed", _PATIENCE) is None:
                     testbed.move_clock(clock, SURELY_NEXT_POLL)
 
-        plan.tell(f"memory after {_POLLS:,} polls")
+        plan.show_step(f"memory after {_POLLS:,} polls")
         yield from _growth(
             testbed, floor("drain", ADDRESS), "polls", poll, (_WARM_POLLS, _POLLS), clock.environment()
         )
@@ -82,7 +75,7 @@ def _after_policies(plan: Plan) -> Iterator[Figure]:
         def push(_process: Process, times: int) -> None:
             testbed.policies(times, window=_WINDOW)
 
-        plan.tell(f"memory after {_POLICIES:,} policies")
+        plan.show_step(f"memory after {_POLICIES:,} policies")
         yield from _growth(testbed, floor("forwarding"), "policies", push, (_WARM_POLICIES, _POLICIES), {})
 
 
@@ -94,7 +87,7 @@ def _growth(
     counts: tuple[int, int],
     env: dict[str, str],
 ) -> Iterator[Figure]:
-    """How much memory grows between the end of the warm-up and the end of the work."""
+    """The growth of memory from the end of the warm-up to the end of the work."""
     warm, whole = counts
     grown: dict[str, dict[str, float]] = {line: {} for line in _LINES}
     for program in (agent(), bare):

@@ -1,4 +1,4 @@
-"""What polls without messages cost on the wire, by how long the platform keeps an idle connection."""
+"""The traffic of polls without messages, by how long the platform keeps an idle connection."""
 
 from __future__ import annotations
 
@@ -30,12 +30,12 @@ class _Counts(NamedTuple):
 
 
 def measure(plan: Plan) -> Iterator[Figure]:
-    """Bytes of TCP payload in both directions, and the share of the polls that need a handshake."""
+    """Measures the TCP payload in both directions, and the share of polls that need a handshake."""
     if plan.quick:
         return
     costs: dict[str, list[float]] = defaultdict(list)
     for name, seconds in KEPT.items():
-        plan.tell(f"{_POLLS} polls of a platform that keeps connections {name}")
+        plan.show_step(f"{_POLLS} polls of a platform that keeps connections {name}")
         polls = _polls(seconds)
         for way, cost in polls:
             costs[way].append(cost)
@@ -48,7 +48,7 @@ def measure(plan: Plan) -> Iterator[Figure]:
 
 
 def _polls(kept: float) -> list[tuple[str, float]]:
-    """How an agent's start and its first polls reach the platform, and the bytes that each takes."""
+    """The kind of connection and the bytes of an agent's start and of each of its first polls."""
     clock = ManualClock()
     with Testbed(platform=True) as testbed, testbed.start_and_wait(agent(), clock.environment()) as process:
         found = [("full", float(_counts(testbed).transferred))]
@@ -66,8 +66,8 @@ def _let_poll(testbed: Testbed, clock: ManualClock, process: Process, kept: floa
     while idle == 0 or testbed.platform.await_line("listed", _PATIENCE) is None:
         idle += _STEP
         if idle >= kept:
-            testbed.platform.tell("close")
-            _counts(testbed)  # comes after it
+            testbed.platform.send("close")
+            _counts(testbed)  # its reply shows that the connections are closed
         testbed.move_clock(clock, _STEP)
     process.await_calm(_BETWEEN_STEPS)
 
@@ -79,6 +79,6 @@ def _way(before: _Counts, after: _Counts) -> str:
 
 
 def _counts(testbed: Testbed) -> _Counts:
-    testbed.platform.tell("counts")
+    testbed.platform.send("counts")
     handshakes, _lists, _reads, transferred, resumed = testbed.platform.wait_for("counts")
     return _Counts(handshakes, resumed, transferred)

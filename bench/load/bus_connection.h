@@ -7,19 +7,19 @@
 #include <string>
 #include <vector>
 
-/// A connection to a bus that owns some names and hands every call that comes to one function.
+/// A connection to a bus that owns some names and passes every incoming call to one function.
 class BusConnection
 {
 public:
-    /// Answers a call, which may be dropped as unknown: false.
+    /// Answers a call; returns false for an unknown one, which is then dropped.
     using Handler = std::function<bool(sd_bus_message*)>;
 
-    /// Ends the program with a message where the bus cannot be reached or a name is taken.
+    /// Ends the program with a message if the bus cannot be reached or a name is taken.
     BusConnection(int (*open)(sd_bus**), const std::vector<std::string>& names, Handler handler);
 
     [[nodiscard]] sd_bus* get() const { return m_bus.get(); }
 
-    /// Handles all that has come and sends what can be sent at once.
+    /// Handles everything that has arrived and sends what can be sent without blocking.
     void process();
 
 private:
@@ -29,5 +29,5 @@ private:
     Handler m_handler;
 };
 
-/// Ends the program where an sd-bus function has failed.
+/// Ends the program if an sd-bus function has failed.
 int require(int result, const char* what);

@@ -1,20 +1,19 @@
-/// Every service that a session agent talks to on both buses, fast enough not to be what is measured.
+/// All services that the agent uses on both buses, fast enough not to be the bottleneck.
 ///
 /// usage: bench_desktop [LAUNCHER_ITEMS [DOCK_ENTRIES]]
 ///
 /// Commands, one a line on the standard input:
 ///   * policies COUNT SIZE WINDOW: push COUNT policies of SIZE bytes, at most WINDOW of them at a time
 ///   * windows COUNT WINDOW: change the windows of the dock's entries COUNT times, at most WINDOW at a time
+///   * changes COUNT: let the launcher say COUNT times at once that its first item was updated
+///   * policy CODE: push a policy of this code
 ///   * wake: push a policy that is no JSON
 ///
 /// Lines on the standard output, with times of the monotonic clock in nanoseconds:
 ///   * ready
-///   * UpdateUserInfo TIME, onUploadFinished TIME
+///   * UpdateUserInfo TIME, onUploadFinished TIME, Terminate TIME
 ///   * entries TIME: all entries have been read
 ///   * done BEGIN END LATENCY...: a command has ended; the latencies stand there where WINDOW is 1
-
-#include "bus_connection.h"
-#include "services.h"
 
 #include <poll.h>
 #include <unistd.h>
@@ -27,12 +26,16 @@
 #include <string>
 #include <vector>
 
+#include "bus_connection.h"
+#include "services.h"
+
 namespace {
 
 const char* const kDaemon = "com.norix.velk.velkg";
 const char* const kDaemonPath = "/com/norix/velk/velkg";
 constexpr int kPropertiesOfEntry = 4;
 constexpr int kChangingEntries = 100;
+constexpr int kReportsOfChange = 2; // the change and the whole inventory
 
 long long now()
 {
@@ -41,12 +44,13 @@ long long now()
         .count();
 }
 
-/// A row of signals, each of which is answered by one call.
-struct Row
+/// A series of signals, each of which is answered by as many calls.
+struct Series
 {
     std::string kind;
     std::string payload;
     int count = 0;
+    int answersOfEach = 1;
     int window = 0;
     int sent = 0;
     int answered = 0;
@@ -54,7 +58,8 @@ struct Row
     long long lastSent = 0;
     std::vector<long long> latencies;
 
-    [[nodiscard]] bool mayGoOn() const { return sent < count && sent - answered < window; }
+    [[nodiscard]] bool mayGoOn() const { return sent < count && sent - answered / answersOfEach < window; }
+    [[nodiscard]] bool isOver() const { return answered == count * answersOfEach; }
 };
 
 class FastDesktop
@@ -95,9 +100,10 @@ private:
     bool handle(sd_bus_message* call)
     {
         const std::string member = sd_bus_message_get_member(call);
-        if (member == "UpdateUserInfo" || member == "onUploadFinished") {
+        if (member == "UpdateUserInfo" || member == "onUploadFinished" || member == "Terminate") {
             std::cout << member << ' ' << now() << '\n' << std::flush;
-        } else if (member == m_row.kind) {
+        }
+        if (member == m_series.kind) {
             countAnswer();
         }
         const bool isKnown = m_services.answer(call);
@@ -110,26 +116,37 @@ private:
 
     void countAnswer()
     {
-        ++m_row.answered;
-        if (m_row.window == 1) {
-            m_row.latencies.push_back(now() - m_row.lastSent);
+        ++m_series.answered;
+        if (m_series.window == 1) {
+            m_series.latencies.push_back(now() - m_series.lastSent);
         }
-        if (m_row.answered == m_row.count) {
-            std::cout << "done " << m_row.begin << ' ' << now();
-            for (const auto latency : m_row.latencies) {
+        if (m_series.isOver()) {
+            std::cout << "done " << m_series.begin << ' ' << now();
+            for (const auto latency : m_series.latencies) {
                 std::cout << ' ' << latency;
             }
             std::cout << '\n' << std::flush;
-            m_row = {};
+            m_series = {};
         }
     }
 
     void goOn()
     {
-        while (m_row.mayGoOn()) {
-            m_row.lastSent = now();
-            m_row.kind == "onPolicyMsg" ? push(m_row.payload) : changeWindows(m_row.sent);
-            ++m_row.sent;
+        while (m_series.mayGoOn()) {
+            m_series.lastSent = now();
+            send();
+            ++m_series.sent;
+        }
+    }
+
+    void send()
+    {
+        if (m_series.kind == "onPolicyMsg") {
+            push(m_series.payload);
+        } else if (m_series.kind == "onUploadFinished") {
+            updateItem();
+        } else {
+            changeWindows(m_series.sent);
         }
     }
 
@@ -138,6 +155,15 @@ private:
         require(sd_bus_emit_signal(m_system.get(), kDaemonPath, kDaemon, "pushPolicyMsg", "ss", "bench",
                                    payload.c_str()),
                 "push a policy");
+    }
+
+    void updateItem()
+    {
+        require(sd_bus_emit_signal(m_session.get(), "/com/norix/kpx/daemon/Launcher",
+                                   "com.norix.kpx.daemon.Launcher", "ItemChanged", "s(ssssxx)x", "update",
+                                   Services::itemFile(0).c_str(), Services::itemName(0).c_str(), "", "",
+                                   int64_t{0}, int64_t{0}, int64_t{0}),
+                "update an item");
     }
 
     /// Each entry gets a window, then each loses it, and so on.
@@ -182,16 +208,26 @@ private:
         words >> verb;
         if (verb == "wake") {
             push("wake up");
+        } else if (verb == "policy") {
+            std::string code;
+            words >> code;
+            push(R"({"type":)" + code + '}');
         } else if (verb == "policies") {
             size_t size = 0;
-            m_row.kind = "onPolicyMsg";
-            words >> m_row.count >> size >> m_row.window;
-            m_row.payload = policyOf(size);
-            m_row.begin = now();
+            m_series.kind = "onPolicyMsg";
+            words >> m_series.count >> size >> m_series.window;
+            m_series.payload = policyOf(size);
+            m_series.begin = now();
         } else if (verb == "windows") {
-            m_row.kind = "sendAppOpenState";
-            words >> m_row.count >> m_row.window;
-            m_row.begin = now();
+            m_series.kind = "sendAppOpenState";
+            words >> m_series.count >> m_series.window;
+            m_series.begin = now();
+        } else if (verb == "changes") {
+            m_series.kind = "onUploadFinished";
+            words >> m_series.count;
+            m_series.answersOfEach = kReportsOfChange;
+            m_series.window = m_series.count;
+            m_series.begin = now();
         }
     }
 
@@ -205,7 +241,7 @@ private:
 
     DesktopSize m_size;
     Services m_services;
-    Row m_row;
+    Series m_series;
     int m_readsOfLastEntry = 0;
     bool m_isWanted = true;
     BusConnection m_system;

@@ -2,17 +2,17 @@
 ///
 /// usage: bench_platform PORT CERTIFICATE KEY AUTHORITY
 ///
-/// Commands, one a line on the standard input:
-///   messages COUNT  so many are unread from now on; the reply to the password tips tells so too, which other
-///                   platforms' do not: an agent that is just starting begins to read at once
-///   close           shut all connections
-///   counts          asks for: counts HANDSHAKES LISTS READS BYTES (both ways, TLS included) RESUMED (of the
-///                   handshakes, those that resumed a TLS session)
+/// Commands, one per line on the standard input:
+///   messages COUNT  from now on COUNT messages are unread; the reply to the password tips reports them too,
+///   as no
+///                   other platform's does, so that an agent begins to read at its start
+///   close           close all connections
+///   counts          print: counts HANDSHAKES LISTS READS BYTES (both ways, with TLS) RESUMED (handshakes
+///   that
+///                   resumed a TLS session)
 /// On the standard output, with the monotonic clock in nanoseconds:
 ///   ready | tips TIME (answered) | listed TIME (no message was unread) | drained BEGIN END (the first list
 ///   request and the reply to the last mark)
-
-#include "tls.h"
 
 #include <netinet/in.h>
 #include <netinet/tcp.h>
@@ -29,6 +29,8 @@
 #include <string>
 #include <thread>
 
+#include "tls.h"
+
 namespace {
 
 long long now()
@@ -44,7 +46,7 @@ std::string reply(const std::string& headers, const std::string& body)
         + "Content-Length: " + std::to_string(body.size()) + "\r\n\r\n" + body;
 }
 
-/// What the platform knows; for any thread.
+/// The platform's messages; thread-safe.
 class MessageStore
 {
 public:
@@ -73,7 +75,7 @@ public:
                          + R"(","content":"text","created_at":"2026-01-01 00:00:00","read_at":""}])");
     }
 
-    /// The reply, and whether it is the last one of a row.
+    /// Returns the reply, and whether no message is unread any more.
     std::pair<std::string, bool> markRead()
     {
         const std::lock_guard lock(m_mutex);
@@ -88,13 +90,13 @@ public:
         return reply(m_unread > 0 ? count() : "", R"({"code":0,"data":{"result":false,"msg":""}})");
     }
 
-    void tellDrained()
+    void printDrained()
     {
         const std::lock_guard lock(m_mutex);
         std::cout << "drained " << m_begin << ' ' << now() << '\n' << std::flush;
     }
 
-    void tellCounts(int handshakes, uint64_t bytes, int resumed)
+    void printCounts(int handshakes, uint64_t bytes, int resumed)
     {
         const std::lock_guard lock(m_mutex);
         std::cout << "counts " << handshakes << ' ' << m_lists << ' ' << m_reads << ' ' << bytes << ' '
@@ -155,7 +157,7 @@ public:
             closeAll();
         } else if (verb == "counts") {
             const std::lock_guard lock(m_mutex);
-            m_store.tellCounts(m_handshakes, m_bytes, m_resumed);
+            m_store.printCounts(m_handshakes, m_bytes, m_resumed);
         }
     }
 
@@ -191,7 +193,7 @@ private:
                 const auto [text, isLast] = m_store.markRead();
                 stream.write(text);
                 if (isLast) {
-                    m_store.tellDrained();
+                    m_store.printDrained();
                 }
             } else {
                 stream.write(m_store.tips());

@@ -1,18 +1,18 @@
 #include "services.h"
 
-#include "bus_connection.h"
-
 #include <unistd.h>
 
 #include <cstdlib>
 #include <set>
 
+#include "bus_connection.h"
+
 namespace {
 
 const std::string kEntries = "/com/norix/kpx/daemon/Dock/entries/e";
 
-const std::set<std::string> kReports{"UpdateUserInfo", "SendUserStatus", "onUploadFinished",
-                                     "sendAppOpenState", "onPolicyMsg"};
+const std::set<std::string> kReports{"UpdateUserInfo",   "SendUserStatus", "onUploadFinished",
+                                     "sendAppOpenState", "onPolicyMsg",    "Terminate"};
 
 std::string plainUserName()
 {
@@ -51,6 +51,16 @@ private:
 std::string Services::entryPath(int number)
 {
     return kEntries + std::to_string(number);
+}
+
+std::string Services::itemName(int number)
+{
+    return "package-" + std::to_string(number);
+}
+
+std::string Services::itemFile(int number)
+{
+    return "/usr/share/applications/" + itemName(number) + ".desktop";
 }
 
 bool Services::toggleWindow(int number)
@@ -136,9 +146,8 @@ void Services::answerItems(sd_bus_message* call) const
     auto* reply = answer.message();
     sd_bus_message_open_container(reply, 'a', "(ssssxx)");
     for (int number = 0; number < m_size.launcherItems; ++number) {
-        const std::string name = "package-" + std::to_string(number);
-        const std::string file = "/usr/share/applications/" + name + ".desktop";
-        sd_bus_message_append(reply, "(ssssxx)", file.c_str(), name.c_str(), "", "", int64_t{0}, int64_t{0});
+        sd_bus_message_append(reply, "(ssssxx)", itemFile(number).c_str(), itemName(number).c_str(), "", "",
+                              int64_t{0}, int64_t{0});
     }
     sd_bus_message_close_container(reply);
 }

@@ -5,15 +5,15 @@
 #include <set>
 #include <string>
 
-/// How much the desktop's services have to tell.
+/// The number of items that the desktop's services report.
 struct DesktopSize
 {
     int launcherItems = 0; ///< 0: there is no launcher
     int dockEntries = 0;
 };
 
-/// Answers to what a session agent asks of logind, the dock, the launcher, the notifications, the screen
-/// saver and the session manager. An entry of the dock has no window at first; all are docked.
+/// Answers the agent's calls to logind, the dock, the launcher, the notifications, the screen saver and the
+/// session manager. An entry of the dock has no window at first; all are docked.
 class Services
 {
 public:
@@ -21,12 +21,15 @@ public:
         : m_size(size)
     { }
 
-    /// Answers a call; false if nobody knows its member.
+    /// Answers a call; returns false if no service has its member.
     bool answer(sd_bus_message* call) const;
 
     static std::string entryPath(int number);
+    /// An item of the launcher: its package, and its desktop file.
+    static std::string itemName(int number);
+    static std::string itemFile(int number);
 
-    /// Gives an entry its window or takes it away; the result is whether it has one now.
+    /// Opens or closes the window of an entry; returns whether it has one now.
     bool toggleWindow(int number);
 
 private:

@@ -7,6 +7,7 @@
 #include <string>
 
 /// A server's side of TLS; who connects needs a certificate of the given authority. Files are PEM.
+/// The server of sandbox/platform/https.py does the same, but a rate measured against it would be its own.
 class TlsContext
 {
 public:

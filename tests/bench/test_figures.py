@@ -8,7 +8,7 @@ from typing import Sequence
 import pytest
 
 from bench.comparison import Change, changes, missing
-from bench.figures import Figure, Goal, Kind, Report, load, number, spread
+from bench.figures import Figure, Goal, Kind, Report, load, number
 
 
 def figure(
@@ -33,11 +33,6 @@ def test_figure_without_a_floor_has_no_ratio() -> None:
 def test_nothing_is_as_much_as_nothing_and_anything_is_more() -> None:
     assert figure([0], [0]).ratio == 1
     assert figure([1], [0]).ratio == float("inf")
-
-
-def test_spread_is_the_distance_of_the_extremes_relative_to_the_median() -> None:
-    assert spread([90, 100, 120]) == pytest.approx(0.3)
-    assert spread([0, 0]) == 0
 
 
 @pytest.mark.parametrize(
@@ -71,7 +66,7 @@ def test_numbers_show_three_digits_that_count(value: float, text: str) -> None:
 
 
 def test_report_comes_back_from_its_file_as_it_was(tmp_path: Path) -> None:
-    report = Report({"machine": 1}, [figure([1, 2], [3], Goal("at most", 2)), figure()])
+    report = Report({"start": {"others": 0.5}}, [figure([1, 2], [3], Goal("at most", 2)), figure()])
     report.save(tmp_path / "report.json")
 
     read = load(tmp_path / "report.json")
@@ -82,6 +77,13 @@ def test_report_comes_back_from_its_file_as_it_was(tmp_path: Path) -> None:
     ]
 
 
+def test_report_of_an_older_form_is_refused(tmp_path: Path) -> None:
+    Report({"start": {"load": 1}}).save(tmp_path / "report.json")
+
+    with pytest.raises(ValueError, match="older form"):
+        load(tmp_path / "report.json")
+
+
 @pytest.mark.parametrize(
     ("kind", "now", "is_rise"),
     [("memory", 111, True), ("instructions", 111, True), ("memory", 109, False), ("time", 300, False)],
@@ -90,6 +92,13 @@ def test_only_instructions_and_memory_more_than_a_tenth_above_are_a_rise(
     kind: Kind, now: float, is_rise: bool
 ) -> None:
     assert Change(figure([now], kind=kind), figure([100], kind=kind)).is_rise is is_rise
+
+
+def test_what_has_risen_with_its_floor_is_no_rise() -> None:
+    before = figure([100], [50])
+
+    assert not Change(figure([130], [65]), before).is_rise
+    assert Change(figure([130], [50]), before).is_rise
 
 
 def test_figures_are_compared_by_their_names() -> None:
