@@ -7,6 +7,7 @@ and the desktop's services (guest/).
 from __future__ import annotations
 
 import json
+import re
 import subprocess
 from dataclasses import dataclass
 from pathlib import Path
@@ -25,8 +26,8 @@ DAEMON = ("com.norix.velk.velkg", "/com/norix/velk/velkg", "com.norix.velk.velkg
 
 
 @dataclass(frozen=True)
-class Event:
-    """What a fake service was asked."""
+class Asked:
+    """What a fake service was asked, or the begin of a session."""
 
     who: str
     member: str
@@ -36,7 +37,7 @@ class Event:
 
 
 @dataclass(frozen=True)
-class Session:
+class LogIn:
     """A log-in that a test has made; the unit is that of its first program."""
 
     unit: str
@@ -48,8 +49,8 @@ class Machine:
     """The terminal, from its first boot until it is closed. It may reboot in between."""
 
     def __init__(self, name: str, log: Path) -> None:
-        self._overlay = Overlay(name)
-        self._overlay.prepare()
+        self.overlay = Overlay(name)
+        self.overlay.prepare()
         self._name = name
         self._log = log
         self._sessions = 0
@@ -87,7 +88,7 @@ class Machine:
         place.write_text(content)
 
     def install(self, package: Path) -> str:
-        """Install a package as an administrator does on a running machine; what its scripts told."""
+        """Install a package as an administrator does on a running machine; what its scripts printed."""
         place = Path(f"/proc/{self._boot.leader}/root/root/agent.deb")
         place.write_bytes(package.read_bytes())
         return self.run("dpkg", "--force-downgrade,unsafe-io", "--install", "/root/agent.deb").stdout
@@ -99,7 +100,7 @@ class Machine:
         kind: str = "wayland",
         session_class: str = "user",
         seat: str = "seat0",
-    ) -> Session:
+    ) -> LogIn:
         """Begin a session whose program is the desktop of guest/desktop.py; a `kind` of "tty" has none."""
         self._sessions += 1
         unit = f"log-in-{self._sessions}.service"
@@ -118,9 +119,9 @@ class Machine:
         else:
             begun = self.wait_for_event(lambda e: e.who == "session" and e.uid == _UIDS[user], mark)
             name = begun.args[0]
-        return Session(unit, user, name)
+        return LogIn(unit, user, name)
 
-    def log_out(self, session: Session) -> None:
+    def log_out(self, session: LogIn) -> None:
         """End a session as its desktop does; returns when the login manager has forgotten it."""
         self.run("systemctl", "stop", session.unit)
         wait_for(f"the end of session {session.name}", lambda: session.name not in self.session_names())
@@ -136,9 +137,7 @@ class Machine:
         self.run("systemctl", "stop", "log-in-*.service", check=False)
         for name in self.session_names():
             self.run("loginctl", "terminate-session", name, check=False)
-        wait_for(
-            "the end of all user managers", lambda: not self.said("loginctl", "--no-legend", "list-users")
-        )
+        wait_for("the end of all user managers", self._has_no_users)
 
     def agent(self, user: str) -> int:
         """Process id of the user's agent, 0 if none runs."""
@@ -152,10 +151,18 @@ class Machine:
 
         def ready() -> int:
             pid = self.agent(user)
-            told = any(event.member == "SendUserStatus" and event.pid == pid for event in self.events())
-            return pid if told and pid != other_than else 0
+            has_reported = any(
+                event.member == "SendUserStatus" and event.pid == pid for event in self.events()
+            )
+            return pid if has_reported and pid != other_than else 0
 
         return wait_for(f"an agent of {user}", ready)
+
+    def starts_skipped(self) -> int:
+        """How often conditions have kept an agent from starting, as the service managers tell."""
+        return len(
+            re.findall(r"velks\.service.* [Ss]kipped", self.said("journalctl", "--boot", "--unit=user@*"))
+        )
 
     def agents(self) -> list[int]:
         """The uids that agents run for."""
@@ -165,10 +172,10 @@ class Machine:
         # A child that has not become another program yet is no agent.
         return sorted(uid for _, parent, uid in rows if parent not in known)
 
-    def events(self) -> list[Event]:
+    def events(self) -> list[Asked]:
         """All that the fakes were asked since the boot."""
         lines = Path(f"/proc/{self._boot.leader}/root/run/booted/events").read_text().splitlines()
-        return [Event(**json.loads(line)) for line in lines]
+        return [Asked(**json.loads(line)) for line in lines]
 
     def count(self, member: str, after: int) -> int:
         """How often a member was called since then."""
@@ -178,7 +185,7 @@ class Machine:
         """The place in `events` where what comes now begins."""
         return len(self.events())
 
-    def wait_for_event(self, wanted: Callable[[Event], bool], after: int = 0) -> Event:
+    def wait_for_event(self, wanted: Callable[[Asked], bool], after: int = 0) -> Asked:
         """The first event of this kind."""
         return wait_for("an event", lambda: next((e for e in self.events()[after:] if wanted(e)), None))
 
@@ -188,36 +195,66 @@ class Machine:
         self.command_daemon("Emit", DAEMON[1], DAEMON[2], "pushPolicyMsg", "booted", text)
 
     def command_daemon(self, member: str, *arguments: str) -> None:
-        """Tell root's fakes what to do: see guest/services.py."""
+        """Configure root's fakes: see guest/services.py."""
         self.run("busctl", "call", DAEMON[0], DAEMON[1], CONTROL, member, "s" * len(arguments), *arguments)
+
+    def command_desktop(self, user: str, member: str, *arguments: str) -> None:
+        """Tell the fakes of a user's desktop what to do."""
+        service = ["com.norix.kpx.Notification", "/com/norix/kpx/Notification", CONTROL]
+        command = ["busctl", "--user", "call", *service, member, "s" * len(arguments), *arguments]
+        self.run(*command, user=user)
 
     def wait_for_reboot(self) -> None:
         """Return when the machine has rebooted itself and runs again."""
-        wait_for("a reboot", lambda: self._boot.ended)
+        self._wait_for_end()
         assert self._boot.rebooted, "the machine went off"
-        self._boot.stop()
         self._boot = self._begin()
+
+    def wait_for_power_off(self) -> None:
+        """Return when the machine has gone off, and been switched on again."""
+        self._wait_for_end()
+        assert not self._boot.rebooted, "the machine rebooted"
+        self._boot = self._begin()
+
+    def _wait_for_end(self) -> None:
+        wait_for("the machine's end", lambda: self._boot.ended)
+        self._boot.stop()
+
+    def check(self, user: str = "alice") -> str:
+        """What velks-check tells the user, in a session, or the policy kit would refuse all."""
+        asked = ["systemd-run", "--user", "--quiet", "--pipe", "--wait", "--collect", "velks-check"]
+        return self.said(*asked, user=user)
+
+    def reload_bus(self) -> None:
+        """Have the system bus read its policies and services anew."""
+        bus = "org.freedesktop.DBus"
+        self.run("busctl", "call", bus, "/", bus, "ReloadConfig")
+
+    def has_service(self, name: str) -> bool:
+        """Whether somebody owns a name on the system bus."""
+        bus = "org.freedesktop.DBus"
+        return self.said("busctl", "call", bus, "/", bus, "NameHasOwner", "s", name) == "b true"
 
     def uptime(self) -> float:
         """Seconds since the host has booted, which the machine's processes live by."""
         return float(self.said("cut", "--delimiter= ", "--fields=1", "/proc/uptime"))
 
-    @property
-    def ended(self) -> bool:
-        """Whether the machine has gone down by itself."""
-        return self._boot.ended
-
     def close(self) -> None:
         """End the machine at once and forget what it wrote."""
         self._boot.stop()
-        self._overlay.close()
+        self.overlay.close()
 
     def _begin(self) -> Boot:
-        boot = Boot(self._name, self._overlay.root, self._log)
+        boot = Boot(self._name, self.overlay.root, self._log)
         self._boot = boot
         wait_for("the boot", lambda: self.said("systemctl", "is-system-running") in {"running", "degraded"})
-        wait_for("the daemon", lambda: self.run("busctl", "status", DAEMON[0], check=False).returncode == 0)
+        wait_for("the daemon", lambda: self.has_service(DAEMON[0]))
         return boot
+
+    def _has_no_users(self) -> bool:
+        # It fails if a user goes while it asks.
+        listed = self.run("loginctl", "--no-legend", "list-users", check=False)
+        return listed.returncode == 0 and not listed.stdout.strip()
 
     def _text_session(self, user: str) -> str:
         for name in self.session_names(user):

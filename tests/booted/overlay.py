@@ -1,7 +1,7 @@
 """A root file system for a booted machine: that of this machine, with all changes kept in memory apart.
 
-VELK_BOOTED_ROOT names another folder to take, such as the root of another release, with the packages of the
-group [booted] and those that the agent depends on.
+VELK_BOOTED_ROOT names another folder to take, such as a root that `./dev elsewhere --keep` has left, with the
+packages of the group [booted] and those that the agent depends on.
 """
 
 from __future__ import annotations
@@ -10,6 +10,7 @@ import os
 import shutil
 import subprocess
 from pathlib import Path
+from typing import Sequence
 
 from tests.booted.patience import REPOSITORY
 
@@ -88,11 +89,36 @@ class Overlay:
         place.write_text(content)
         place.chmod(0o644)
 
+    def apt(self, *arguments: str, folder: Path | None = None) -> str:
+        """What apt-get says of the packages of the machine's release. It runs here, where a network is."""
+        ended = self._try_apt(arguments, folder)
+        if ended.returncode:  # there are no package lists, or old ones
+            self._try_apt(["update"], folder)
+            ended = self._try_apt(arguments, folder)
+        assert ended.returncode == 0, f"apt-get {' '.join(arguments)}: {ended.stderr}; is there a network?"
+        return ended.stdout
+
+    def bring_programs(self, package: str) -> None:
+        """Unpack a package without installing it: none of its services is enabled or started."""
+        place = self.root / "root" / package
+        if place.exists():
+            return
+        place.mkdir()
+        self.apt("download", package, folder=place)
+        (archive,) = place.glob("*.deb")
+        with subprocess.Popen(["dpkg-deb", "--fsys-tarfile", archive], stdout=subprocess.PIPE) as content:
+            unpack = ["tar", "--extract", "--keep-directory-symlink", f"--directory={self.root}"]
+            subprocess.run(unpack, stdin=content.stdout, check=True)
+
     def close(self) -> None:
         """Forget all changes."""
         for mounted in (self.root, self._folder):
             subprocess.run(["umount", "--lazy", mounted], check=True)
         self._folder.rmdir()
+
+    def _try_apt(self, arguments: Sequence[str], folder: Path | None) -> subprocess.CompletedProcess[str]:
+        options = ["-o", f"Dir={self.root}", "-o", "APT::Sandbox::User=root", "--quiet"]
+        return subprocess.run(["apt-get", *options, *arguments], cwd=folder, capture_output=True, text=True)
 
     def _forget_units(self) -> None:
         """Nothing that this machine has enabled starts in the other."""

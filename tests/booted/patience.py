@@ -6,19 +6,17 @@ import time
 from pathlib import Path
 from typing import Callable, TypeVar
 
+from sandbox.events import NotSeen
+
 REPOSITORY = Path(__file__).resolve().parents[2]
-_PATIENCE = 60.0
+_PATIENCE = 120.0  # also of a machine that is busy with much else
 _PAUSE = 0.05
 
 Seen = TypeVar("Seen")
 
 
-class NotSeen(Exception):
-    """What was waited for did not come."""
-
-
 def wait_for(what: str, look: Callable[[], Seen | None], seconds: float = _PATIENCE) -> Seen:
-    """Look until something is seen, and return it. `what` is told if it never is."""
+    """Look until something is seen, and return it. A failure names `what`."""
     end = time.monotonic() + seconds
     while True:
         seen = look()

@@ -6,8 +6,10 @@ from typing import Iterator
 
 import pytest
 
+from tests.booted.conftest import DROP_IN
 from tests.booted.machine import Machine
 from tests.booted.patience import wait_for
+from tests.booted.refusals import wait_for_refusal
 
 SCRIPT = "/usr/share/velk/scripts/restore_config.bash"
 GONE_SECONDS = 10.0  # what docs/service.md promises
@@ -29,15 +31,12 @@ PROBES = {
 
 
 @pytest.fixture
-def exiting(machine: Machine) -> Iterator[Machine]:
+def exiting(machine: Machine, inhibited: None) -> Iterator[Machine]:
     """The machine with alice logged in, whose agent is ready, and a reboot that root does not permit."""
-    inhibitor = ["systemd-inhibit", "--what=shutdown", "--mode=block", "sleep", "infinity"]
-    machine.run("systemd-run", "--quiet", "--unit=inhibitor", *inhibitor)
     machine.log_in("alice")
     machine.wait_for_agent("alice")
     yield machine
     machine.end_sessions()
-    machine.run("systemctl", "stop", "inhibitor", check=False)  # it has gone if the machine has rebooted
     machine.run("rm", "-f", SCRIPT)
 
 
@@ -54,6 +53,20 @@ def test_script_can_do_what_the_session_can(exiting: Machine) -> None:
     leave_domain(exiting, "\n".join([*lines, "echo end >>~/said"]))
     wait_for("the script's end", lambda: "end" in said(exiting))
     assert said(exiting) == [*PROBES, "end"], exiting.said("cat", "/home/alice/log")
+
+
+def test_exit_is_whole_under_the_example_of_a_drop_in(hasty: Machine, inhibited: None) -> None:
+    example = "/usr/share/doc/velk-session-agent/examples/hardening.conf"
+    hasty.run("cp", example, DROP_IN)
+    hasty.run("rm", "-f", "/home/alice/said")
+    hasty.log_in("alice")
+    hasty.wait_for_agent("alice")
+    mark = hasty.mark()
+    hasty.write(SCRIPT, "grep NoNewPrivs /proc/self/status >~/said")
+    wait_for_refusal(hasty)
+    told = [event.member for event in hasty.events()[mark:] if event.member in {"onDomainConfig", "Set"}]
+    assert (said(hasty), told) == (["NoNewPrivs:\t1"], ["onDomainConfig", "Set"])
+    hasty.run("rm", SCRIPT)
 
 
 def said(machine: Machine) -> list[str]:

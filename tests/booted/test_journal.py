@@ -4,6 +4,8 @@ from __future__ import annotations
 
 import json
 
+import pytest
+
 from tests.booted.machine import USERS, Machine
 from tests.booted.patience import wait_for
 
@@ -26,15 +28,36 @@ def push_many(machine: Machine, count: int, text: str) -> None:
     )
 
 
+@pytest.mark.quick
 def test_entry_says_who_logged_what_and_where(machine: Machine) -> None:
     machine.log_in("alice")
     machine.wait_for_agent("alice")
-    machine.push_policy("told once")
-    (entry,) = wait_for("the entry", lambda: entries(machine, "told once"))
+    machine.push_policy("logged once")
+    (entry,) = wait_for("the entry", lambda: entries(machine, "logged once"))
     assert entry["CODE_FUNC"] == "MessageTransfer::onPolicyMsg"
     assert entry["CODE_FILE"] == "src/velk/velks/message_transfer.cpp"
     assert (entry["PRIORITY"], entry["_UID"]) == ("6", str(USERS["alice"]))
     assert entry["SYSLOG_IDENTIFIER"] == "velks"
+
+
+# Who asks, as options of setpriv, and whether alice's lines are for them.
+READERS = {
+    "--reuid=1000 --regid=1000 --clear-groups": True,
+    "--reuid=1001 --regid=1001 --clear-groups": False,
+    "--reuid=1001 --regid=1001 --groups=adm": True,
+    "--reuid=1001 --regid=1001 --groups=systemd-journal": True,
+}
+
+
+@pytest.mark.quick
+@pytest.mark.parametrize("reader", READERS)
+def test_lines_are_for_the_user_and_administrators(machine: Machine, reader: str) -> None:
+    machine.log_in("alice")
+    machine.wait_for_agent("alice")
+    machine.push_policy("a secret")
+    wait_for("the entry", lambda: entries(machine, "a secret"))
+    asked = ["journalctl", "--quiet", "--boot", "--output=cat", "_SYSTEMD_USER_UNIT=velks.service"]
+    assert ("a secret" in machine.said("setpriv", *reader.split(), *asked)) == READERS[reader]
 
 
 def test_burst_of_policies_is_forwarded_whole(machine: Machine) -> None:
@@ -42,7 +65,7 @@ def test_burst_of_policies_is_forwarded_whole(machine: Machine) -> None:
     machine.wait_for_agent("alice")
     mark = machine.mark()
     push_many(machine, BURST, '{"type": 5}')
-    wait_for("all policies", lambda: machine.count("onPolicyMsg", mark) == BURST, seconds=120)
+    wait_for("all policies", lambda: machine.count("onPolicyMsg", mark) == BURST, seconds=240)
 
 
 def test_journal_that_is_frozen_holds_nothing_up(machine: Machine) -> None:

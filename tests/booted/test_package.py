@@ -13,7 +13,10 @@ from tests.booted.conftest import PACKAGE
 from tests.booted.machine import USERS, Machine
 from tests.booted.patience import wait_for
 
+pytestmark = pytest.mark.quick
+
 NAME = "velk-session-agent"
+COMPILER = re.compile(r"(gcc|g\+\+|cpp|clang|llvm|tcc)(-|$)|(make|binutils|dpkg-dev|build-essential)$")
 
 
 @pytest.fixture(scope="session")
@@ -31,7 +34,7 @@ def newer(tmp_path_factory: pytest.TempPathFactory) -> Path:
 
 
 @pytest.fixture
-def terminal(machine: Machine) -> Iterator[Machine]:
+def machine(machine: Machine) -> Iterator[Machine]:
     """The machine, with the package as it was once the test is over."""
     yield machine
     machine.end_sessions()
@@ -46,37 +49,37 @@ def program_of(machine: Machine, pid: int) -> str:
 
 
 def test_upgrade_and_downgrade_renew_each_running_agent_and_start_no_other(
-    terminal: Machine, newer: Path
+    machine: Machine, newer: Path
 ) -> None:
-    terminal.run("systemctl", "start", f"user@{USERS['bob']}.service")  # a manager without a session
-    terminal.log_in("alice")
-    terminal.log_in("zhang@corp.example", "autostart")
-    terminal.log_in("@li", kind="tty", seat="")
-    sessions = terminal.session_names()
+    machine.run("systemctl", "start", f"user@{USERS['bob']}.service")  # a manager without a session
+    machine.log_in("alice")
+    machine.log_in("zhang@corp.example", "autostart")
+    machine.log_in("@li", kind="tty", seat="")
+    sessions = machine.session_names()
     for package in (newer, PACKAGE):
-        old = {user: terminal.wait_for_agent(user) for user in ("alice", "zhang@corp.example")}
-        terminal.install(package)
+        old = {user: machine.wait_for_agent(user) for user in ("alice", "zhang@corp.example")}
+        machine.install(package)
         for user, pid in old.items():
-            fresh = terminal.wait_for_agent(user, other_than=pid)
-            assert program_of(terminal, fresh) == "/usr/bin/velks"
-        assert terminal.agents() == [USERS["alice"], USERS["zhang@corp.example"]]
-    assert terminal.session_names() == sessions
-    terminal.run("systemctl", "stop", f"user@{USERS['bob']}.service")
+            fresh = machine.wait_for_agent(user, other_than=pid)
+            assert program_of(machine, fresh) == "/usr/bin/velks"
+        assert machine.agents() == [USERS["alice"], USERS["zhang@corp.example"]]
+    assert machine.session_names() == sessions
+    machine.run("systemctl", "stop", f"user@{USERS['bob']}.service")
 
 
 def test_upgrade_leaves_an_agent_alone_that_is_about_to_end_its_session(
-    terminal: Machine, newer: Path
+    machine: Machine, newer: Path
 ) -> None:
-    terminal.log_in("alice")
-    agent = terminal.wait_for_agent("alice")
-    mark = terminal.mark()
-    terminal.push_policy({"type": 1201})
-    terminal.wait_for_event(lambda event: event.member == "Notify", mark)
-    wait_for("the countdown in the unit's status", lambda: status_of(terminal))
-    told = terminal.install(newer)
-    assert "velks of user 1000 carries out a policy that ends the session; it is not restarted" in told
-    assert terminal.agent("alice") == agent
-    assert "runs an older program than the one installed" in terminal.said("velks-check", user="alice")
+    machine.log_in("alice")
+    agent = machine.wait_for_agent("alice")
+    mark = machine.mark()
+    machine.push_policy({"type": 1201})
+    machine.wait_for_event(lambda event: event.member == "Notify", mark)
+    wait_for("the countdown in the unit's status", lambda: status_of(machine))
+    printed = machine.install(newer)
+    assert "velks of user 1000 carries out a policy that ends the session; it is not restarted" in printed
+    assert machine.agent("alice") == agent
+    assert "runs an older program than the one installed" in machine.said("velks-check", user="alice")
 
 
 def status_of(machine: Machine) -> str:
@@ -86,68 +89,87 @@ def status_of(machine: Machine) -> str:
     )
 
 
-def test_removal_ends_the_agents_and_their_start_and_a_new_log_in_brings_them_back(terminal: Machine) -> None:
-    terminal.log_in("alice", "autostart")
-    terminal.log_in("bob")
-    sessions = terminal.session_names()
+def test_removal_ends_the_agents_and_their_start_and_a_new_log_in_brings_them_back(machine: Machine) -> None:
+    machine.log_in("alice", "autostart")
+    machine.log_in("bob")
+    sessions = machine.session_names()
     for user in ("alice", "bob"):
-        terminal.wait_for_agent(user)
-    terminal.run("dpkg", "--remove", NAME)
-    wait_for("the agents' end", lambda: not terminal.agents())
-    assert terminal.session_names() == sessions
-    entry = terminal.log_in("alice", "autostart", seat="")  # the entry is configuration, which stays
-    terminal.run("systemctl", "--user", "restart", "booted-desktop.target", user="bob")
-    assert "not-found" in terminal.said(
+        machine.wait_for_agent(user)
+    machine.run("dpkg", "--remove", NAME)
+    wait_for("the agents' end", lambda: not machine.agents())
+    assert machine.session_names() == sessions
+    entry = machine.log_in("alice", "autostart", seat="")  # the entry is configuration, which stays
+    machine.run("systemctl", "--user", "restart", "booted-desktop.target", user="bob")
+    assert "not-found" in machine.said(
         "systemctl", "--user", "show", "velks", "--property=LoadState", user="bob"
     )
-    assert terminal.agents() == []
-    terminal.log_out(entry)
-    terminal.install(PACKAGE)
-    terminal.end_sessions()
-    terminal.log_in("bob")
-    terminal.wait_for_agent("bob")
+    assert machine.agents() == []
+    machine.log_out(entry)
+    machine.install(PACKAGE)
+    machine.end_sessions()
+    machine.log_in("bob")
+    machine.wait_for_agent("bob")
 
 
-def test_removal_tells_of_a_countdown_that_it_drops(terminal: Machine) -> None:
-    session = terminal.log_in("alice")
-    terminal.wait_for_agent("alice")
-    terminal.push_policy({"type": 1201})
-    wait_for("the countdown in the unit's status", lambda: status_of(terminal))
-    told = terminal.run("dpkg", "--remove", NAME).stdout
-    assert "velks of user 1000 was about to end the session by a policy; that is dropped" in told
-    assert session.name in terminal.session_names()
+def test_installation_after_a_removal_starts_no_agent_by_itself(machine: Machine) -> None:
+    session = machine.log_in("alice")
+    old = machine.wait_for_agent("alice")
+    machine.run("dpkg", "--remove", NAME)
+    machine.install(PACKAGE)
+    assert (machine.agents(), machine.session_names()) == ([], [session.name])
+    machine.run("systemctl", "--user", "start", "velks", user="alice")
+    machine.wait_for_agent("alice", other_than=old)
 
 
-def test_purge_leaves_nothing(terminal: Machine) -> None:
-    terminal.log_in("alice")
-    terminal.wait_for_agent("alice")
-    terminal.run("dpkg", "--purge", NAME)
-    assert terminal.agents() == []
-    left = terminal.said(
+def test_installation_on_a_bare_system_draws_in_no_compiler(machine: Machine, tmp_path: Path) -> None:
+    nothing = tmp_path / "status"
+    nothing.touch()
+    plan = machine.overlay.apt("-o", f"Dir::State::status={nothing}", "--simulate", "install", str(PACKAGE))
+    names = re.findall(r"(?m)^Inst (\S+)", plan)
+    assert {NAME, "polkitd", "libpam-systemd"} <= set(names)
+    assert [name for name in names if COMPILER.match(name) and not name.endswith("-base")] == []
+
+
+def test_removal_reports_a_countdown_that_it_drops(machine: Machine) -> None:
+    session = machine.log_in("alice")
+    machine.wait_for_agent("alice")
+    machine.push_policy({"type": 1201})
+    wait_for("the countdown in the unit's status", lambda: status_of(machine))
+    printed = machine.run("dpkg", "--remove", NAME).stdout
+    assert "velks of user 1000 was about to end the session by a policy; that is dropped" in printed
+    assert session.name in machine.session_names()
+
+
+def test_purge_leaves_nothing(machine: Machine) -> None:
+    machine.log_in("alice")
+    machine.wait_for_agent("alice")
+    machine.run("dpkg", "--purge", NAME)
+    assert machine.agents() == []
+    left = machine.said(
         "find", "/etc", "/usr", "/var/lib/systemd", "-path", "*velks*", "-not", "-path", "*/booted*"
     )
     assert left == ""
 
 
-def test_mask_holds_over_an_upgrade(terminal: Machine, newer: Path) -> None:
-    terminal.run("systemctl", "--global", "mask", "velks.service")
-    terminal.install(newer)
+def test_mask_holds_over_an_upgrade(machine: Machine, newer: Path) -> None:
+    machine.run("systemctl", "--global", "mask", "velks.service")
+    machine.install(newer)
     for way in ("target", "autostart"):
-        session = terminal.log_in("alice", way)
-        terminal.run("systemctl", "--user", "start", "default.target", user="alice")
-        assert terminal.agents() == []
-        terminal.log_out(session)
+        session = machine.log_in("alice", way)
+        machine.run("systemctl", "--user", "start", "default.target", user="alice")
+        assert machine.agents() == []
+        machine.log_out(session)
 
 
-def test_installed_units_are_understood_also_with_the_example_of_a_drop_in(terminal: Machine) -> None:
-    terminal.run(
+def test_installed_units_are_understood_also_with_the_example_of_a_drop_in(machine: Machine) -> None:
+    machine.run(
         *["install", "-D", "--mode=644", f"/usr/share/doc/{NAME}/examples/hardening.conf"],
         "/etc/systemd/user/velks.service.d/hardening.conf",
     )
-    terminal.log_in("alice")
-    agent = terminal.wait_for_agent("alice")
-    assert "NoNewPrivs:\t1" in terminal.said("cat", f"/proc/{agent}/status")
+    machine.log_in("alice")
+    agent = machine.wait_for_agent("alice")
+    assert "NoNewPrivs:\t1" in machine.said("cat", f"/proc/{agent}/status")
     units = ["velks.service", "velks-session@1.path", "velks-session@1.service"]
-    verified = terminal.run("systemd-analyze", "--user", "--man=no", "verify", *units, user="alice")
+    verified = machine.run("systemd-analyze", "--user", "--man=no", "verify", *units, user="alice")
     assert (verified.stdout, verified.stderr) == ("", "")
-    terminal.run("rm", "-r", "/etc/systemd/user/velks.service.d")
+    machine.run("rm", "-r", "/etc/systemd/user/velks.service.d")

@@ -41,6 +41,7 @@ class Services:
         self._who = who
         self._bus = bus
         self._answers = answers
+        self._muted = ""
         bus.add_message_filter(self._on_message)
         for name in names:
             bus.request_name(name)
@@ -58,7 +59,7 @@ class Services:
         member = str(message.get_member())
         args = json.loads(json.dumps(message.get_args_list(), default=str))
         record(self._who, member, args, *self._sender(message.get_sender()))
-        if message.get_no_reply():
+        if message.get_no_reply() or member == self._muted:
             return
         key = (str(args[0]), f"{member} {args[1]}") if member in ("Get", "Set") else None
         known = self._answers.get(key or (str(message.get_interface()), member))
@@ -79,15 +80,21 @@ class Services:
         return found
 
     def _obey(self, message: Any) -> None:
-        """A test's wish: `Emit` a signal of strings, or `EmitMany` of it."""
+        """A test's wish: `Emit` a signal of strings, `EmitMany` of it, or `Mute` a member for good."""
         args = [str(arg) for arg in message.get_args_list()]
-        times = int(args.pop(0)) if message.get_member() == "EmitMany" else 1
-        path, interface, member, *values = args
+        if message.get_member() == "Mute":
+            (self._muted,) = args
+        elif message.get_member() == "EmitMany":
+            self._emit(int(args[0]), *args[1:])
+        else:
+            self._emit(1, *args)
+        self._reply(message, "", None)
+
+    def _emit(self, times: int, path: str, interface: str, member: str, *values: str) -> None:
         for _ in range(times):
             signal = dbus.lowlevel.SignalMessage(path, interface, member)
             signal.append(*values, signature="s" * len(values))
             self._bus.send_message(signal)
-        self._reply(message, "", None)
 
     def _reply(self, message: Any, signature: str, value: Any) -> None:
         reply = dbus.lowlevel.MethodReturnMessage(message)
