@@ -1,7 +1,19 @@
-# Looks at a command's arguments before anything else is done. What there is stands in the command's help: a line
-# that begins with two blanks and a word names an option, with what follows it, or something else that may be given.
+# Checks a command's arguments before anything else runs. The command's help defines them. A line that begins with two
+# blanks and a word names an option, with its value, or another argument; a line that begins with more blanks and a
+# number names a scene.
 
-# Fills ARGUMENTS with the words after the command; names of files are made absolute, since ./dev works at its root.
+readonly WRONG_ARGUMENTS=2 # exit status, as of most programs
+
+# Checks variables of the environment like arguments.
+read_variables() {
+    local presets
+    presets=$(sed -n 's/.*{"name": "\([^"]*\)", "configurePreset".*/\1/p' CMakePresets.json)
+    grep -qxF -- "$PRESET" <<<"$presets" ||
+        fail "VELK_PRESET: there is no preset '$PRESET'; there are: ${presets//$'\n'/, }" "$WRONG_ARGUMENTS"
+    is_number "$TEST_JOBS" || fail "VELK_TEST_JOBS: '$TEST_JOBS' is not a whole number of at least 1" "$WRONG_ARGUMENTS"
+}
+
+# Fills ARGUMENTS with the words after the command; makes file names absolute, since ./dev works at its root.
 read_arguments() {
     local command=$1 word value_kind
     shift
@@ -27,22 +39,24 @@ read_arguments() {
                 shift
                 ;;
             *)
-                if takes_rest "$command" "$word"; then
-                    ARGUMENTS+=("$word" "$@")
-                    return
-                fi
+                [[ $command != mutate ]] || word=${word##*/}
                 knows_word "$command" "$word" || refuse "$command" "there is no '$word' here"
                 ARGUMENTS+=("$word")
+                if takes_rest "$command"; then
+                    [[ ! ${1:-} =~ ^(-h|--help)$ ]] || exec cat "$PARTS/help/$command.txt"
+                    ARGUMENTS+=("$@")
+                    return
+                fi
                 ;;
         esac
     done
 }
 
 refuse() {
-    fail "$1: $2; see ./dev $1 --help"
+    fail "$1: $2; see ./dev $1 --help" "$WRONG_ARGUMENTS"
 }
 
-# What follows an option, empty if nothing does; an option that is not in the help is refused.
+# The kind of an option's value, empty if it takes none; refuses an option that is not in the help.
 option_value() {
     local name kind
     while read -r name kind _; do
@@ -56,35 +70,61 @@ option_value() {
 take_value() {
     local command=$1 option=$2 kind=$3 value=$4
     case $kind in
-        N | KIB | SECONDS) [[ $value =~ ^[0-9]+$ && $value != 0* ]] || refuse "$command" "'$value' is no whole number from 1 upwards" ;;
-        LIST) [[ $value =~ ^[1-9][0-9]*(,[1-9][0-9]*)*$ ]] || refuse "$command" "'$value' is no list of numbers, such as 4,10" ;;
+        N | KIB | SECONDS) is_number "$value" || refuse "$command" "'$value' is not a whole number of at least 1" ;;
+        COUNT) [[ $value == 0 ]] || is_number "$value" || refuse "$command" "'$value' is not a whole number" ;;
+        SCENES) require_scenes "$command" "$value" ;;
         FILE)
             value=$(as_called "$value")
-            [[ -d $(dirname "$value") && -w $(dirname "$value") ]] ||
-                fail "$command: nothing can be written to $value: there is no such folder that you may write to"
+            require_writable "$command" "$value"
+            ;;
+        FIGURES) # those of other groups in the file are kept
+            value=$(as_called "$value")
+            require_writable "$command" "$value"
+            [[ ! -e $value ]] || require_report "$command" "$value"
             ;;
         REPORT)
             value=$(as_called "$value")
-            [[ -r $value ]] || fail "$command: there is no file $value"
+            require_report "$command" "$value"
             ;;
     esac
     ARGUMENTS+=("$option" "$value")
 }
 
-# A file's name from where one stands.
+is_number() {
+    [[ $1 =~ ^[1-9][0-9]*$ ]]
+}
+
+require_scenes() {
+    local number
+    [[ $2 =~ ^[1-9][0-9]*(,[1-9][0-9]*)*$ ]] || refuse "$1" "'$2' is not a list of numbers, such as 4,10"
+    for number in ${2//,/ }; do
+        grep -qE "^ {3,}$number  " "$PARTS/help/$1.txt" || refuse "$1" "there is no scene $number"
+    done
+}
+
+require_writable() {
+    local folder
+    folder=$(dirname "$2")
+    [[ -d $folder && -w $folder ]] ||
+        fail "$1: $2 cannot be written: its folder does not exist or is not writable" "$WRONG_ARGUMENTS"
+    [[ ! -d $2 ]] || fail "$1: $2 cannot be written: it is a folder" "$WRONG_ARGUMENTS"
+}
+
+require_report() {
+    [[ -e $2 ]] || fail "$1: there is no file $2" "$WRONG_ARGUMENTS"
+    grep -qs '"figures": ' "$2" || fail "$1: $2 is not a report of a run, or you may not read it" "$WRONG_ARGUMENTS"
+}
+
+# A file name relative to the caller's folder.
 as_called() {
     [[ $1 == /* ]] && printf '%s\n' "$1" || printf '%s\n' "$CALLED_FROM/$1"
 }
 
-# Whether what follows the word is for another program. The word itself must be known, unless the help names none.
+# Whether the words after the first one are for another program.
 takes_rest() {
-    case $1 in
-        test | sanitize) knows_word "$1" "$2" ;;
-        mutate | elsewhere) true ;;
-        *) false ;;
-    esac
+    [[ $1 =~ ^(test|sanitize|elsewhere)$ ]]
 }
 
 knows_word() {
-    grep -qE "^  $2( |\$)" "$PARTS/help/$1.txt" && [[ $2 =~ ^[a-z0-9_-]+$ ]]
+    [[ $2 =~ ^[a-z0-9_.-]+$ ]] && grep -qE "^  ${2//./\\.}( |\$)" "$PARTS/help/$1.txt"
 }

@@ -1,5 +1,8 @@
-# The tests on a machine that really boots. They need root, and a kernel that lets them mount; they take some five
-# minutes. So they are no part of `./dev test` alone.
+# The tests on a machine that really boots. They need root, a kernel that lets them mount, and some seven minutes, so
+# `./dev test` alone does not run them.
+
+# Machines at a time: the tests mostly wait, one of them for five minutes.
+readonly BOOTED_JOBS=3
 
 run_booted_tests() {
     local as_root=() missing=(systemd-container) folder=build/booted
@@ -11,11 +14,12 @@ run_booted_tests() {
     require_space 500
     need_packages build package tests booted
     build_booted_package
-    # In namespaces of its own, all ends with the tests. sudo hands on no variables.
+    # In namespaces of their own, all processes and mounts end with the tests. sudo passes no variables on.
     narrate "testing" "${as_root[@]}" env PYTHONDONTWRITEBYTECODE=1 \
         VELK_BOOTED_ROOT="${VELK_BOOTED_ROOT:-/}" VELK_PACKAGE="$(echo "$PWD/$folder"/velk-session-agent_*.deb)" \
         unshare --mount --pid --fork --kill-child --mount-proc \
-        "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" --confcutdir tests/booted tests/booted "$@"
+        "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" -n "$BOOTED_JOBS" \
+        --confcutdir tests/booted tests/booted "$@"
 }
 
 require_machines() {
@@ -23,7 +27,7 @@ require_machines() {
     trouble=$("${as_root[@]}" tests/booted/can-boot 2>&1) || fail "$trouble"
 }
 
-# As ./dev package does, but the binary package alone, unchecked, and with the compiler's cache.
+# Like ./dev package, but builds only the binary package, without checks, and with the compiler cache.
 build_booted_package() {
     rm -rf "$folder"
     mkdir -p "$folder/velk-session-agent"

@@ -1,8 +1,8 @@
-# Building: the programs that a command needs, and no others.
+# Builds the programs that a command needs, and no others.
 
 readonly AGENT=$PWD/build/$PRESET/src/velks
 
-# Builds the given targets, everything without one.
+# Builds the given targets; without one, everything.
 build() {
     local targets=() target
     for target in "$@"; do targets+=(--target "$target"); done
@@ -11,7 +11,7 @@ build() {
         fail "the build failed; see the messages above"
 }
 
-# A configuration that failed or is not finished leaves no build.ninja.
+# A failed or unfinished configuration leaves no build.ninja.
 configure() {
     [[ ! -f build/$1/build.ninja ]] || return 0
     echo "Preparing the build in build/$1 ..."

@@ -1,10 +1,10 @@
-# Formats, linters and drawings.
+# Formatters, linters and diagrams.
 
 cpp_files() {
     git ls-files --cached --others --exclude-standard '*.cpp' '*.h' | existing
 }
 
-# Files that git knows may have been deleted.
+# Drops files that git lists but that have been deleted.
 existing() {
     local file
     while IFS= read -r file; do [[ ! -e $file ]] || printf '%s\n' "$file"; done
@@ -12,11 +12,11 @@ existing() {
 
 readonly PYTHON_FOLDERS=(bench sandbox tests)
 readonly SHELL_SCRIPTS=(
-    dev dev.d/enter-root dev.d/tidy .ci/run data/autostart debian/tests/installed-agent
-    sandbox/can-box sandbox/in-box sandbox/in-box-python tests/booted/can-boot tests/sanitizers/memcheck-agent
+    dev dev.d/enter-root dev.d/tidy .ci/run data/autostart debian/tests/booted-machine
+    debian/tests/installed-agent sandbox/can-box sandbox/in-box sandbox/in-box-python tests/booted/can-boot tests/sanitizers/memcheck-agent
 )
 
-# All checks are made, whichever of them fails.
+# Runs all checks, even if one fails.
 run_lint() {
     require_git
     require_space 1000
@@ -32,7 +32,7 @@ run_lint() {
     echo "lint: all clean"
 }
 
-# Of files, and of functions in Python; of functions in C++, clang-tidy knows them.
+# Limits of files, and of functions in Python; clang-tidy checks those of functions in C++.
 check_limits() {
     {
         printf '%s\n' "${sources[@]}"
@@ -80,7 +80,7 @@ run_format() {
     echo "format: done"
 }
 
-# Without the line that names the version of the program that drew.
+# Drops the line with graphviz's version.
 run_diagrams() {
     need_packages diagrams
     local text drawn

@@ -1,13 +1,14 @@
-# What all commands say and how they say it.
+# Output that all commands share.
 
 readonly LONGEST_SILENCE=8 # seconds
 
+# With the exit status, 1 without one.
 fail() {
     printf 'dev: %s\n' "$1" >&2
-    exit 1
+    exit "${2:-1}"
 }
 
-# Runs a command and passes on what it says; after some seconds of silence, says that it still goes on.
+# Runs a command and passes its output on; after some seconds of silence, prints that the command is still running.
 narrate() {
     local words=$1 statuses
     shift
@@ -20,14 +21,14 @@ narrate() {
 
 keep_company() {
     local words=$1 line status begin=$SECONDS
-    trap '' INT # reads on until the command has ended
+    trap '' INT TERM # reads on until the command has ended
     while true; do
         status=0
         IFS= read -t "$LONGEST_SILENCE" -r line || status=$?
         if ((status == 0)); then
             printf '%s\n' "$line"
-        elif ((status > 128)); then # time is up; what there is of a line comes first
-            printf '%s\n' "$line${line:+ }... $words goes on ($((SECONDS - begin)) s)"
+        elif ((status > 128)); then # timed out; print the partial line first
+            printf '%s\n' "$line${line:+ }... $words continues ($((SECONDS - begin)) s)"
         else
             printf '%s' "$line"
             return
@@ -35,8 +36,8 @@ keep_company() {
     done
 }
 
-# Runs a command whose steps are lines that begin with "[12/56]" or "[ 12 %]": on a terminal they take turns in one
-# line; in a file there is one every few seconds. Other lines are passed on.
+# Runs a command that prints steps, lines that begin with "[12/56]" or "[ 12 %]". On a terminal each step replaces the
+# one before; in a file one is printed every few seconds. Other lines are passed on.
 show_steps() {
     local statuses
     set +e
@@ -47,8 +48,8 @@ show_steps() {
 }
 
 print_steps() {
-    local line='' last='' status=0 told=$((SECONDS - LONGEST_SILENCE)) step='^\[ *[0-9]+(/[0-9]+| %)\] '
-    trap '' INT
+    local line='' last='' status=0 printed=$((SECONDS - LONGEST_SILENCE)) step='^\[ *[0-9]+(/[0-9]+| %)\] '
+    trap '' INT TERM
     while ((status == 0 || status > 128)); do
         status=0
         IFS= read -t "$LONGEST_SILENCE" -r line || status=$?
@@ -64,16 +65,21 @@ print_steps() {
     clear_step
 }
 
-# A person sees each step in its turn, a file one every few seconds.
+# A terminal shows each step, a file one every few seconds.
 show_step() {
-    if [[ -t 1 ]]; then
+    if is_terminal; then
         printf '\r\033[K%s' "${last:0:$(($(tput cols 2>/dev/null || echo 80) - 1))}"
-    elif ((SECONDS - told >= LONGEST_SILENCE - 2)) && [[ -n $last ]]; then
+    elif ((SECONDS - printed >= LONGEST_SILENCE - 2)) && [[ -n $last ]]; then
         printf '%s\n' "$last"
-        told=$SECONDS
+        printed=$SECONDS
     fi
 }
 
 clear_step() {
-    [[ ! -t 1 ]] || printf '\r\033[K'
+    ! is_terminal || printf '\r\033[K'
+}
+
+# One that can clear a line.
+is_terminal() {
+    [[ -t 1 && ${TERM:-dumb} != dumb ]]
 }

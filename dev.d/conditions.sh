@@ -1,6 +1,6 @@
-# What must be so before anything is installed or built. Each trouble is one line that says what to do.
+# Preconditions of installing and building. Each failure is one line that says what to do.
 
-# Whoever builds here owns what is built: root's files would be in the way of the next command of the tree's owner.
+# The build must run as the tree's owner: files of root would block the owner's next command.
 require_owner() {
     local owner
     owner=$(stat -c %U .)
@@ -19,7 +19,7 @@ require_boxes() {
 require_git() {
     local answer
     if ! command -v git >/dev/null; then
-        [[ -e .git ]] || fail "this is no git clone, and this command works on what git lists"
+        [[ -e .git ]] || fail "this is not a git clone, and this command works on what git lists"
         return 0 # it will be installed
     fi
     answer=$(LC_ALL=C git ls-files 2>&1 >/dev/null) || fail "git lists no sources here: ${answer%%$'\n'*}"

@@ -1,6 +1,6 @@
 # The Debian package.
 
-# The tree as a commit of it would be: no file that git ignores, no modes but those that git knows.
+# Copies the tree as a commit would record it: without ignored files, and with git's file modes.
 export_tree() {
     git ls-files -z --cached --others --exclude-standard | while IFS= read -r -d '' file; do
         [[ ! -e $file ]] || printf '%s\0' "$file" # deleted, but not yet for git
@@ -17,14 +17,15 @@ run_package() {
     mkdir -p "$folder/velk-session-agent"
     export_tree "$folder/velk-session-agent"
     narrate "building the package" build_package "$folder/velk-session-agent"
-    # Which version of Debian's policy is the current one, and which functions could have been checked at run time,
-    # is another on each release; debian/rules asks for all hardening.
+    # Suppresses what lintian reports differently on each release: the current version of Debian's policy, and functions
+    # that could be checked at run time, though debian/rules enables all hardening.
     narrate "lintian" lintian --pedantic --fail-on error,warning,info,pedantic --display-info --suppress-tags \
         out-of-date-standards-version,newer-standards-version,hardening-no-fortify-functions "$folder"/*.changes
     (cd "$folder" && sha256sum ./*.deb ./*.dsc ./*.tar.*)
 }
 
-# In this folder, with further arguments of dpkg-buildpackage. A fixed locale, umask and zone: the same commit gives the same bytes.
+# Runs in the given folder, with further arguments for dpkg-buildpackage. Locale, umask and time zone are fixed, so that
+# the same commit gives the same bytes.
 build_package() {
     cd "$1" || return
     shift

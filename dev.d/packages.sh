@@ -1,12 +1,13 @@
-# Debian's packages that a command needs, by the groups of packages.txt.
+# The Debian packages that a command needs, by the groups of packages.txt.
 
 readonly APT_LOG=build/apt.log
 
-# Names in the given groups; without a group, in all but [booted], which changes how people log in.
+# Package names in the given groups; without a group, in all but [booted], which changes how users log in,
+# and [neighbours], which are not installed.
 wanted_packages() {
     awk -v groups=" $* " '
         /^\[/ { group = substr($1, 2, length($1) - 2); next }
-        /^[^#]/ && (groups == "  " && group != "booted" || index(groups, " " group " ")) { print $1 }' packages.txt | sort -u
+        /^[^#]/ && (groups == "  " && group != "booted" && group != "neighbours" || index(groups, " " group " ")) { print $1 }' packages.txt | sort -u
 }
 
 missing_packages() {
@@ -27,10 +28,10 @@ need_packages() {
     mkdir -p build
     update_lists || fail "Debian's package lists could not be fetched: $(apt_error); is there a network?"
     tell_sizes
-    install_missing || fail "the packages could not be installed: $(apt_error); all of it stands in $APT_LOG"
+    install_missing || fail "the packages could not be installed: $(apt_error); see $APT_LOG"
 }
 
-# Asks for the password, if there is one to be asked for, before anything else is said.
+# Asks for sudo's password, if it needs one, before any other output.
 require_sudo() {
     local by_hand="as root, run: apt-get update && apt-get install --no-install-recommends ${missing[*]}"
     ((EUID)) || return 0
@@ -43,7 +44,7 @@ update_lists() {
     narrate "fetching Debian's package lists" log_apt update
 }
 
-# What will come, before it comes.
+# Prints what will be installed, before it is.
 tell_sizes() {
     local plan
     plan=$(run_apt --assume-no --no-install-recommends install "${missing[@]}" 2>&1 || true)
@@ -53,7 +54,7 @@ tell_sizes() {
         -e 's/^After this operation, (.*) of additional disk space.*/On the disk: \1/p' <<<"$plan"
 }
 
-# apt's own progress, as steps; whatever else it says goes into the log.
+# Shows apt's own progress as steps; its other output goes to the log.
 install_missing() {
     show_steps apt_steps
 }
@@ -72,7 +73,7 @@ run_apt() {
         apt-get -o APT::Update::Error-Mode=any "$@" </dev/null
 }
 
-# The first thing that apt called an error.
+# The first error that apt printed.
 apt_error() {
     sed -n 's/^[EW]: //p' "$APT_LOG" | head -n 1
 }

@@ -1,7 +1,5 @@
 # The tests, layer by layer.
 
-# Four workers on two cores: the tests mostly wait for events.
-readonly TEST_JOBS=${VELK_TEST_JOBS:-4}
 readonly LEAST_COVERAGE=95 # per cent of the lines
 readonly PYTEST_CHOSE_NONE=5 # exit status of pytest when no test was left
 
@@ -16,7 +14,8 @@ run_test() {
     require_space 1000
     need_packages build terminal tests
     case $layer in
-        unit | all) build ;;
+        unit) build_unit_tests "$@" ;;
+        all) build ;;
         *) build velks velks-check ;;
     esac
     case $layer in
@@ -28,7 +27,7 @@ run_test() {
     esac
 }
 
-# One layer that fails does not keep the others from being run.
+# Runs all layers, even if one fails.
 run_all_layers() {
     local failed=()
     run_unit_tests || failed+=(unit)
@@ -44,18 +43,31 @@ join_words() {
     printf '%s\n' "${*//,/, }" | sed 's/,/, /g'
 }
 
+# Each test is named after its program, so a selection needs no other program. Of a selection that ctest does not
+# understand, or that is empty, nothing is built: ctest reports it.
+build_unit_tests() {
+    local programs=()
+    configure "$PRESET"
+    if (($#)); then
+        mapfile -t programs < <(ctest --test-dir "build/$PRESET" --show-only "$@" 2>/dev/null |
+            sed -n 's/^ *Test *#[0-9]*: \([^ ]*\).*/\1/p')
+        ((${#programs[@]})) || return 0
+    fi
+    build "${programs[@]}"
+}
+
 run_unit_tests() {
     narrate "running unit tests" ctest --test-dir "build/$PRESET" --parallel "$TEST_JOBS" \
         --output-on-failure --no-tests=error "$@"
 }
 
-# ./dev itself, in copies of its parts and with stand-ins for the programs that it calls.
+# Tests ./dev itself, in copies of its parts and with fakes of the programs that it calls.
 run_dev_tests() {
     narrate "testing ./dev" "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" \
         -n "$TEST_JOBS" -p tests.dev.devtree --confcutdir tests/dev tests/dev "$@"
 }
 
-# Each worker is a box of its own, with its own file view, buses and user.
+# Each worker runs in its own box, with its own file system view, buses and user.
 run_pytest_as() {
     local user=$1
     shift
@@ -65,10 +77,10 @@ run_pytest_as() {
 }
 
 colour() {
-    if [[ -t 1 ]]; then echo --color=yes; else echo --color=no; fi
+    if is_terminal; then echo --color=yes; else echo --color=no; fi
 }
 
-# The layer's tests for a domain user, then those for a local user. A choice may leave one of them without tests.
+# Runs the layer's tests for a domain user, then for a local user. A selection may leave one of them without tests.
 run_for_each_user() {
     local user status worst=0 without=0
     for user in domain local; do
@@ -80,7 +92,7 @@ run_for_each_user() {
             *) worst=$status ;;
         esac
     done
-    ((without < 2)) || fail "no test was chosen"
+    ((without < 2)) || fail "no test was selected"
     return "$worst"
 }
 
@@ -89,8 +101,8 @@ run_sanitize() {
     (($#)) && shift
     case $kind in
         address)
-            # Giving memory back asks for the time, which locks up under the tests' preloaded clock; a full
-            # quarantine must not look like a leak.
+            # Returning memory reads the time, which deadlocks under the tests' preloaded clock; a full quarantine must
+            # not look like a leak.
             export ASAN_OPTIONS=allocator_release_to_os_interval_ms=-1:quarantine_size_mb=16
             export LSAN_OPTIONS="print_suppressions=0 suppressions=$PWD/tests/sanitizers/leak.supp"
             VELK_PRESET=asan-ubsan exec ./dev test "$@"
@@ -99,21 +111,24 @@ run_sanitize() {
             export TSAN_OPTIONS="ignore_noninstrumented_modules=1 suppressions=$PWD/tests/sanitizers/thread.supp"
             VELK_PRESET=tsan exec ./dev test unit "$@"
             ;;
-        memory) run_memcheck "$@" ;;
+        memory)
+            read_arguments soak "$@"
+            run_memcheck "${ARGUMENTS[@]}"
+            ;;
     esac
 }
 
-# A day under valgrind: its memory says nothing about the agent's, but valgrind sees what is lost.
+# Runs a session under valgrind, which finds leaks and misuse; the memory growth measured there is meaningless.
 run_memcheck() {
     local logs=build/memcheck
     require_boxes
-    need_packages build terminal bench
+    need_packages build terminal soak bench
     build velks
     rm -rf "$logs"
     mkdir -p "$logs"
     VELK_AGENT=$PWD/tests/sanitizers/memcheck-agent narrate "running a session under valgrind" \
         "$PYTHON" -m sandbox soak --hours 2 --allowance 1000000 "$@"
-    # A child that has not become another program yet leaves a log without a summary.
+    # A child that has not yet called exec leaves a log without a summary.
     if grep -l 'ERROR SUMMARY: [1-9]' "$logs"/*.log; then
         fail "valgrind found something; see the logs above"
     fi

@@ -13,7 +13,7 @@ from typing import Sequence
 import pytest
 
 REPOSITORY = Path(__file__).resolve().parents[2]
-_PARTS = ("dev", "dev.d", "packages.txt", "sandbox/can-box", "docs/policy.dot")
+_PARTS = ("dev", "dev.d", "packages.txt", "CMakePresets.json", "sandbox/can-box", "docs/policy.dot")
 # Programs that would change the machine, take long, or are not installed everywhere.
 _STAND_INS = (
     *(
@@ -40,7 +40,8 @@ _STAND_INS = (
         "debootstrap",
     ),
 )
-_MODULE = """import os, sys
+# A Python module that takes note of its call.
+MODULE = """import os, sys
 with open("calls", "a") as calls:
     print("{name}", *sys.argv[1:], file=calls)
 sys.exit(int(os.environ.get("STATUS_OF_{name}", "0")))
@@ -60,15 +61,24 @@ class Tree:
         self._programs = root.parent / "programs"
         self._programs.mkdir(parents=True)
         for part in _PARTS:
-            _copy(REPOSITORY / part, root / part)
+            self.copy(part)
         for name in _STAND_INS:
             self.stand_in(name)
         self.stand_in("sudo", '"$@"')
         for name in ("sandbox/__main__", "pytest", "bench/__main__"):
-            self.write(f"{name}.py", _MODULE.format(name=name.split("/")[0]))
-        self.write("tests/lint/limits.py", _MODULE.format(name="limits"))
+            self.write(f"{name}.py", MODULE.format(name=name.split("/")[0]))
+        self.write("tests/lint/limits.py", MODULE.format(name="limits"))
         self.write("source.cpp", "")
         self.stand_in("git", _GIT)
+
+    def copy(self, name: str) -> None:
+        """Put one more part of the repository into the copy."""
+        source, target = REPOSITORY / name, self.root / name
+        target.parent.mkdir(parents=True, exist_ok=True)
+        if source.is_dir():
+            shutil.copytree(source, target)
+        else:
+            shutil.copy(source, target)
 
     def write(self, name: str, text: str) -> Path:
         """Put a file into the copy."""
@@ -84,13 +94,14 @@ class Tree:
         path.write_text(f"#!/bin/bash\n{note}\n{script}\n")
         path.chmod(0o755)
 
-    def take_away(self, name: str) -> None:
-        """Let a program be missing, even if the machine has it."""
-        (self._programs / name).unlink()
+    def take_away(self, *names: str) -> None:
+        """Let programs be missing, even if the machine has them."""
+        for name in names:
+            (self._programs / name).unlink()
         for folder in ("/usr/bin", "/usr/sbin"):
             for program in Path(folder).iterdir():
                 known = self._programs / program.name
-                if program.name != name and not known.exists():
+                if program.name not in names and not known.exists():
                     known.symlink_to(program)
         self.path = str(self._programs)
 
@@ -98,7 +109,7 @@ class Tree:
 
     def command(self, *arguments: str, uid: int = 1000) -> list[str]:
         """The command line of ./dev as a user of this number, who owns the copy."""
-        who = ["unshare", "--user", f"--map-user={uid}", f"--map-group={uid}"]
+        who = ["/usr/bin/unshare", "--user", f"--map-user={uid}", f"--map-group={uid}"]
         return [*who, str(self.root / "dev"), *arguments]
 
     @property
@@ -133,17 +144,9 @@ class Tree:
         return [line for line in lines if not programs or line.split()[0] in programs]
 
 
-def _copy(source: Path, target: Path) -> None:
-    target.parent.mkdir(parents=True, exist_ok=True)
-    if source.is_dir():
-        shutil.copytree(source, target)
-    else:
-        shutil.copy(source, target)
-
-
-def refused(ended: subprocess.CompletedProcess[str]) -> str:
+def refused(ended: subprocess.CompletedProcess[str], status: int = 1) -> str:
     """The one line that a command ended with."""
-    assert ended.returncode == 1, ended
+    assert ended.returncode == status, ended
     (line,) = ended.stderr.splitlines()
     assert line.startswith("dev: ")
     return line.removeprefix("dev: ")

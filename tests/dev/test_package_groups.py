@@ -2,11 +2,13 @@
 
 from __future__ import annotations
 
+import re
+import subprocess
 from pathlib import Path
 
 import pytest
 
-from tests.dev.devtree import Tree, refused
+from tests.dev.devtree import REPOSITORY, Tree, refused
 
 PLAN = """Reading package lists...
 0 upgraded, 226 newly installed, 0 to remove and 4 not upgraded.
@@ -46,7 +48,7 @@ def group(tree: Tree, *wanted: str) -> set[str]:
             current = found.setdefault(line.strip("[]"), set())
         elif line and not line.startswith("#"):
             current.add(line)
-    return set.union(*(found[name] for name in wanted or found.keys() - {"booted"}))
+    return set.union(*(found[name] for name in wanted or found.keys() - {"booted", "neighbours"}))
 
 
 @pytest.mark.parametrize(
@@ -54,15 +56,15 @@ def group(tree: Tree, *wanted: str) -> set[str]:
     [
         ("demo", "build terminal"),
         ("box", "build terminal"),
-        ("soak", "build terminal"),
+        ("soak", "build terminal soak"),
         ("test contracts", "build terminal tests"),
         ("format", "lint"),
         ("lint", "build terminal tests lint"),
         ("diagrams", "diagrams"),
         ("package", "build package"),
         ("fuzz", "build terminal fuzz"),
-        ("bench", "build terminal bench"),
-        ("bench --write-docs", "build terminal bench plots"),
+        ("bench", "build terminal soak bench"),
+        ("bench --write-docs", "build terminal soak bench plots"),
         ("setup", ""),
         ("setup lint plots", "lint plots"),
     ],
@@ -82,17 +84,17 @@ def test_what_is_there_is_not_installed_again(bare: Tree) -> None:
     assert "All packages are installed." in ended.stdout
 
 
-def test_names_and_sizes_are_told_beforehand_and_progress_after(bare: Tree) -> None:
+def test_names_and_sizes_are_shown_beforehand_and_progress_after(bare: Tree) -> None:
     shown = bare.dev("diagrams").stdout.splitlines()
 
-    told = [
+    listed = [
         "Installing graphviz",
         "With all that they need: 226 packages",
         "To download: 177 MB",
         "On the disk: 750 MB",
         "[ 50 %] Retrieving file 1 of 2",
     ]
-    assert [line for line in shown if line in told] == told
+    assert [line for line in shown if line in listed] == listed
 
 
 def test_nothing_is_recommended_into_the_machine(bare: Tree) -> None:
@@ -118,12 +120,20 @@ def test_a_package_that_cannot_be_installed_is_one_line(bare: Tree) -> None:
     )
 
     assert refused(bare.dev("diagrams")) == (
-        "the packages could not be installed: Unable to locate package graphviz; "
-        "all of it stands in build/apt.log"
+        "the packages could not be installed: Unable to locate package graphviz; " "see build/apt.log"
     )
 
 
-def test_without_sudo_the_line_for_root_is_told(bare: Tree) -> None:
+def test_an_interrupted_installation_is_named_with_its_remedy(bare: Tree) -> None:
+    words = "dpkg was interrupted, you must manually run 'sudo dpkg --configure -a' to correct the problem."
+    bare.stand_in("apt-get", f"""[[ $* != *install* ]] || {{ echo "E: {words}"; exit 100; }}""")
+
+    assert refused(bare.dev("diagrams")) == (
+        f"the packages could not be installed: {words}; see build/apt.log"
+    )
+
+
+def test_without_sudo_the_line_for_root_is_shown(bare: Tree) -> None:
     bare.take_away("sudo")
 
     assert refused(bare.dev("diagrams")) == (
@@ -132,7 +142,7 @@ def test_without_sudo_the_line_for_root_is_told(bare: Tree) -> None:
     )
 
 
-def test_a_user_whom_sudo_refuses_is_told_the_line_for_root(bare: Tree) -> None:
+def test_a_refusal_by_sudo_shows_the_line_for_root(bare: Tree) -> None:
     bare.stand_in("sudo", "exit 1")
 
     assert refused(bare.dev("diagrams")).startswith("packages are missing and sudo refuses; as root, run: ")
@@ -153,9 +163,34 @@ def test_root_needs_no_sudo(bare: Tree) -> None:
     assert not bare.calls("sudo") and bare.calls("apt-get")
 
 
+def test_what_the_package_is_built_from_is_installed(tree: Tree) -> None:
+    control = Path(REPOSITORY, "debian/control").read_text()
+    (wanted,) = re.findall(r"^Build-Depends:((?:.*\n )*.*)", control, re.MULTILINE)
+    named = {re.split(r"[ :(]", name.strip())[0] for name in wanted.split(",")}
+
+    assert named - {"", "debhelper-compat"} <= group(tree, "build", "package")
+
+
+def test_no_package_starts_anything_that_stays(tree: Tree) -> None:
+    for name in group(tree):
+        listed = subprocess.run(["dpkg", "-L", name], capture_output=True, text=True).stdout
+        units = re.findall(
+            r"/lib/systemd/system/.*\.(?:service|socket)$|^/etc/init.d/.+", listed, re.MULTILINE
+        )
+        # What a timer starts ends again.
+        assert [unit for unit in units if not listed.count(unit.replace(".service", ".timer"))] == [], name
+
+
 def test_the_names_are_in_order_and_none_is_there_twice_in_a_group(tree: Tree) -> None:
     text = Path(tree.root, "packages.txt").read_text()
 
     for part in text.split("[")[1:]:
         listed = [line for line in part.splitlines()[1:] if line and not line.startswith("#")]
         assert listed == sorted(set(listed))
+
+
+def test_the_help_of_setup_names_every_group() -> None:
+    groups = re.findall(r"^\[(\w+)\]", (REPOSITORY / "packages.txt").read_text(), re.MULTILINE)
+    explained = re.findall(r"^  (\w+) ", (REPOSITORY / "dev.d/help/setup.txt").read_text(), re.MULTILINE)
+
+    assert explained == groups
