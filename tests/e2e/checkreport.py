@@ -5,7 +5,7 @@ from __future__ import annotations
 import json
 import subprocess
 from dataclasses import dataclass
-from datetime import datetime, timedelta
+from datetime import datetime, timedelta, timezone
 from pathlib import Path
 from typing import Mapping
 
@@ -44,7 +44,7 @@ class CheckReport:
         return {name for name, _ in self.lines}
 
     def worse_than_good(self) -> list[tuple[str, Line]]:
-        """The lines that somebody should look at."""
+        """The lines that are not good."""
         return [entry for entry in self.lines if entry[1].result != "good"]
 
 
@@ -92,7 +92,7 @@ def pair(begins_in_days: int = -1, ends_in_days: int = 365) -> Pair:
     """A fresh certificate with this time of validity, signed by itself."""
     key = ec.generate_private_key(ec.SECP256R1())
     name = x509.Name([x509.NameAttribute(NameOID.COMMON_NAME, "terminal")])
-    now = datetime.utcnow()
+    now = datetime.now(timezone.utc)
     certificate = (
         x509.CertificateBuilder()
         .subject_name(name)
@@ -104,8 +104,7 @@ def pair(begins_in_days: int = -1, ends_in_days: int = 365) -> Pair:
         .sign(key, hashes.SHA256())
     )
     return Pair(
-        certificate.public_bytes(serialization.Encoding.PEM),
-        key_text(key, serialization.NoEncryption()),
+        certificate.public_bytes(serialization.Encoding.PEM), key_text(key, serialization.NoEncryption())
     )
 
 

@@ -1,4 +1,4 @@
-"""What the daemon must hear of any history of the dock, said as plainly as possible, and random histories."""
+"""What the agent must report of any history of the dock, as a plain model, and random histories."""
 
 from __future__ import annotations
 
@@ -56,7 +56,7 @@ class DockModel:
     A stretch is what the dock does before the agent comes to handle it. An entry that was added is read when
     the agent comes to its addition, at the end of the stretch: what the dock announced of it until then is in
     the reading and no news. An entry that has gone by then cannot be read: it counts as open, without a name
-    or an identifier, so its removal concerns nobody.
+    or an identifier, so its removal is not reported.
     """
 
     dock: Dock
@@ -120,7 +120,7 @@ class DockModel:
         return [(CLOSED, gone.name)] if gone and gone.windows else []
 
     def _counted(self, path: str, windows: int) -> list[tuple[int, str]]:
-        entry = self._entry_to_tell(path)
+        entry = self._entry_known_by_now(path)
         if entry is None or windows == entry.windows:
             return []
         kind = OPENED if windows > entry.windows else CLOSED
@@ -128,13 +128,13 @@ class DockModel:
         return [(kind, entry.name)]
 
     def _renamed(self, path: str, name: str) -> list[tuple[int, str]]:
-        entry = self._entry_to_tell(path)
+        entry = self._entry_known_by_now(path)
         if entry and name:
             entry.name = name
         return []
 
-    def _entry_to_tell(self, path: str) -> _Known | None:
-        """The entry that an announcement is news for."""
+    def _entry_known_by_now(self, path: str) -> _Known | None:
+        """The entry whose announcement must be reported; None for one that is unknown or being read."""
         if path in self._read_now:
             return None
         return next((entry for entry in self._known.values() if entry.path == path), None)

@@ -1,4 +1,4 @@
-"""What the agent tells the daemon of the applications on the dock."""
+"""What the agent reports to the daemon of the applications on the dock."""
 
 from __future__ import annotations
 
@@ -7,19 +7,21 @@ from uuid import uuid4
 
 from sandbox.fakes import dock
 from sandbox.terminal import Terminal
+from tests.e2e import wire
 
 OPENED, CLOSED = 1, 2
+UNKNOWN = "unknown entry"
 
 
 def settle(terminal: Terminal) -> None:
-    """Return once the agent has handled all that the dock and others on its bus have said so far, and has
-    asked back for what it was not told.
+    """Return once the agent has handled all signals on the session bus so far, and has read the properties
+    that were invalidated.
 
-    The dock takes back an entry that nobody knows, which the agent logs; the first one brings the agent's own
-    questions to the dock, the second one comes after the answers.
+    The dock removes an unknown entry, which the agent logs: the first time the agent's calls have reached the
+    dock, the second time their replies have been handled, too.
     """
     for _ in range(2):
-        token = f"nobody {uuid4()}"
+        token = f"{UNKNOWN} {uuid4()}"
         mark = terminal.events.mark()
         terminal.dock.emit(dock.INTERFACE, "EntryRemoved", token)
         terminal.events.wait_for(lambda event: token in event.args[0], kind="log", after=mark)
@@ -27,31 +29,31 @@ def settle(terminal: Terminal) -> None:
 
 
 def start(terminal: Terminal) -> None:
-    """Start the agent; it has then told of what was open."""
+    """Start the agent; returns when it has reported what was open."""
     terminal.start_agent()
     settle(terminal)
 
 
-def told(terminal: Terminal, after: int = 0) -> list[tuple[int, str]]:
-    """Types and names of the applications that the daemon was told of since a mark."""
+def reported(terminal: Terminal, after: int = 0) -> list[tuple[int, str]]:
+    """Types and names of the applications that the agent has reported since a mark."""
     calls = terminal.events.all(source="velks", target="daemon", member="sendAppOpenState", after=after)
     return [(call.args[0], call.args[1]) for call in calls]
 
 
 def follows(terminal: Terminal, *changes: Callable[[], object]) -> list[tuple[int, str]]:
-    """What the daemon is told when these things happen, each after the agent has handled the one before."""
+    """What the agent reports of these changes; each waits until the agent has handled the one before."""
     mark = terminal.events.mark()
     for change in changes:
         change()
         settle(terminal)
-    return told(terminal, mark)
+    return reported(terminal, mark)
 
 
 def warnings(terminal: Terminal, after: int = 0) -> list[str]:
-    """What the agent has warned of since a mark, without what `settle` provoked and without the address of a
-    platform, which terminals without one lack."""
-    lines = [event.args[0] for event in terminal.events.all(kind="log", member="warning", after=after)]
-    return [line for line in lines if '"nobody ' not in line and '"getHostAndPort"' not in line]
+    """What the agent has warned of since a mark, but for what `settle` provoked and for the missing address
+    of a terminal without a platform."""
+    provoked = (f'"{UNKNOWN} ', '"getHostAndPort"')
+    return [line for line in wire.warnings(terminal, after) if not any(text in line for text in provoked)]
 
 
 def scans(terminal: Terminal, after: int = 0) -> list[str]:

@@ -1,4 +1,4 @@
-"""The road of a terminal that leaves the domain, as it was seen from outside."""
+"""The steps of a terminal that leaves the domain, as seen from outside."""
 
 from __future__ import annotations
 
@@ -6,11 +6,11 @@ import configparser
 from pathlib import Path
 
 from sandbox.terminal import Terminal
-from tests.e2e.wire import settled
+from tests.e2e.wire import push, settled
 
 EXIT = {"type": 1200}
 ON_SYSTEM_BUS = ("daemon", "identity", "logind")
-ROAD = [
+EXIT_STEPS = [
     ("notifications", "Notify"),
     ("restore_config", "restore_config"),
     ("systemctl", "systemctl"),
@@ -21,17 +21,16 @@ ROAD = [
 
 def leave_domain(session: Terminal) -> int:
     """Push the policy, wait for the sequence's last step; the result is the mark before it."""
-    mark = session.events.mark()
-    session.daemon.push_policy(EXIT)
+    mark = push(session, EXIT)
     session.events.wait_for(target="identity", member="Set", after=mark)
     return mark
 
 
-def road(session: Terminal, mark: int) -> list[tuple[str, str]]:
+def steps_seen(session: Terminal, mark: int) -> list[tuple[str, str]]:
     """The steps of the exit that were seen from outside, in their order.
 
-    The agent waits for each step but the calls on the system bus, which come last; their serial numbers tell
-    in which order they were sent to different receivers.
+    The agent waits for each step but the calls on the system bus, which come last; their serial numbers
+    show in which order they were sent to different receivers.
     """
     steps = settled(session, mark)
     sent = sorted(
@@ -42,7 +41,7 @@ def road(session: Terminal, mark: int) -> list[tuple[str, str]]:
 
 
 def restrictions() -> dict[str, str]:
-    """The user's restriction switches as they stand in the file."""
+    """The user's restriction switches in the file."""
     file = configparser.RawConfigParser()
     file.optionxform = str  # type: ignore[assignment]
     file.read(Path.home() / ".config" / "norix" / "desktop-control.ini")

@@ -25,6 +25,15 @@ def poll(terminal: Terminal) -> int:
     return mark
 
 
+def begin_poll(terminal: Terminal, route: str = "list", count: int = 1) -> int:
+    """Let the next poll come as far as the `count`th request of a route; the mark before it."""
+    mark = terminal.events.mark()
+    terminal.sync()
+    terminal.jump(SURELY_NEXT_POLL)
+    terminal.events.wait_for(kind="http", member=route, after=mark, count=count)
+    return mark
+
+
 def answer_always(
     terminal: Terminal, body: bytes, headers: dict[str, str] | None = None, status: int = 200
 ) -> None:

@@ -10,6 +10,7 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.machine import layout
 from sandbox.machine.packages import desktop_file
 from sandbox.terminal import Terminal
+from tests.e2e.wire import start_agent
 
 INVENTORY = "https://%1:%2/uim/v3/client/upload_info"
 CHANGE = "https://%1:%2/uim/v3/client/upinfo_log"
@@ -54,8 +55,7 @@ def next_change(terminal: Terminal, after: int = 0, count: int = 1) -> dict[str,
 
 def inventory_at_start(terminal: Terminal) -> list[dict[str, Any]]:
     """Start the agent; the records of its first inventory."""
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     return next_inventory(terminal, mark)
 
 

@@ -20,20 +20,6 @@ WAYS: list[tuple[Announcement, ...]] = [
 ]
 
 
-def test_each_window_of_a_docked_application_is_told(session: Terminal) -> None:
-    session.dock.open_app("mail", "Mail", docked=True, windows=0)
-    settle(session)
-
-    counts = [lambda number=number: session.dock.set_windows("mail", number) for number in (1, 2, 1, 0)]
-
-    assert follows(session, *counts) == [
-        (OPENED, "Mail"),
-        (OPENED, "Mail"),
-        (CLOSED, "Mail"),
-        (CLOSED, "Mail"),
-    ]
-
-
 @pytest.mark.parametrize(
     ("before", "after", "events"),
     [
@@ -60,7 +46,7 @@ def test_a_change_of_the_number_of_windows_is_one_event(
 
 
 @pytest.mark.parametrize("ways", WAYS, ids=str)
-def test_each_change_of_windows_is_told_once_however_the_dock_announces_it(
+def test_each_change_of_windows_is_reported_once_however_the_dock_announces_it(
     session: Terminal, ways: tuple[Announcement, ...]
 ) -> None:
     session.dock.announces = ways

@@ -1,4 +1,4 @@
-"""Applications on the dock: each one that opens or closes is told to the daemon, once."""
+"""Applications on the dock: the agent reports each one that opens or closes to the daemon, once."""
 
 from __future__ import annotations
 
@@ -9,24 +9,25 @@ from sandbox.events import Event
 from sandbox.fakes import dock
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
+from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, reported, warnings
+from tests.e2e.wire import wait_on_notification
 
 
-def test_running_applications_are_told_once_at_start_in_the_docks_order(terminal: Terminal) -> None:
+def test_running_applications_are_reported_once_at_start_in_the_docks_order(terminal: Terminal) -> None:
     for app, docked in (("z", False), ("y", True), ("m", False), ("x", True), ("a", False)):
         terminal.dock.open_app(app, app.upper(), docked=docked)
 
     start(terminal)
 
-    assert told(terminal) == [(OPENED, "Z"), (OPENED, "M"), (OPENED, "A")]
+    assert reported(terminal) == [(OPENED, "Z"), (OPENED, "M"), (OPENED, "A")]
     assert scans(terminal) == ["dock entry size: 5"]
     assert warnings(terminal) == []
 
 
-def test_an_empty_dock_is_read_and_nothing_told(terminal: Terminal) -> None:
+def test_an_empty_dock_is_read_and_nothing_is_reported(terminal: Terminal) -> None:
     start(terminal)
 
-    assert (told(terminal), scans(terminal), warnings(terminal)) == ([], ["dock entry size: 0"], [])
+    assert (reported(terminal), scans(terminal), warnings(terminal)) == ([], ["dock entry size: 0"], [])
 
 
 def test_the_session_is_announced_before_its_applications(terminal: Terminal) -> None:
@@ -41,25 +42,21 @@ def test_the_session_is_announced_before_its_applications(terminal: Terminal) ->
     assert watched == ["UpdateUserInfo", "SendUserStatus", "sendAppOpenState"]
 
 
-def test_an_application_that_opens_is_told_by_its_name(session: Terminal) -> None:
-    assert follows(session, lambda: session.dock.open_app("editor", "编辑器 2")) == [(OPENED, "编辑器 2")]
-
-
 @pytest.mark.parametrize("windows", [0, 1, 3])
 def test_an_application_that_comes_to_the_dock_is_one_event_whatever_its_windows(
     session: Terminal, windows: int
 ) -> None:
-    events = follows(session, lambda: session.dock.open_app("editor", "Editor", windows=windows))
+    events = follows(session, lambda: session.dock.open_app("editor", "编辑器 2", windows=windows))
 
-    assert events == [(OPENED, "Editor")]
+    assert events == [(OPENED, "编辑器 2")]
 
 
 @pytest.mark.parametrize("windows", [0, 2])
-def test_an_application_that_is_put_on_the_dock_is_not_told(session: Terminal, windows: int) -> None:
+def test_an_application_that_is_put_on_the_dock_is_not_reported(session: Terminal, windows: int) -> None:
     assert follows(session, lambda: session.dock.open_app("mail", "Mail", docked=True, windows=windows)) == []
 
 
-def test_keeping_an_application_on_the_dock_or_not_is_not_told(session: Terminal) -> None:
+def test_keeping_an_application_on_the_dock_or_not_is_not_reported(session: Terminal) -> None:
     session.dock.open_app("mail", "Mail")
     settle(session)
 
@@ -107,9 +104,7 @@ def test_an_application_may_come_and_go_many_times(session: Terminal) -> None:
     events = []
     for _ in range(3):
         events += follows(
-            session,
-            lambda: session.dock.open_app("mail", "Mail"),
-            lambda: session.dock.close_app("mail"),
+            session, lambda: session.dock.open_app("mail", "Mail"), lambda: session.dock.close_app("mail")
         )
 
     assert events == [(OPENED, "Mail"), (CLOSED, "Mail")] * 3
@@ -123,7 +118,7 @@ def test_an_entry_without_windows_that_goes_and_comes_again_is_a_new_one(session
         session.dock.close_app("mail")
         settle(session)
 
-    assert (told(session), warnings(session)) == ([], [])
+    assert (reported(session), warnings(session)) == ([], [])
 
 
 def test_the_removal_of_an_unknown_entry_is_warned_of_and_nothing_else(session: Terminal) -> None:
@@ -135,7 +130,7 @@ def test_the_removal_of_an_unknown_entry_is_warned_of_and_nothing_else(session: 
     assert (events, warnings(session)) == ([], ['unknow entry removed, id: "printer"'])
 
 
-def test_an_entry_that_is_told_twice_is_warned_of_and_then_followed_once(session: Terminal) -> None:
+def test_an_entry_that_is_announced_twice_is_warned_of_and_then_followed_once(session: Terminal) -> None:
     path = session.dock.open_app("mail", "Mail")
     settle(session)
 
@@ -154,13 +149,13 @@ def test_of_two_entries_with_one_identifier_the_newer_one_is_followed(session: T
     newer = session.dock.open_app("mail", "New")
     settle(session)
 
-    assert told(session) == [(OPENED, "Old"), (OPENED, "New")]
+    assert reported(session) == [(OPENED, "Old"), (OPENED, "New")]
     assert warnings(session) == [f'repeat entry added, path: "{newer}"']
     assert follows(session, lambda: session.dock.set("WindowInfos", {}, path=older)) == []
     assert follows(session, lambda: session.dock.set("WindowInfos", {}, path=newer)) == [(CLOSED, "New")]
 
 
-def test_an_entry_that_does_not_exist_at_start_is_warned_of_and_the_others_are_told(
+def test_an_entry_that_does_not_exist_at_start_is_warned_of_and_the_others_are_reported(
     terminal: Terminal,
 ) -> None:
     terminal.dock.open_app("a", "A")
@@ -171,7 +166,7 @@ def test_an_entry_that_does_not_exist_at_start_is_warned_of_and_the_others_are_t
     start(terminal)
 
     # Nothing is known of the missing one, not even that it is docked.
-    assert told(terminal) == [(OPENED, "A"), (OPENED, ""), (OPENED, "C")]
+    assert reported(terminal) == [(OPENED, "A"), (OPENED, ""), (OPENED, "C")]
     assert warnings(terminal) == [f'entry is invalid, path: "{missing}"']
 
 
@@ -207,17 +202,17 @@ def test_what_happens_while_the_daemon_is_absent_is_lost_and_nothing_else(sessio
     session.dock.open_app("mail", "Mail")
     settle(session)
 
-    assert told(session, mark) == [(OPENED, "Mail")]
+    assert reported(session, mark) == [(OPENED, "Mail")]
     assert warnings(session, mark) == []
 
 
 @pytest.mark.local_user
-def test_a_local_users_applications_are_told_too(terminal: Terminal) -> None:
+def test_a_local_users_applications_are_reported_too(terminal: Terminal) -> None:
     terminal.dock.open_app("a", "A")
 
     start(terminal)
 
-    assert told(terminal) == [(OPENED, "A")]
+    assert reported(terminal) == [(OPENED, "A")]
     assert follows(terminal, lambda: terminal.dock.close_app("a")) == [(CLOSED, "A")]
 
 
@@ -226,10 +221,7 @@ def test_what_an_application_did_before_it_was_read_is_no_change(session: Termin
     if known:
         session.dock.open_app("editor", "Editor", docked=True, windows=0)
         settle(session)
-    mark = session.events.mark()
-    session.notifications.fault = Fault.hold()
-    session.daemon.push_policy({"type": 1300})
-    session.events.wait_for(target="notifications", member="Notify", after=mark)
+    mark = wait_on_notification(session, Fault.hold())
     session.dock.open_app("mail", "Mail", docked=True, windows=0)
     for number in (1, 2, 3):
         session.dock.set_windows("mail", number)
@@ -238,10 +230,10 @@ def test_what_an_application_did_before_it_was_read_is_no_change(session: Termin
     session.notifications.release()
     settle(session)
 
-    assert told(session, mark) == []
+    assert reported(session, mark) == []
     session.dock.set_windows("mail", 1)
     settle(session)
-    assert told(session, mark) == [(CLOSED, "Post")]
+    assert reported(session, mark) == [(CLOSED, "Post")]
 
 
 def test_changes_right_after_a_new_entry_are_all_reported(session: Terminal) -> None:
@@ -255,7 +247,7 @@ def test_changes_right_after_a_new_entry_are_all_reported(session: Terminal) -> 
         session.dock.set_windows("mail", 0)
     settle(session)
 
-    assert told(session, mark) == [(OPENED, "Mail"), (CLOSED, "Mail")] * 40
+    assert reported(session, mark) == [(OPENED, "Mail"), (CLOSED, "Mail")] * 40
 
 
 def test_windows_that_come_right_after_an_entry_was_read_are_reported(session: Terminal) -> None:
@@ -269,4 +261,4 @@ def test_windows_that_come_right_after_an_entry_was_read_are_reported(session: T
         session.dock.open_app(f"new {number}", f"New {number}", docked=True, windows=0)
         settle(session)
 
-    assert told(session) == [(OPENED, f"New {number}") for number in range(40)]
+    assert reported(session) == [(OPENED, f"New {number}") for number in range(40)]

@@ -14,7 +14,11 @@ from tests.e2e.checkreport import binary, make_all_well, report, run
 
 
 # What it asks the services: nothing that would change them.
-QUESTIONS = [("daemon", "GetMachineID"), ("logind", "Get"), ("identity", "Get"), ("logind", "CanReboot")]
+QUESTIONS = [
+    *[("daemon", "GetMachineID"), ("logind", "Get"), ("identity", "Get")],
+    *[("logind", "Get")] * 4,  # of the session
+    ("logind", "CanReboot"),
+]
 
 
 def test_session_that_lacks_nothing_is_good(terminal: Terminal) -> None:
@@ -64,7 +68,7 @@ def test_warnings_alone_are_exit_status_1(terminal: Terminal) -> None:
     terminal.screensaver.leave()
     ended = run(terminal)
     assert ended.returncode == 1
-    assert ended.stdout.splitlines()[-1].endswith("but not all of its work; see the warnings.")
+    assert ended.stdout.splitlines()[-1].endswith("only part of its work in this session; see the warnings.")
 
 
 def test_user_without_account_entry_is_bad(terminal: Terminal) -> None:
@@ -98,7 +102,7 @@ def test_information_file_that_is_missing_is_bad(terminal: Terminal) -> None:
     assert report(terminal).line("information file", "No such file").result == "bad"
 
 
-def test_information_file_that_nobody_may_read_is_bad(terminal: Terminal) -> None:
+def test_unreadable_information_file_is_bad(terminal: Terminal) -> None:
     layout.USERINFO.chmod(0)
     assert report(terminal).line("information file", "Permission denied").result == "bad"
 
@@ -106,7 +110,7 @@ def test_information_file_that_nobody_may_read_is_bad(terminal: Terminal) -> Non
 def test_address_of_the_platform_is_needed(terminal: Terminal) -> None:
     found = report(terminal)  # the default file names none
     assert found.line("platform address", "names no server_host").result == "bad"
-    assert found.line("platform", "address is not known").result == "bad"
+    assert found.line("platform", "address is unknown").result == "bad"
 
 
 def test_port_that_is_none_is_bad(terminal: Terminal) -> None:

@@ -27,26 +27,21 @@ def working(terminal: Terminal) -> Terminal:
 @pytest.mark.parametrize("subject", CERTIFICATES)
 def test_file_that_is_missing_is_bad(working: Terminal, subject: str) -> None:
     working.files.remove(CERTIFICATES[subject])
-    line = report(working).line(subject)
-    assert line.result == "bad"
-    assert f"{CERTIFICATES[subject]} cannot be read (No such file or directory)" in line.text
+    text = f"{CERTIFICATES[subject]} cannot be read (No such file or directory)"
+    assert report(working).line(subject, text).result == "bad"
 
 
 @pytest.mark.parametrize("subject", CERTIFICATES)
 def test_file_that_the_user_may_not_read_is_bad(working: Terminal, subject: str) -> None:
     CERTIFICATES[subject].chmod(0)
-    line = report(working).line(subject)
-    assert line.result == "bad"
-    assert "cannot be read (Permission denied)" in line.text
+    assert report(working).line(subject, "cannot be read (Permission denied)").result == "bad"
 
 
 @pytest.mark.parametrize("subject", CERTIFICATES)
 @pytest.mark.parametrize("content", [b"", b"no PEM\n", b"-----BEGIN CERTIFICATE-----\nAAAA\n"])
 def test_file_that_is_no_pem_is_bad(working: Terminal, subject: str, content: bytes) -> None:
     working.files.write(CERTIFICATES[subject], content)
-    line = report(working).line(subject)
-    assert line.result == "bad"
-    assert " in PEM form" in line.text
+    assert report(working).line(subject, " in PEM form").result == "bad"
 
 
 def test_certificate_broken_after_a_sound_one_is_bad(working: Terminal) -> None:
@@ -69,9 +64,7 @@ def test_time_of_a_certificate_counts(
     working: Terminal, subject: str, begins: int, ends: int, result: str, words: str
 ) -> None:
     working.files.write(CERTIFICATES[subject], pair(begins, ends).certificate)
-    line = report(working).line(subject)
-    assert line.result == result
-    assert words in line.text
+    assert report(working).line(subject, words).result == result
 
 
 def test_certificate_that_ends_first_counts_for_the_whole_file(working: Terminal) -> None:
@@ -102,7 +95,7 @@ def test_platform_that_is_down_is_bad_with_the_reason(working: Terminal) -> None
     assert "refused" in line.text or "connect" in line.text
 
 
-def test_platform_with_a_certificate_of_somebody_else_is_bad(working: Terminal) -> None:
+def test_platform_with_a_certificate_of_another_authority_is_bad(working: Terminal) -> None:
     certificate = Authority(layout.BOX / "stranger", "stranger").issue_server(layout.PLATFORM_HOST)
     working.platform.leave()
     stranger = Platform(working.events, working.platform.port, certificate)
@@ -126,21 +119,17 @@ def test_platform_that_rejects_the_terminals_certificate_is_bad(working: Termina
 @pytest.mark.parametrize(
     ("fault", "text"),
     [
-        (
-            HttpFault.reply(400),
-            "answers, but does not accept this terminal's certificate or this user (HTTP status 400)",
-        ),
-        (
-            HttpFault.reply(401),
-            "answers, but does not accept this terminal's certificate or this user (HTTP status 401)",
-        ),
-        (
-            HttpFault.reply(403),
-            "answers, but does not accept this terminal's certificate or this user (HTTP status 403)",
+        *(
+            (
+                HttpFault.reply(status),
+                "answers, but does not accept this terminal's certificate or this user "
+                f"(HTTP status {status})",
+            )
+            for status in (400, 401, 403)
         ),
         (HttpFault.reply(500, b"[]"), "answers with HTTP status 500 instead of messages"),
-        (HttpFault.reply(200, b"{}"), "answers with something else than messages"),
-        (HttpFault.reply(200, b"<html>"), "answers with something else than messages"),
+        (HttpFault.reply(200, b"{}"), "answers with something other than messages"),
+        (HttpFault.reply(200, b"<html>"), "answers with something other than messages"),
     ],
 )
 def test_platform_that_answers_otherwise_is_bad(working: Terminal, fault: HttpFault, text: str) -> None:

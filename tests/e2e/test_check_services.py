@@ -6,12 +6,14 @@ import os
 import shutil
 import signal
 import subprocess
+import sys
 from pathlib import Path
 
 import pytest
 
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
+from sandbox.fakes.logind import DISPLAY, USER
 from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 from tests.e2e.checkreport import Line, make_all_well, report
@@ -66,8 +68,12 @@ def test_package_tool_that_does_not_run_is_a_warning(terminal: Terminal, tool: s
             "failed; see journalctl --user -u velks, then systemctl --user restart velks",
         ),
         ("ActiveState=inactive", "warning", "inactive; start it with systemctl --user start velks"),
-        ("ActiveState=inactive LoadState=masked", "warning", "masked: somebody wants no agent here; "),
-        ("ActiveState=inactive LoadState=not-found", "warning", "not known to the service manager; "),
+        (
+            "ActiveState=inactive LoadState=masked",
+            "warning",
+            "masked: an administrator or the user has disabled the agent; ",
+        ),
+        ("ActiveState=inactive LoadState=not-found", "warning", "unknown to the service manager; "),
         ("ActiveState=activating", "warning", "about to start again after a failure; see journalctl"),
         ("ActiveState=inactive Result=exec-condition", "warning", "not meant to run for this user: "),
         (
@@ -125,6 +131,37 @@ def test_reboot_that_would_be_refused_is_a_warning(terminal: Terminal, answer: s
     assert (line.result, line.text.split(":")[0]) == ("warning", f"would be refused now ({answer})")
 
 
+def test_reboot_that_cannot_be_asked_for_without_a_policy_kit_is_a_warning(terminal: Terminal) -> None:
+    make_all_well(terminal)
+    terminal.logind.faults["CanReboot"] = Fault.fail("org.freedesktop.DBus.Error.AccessDenied")
+    line = report(terminal).line("reboot")
+    assert (line.result, line.text.split(" (")[0]) == ("warning", "would be refused now")
+
+
+@pytest.mark.parametrize("kind", ["wayland", "x11"])
+def test_graphical_session_is_good(terminal: Terminal, kind: str) -> None:
+    make_all_well(terminal)
+    terminal.logind.set("Type", kind, path=DISPLAY)
+    assert report(terminal).line("session") == Line("good", f"is graphical ({kind})")
+    terminal.logind.set("Active", False, path=DISPLAY)
+    assert report(terminal).line("session") == Line("good", f"is graphical ({kind}), in the background")
+
+
+@pytest.mark.parametrize(("name", "value"), [("Type", "tty"), ("Type", "unspecified"), ("Class", "greeter")])
+def test_session_without_a_desktop_of_the_user_is_bad(terminal: Terminal, name: str, value: str) -> None:
+    make_all_well(terminal)
+    terminal.logind.set(name, value, path=DISPLAY)
+    line = report(terminal).line("session")
+    assert (line.result, line.text.split(":")[0]) == ("bad", "this user has no graphical one")
+
+
+def test_agent_without_any_session_is_bad(terminal: Terminal) -> None:
+    make_all_well(terminal)
+    terminal.logind.set("Display", ("", "/"), path=USER)
+    line = report(terminal).line("session")
+    assert (line.result, line.text.split(":")[0]) == ("bad", "this user has no graphical one")
+
+
 def test_agent_that_is_frozen_is_bad(terminal: Terminal) -> None:
     make_all_well(terminal)
     os.kill(terminal.agent.pid, signal.SIGSTOP)
@@ -144,6 +181,23 @@ def test_second_agent_is_bad(terminal: Terminal) -> None:
         line = report(terminal).line("agent")
         second.terminate()
     assert (line.result, line.text) == ("bad", "runs 2 times; there must be one")
+
+
+FORKS = """
+import os, sys
+open("/proc/self/comm", "w").write("velks")
+if os.fork():
+    print("forked", flush=True)
+sys.stdin.read()
+"""
+
+
+def test_child_of_the_agent_that_is_no_other_program_yet_is_no_second_agent(terminal: Terminal) -> None:
+    command = [sys.executable, "-c", FORKS]
+    with subprocess.Popen(command, stdin=subprocess.PIPE, stdout=subprocess.PIPE) as forked:
+        assert forked.stdout and forked.stdout.readline() == b"forked\n"
+        line = report(terminal).line("agent")
+    assert (line.result, line.text) == ("good", "runs")
 
 
 def test_agent_whose_program_was_replaced_is_a_warning(terminal: Terminal, tmp_path: Path) -> None:

@@ -10,7 +10,7 @@ from sandbox.fakes import dock
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault, FirstCalls
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
+from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, reported, warnings
 from tests.e2e.wire import carries_out_policies
 
 DBUS_LIMIT = 25
@@ -22,7 +22,7 @@ def test_a_failing_dock_counts_as_empty_and_is_followed_when_it_is_well(terminal
     start(terminal)
     terminal.dock.fault = Fault.none()
 
-    assert (told(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
+    assert (reported(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
     assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
 
 
@@ -32,7 +32,7 @@ def test_a_dock_that_does_not_introspect_is_read_all_the_same(terminal: Terminal
 
     start(terminal)
 
-    assert told(terminal) == [(OPENED, "A")]
+    assert reported(terminal) == [(OPENED, "A")]
 
 
 def test_a_hung_dock_at_start_costs_the_limit_and_counts_as_empty(terminal: Terminal) -> None:
@@ -65,7 +65,7 @@ def test_a_dock_that_hangs_later_holds_the_agent_up_by_the_limit_for_each_questi
     terminal.dock.fault = Fault.none()
     settle(terminal)
     assert warnings(terminal, mark) == []
-    assert told(terminal, mark) == [(OPENED, "")]
+    assert reported(terminal, mark) == [(OPENED, "")]
 
 
 @pytest.mark.parametrize("name", ["Id", "IsDocked"])
@@ -82,23 +82,23 @@ def test_an_entry_that_once_fails_to_answer_keeps_its_windows_and_signals(
         terminal.jump(DBUS_LIMIT)
     settle(terminal)
 
-    assert (told(terminal, mark), warnings(terminal, mark)) == ([(OPENED, "A")], [])
+    assert (reported(terminal, mark), warnings(terminal, mark)) == ([(OPENED, "A")], [])
     events = follows(
         terminal, lambda: terminal.dock.set_windows("a", 1), lambda: terminal.dock.close_app("a")
     )
     assert events == [(CLOSED, "A"), (CLOSED, "A")]
 
 
-def test_an_entry_that_never_tells_its_identifier_is_followed_all_the_same(terminal: Terminal) -> None:
+def test_an_entry_whose_identifier_cannot_be_read_is_followed_all_the_same(terminal: Terminal) -> None:
     terminal.dock.faults["Id"] = Fault.fail()
     terminal.dock.open_app("a", "A", windows=2)
     start(terminal)
 
-    assert (told(terminal), warnings(terminal)) == ([(OPENED, "A")], [])
+    assert (reported(terminal), warnings(terminal)) == ([(OPENED, "A")], [])
     assert follows(terminal, lambda: terminal.dock.set_windows("a", 1)) == [(CLOSED, "A")]
 
 
-def test_a_dock_that_is_slow_to_tell_what_it_declared_invalid_holds_nothing_up(terminal: Terminal) -> None:
+def test_a_slow_answer_about_an_invalidated_property_blocks_nothing(terminal: Terminal) -> None:
     terminal.dock.open_app("a", "A", docked=True, windows=0)
     start(terminal)
     terminal.dock.announces = ("invalidated",)
@@ -108,14 +108,14 @@ def test_a_dock_that_is_slow_to_tell_what_it_declared_invalid_holds_nothing_up(t
     terminal.dock.set_windows("a", 1)
     terminal.events.wait_for(target="dock", member="Get", after=mark)
     carries_out_policies(terminal)
-    before = told(terminal, mark)
+    before = reported(terminal, mark)
     terminal.dock.release()
     settle(terminal)
 
-    assert (before, told(terminal, mark)) == ([], [(OPENED, "A")])
+    assert (before, reported(terminal, mark)) == ([], [(OPENED, "A")])
 
 
-def test_what_a_dock_does_not_tell_after_declaring_it_invalid_changes_nothing(terminal: Terminal) -> None:
+def test_an_invalidated_property_that_cannot_be_read_changes_nothing(terminal: Terminal) -> None:
     terminal.dock.open_app("a", "A", docked=True, windows=1)
     start(terminal)
     terminal.dock.announces = ("invalidated",)
@@ -140,7 +140,7 @@ def test_a_list_of_entries_of_another_type_counts_as_empty(
 
     start(terminal)
 
-    assert (told(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
+    assert (reported(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
     terminal.dock.set("Entries", [])
     assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
 
@@ -157,7 +157,7 @@ def test_an_entry_with_a_property_of_another_type_does_not_stop_the_agent(
 
     start(terminal)
 
-    assert told(terminal) == [(OPENED, "" if name == "Name" else "A")]
+    assert reported(terminal) == [(OPENED, "" if name == "Name" else "A")]
     assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
 
 
@@ -188,5 +188,5 @@ def test_replies_of_another_form_do_not_stop_the_agent(terminal: Terminal, reply
     settle(terminal)
     del terminal.dock.answers["Get"]
 
-    assert (told(terminal), warnings(terminal)) == ([(OPENED, "")], [])
+    assert (reported(terminal), warnings(terminal)) == ([(OPENED, "")], [])
     assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]

@@ -13,7 +13,7 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from tests.e2e.dockmodel import Act, DockModel, acts
-from tests.e2e.dockwatch import settle, start, told
+from tests.e2e.dockwatch import settle, start, reported
 
 Pace = Literal["one by one", "at once", "during a notification", "during an inventory"]
 PACES: tuple[Pace, ...] = ("one by one", "at once", "during a notification", "during an inventory")
@@ -48,11 +48,11 @@ def unblock(terminal: Terminal) -> None:
 
 
 def carry_out(terminal: Terminal, model: DockModel, pace: Pace, stretch: list[Act]) -> list[tuple[int, str]]:
-    """Let a stretch of acts happen at a pace; the events that it must bring."""
+    """Let a part of a history happen at a pace; return the events that must follow."""
     expected = []
     block(terminal, pace)
     for act in stretch:
-        # While the agent reads a new entry, nobody can say what of it is news.
+        # While the agent reads a new entry, it is open which changes are news.
         if pace == "at once" and act.app in model.added:
             continue
         model.do(act)
@@ -86,7 +86,7 @@ def test_any_history_is_reported_change_by_change(terminal: Terminal) -> None:
         expected = []
         for pace, stretch in history:
             expected += carry_out(terminal, model, pace, stretch)
-        assert told(terminal, mark) == expected
+        assert reported(terminal, mark) == expected
 
     each_change_is_one_event()
 
@@ -114,6 +114,6 @@ def test_any_history_during_a_slow_log_in_is_reported_change_by_change(terminal:
             model.do(act)
         terminal.platform.release()
         settle(terminal)
-        assert told(terminal, mark) == expected + model.end_stretch()
+        assert reported(terminal, mark) == expected + model.end_stretch()
 
     each_change_is_one_event()

@@ -1,32 +1,16 @@
-"""A dock that comes late, goes and comes back, and others who speak in its name."""
+"""A dock that comes late, goes and comes back, and strangers that send its signals."""
 
 from __future__ import annotations
-
-from typing import Iterator
-
-import pytest
 
 from sandbox.bus.stranger import Stranger
 from sandbox.fakes import dock
 from sandbox.fakes.exported import PROPERTIES
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, told, warnings
+from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, reported, warnings
+from tests.e2e.strangers import let_reach_the_bus, receivers, straight_or_not
 from tests.e2e.wire import asked_of_the_session_bus, carries_out_policies
 
 WAITING = "dock service is not registered, wait.."
-
-
-@pytest.fixture
-def stranger(terminal: Terminal) -> Iterator[Stranger]:
-    """Someone else on the session bus."""
-    someone = Stranger(terminal.session_bus)
-    yield someone
-    someone.close()
-
-
-def let_reach_the_bus(stranger: Stranger) -> None:
-    """Return once the bus has passed on what the stranger sent."""
-    stranger.call("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus", "GetId")
 
 
 def start_without_dock(terminal: Terminal) -> None:
@@ -46,14 +30,14 @@ def appear(terminal: Terminal) -> None:
     settle(terminal)
 
 
-def test_an_absent_dock_is_warned_of_once_and_nothing_is_told(terminal: Terminal) -> None:
+def test_an_absent_dock_is_warned_of_once_and_nothing_is_reported(terminal: Terminal) -> None:
     terminal.dock.open_app("a", "A")
 
     start_without_dock(terminal)
     carries_out_policies(terminal)
     terminal.sync()
 
-    assert (told(terminal), scans(terminal), warnings(terminal)) == ([], [], [WAITING])
+    assert (reported(terminal), scans(terminal), warnings(terminal)) == ([], [], [WAITING])
 
 
 def test_a_late_dock_is_waited_for_without_asking(terminal: Terminal) -> None:
@@ -69,7 +53,7 @@ def test_a_late_dock_is_read_whole_and_then_followed(terminal: Terminal) -> None
 
     appear(terminal)
 
-    assert (told(terminal), scans(terminal)) == ([(OPENED, "B"), (OPENED, "C")], ["dock entry size: 3"])
+    assert (reported(terminal), scans(terminal)) == ([(OPENED, "B"), (OPENED, "C")], ["dock entry size: 3"])
     events = follows(
         terminal,
         lambda: terminal.dock.open_app("d", "D"),
@@ -88,7 +72,7 @@ def test_a_late_dock_that_comes_back_is_not_read_again(terminal: Terminal) -> No
     terminal.dock.restart()
     settle(terminal)
 
-    assert (told(terminal, mark), scans(terminal, mark), warnings(terminal, mark)) == ([], [], [])
+    assert (reported(terminal, mark), scans(terminal, mark), warnings(terminal, mark)) == ([], [], [])
 
 
 def test_a_dock_that_goes_and_comes_back_is_not_read_again_but_still_followed(terminal: Terminal) -> None:
@@ -101,23 +85,22 @@ def test_a_dock_that_goes_and_comes_back_is_not_read_again_but_still_followed(te
     terminal.dock.appear()
     settle(terminal)
 
-    assert (told(terminal, mark), scans(terminal, mark), warnings(terminal, mark)) == ([], [], [])
+    assert (reported(terminal, mark), scans(terminal, mark), warnings(terminal, mark)) == ([], [], [])
     events = follows(
         terminal, lambda: terminal.dock.open_app("b", "B"), lambda: terminal.dock.set_windows("a", 2)
     )
     assert events == [(OPENED, "B"), (OPENED, "A")]
 
 
-@pytest.mark.parametrize("straight", [False, True], ids=["broadcast", "straight"])
+@straight_or_not
 def test_a_stranger_that_speaks_like_the_dock_is_ignored(
-    terminal: Terminal, stranger: Stranger, straight: bool
+    terminal: Terminal, on_session: Stranger, straight: bool
 ) -> None:
     path = terminal.dock.open_app("mail", "Mail")
     start(terminal)
     mark = terminal.events.mark()
 
-    agent: list[str | None] = [*terminal.agent.bus_names(terminal.session_bus)]
-    for receiver in agent if straight else [None]:
+    for receiver in receivers(terminal, terminal.session_bus, straight):
         for place, interface, member, signature, args in (
             (path, dock.ENTRY, "NameChanged", "s", ("Spoof",)),
             (path, dock.ENTRY, "WindowInfosChanged", "a{us}", ({},)),
@@ -126,33 +109,33 @@ def test_a_stranger_that_speaks_like_the_dock_is_ignored(
             (dock.PATH, dock.INTERFACE, "EntryAdded", "oi", (path, 0)),
             (dock.PATH, dock.INTERFACE, "EntryRemoved", "s", ("mail",)),
         ):
-            stranger.emit(place, interface, member, *args, signature=signature, destination=receiver)
-    let_reach_the_bus(stranger)
+            on_session.emit(place, interface, member, *args, signature=signature, destination=receiver)
+    let_reach_the_bus(on_session)
     settle(terminal)
 
-    assert (told(terminal, mark), warnings(terminal, mark)) == ([], [])
+    assert (reported(terminal, mark), warnings(terminal, mark)) == ([], [])
     assert terminal.events.all(source="velks", target="dock", after=mark) == []
     assert follows(terminal, lambda: terminal.dock.close_app("mail")) == [(CLOSED, "Mail")]
 
 
-def test_a_stranger_is_ignored_while_the_dock_is_awaited(terminal: Terminal, stranger: Stranger) -> None:
+def test_a_stranger_is_ignored_while_the_dock_is_awaited(terminal: Terminal, on_session: Stranger) -> None:
     path = terminal.dock.open_app("mail", "Mail")
     start_without_dock(terminal)
 
-    stranger.emit(dock.PATH, dock.INTERFACE, "EntryAdded", path, 0, signature="oi")
-    let_reach_the_bus(stranger)
+    on_session.emit(dock.PATH, dock.INTERFACE, "EntryAdded", path, 0, signature="oi")
+    let_reach_the_bus(on_session)
     appear(terminal)
 
-    assert (told(terminal), warnings(terminal)) == ([(OPENED, "Mail")], [WAITING])
+    assert (reported(terminal), warnings(terminal)) == ([(OPENED, "Mail")], [WAITING])
 
 
-def test_signals_of_another_form_do_nothing(terminal: Terminal, stranger: Stranger) -> None:
+def test_signals_of_another_form_do_nothing(terminal: Terminal, on_session: Stranger) -> None:
     path = terminal.dock.open_app("mail", "Mail")
     start(terminal)
     mark = terminal.events.mark()
 
     terminal.dock.leave()
-    assert stranger.own(dock.INTERFACE) == 1
+    assert on_session.own(dock.INTERFACE) == 1
     for place, interface, member, signature, args in (
         (dock.PATH, dock.INTERFACE, "EntryAdded", "", ()),
         (dock.PATH, dock.INTERFACE, "EntryAdded", "si", (path, 0)),
@@ -164,11 +147,11 @@ def test_signals_of_another_form_do_nothing(terminal: Terminal, stranger: Strang
         (path, PROPERTIES, "PropertiesChanged", "s", (dock.ENTRY,)),
         (path, PROPERTIES, "PropertiesChanged", "sa{sv}as", ("com.norix.Other", {"Name": "Other"}, [])),
     ):
-        stranger.emit(place, interface, member, *args, signature=signature)
-    let_reach_the_bus(stranger)
-    stranger.release(dock.INTERFACE)
+        on_session.emit(place, interface, member, *args, signature=signature)
+    let_reach_the_bus(on_session)
+    on_session.release(dock.INTERFACE)
     terminal.dock.appear()
     settle(terminal)
 
-    assert (told(terminal, mark), warnings(terminal, mark)) == ([], [])
+    assert (reported(terminal, mark), warnings(terminal, mark)) == ([], [])
     assert follows(terminal, lambda: terminal.dock.close_app("mail")) == [(CLOSED, "Mail")]

@@ -14,7 +14,7 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import FAKES, Terminal
-from tests.e2e.wire import FIVE_MINUTES, SHUTDOWN_NOTICE, next_notification, next_status
+from tests.e2e.wire import FIVE_MINUTES, SHUTDOWN_NOTICE, next_notification, next_status, push, push_online
 
 DBUS_LIMIT = 25
 TRANSFER_LIMIT = 30
@@ -28,7 +28,7 @@ def busy_desktop(terminal: Terminal) -> None:
 
 
 def changes_come(terminal: Terminal) -> None:
-    """The dock and the launcher tell of changes, if they are there."""
+    """The dock and the launcher announce changes, if they are there."""
     if terminal.dock.present:
         terminal.dock.open_app("editor", "Editor")
     terminal.launcher.announce("created", terminal.launcher.items[0])
@@ -36,8 +36,7 @@ def changes_come(terminal: Terminal) -> None:
 
 def lie(fake: Fake) -> None:
     """Answer every call with values of another type than the contract's."""
-    contracts = [contract for known in fake.objects.values() for contract in known.contracts.values()]
-    methods = [name for contract in contracts for name in contract.methods]
+    methods = [name for known in fake.objects.values() for name in known.contract.methods]
     fake.answers = {name: NONSENSE for name in [*methods, "Get", "Set"]}
 
 
@@ -58,9 +57,8 @@ def hang(terminal: Terminal, fake: Fake) -> None:
 
 
 def policies_go_on(terminal: Terminal, faulty: str) -> None:
-    """A notice is shown and a policy forwarded, each to where somebody takes it."""
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1300})
+    """A notice is shown and a policy forwarded, unless it is their service that is faulty."""
+    mark = push(terminal, {"type": 1300})
     terminal.daemon.push_policy({"type": 5})
     if faulty != "notifications":
         assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
@@ -70,9 +68,8 @@ def policies_go_on(terminal: Terminal, faulty: str) -> None:
 
 
 def reports_go_on(terminal: Terminal) -> None:
-    """The daemon is told who is there when it asks, and the state after five minutes."""
-    mark = terminal.events.mark()
-    terminal.daemon.push_online()
+    """The agent reports the user when the daemon asks, and the state after five minutes."""
+    mark = push_online(terminal)
     next_status(terminal, mark)
     terminal.sync()
     mark = terminal.events.mark()
@@ -80,7 +77,7 @@ def reports_go_on(terminal: Terminal) -> None:
     next_status(terminal, mark)
 
 
-def all_goes_on(terminal: Terminal, faulty: str) -> None:
+def all_goes_on(terminal: Terminal, faulty: str = "") -> None:
     """Nothing but what the faulty service itself does is missing."""
     changes_come(terminal)
     policies_go_on(terminal, faulty)
@@ -99,14 +96,14 @@ def late(terminal: Terminal, fake: Fake) -> None:
     fake.leave()
     terminal.start_agent()
     fake.appear()
-    all_goes_on(terminal, "nobody")
+    all_goes_on(terminal)
 
 
 def restarting(terminal: Terminal, fake: Fake) -> None:
     """Another process takes its place, which is served as well."""
     terminal.start_agent()
     fake.restart()
-    all_goes_on(terminal, "nobody")
+    all_goes_on(terminal)
 
 
 def gone(terminal: Terminal, fake: Fake) -> None:
@@ -120,21 +117,21 @@ def hung_at_the_start(terminal: Terminal, fake: Fake) -> None:
     """Takes every call from the start on and answers none."""
     hang(terminal, fake)
     terminal.start_agent()
-    all_goes_on(terminal, "nobody")
+    all_goes_on(terminal)
 
 
 def hung_later(terminal: Terminal, fake: Fake) -> None:
     """Takes every call and, from some time on, answers none."""
     terminal.start_agent()
     hang(terminal, fake)
-    all_goes_on(terminal, "nobody")
+    all_goes_on(terminal)
 
 
 def lying(terminal: Terminal, fake: Fake) -> None:
     """Answers with values of another type."""
     lie(fake)
     terminal.start_agent()
-    all_goes_on(terminal, "nobody")
+    all_goes_on(terminal)
 
 
 @pytest.mark.parametrize("state", [absent, late, restarting, gone, hung_at_the_start, hung_later, lying])
@@ -167,7 +164,7 @@ def test_applications_and_software_are_watched_without_a_daemon(terminal: Termin
     terminal.dock.close_app("mail")
     closed = terminal.events.wait_for(target="daemon", member="sendAppOpenState")
     assert closed.args == (2, "Mail")
-    all_goes_on(terminal, "nobody")
+    all_goes_on(terminal)
 
 
 def platform_hangs(terminal: Terminal) -> None:
@@ -182,17 +179,17 @@ def platform_lies(terminal: Terminal) -> None:
 
 
 def platform_leaves(terminal: Terminal) -> None:
-    """Nobody takes the platform's connections any more."""
+    """The platform accepts no connection any more."""
     terminal.platform.leave()
 
 
 def platform_appears(terminal: Terminal) -> None:
-    """Somebody takes the platform's connections again."""
+    """The platform accepts connections again."""
     terminal.platform.appear()
 
 
 def platform_restarts(terminal: Terminal) -> None:
-    """Every connection to the platform is lost, and new ones are taken."""
+    """The platform loses every connection and accepts new ones."""
     terminal.platform.leave()
     terminal.platform.appear()
 
@@ -215,10 +212,7 @@ def platform_is_well(terminal: Terminal) -> None:
     ],
 )
 def test_policies_and_reports_go_on_while_the_platform_is(
-    terminal: Terminal,
-    before: Callable[[Terminal], None],
-    after: Callable[[Terminal], None],
-    serves: bool,
+    terminal: Terminal, before: Callable[[Terminal], None], after: Callable[[Terminal], None], serves: bool
 ) -> None:
     busy_desktop(terminal)
     before(terminal)

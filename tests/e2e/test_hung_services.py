@@ -6,7 +6,17 @@ import pytest
 
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from tests.e2e.wire import SHUTDOWN_NOTICE, forced_actions, log_lines, next_notification, next_status
+from tests.e2e.wire import (
+    SHUTDOWN_NOTICE,
+    begin_countdown,
+    comes_in_a_minute,
+    log_lines,
+    next_notification,
+    next_status,
+    push,
+    wait_on_notification,
+    warnings,
+)
 
 DBUS_LIMIT = 25
 
@@ -52,16 +62,12 @@ def test_five_minutes_begin_when_the_name_is_known(terminal: Terminal) -> None:
     assert terminal.events.all(member="SendUserStatus", after=mark) == []
 
 
-def test_slow_notifications_are_no_failure(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.notifications.fault = Fault.hold()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1300})
-    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
-    terminal.jump(DBUS_LIMIT - 5)
-    terminal.notifications.release()
-    terminal.sync()
-    assert terminal.events.all(kind="log", member="warning", after=mark) == []
+def test_slow_notifications_are_no_failure(session: Terminal) -> None:
+    mark = wait_on_notification(session, Fault.hold())
+    session.jump(DBUS_LIMIT - 5)
+    session.notifications.release()
+    session.sync()
+    assert warnings(session, mark) == []
 
 
 @pytest.mark.parametrize(
@@ -81,98 +87,69 @@ def test_hung_service_reads_as_no_and_the_report_comes(terminal: Terminal, hung:
 
 
 def test_hung_notifications_delay_a_policy_by_the_limit_and_the_log_out_still_comes(
-    terminal: Terminal,
+    session: Terminal,
 ) -> None:
-    terminal.start_agent()
-    terminal.notifications.fault = Fault.hang()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
-    terminal.daemon.push_policy({"type": 5})
-    terminal.jump(DBUS_LIMIT)
-    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+    mark = wait_on_notification(session, Fault.hang(), 1201)
+    session.daemon.push_policy({"type": 5})
+    session.jump(DBUS_LIMIT)
+    session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
 
     # The minute begins when the warning has been tried.
-    terminal.advance(59)
-    assert forced_actions(terminal, mark) == []
-    terminal.advance(1)
-    assert forced_actions(terminal, mark) == ["Terminate"]
+    comes_in_a_minute(session, "Terminate", mark)
 
 
-def test_minute_before_the_reboot_begins_when_the_warning_has_been_tried(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.notifications.fault = Fault.hang()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1200})
-    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
-    terminal.jump(DBUS_LIMIT)
-    terminal.events.wait_for(target="identity", member="Set", after=mark)
+def test_minute_before_the_reboot_begins_when_the_warning_has_been_tried(session: Terminal) -> None:
+    mark = wait_on_notification(session, Fault.hang(), 1200)
+    session.jump(DBUS_LIMIT)
+    session.events.wait_for(target="identity", member="Set", after=mark)
 
-    terminal.advance(59)
-    assert forced_actions(terminal, mark) == []
-    terminal.advance(1)
-    assert forced_actions(terminal, mark) == ["Reboot"]
+    comes_in_a_minute(session, "Reboot", mark)
 
 
-def test_hung_policy_service_does_not_hold_up_the_agent(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.policy_service.fault = Fault.hang()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 5})
-    terminal.daemon.push_policy({"type": 1300})
-    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
+def test_hung_policy_service_does_not_hold_up_the_agent(session: Terminal) -> None:
+    session.policy_service.fault = Fault.hang()
+    mark = push(session, {"type": 5})
+    session.daemon.push_policy({"type": 1300})
+    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
-def test_no_signal_is_handled_while_a_notification_is_waited_for(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.notifications.fault = Fault.hang()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1300})
-    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
-    terminal.daemon.push_policy({"type": 5})
-    terminal.jump(DBUS_LIMIT)
-    terminal.sync()
+def test_no_signal_is_handled_while_a_notification_is_waited_for(session: Terminal) -> None:
+    mark = wait_on_notification(session, Fault.hang())
+    session.daemon.push_policy({"type": 5})
+    session.jump(DBUS_LIMIT)
+    session.sync()
 
-    lines = log_lines(terminal, mark)
+    lines = log_lines(session, mark)
     given_up = next(number for number, line in enumerate(lines) if line.startswith("--@@@@--"))
     forwarded = lines.index('onPolicyMsg ---------payload: "{\\"type\\": 5}"')
     assert given_up < forwarded
 
 
-def test_failed_warning_is_logged(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.notifications.fault = Fault.fail("com.norix.Error")
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    terminal.sync()
-    warnings = terminal.events.all(kind="log", member="warning", after=mark)
-    assert [line.args[0] for line in warnings] == ['--@@@@-- QDBusError("com.norix.Error", "told to fail")']
+def test_failed_warning_is_logged(session: Terminal) -> None:
+    session.notifications.fault = Fault.fail("com.norix.Error")
+    mark = push(session, {"type": 1201})
+    session.sync()
+    assert warnings(session, mark) == ['--@@@@-- QDBusError("com.norix.Error", "simulated failure")']
 
 
-def test_hung_login_manager_at_the_forced_action_does_not_stop_later_policies(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    next_notification(terminal, mark)
-    terminal.sync()
-    terminal.logind.fault = Fault.hang()
-    terminal.jump(60)
-    terminal.events.wait_for(target="logind", member="Terminate", after=mark)
-    terminal.daemon.push_policy({"type": 5})
-    terminal.jump(DBUS_LIMIT)
-    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+def test_hung_login_manager_at_the_forced_action_does_not_stop_later_policies(session: Terminal) -> None:
+    mark = begin_countdown(session)
+    session.logind.fault = Fault.hang()
+    session.jump(60)
+    session.events.wait_for(target="logind", member="Terminate", after=mark)
+    session.daemon.push_policy({"type": 5})
+    session.jump(DBUS_LIMIT)
+    session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
 
 
 @pytest.mark.real_time
-def test_limit_holds_by_the_clock_on_the_wall(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.notifications.fault = Fault.hang()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1300})
-    terminal.daemon.push_policy({"type": 5})
-    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark, timeout=120)
-    terminal.sync()
-    assert [line.args[0] for line in terminal.events.all(kind="log", member="warning", after=mark)] == [
+def test_limit_holds_by_the_clock_on_the_wall(session: Terminal) -> None:
+    session.notifications.fault = Fault.hang()
+    mark = push(session, {"type": 1300})
+    session.daemon.push_policy({"type": 5})
+    session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark, timeout=120)
+    session.sync()
+    assert warnings(session, mark) == [
         '--@@@@-- QDBusError("org.freedesktop.DBus.Error.NoReply", "Did not receive a reply. Possible causes '
         "include: the remote application did not send a reply, the message bus security policy blocked the "
         'reply, the reply timeout expired, or the network connection was broken.")'

@@ -3,9 +3,8 @@
 from __future__ import annotations
 
 import json
-import os
 from pathlib import Path
-from typing import Any
+from typing import Any, Callable
 
 import pytest
 
@@ -56,6 +55,17 @@ def write(terminal: Terminal, whose: str, *records: Any) -> None:
 def numbers(records: list[dict[str, Any]]) -> list[int]:
     """The platform's identifiers of reported records."""
     return [known["software_id"] for known in records]
+
+
+def in_place_of_it_a_folder(file: Path) -> None:
+    """A folder has the file's name."""
+    file.unlink()
+    file.mkdir()
+
+
+def unreadable(file: Path) -> None:
+    """The user may not read the file."""
+    file.chmod(0)
 
 
 @pytest.mark.parametrize("whose", FILES)
@@ -177,26 +187,13 @@ def test_broken_file_is_as_good_as_none(terminal: Terminal, whose: str, content:
 
 
 @pytest.mark.parametrize("whose", FILES)
-def test_missing_file_is_as_good_as_none(terminal: Terminal, whose: str) -> None:
+@pytest.mark.parametrize("spoil", [Path.unlink, in_place_of_it_a_folder, unreadable])
+def test_file_that_cannot_be_read_is_as_good_as_none(
+    terminal: Terminal, whose: str, spoil: Callable[[Path], None]
+) -> None:
     install(terminal, EDITOR)
-    terminal.files.remove(FILES[whose])
-
-    assert numbers(inventory_at_start(terminal)) == [-1]
-
-
-@pytest.mark.parametrize("whose", FILES)
-def test_folder_in_the_place_of_a_file_is_as_good_as_none(terminal: Terminal, whose: str) -> None:
-    install(terminal, EDITOR)
-    terminal.files.remove(FILES[whose])
-    FILES[whose].mkdir()
-
-    assert numbers(inventory_at_start(terminal)) == [-1]
-
-
-def test_file_that_may_not_be_read_is_as_good_as_none(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", record())
-    os.chmod(FILES["daemon"], 0)
+    write(terminal, whose, record())
+    spoil(FILES[whose])
 
     assert numbers(inventory_at_start(terminal)) == [-1]
 

@@ -25,21 +25,18 @@ def journal() -> Iterator[Journal]:
     opened.close()
 
 
-def start_as_service(terminal: Terminal, journal: Journal, folder: Path) -> None:
-    """Start the agent as a unit of a service manager; returns when it has announced the session."""
-    terminal.agent.binary = service(terminal.agent.binary, folder)
-    mark = terminal.events.mark()
+@pytest.fixture
+def as_service(terminal: Terminal, journal: Journal, tmp_path: Path) -> Terminal:
+    """A terminal whose agent runs as a unit of a service manager and has announced the session."""
+    terminal.agent.binary = service(terminal.agent.binary, tmp_path)
     terminal.start_agent(
-        ready=lambda: terminal.events.wait_for(target="daemon", member="SendUserStatus", after=mark),
-        extra_env=PLAIN,
+        ready=lambda: terminal.events.wait_for(target="daemon", member="SendUserStatus"), extra_env=PLAIN
     )
+    return terminal
 
 
-def test_entry_has_text_priority_file_line_and_function(
-    terminal: Terminal, journal: Journal, tmp_path: Path
-) -> None:
-    start_as_service(terminal, journal, tmp_path)
-    terminal.daemon.push_policy('no JSON, 中文\nand a second "line"')
+def test_entry_has_text_priority_file_line_and_function(as_service: Terminal, journal: Journal) -> None:
+    as_service.daemon.push_policy('no JSON, 中文\nand a second "line"')
     entry = journal.wait_for("onPolicyMsg ---------payload:")
     assert entry["MESSAGE"] == r'onPolicyMsg ---------payload: "no JSON, 中文\nand a second \"line\""'
     assert entry["PRIORITY"] == "6"
@@ -47,13 +44,10 @@ def test_entry_has_text_priority_file_line_and_function(
     assert int(entry["CODE_LINE"]) > 0
     assert entry["CODE_FUNC"] == "MessageTransfer::onPolicyMsg"
     assert entry["SYSLOG_IDENTIFIER"] == "velks"
-    assert terminal.agent.log == ""
+    assert as_service.agent.log == ""
 
 
-def test_function_inside_a_namespace_has_its_name(
-    terminal: Terminal, journal: Journal, tmp_path: Path
-) -> None:
-    start_as_service(terminal, journal, tmp_path)
+def test_function_inside_a_namespace_has_its_name(as_service: Terminal, journal: Journal) -> None:
     assert journal.wait_for("getCurrentLoginUser")["CODE_FUNC"] == "{anonymous}::getCurrentLoginUser"
 
 
@@ -61,23 +55,17 @@ def test_function_inside_a_namespace_has_its_name(
     ("text", "priority"),
     [("velkg restart sendonline", "7"), ("--@@@@--", "4"), ("----HandleEvent::sendMessage----", "6")],
 )
-def test_level_is_the_priority(
-    terminal: Terminal, journal: Journal, tmp_path: Path, text: str, priority: str
-) -> None:
-    terminal.notifications.leave()
-    start_as_service(terminal, journal, tmp_path)
-    terminal.daemon.push_online()
-    terminal.daemon.push_policy({"type": 1300})  # the service is absent: a warning
-    terminal.daemon.push_policy({"type": 1200})  # a notification with an action
+def test_level_is_the_priority(as_service: Terminal, journal: Journal, text: str, priority: str) -> None:
+    as_service.notifications.leave()
+    as_service.daemon.push_online()
+    as_service.daemon.push_policy({"type": 1300})  # the service is absent: a warning
+    as_service.daemon.push_policy({"type": 1200})  # a notification with an action
     assert journal.wait_for(text)["PRIORITY"] == priority
 
 
-def test_line_too_long_for_a_datagram_arrives_whole(
-    terminal: Terminal, journal: Journal, tmp_path: Path
-) -> None:
-    start_as_service(terminal, journal, tmp_path)
+def test_line_too_long_for_a_datagram_arrives_whole(as_service: Terminal, journal: Journal) -> None:
     payload = "x" * 5_000_000
-    terminal.daemon.push_policy(payload)
+    as_service.daemon.push_policy(payload)
     assert journal.wait_for("payload:")["MESSAGE"] == f'onPolicyMsg ---------payload: "{payload}"'
 
 
@@ -90,40 +78,33 @@ def test_log_stays_on_a_standard_error_that_is_not_the_journals(
     assert '---getusername: "@zhang.wei"' in terminal.agent.log
 
 
-def test_journal_that_has_gone_does_not_stop_the_agent(
-    terminal: Terminal, journal: Journal, tmp_path: Path
-) -> None:
-    start_as_service(terminal, journal, tmp_path)
+def test_journal_that_has_gone_does_not_stop_the_agent(as_service: Terminal, journal: Journal) -> None:
     journal.close()
-    carries_out_policies(terminal)
+    carries_out_policies(as_service)
 
 
-def test_journal_that_comes_back_takes_lines_again(
-    terminal: Terminal, journal: Journal, tmp_path: Path
-) -> None:
-    start_as_service(terminal, journal, tmp_path)
+def test_journal_that_comes_back_takes_lines_again(as_service: Terminal, journal: Journal) -> None:
     journal.close()
     back = Journal()
-    terminal.daemon.push_policy("to the new journal")
+    as_service.daemon.push_policy("to the new journal")
     assert "to the new journal" in back.wait_for("onPolicyMsg")["MESSAGE"]
     back.close()
 
 
-def test_journal_that_hangs_holds_nothing_up_and_is_told_what_it_missed(
-    terminal: Terminal, journal: Journal, tmp_path: Path
+def test_journal_that_hangs_blocks_nothing_and_learns_how_much_it_missed(
+    as_service: Terminal, journal: Journal
 ) -> None:
-    start_as_service(terminal, journal, tmp_path)
-    mark = terminal.events.mark()
+    mark = as_service.events.mark()
     for _ in range(MORE_THAN_A_JOURNAL_QUEUES):
-        terminal.daemon.push_policy("no JSON")
-    terminal.daemon.push_policy({"type": 1300})
-    terminal.events.wait_for(member="Notify", after=mark)
+        as_service.daemon.push_policy("no JSON")
+    as_service.daemon.push_policy({"type": 1300})
+    as_service.events.wait_for(member="Notify", after=mark)
 
     journal.wait_for("getCurrentLoginUser")  # makes room
-    terminal.daemon.push_policy("no JSON")
+    as_service.daemon.push_policy("no JSON")
     lost = journal.wait_for("log lines are lost")
     assert 0 < int(lost["MESSAGE"].split()[0]) <= MORE_THAN_A_JOURNAL_QUEUES + 10
     assert lost["MESSAGE"].endswith("log lines are lost, the journal did not take them")
     assert lost["PRIORITY"] == "4"
     assert "no JSON" in journal.wait_for("onPolicyMsg")["MESSAGE"]
-    assert terminal.agent.log == ""
+    assert as_service.agent.log == ""

@@ -7,46 +7,33 @@ import pytest
 from sandbox import policies
 from sandbox.policies import Policy
 from sandbox.terminal import Terminal
-from tests.e2e.wire import forced_actions, next_notification, next_status, settled
+from tests.e2e.wire import begin_countdown, forced_actions, push, settled
 
 pytestmark = pytest.mark.local_user
 
 
 @pytest.mark.parametrize("policy", policies.for_domain_users(), ids=str)
 def test_policy_for_domain_users_does_nothing(session: Terminal, policy: Policy) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": policy.code, "payload": {"uid": session.user.uid}})
+    mark = push(session, {"type": policy.code, "payload": {"uid": session.user.uid}})
     assert settled(session, mark) == []
     session.advance(60)
     assert forced_actions(session, mark) == []
 
 
 def test_account_check_is_not_even_made(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1202, "payload": {"uid": session.user.uid}})
+    mark = push(session, {"type": 1202, "payload": {"uid": session.user.uid}})
     session.sync()
     assert session.events.all(lambda event: "sendUID" in event.args[0], kind="log", after=mark) == []
 
 
 def test_disabled_terminal_logs_a_local_user_out_too(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1201})
-    next_notification(session, mark)
+    mark = begin_countdown(session)
     session.advance(60)
     assert forced_actions(session, mark) == ["Terminate"]
 
 
 def test_domain_exit_reboots_under_a_local_user_too(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1200})
+    mark = push(session, {"type": 1200})
     session.events.wait_for(target="identity", member="Set", after=mark)
     session.advance(60)
     assert forced_actions(session, mark) == ["Reboot"]
-
-
-def test_local_user_is_announced_by_name_and_uid(terminal: Terminal) -> None:
-    mark = terminal.events.mark()
-    terminal.start_agent()
-    announced = terminal.events.wait_for(target="daemon", member="UpdateUserInfo", after=mark)
-    assert announced.args == (terminal.user.name, terminal.user.uid)
-    assert next_status(terminal, mark) == (1, terminal.user.name)

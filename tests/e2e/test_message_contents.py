@@ -1,4 +1,4 @@
-"""What stands in the platform's replies, however unusual: it is shown as it is, or harmless."""
+"""Unusual contents of the platform's replies are shown as they are, or are harmless."""
 
 from __future__ import annotations
 
@@ -7,21 +7,18 @@ from typing import Any
 
 import pytest
 
-from sandbox.periods import SURELY_NEXT_POLL
-from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
+from tests.e2e.messages import answer_always, poll
 from tests.e2e.wire import next_notification
 
 READ = "2026-01-01 00:00:00"
 
 
 def replied(terminal: Terminal, body: str) -> int:
-    """Let the agent have this reply to its next list request; the result is the mark before it."""
-    terminal.platform.faults["list"] = HttpFault.reply(200, body.encode())
+    """Let the agent have this reply to its next list request; the mark before it."""
+    answer_always(terminal, body.encode())
     terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.advance(SURELY_NEXT_POLL)
-    return mark
+    return poll(terminal)
 
 
 def message(title: str, **fields: Any) -> dict[str, Any]:
@@ -29,7 +26,7 @@ def message(title: str, **fields: Any) -> dict[str, Any]:
     return {"uuid": title, "title": title, **fields}
 
 
-def road(terminal: Terminal, after: int) -> list[tuple[str, str]]:
+def receipts_and_notices(terminal: Terminal, after: int) -> list[tuple[str, str]]:
     """Receipts and notifications in the order in which they came, each with its message's title."""
     return [
         (event.member, json.loads(event.args[1])["uuid"] if event.member == "read" else event.args[3])
@@ -42,7 +39,7 @@ def test_messages_of_one_reply_are_marked_and_shown_one_by_one(terminal: Termina
     messages = [message("a"), message("b", read_at=READ), message("c"), message("a")]
     mark = replied(terminal, json.dumps(messages))
     shown = [(member, title) for title in ("a", "c", "a") for member in ("read", "Notify")]
-    assert road(terminal, mark) == shown
+    assert receipts_and_notices(terminal, mark) == shown
 
 
 @pytest.mark.parametrize(
@@ -81,5 +78,5 @@ def test_message_of_a_megabyte_is_shown_whole(terminal: Terminal) -> None:
 )
 def test_deeply_nested_reply_is_harmless(terminal: Terminal, body: str) -> None:
     mark = replied(terminal, body)
-    assert road(terminal, mark) == []
+    assert receipts_and_notices(terminal, mark) == []
     terminal.sync()

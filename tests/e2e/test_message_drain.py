@@ -1,4 +1,4 @@
-"""Long rows of messages: what waits meanwhile, and what the platform has to bear."""
+"""Long backlogs: what waits meanwhile, and how much load the platform gets."""
 
 from __future__ import annotations
 
@@ -14,7 +14,7 @@ from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.policies import POLICIES
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.e2e.messages import USER, answer_always, as_reply, message, poll, requests
+from tests.e2e.messages import USER, answer_always, as_reply, begin_poll, message, poll, requests
 from tests.e2e.wire import FORWARDED_CODE, forced_actions
 
 LESS_THAN_A_REQUEST_MAY_TAKE = 20
@@ -31,10 +31,7 @@ def session(terminal: Terminal) -> Terminal:
 
 def test_count_that_never_falls_does_not_keep_a_log_out_waiting(session: Terminal) -> None:
     answer_always(session, as_reply(message()), {"X-Total-Count": "1000"})
-    mark = session.events.mark()
-    session.sync()
-    session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark, count=60)
+    mark = begin_poll(session, count=60)
 
     session.daemon.push_policy({"type": 1201})
     session.events.wait_for(
@@ -76,10 +73,7 @@ def policy_goes_before_the_51st_message(terminal: Terminal) -> None:
 def held(session: Terminal) -> Iterator[Terminal]:
     """A terminal whose agent waits for the reply to its first list request."""
     session.platform.fault = HttpFault.hang()
-    mark = session.events.mark()
-    session.sync()
-    session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark)
+    begin_poll(session)
     yield session
     session.platform.release()
 
@@ -117,10 +111,7 @@ def test_long_drain_needs_no_more_stack_than_a_short_one(session: Terminal) -> N
 def test_policy_that_waits_during_a_drain_is_carried_out_after_it(session: Terminal) -> None:
     session.platform.post_message(USER, "T", "C")
     session.platform.faults["list"] = HttpFault.hang()
-    mark = session.events.mark()
-    session.sync()
-    session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark)
+    mark = begin_poll(session)
     session.daemon.push_policy({"type": 1201})
     session.platform.release()
     session.sync()

@@ -10,14 +10,7 @@ import pytest
 from sandbox.periods import BEFORE_ANY_POLL, SURELY_FIRST_POLL, SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.e2e.messages import (
-    USER,
-    answer_always,
-    as_reply,
-    message,
-    poll,
-    requests,
-)
+from tests.e2e.messages import USER, answer_always, as_reply, begin_poll, message, poll, requests
 from tests.e2e.wire import log_lines, next_notification
 
 
@@ -35,7 +28,11 @@ def test_message_is_shown_with_its_action_and_marked_read(session: Terminal) -> 
 
     sent = session.platform.messages()[0]
     notification = next_notification(session, mark)
-    assert (notification.application, notification.summary, notification.body) == ("升级", "升级", "今晚, 22:00")
+    assert (notification.application, notification.summary, notification.body) == (
+        "升级",
+        "升级",
+        "今晚, 22:00",
+    )
     assert notification.actions == ["_open", "查看"]
     action = f"/usr/bin/velkm,升级,今晚, 22:00,admin,{sent['created_at']}"
     assert notification.hints == {"x-norix-action-_open": action}
@@ -121,7 +118,7 @@ def test_poll_is_drawn_anew_and_never_early(terminal: Terminal) -> None:
 @pytest.mark.parametrize(
     ("running", "locked", "state"), [(True, False, 0), (False, True, 1), (True, True, 0)]
 )
-def test_nothing_is_polled_while_nobody_looks(
+def test_nothing_is_polled_while_the_screen_is_locked_or_saved(
     session: Terminal, running: bool, locked: bool, state: int
 ) -> None:
     session.platform.post_message(USER, "T", "C")
@@ -140,10 +137,7 @@ def test_drain_goes_on_although_the_screen_is_locked_meanwhile(session: Terminal
     for number in range(3):
         session.platform.post_message(USER, f"message {number}", "text")
     session.platform.faults["list"] = HttpFault.hang()
-    mark = session.events.mark()
-    session.sync()
-    session.jump(SURELY_NEXT_POLL)
-    session.events.wait_for(kind="http", member="list", after=mark)
+    mark = begin_poll(session)
     session.session_manager.set("Locked", True)
     session.platform.release()
     session.sync()
@@ -220,7 +214,7 @@ def test_unusual_values_are_shown_as_they_are(session: Terminal, text: str) -> N
 
 
 def test_uuid_goes_into_the_receipt_without_escaping(session: Terminal) -> None:
-    session.contracts.excuse("read-receipt")
+    session.contracts.allow_violations("read-receipt")
     answer_always(session, as_reply(message(uuid='%1"},{"uuid":"二')))
     mark = poll(session)
     assert requests(session, "read", mark)[0].args[1] == '{"uuid":"%1"},{"uuid":"二"}'

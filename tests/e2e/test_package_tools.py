@@ -1,4 +1,4 @@
-"""Package tools that hang, crash, cannot be run or print what nobody expects."""
+"""Package tools that hang, crash, cannot be run or print something unexpected."""
 
 from __future__ import annotations
 
@@ -241,11 +241,10 @@ def test_tool_that_cannot_be_run_is_given_up_at_once(terminal: Terminal, tool: s
     assert inventory_at_start(terminal)[0][key] == value
 
 
-def test_failed_version_is_reported_with_the_change(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.packages.install("editor", "1")
-    terminal.tools.forbid("dpkg-query")
+def test_failed_version_is_reported_with_the_change(session: Terminal) -> None:
+    session.packages.install("editor", "1")
+    session.tools.forbid("dpkg-query")
 
-    mark = announce(terminal, "created", EDITOR)
+    mark = announce(session, "created", EDITOR)
 
-    assert json.loads(next_upload(terminal, CHANGE, mark))["payload"]["software_version"] == "failed"
+    assert json.loads(next_upload(session, CHANGE, mark))["payload"]["software_version"] == "failed"

@@ -9,7 +9,7 @@ import pytest
 from sandbox.machine.users import User
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.e2e.wire import SHUTDOWN_NOTICE, log_lines, next_notification
+from tests.e2e.wire import SHUTDOWN_NOTICE, log_lines, next_notification, start_agent
 
 USER = "zhang.wei"
 NOTICE = "用户密码快过期了！！"
@@ -19,8 +19,7 @@ EARLY, LATE = 59, 61
 
 def test_notice_comes_a_minute_after_the_start(terminal: Terminal) -> None:
     terminal.platform.password_tip(USER, "您的密码还有3天过期")
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     terminal.advance(EARLY)
     assert terminal.events.all(member="Notify", after=mark) == []
     terminal.advance(LATE - EARLY)
@@ -33,8 +32,7 @@ def test_notice_comes_a_minute_after_the_start(terminal: Terminal) -> None:
 def test_request_names_the_user_without_the_first_at_sign(terminal: Terminal) -> None:
     assert terminal.platform
     terminal.files.write_accounts(User("@@zhang@wei", terminal.user.uid))
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     line, body = terminal.events.wait_for(kind="http", member="tips", after=mark).args
     assert line == "GET /uim/v3/client/password/tips HTTP/1.1"
     assert body == '{\n    "username": "@zhang@wei"\n}\n'
@@ -42,8 +40,7 @@ def test_request_names_the_user_without_the_first_at_sign(terminal: Terminal) ->
 
 def test_password_that_does_not_expire_is_logged_twice_and_not_shown(terminal: Terminal) -> None:
     assert terminal.platform
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     terminal.advance(LATE)
     assert terminal.events.all(member="Notify", after=mark) == []
     assert log_lines(terminal, mark).count(NOTICE) == 2
@@ -52,8 +49,7 @@ def test_password_that_does_not_expire_is_logged_twice_and_not_shown(terminal: T
 @pytest.mark.parametrize("body", [b"", b"garbage"], ids=repr)
 def test_reply_that_is_no_json_is_ignored(terminal: Terminal, body: bytes) -> None:
     terminal.platform.faults["tips"] = HttpFault.reply(200, body)
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     terminal.advance(LATE)
     assert NOTICE not in log_lines(terminal, mark)
     assert terminal.events.all(member="Notify", after=mark) == []
@@ -72,7 +68,6 @@ def test_tips_that_carry_a_count_ask_for_messages_at_once_and_mark_them_read(ter
     terminal.platform.post_message(USER, "T", "C")
     body = json.dumps({"code": 0, "data": {"result": False, "msg": ""}}).encode()
     terminal.platform.faults["tips"] = HttpFault.reply(200, body, {"X-Total-Count": "2"})
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     assert next_notification(terminal, mark).summary == "T"
     assert [message["read_at"] != "" for message in terminal.platform.messages()] == [True]

@@ -1,4 +1,4 @@
-"""A platform that is down, slow, lying or somebody else: the agent logs it, goes on, and comes back."""
+"""A platform that is down, slow, lying or not the real one: the agent logs it, goes on, and recovers."""
 
 from __future__ import annotations
 
@@ -10,26 +10,13 @@ from typing import Iterator
 import pytest
 
 from sandbox.machine import layout
-from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.platform.certificates import Authority, CertificateFiles
 from sandbox.platform.server import HttpFault, Platform, trust
 from sandbox.terminal import Terminal
-from tests.e2e.wire import carries_out_policies, log_lines, next_notification
+from tests.e2e.messages import USER, begin_poll, poll
+from tests.e2e.wire import carries_out_policies, log_lines, next_notification, start_agent, warnings
 
-USER = "zhang.wei"
 TRANSFER_LIMIT = 30
-
-
-def poll(terminal: Terminal) -> int:
-    """Let the next poll come, with all that follows from it; the result is the mark before it."""
-    mark = terminal.events.mark()
-    terminal.advance(SURELY_NEXT_POLL)
-    return mark
-
-
-def warnings(terminal: Terminal, after: int) -> list[str]:
-    """What the agent has warned of since a mark."""
-    return [event.args[0] for event in terminal.events.all(kind="log", member="warning", after=after)]
 
 
 def next_poll_is_well(terminal: Terminal) -> None:
@@ -50,18 +37,12 @@ def test_broken_reply_is_one_warning_and_shows_nothing(terminal: Terminal, fault
 
     terminal.platform.release()
     carries_out_policies(terminal)
-    next_poll_is_well_after_the_first(terminal)
-
-
-def next_poll_is_well_after_the_first(terminal: Terminal) -> None:
-    """Assert that the message that waited arrives with the next poll."""
     assert next_notification(terminal, poll(terminal)).summary == "T"
 
 
 def test_platform_that_is_down_is_asked_again_with_every_poll(terminal: Terminal) -> None:
     terminal.platform.leave()
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     assert len(warnings(terminal, mark)) == 1
     mark = poll(terminal)
     assert len(warnings(terminal, mark)) == 1
@@ -74,10 +55,7 @@ def test_hanging_platform_costs_the_transfer_limit_and_no_more(terminal: Termina
     terminal.platform.post_message(USER, "T", "C")
     terminal.start_agent()
     terminal.platform.fault = HttpFault.hang()
-    mark = terminal.events.mark()
-    terminal.sync()
-    terminal.jump(SURELY_NEXT_POLL)
-    terminal.events.wait_for(kind="http", member="list", after=mark)
+    mark = begin_poll(terminal)
     terminal.daemon.push_policy({"type": 5})
     terminal.jump(TRANSFER_LIMIT)
     terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
@@ -85,17 +63,14 @@ def test_hanging_platform_costs_the_transfer_limit_and_no_more(terminal: Termina
     assert len(warnings(terminal, mark)) == 1
 
     terminal.platform.release()
-    next_poll_is_well_after_the_first(terminal)
+    assert next_notification(terminal, poll(terminal)).summary == "T"
 
 
 def test_hanging_receipt_does_not_keep_the_message_from_being_shown(terminal: Terminal) -> None:
     terminal.platform.post_message(USER, "T", "C")
     terminal.start_agent()
     terminal.platform.faults["read"] = HttpFault.hang()
-    mark = terminal.events.mark()
-    terminal.sync()
-    terminal.jump(SURELY_NEXT_POLL)
-    terminal.events.wait_for(kind="http", member="read", after=mark)
+    mark = begin_poll(terminal, "read")
     terminal.jump(TRANSFER_LIMIT)
     assert next_notification(terminal, mark).summary == "T"
 
@@ -131,13 +106,12 @@ def expired() -> CertificateFiles:
 
 
 @pytest.mark.parametrize("identity", [stranger, misnamed, expired])
-def test_platform_with_a_wrong_certificate_is_told_nothing(terminal: Terminal, identity: object) -> None:
+def test_platform_with_a_wrong_certificate_gets_no_request(terminal: Terminal, identity: object) -> None:
     assert callable(identity)
     terminal.platform.close()
     stranger = Platform(terminal.events, server=identity())
     try:
-        mark = terminal.events.mark()
-        terminal.start_agent()
+        mark = start_agent(terminal)
         poll(terminal)
         requests = terminal.events.all(kind="http", after=mark)
         assert {event.member for event in requests} <= {"tls"}
@@ -150,8 +124,7 @@ def test_platform_with_a_wrong_certificate_is_told_nothing(terminal: Terminal, i
 def test_terminal_without_its_certificate_gets_nothing_and_goes_on(terminal: Terminal) -> None:
     assert terminal.platform
     layout.CLIENT_CERTIFICATE.unlink()
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     poll(terminal)
     assert [
         event.member for event in terminal.events.all(kind="http", after=mark) if event.member != "tls"
@@ -189,7 +162,7 @@ WEB_SERVER_PORT = 9443
 
 @pytest.fixture
 def web_server(terminal: Terminal) -> Iterator[int]:
-    """A web server of somebody else's in front of the platform; the result is its port."""
+    """A common web server in front of the platform; the result is its port."""
     folder = Path(mkdtemp())
     known = trust()
     # It wants certificate and key in one file.
@@ -241,8 +214,7 @@ def test_without_host_and_port_the_platform_is_never_asked(terminal: Terminal, c
         layout.USERINFO.unlink()
     else:
         terminal.files.write_userinfo(content)
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     poll(terminal)
     assert terminal.events.all(kind="http", after=mark) == []
     assert "---------load cfg" not in log_lines(terminal, mark)
@@ -252,8 +224,7 @@ def test_without_host_and_port_the_platform_is_never_asked(terminal: Terminal, c
 @pytest.mark.local_user
 def test_local_user_is_logged_and_the_platform_never_asked(terminal: Terminal) -> None:
     assert terminal.platform
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     poll(terminal)
     assert terminal.events.all(kind="http", after=mark) == []
     assert f'is not ldap user: "{terminal.user.name}"' in log_lines(terminal, mark)

@@ -12,9 +12,12 @@ from sandbox.terminal import Terminal
 from tests.e2e.wire import (
     SHUTDOWN_NOTICE,
     Notification,
+    begin_countdown,
+    comes_in_a_minute,
     forced_actions,
     log_lines,
     next_notification,
+    push,
     settled,
 )
 
@@ -28,29 +31,22 @@ def plain(body: str, timeout: int) -> Notification:
 
 @pytest.mark.parametrize("policy", policies.with_action("WarnThenLogOut"), ids=str)
 def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, policy: Policy) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": policy.code, "payload": {"uid": session.user.uid}})
+    mark = push(session, {"type": policy.code, "payload": {"uid": session.user.uid}})
 
     assert next_notification(session, mark) == plain(policy.notice, timeout=-1)
-    session.advance(59)
-    assert forced_actions(session, mark) == []
-    session.advance(1)
-    assert forced_actions(session, mark) == ["Terminate"]
+    comes_in_a_minute(session, "Terminate", mark)
     session.advance(120)
     assert forced_actions(session, mark) == ["Terminate"]
 
 
 @pytest.mark.parametrize("app_id", ["", "another", "终端"])
 def test_policy_is_obeyed_whatever_its_application(session: Terminal, app_id: str) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1300}, app_id)
+    mark = push(session, {"type": 1300}, app_id)
     assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
 def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1201})
-    next_notification(session, mark)
+    mark = begin_countdown(session)
     session.advance(60)
 
     call = session.events.wait_for(target="logind", member="Terminate", after=mark)
@@ -76,8 +72,7 @@ def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
 def test_account_policy_for_anyone_else_does_nothing(
     session: Terminal, policy: Policy, payload: dict[str, object]
 ) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy(json.dumps({"type": policy.code, **payload}))
+    mark = push(session, json.dumps({"type": policy.code, **payload}))
 
     assert settled(session, mark) == []
     session.advance(60)
@@ -85,16 +80,14 @@ def test_account_policy_for_anyone_else_does_nothing(
 
 
 def test_account_check_is_logged_with_both_uids(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1202, "payload": {"uid": 7}})
+    mark = push(session, {"type": 1202, "payload": {"uid": 7}})
     session.sync()
     assert "sendUID : 7 , localUID: 20001 ,flag : false" in log_lines(session, mark)
 
 
 @pytest.mark.parametrize("policy", policies.with_action("Notify", "RequestPasswordChange"), ids=str)
 def test_notice_is_a_notice_only(session: Terminal, policy: Policy) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": policy.code, "payload": {"uid": session.user.uid}})
+    mark = push(session, {"type": policy.code, "payload": {"uid": session.user.uid}})
 
     assert next_notification(session, mark) == plain(policy.notice, timeout=0)
     assert [event.member for event in settled(session, mark)] == ["Notify"]
@@ -117,8 +110,7 @@ def test_notice_is_a_notice_only(session: Terminal, policy: Policy) -> None:
     ],
 )
 def test_any_other_code_is_forwarded_unchanged(session: Terminal, payload: str) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy(payload)
+    mark = push(session, payload)
 
     done = settled(session, mark)
     assert [(event.target, event.member, event.args) for event in done] == [
@@ -145,8 +137,7 @@ def test_any_other_code_is_forwarded_unchanged(session: Terminal, payload: str) 
     ],
 )
 def test_text_that_is_no_policy_is_logged_and_ignored(session: Terminal, payload: str) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy(payload)
+    mark = push(session, payload)
 
     assert settled(session, mark) == []
     quoted = json.dumps(payload, ensure_ascii=False)
@@ -154,8 +145,7 @@ def test_text_that_is_no_policy_is_logged_and_ignored(session: Terminal, payload
 
 
 def test_characters_outside_latin1_do_not_hide_a_policy(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy('{"type":1300,"reason":"停用"}')
+    mark = push(session, '{"type":1300,"reason":"停用"}')
     assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
@@ -163,8 +153,7 @@ BYTE_ORDER_MARK = "\ufeff"
 
 
 def test_leading_byte_order_mark_is_lost_on_the_bus(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy(BYTE_ORDER_MARK + '{"type":1300}')
+    mark = push(session, BYTE_ORDER_MARK + '{"type":1300}')
     assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
     mark = session.events.mark()
@@ -174,59 +163,25 @@ def test_leading_byte_order_mark_is_lost_on_the_bus(session: Terminal) -> None:
 
 
 def test_second_byte_order_mark_makes_a_policy_unreadable(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy(2 * BYTE_ORDER_MARK + '{"type":1300}')
+    mark = push(session, 2 * BYTE_ORDER_MARK + '{"type":1300}')
     assert settled(session, mark) == []
 
 
 def test_second_policy_restarts_the_minute_and_its_kind_wins(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1200})
-    next_notification(session, mark)
+    mark = begin_countdown(session, 1200)
     session.advance(30)
     session.daemon.push_policy({"type": 1201})
     next_notification(session, mark, count=2)
 
-    session.advance(59)
-    assert forced_actions(session, mark) == []
-    session.advance(1)
-    assert forced_actions(session, mark) == ["Terminate"]
+    comes_in_a_minute(session, "Terminate", mark)
     session.advance(60)
     assert forced_actions(session, mark) == ["Terminate"]
 
 
 @pytest.mark.parametrize("later", [{"type": 1300}, {"type": 1304}, {"type": 5}, "no JSON"], ids=str)
 def test_no_other_message_stops_the_countdown(session: Terminal, later: str | dict[str, object]) -> None:
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1201})
-    next_notification(session, mark)
+    mark = begin_countdown(session)
     session.advance(30)
     session.daemon.push_policy(later)
     session.advance(30)
     assert forced_actions(session, mark) == ["Terminate"]
-
-
-def test_forced_action_that_fails_is_one_warning(session: Terminal) -> None:
-    session.logind.leave()
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 1201})
-    next_notification(session, mark)
-    session.advance(60)
-
-    warnings = session.events.all(kind="log", member="warning", after=mark)
-    assert len(warnings) == 1
-    assert "Terminate" in warnings[0].args[0]
-
-
-def test_forwarding_to_an_absent_policy_service_is_silent(session: Terminal) -> None:
-    session.policy_service.leave()
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 5, "lost": True})
-    session.sync()
-    assert session.events.all(kind="log", member="warning", after=mark) == []
-
-    session.policy_service.appear()
-    mark = session.events.mark()
-    session.daemon.push_policy({"type": 5, "lost": False})
-    arrived = session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
-    assert json.loads(arrived.args[0])["lost"] is False

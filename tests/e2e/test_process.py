@@ -6,15 +6,13 @@ import pytest
 
 from sandbox.machine.users import User
 from sandbox.terminal import Terminal
-from tests.e2e.wire import FIVE_MINUTES, log_lines, next_status
+from tests.e2e.wire import FIVE_MINUTES, log_lines, next_status, push, start_agent
 
 
-def test_log_calls_carry_file_line_and_function(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy("no JSON")
-    terminal.sync()
-    entry = terminal.events.all(kind="log", after=mark)[0]
+def test_log_calls_carry_file_line_and_function(session: Terminal) -> None:
+    mark = push(session, "no JSON")
+    session.sync()
+    entry = session.events.all(kind="log", after=mark)[0]
     assert entry.member == "info"
     assert entry.detail["file"] == "src/velk/velks/message_transfer.cpp"
     assert entry.detail["line"] > 0
@@ -34,8 +32,7 @@ def test_log_calls_carry_file_line_and_function(terminal: Terminal) -> None:
     ],
 )
 def test_line_is_logged_at_its_level(terminal: Terminal, beginning: str, level: str) -> None:
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     terminal.daemon.push_online()
     terminal.daemon.push_policy({"type": 1202, "payload": {"uid": 7}})
     terminal.sync()
@@ -45,8 +42,7 @@ def test_line_is_logged_at_its_level(terminal: Terminal, beginning: str, level: 
 
 def test_login_name_is_logged_as_it_is_and_without_its_first_at_sign(terminal: Terminal) -> None:
     terminal.files.write_accounts(User("@@zhang@wei", terminal.user.uid))
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     names = [line for line in log_lines(terminal, mark) if "getusername:" in line]
     assert names == [
         'getCurrentLoginUser getusername: "@@zhang@wei"',
@@ -64,8 +60,7 @@ def test_login_name_is_read_in_the_encoding_of_the_locale(terminal: Terminal) ->
 
 def test_user_without_account_entry_has_an_empty_login_name(terminal: Terminal) -> None:
     terminal.files.write_accounts()
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     assert [line for line in log_lines(terminal, mark) if "getusername:" in line] == [
         '---getusername: ""',
         '---getusername: ""',
@@ -93,16 +88,14 @@ def test_no_services_at_all_do_not_keep_the_agent_from_running(terminal: Termina
     assert next_status(terminal, mark) == (1, "")
 
 
-def test_memory_of_many_policies_is_given_back(terminal: Terminal) -> None:
-    terminal.start_agent()
+def test_memory_of_many_policies_is_given_back(session: Terminal) -> None:
     payload = '{"type":5,"text":"' + "x" * 10000 + '"}'
 
     def resident_after(policies: int) -> int:
         for _ in range(policies):
-            mark = terminal.events.mark()
-            terminal.daemon.push_policy(payload)
-            terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
-        return terminal.agent.resident_bytes()
+            mark = push(session, payload)
+            session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+        return session.agent.resident_bytes()
 
     warm = resident_after(500)
     assert resident_after(2000) - warm < 2000 * len(payload) / 10

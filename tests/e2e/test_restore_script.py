@@ -8,8 +8,8 @@ from pathlib import Path
 import pytest
 
 from sandbox.terminal import Terminal
-from tests.e2e.domainexit import EXIT, ROAD, leave_domain, road
-from tests.e2e.wire import forced_actions, log_lines
+from tests.e2e.domainexit import EXIT, EXIT_STEPS, leave_domain, steps_seen
+from tests.e2e.wire import forced_actions, log_lines, push
 
 
 def test_script_path_is_logged(session: Terminal) -> None:
@@ -52,8 +52,7 @@ def test_script_that_reads_its_input_finds_its_end_at_once(session: Terminal) ->
 
 def test_script_that_takes_longer_than_the_minute_delays_the_reboot_to_its_end(session: Terminal) -> None:
     session.commands.hold("restore_config")
-    mark = session.events.mark()
-    session.daemon.push_policy(EXIT)
+    mark = push(session, EXIT)
     session.events.wait_for(target="restore_config", after=mark)
 
     session.jump(90)
@@ -61,7 +60,7 @@ def test_script_that_takes_longer_than_the_minute_delays_the_reboot_to_its_end(s
     session.commands.release("restore_config")
     session.sync()
     session.sync()
-    assert road(session, mark) == [*ROAD, ("logind", "Reboot")]
+    assert steps_seen(session, mark) == [*EXIT_STEPS, ("logind", "Reboot")]
 
 
 @pytest.mark.parametrize("stream", [1, 2], ids=["stdout", "stderr"])
@@ -76,13 +75,12 @@ def test_script_writes_where_the_agent_writes(session: Terminal, stream: int) ->
 def test_script_is_waited_for_by_the_clock_on_the_wall(session: Terminal) -> None:
     """Longer than the 30 s after which a child process is given up by default."""
     session.files.write_restore_script("sleep 31; restore_config\n")
-    mark = session.events.mark()
-    session.daemon.push_policy(EXIT)
+    mark = push(session, EXIT)
     session.events.wait_for(target="identity", member="Set", after=mark, timeout=120)
-    assert road(session, mark) == ROAD
+    assert steps_seen(session, mark) == EXIT_STEPS
 
 
 def test_script_leaves_a_child_that_does_not_hold_up_the_exit(session: Terminal) -> None:
     session.files.write_restore_script("sleep 600 & disown; restore_config\n")
     mark = leave_domain(session)
-    assert road(session, mark) == ROAD
+    assert steps_seen(session, mark) == EXIT_STEPS

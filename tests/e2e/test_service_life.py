@@ -10,9 +10,14 @@ from sandbox.terminal import Terminal
 from tests.e2e.wire import (
     FIVE_MINUTES,
     SHUTDOWN_NOTICE,
+    begin_countdown,
     forced_actions,
     next_notification,
     next_status,
+    push,
+    push_online,
+    start_agent,
+    warnings,
 )
 
 ACTIVE, LOCKED, SCREEN_SAVER = 1, 2, 3
@@ -32,25 +37,10 @@ def forwarded(terminal: Terminal) -> list[str]:
 
 
 def report(terminal: Terminal) -> tuple[int, str]:
-    """Status and name that the daemon is told when it asks."""
-    mark = terminal.events.mark()
-    terminal.daemon.push_online()
+    """Status and name that the agent reports when the daemon asks."""
+    mark = push_online(terminal)
     status, name = next_status(terminal, mark)
     return status, name
-
-
-def warnings(terminal: Terminal, after: int) -> list[str]:
-    """What the agent has warned of since a mark."""
-    return [event.args[0] for event in terminal.events.all(kind="log", member="warning", after=after)]
-
-
-def begin_countdown(terminal: Terminal) -> int:
-    """Push a log-out and wait for its warning; the result is the mark before it."""
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    next_notification(terminal, mark)
-    terminal.sync()
-    return mark
 
 
 def test_policies_go_to_the_policy_service_that_is_there_at_the_time(terminal: Terminal) -> None:
@@ -80,10 +70,9 @@ def test_what_the_policy_service_replies_is_not_looked_at(terminal: Terminal, re
     assert (forwarded(terminal), warnings(terminal, mark)) == (["first", "second"], [])
 
 
-def test_the_login_manager_that_is_there_at_the_time_tells_the_name(terminal: Terminal) -> None:
+def test_the_name_is_read_from_the_login_manager_that_is_there_at_the_time(terminal: Terminal) -> None:
     terminal.logind.leave()
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     assert next_status(terminal, mark) == (ACTIVE, "")
     terminal.logind.appear()
     assert report(terminal) == (ACTIVE, "zhang.wei")
@@ -106,66 +95,52 @@ def test_the_identity_of_the_start_is_announced_although_the_login_manager_came_
     assert announced.args == ("", 0)
 
 
-def test_a_login_manager_that_restarts_in_the_last_minute_ends_the_session(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = begin_countdown(terminal)
-    terminal.logind.restart()
-    terminal.advance(60)
-    assert forced_actions(terminal, mark) == ["Terminate"]
+def test_a_login_manager_that_restarts_in_the_last_minute_ends_the_session(session: Terminal) -> None:
+    mark = begin_countdown(session)
+    session.logind.restart()
+    session.advance(60)
+    assert forced_actions(session, mark) == ["Terminate"]
 
 
-def test_a_login_manager_that_has_gone_by_the_last_second_is_one_warning(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = begin_countdown(terminal)
-    terminal.logind.leave()
-    terminal.advance(60)
-    assert [line.partition(":")[0] for line in warnings(terminal, mark)] == ["cannot call Terminate"]
-    terminal.logind.appear()
-    terminal.advance(FIVE_MINUTES)
-    assert forced_actions(terminal, mark) == []
+def test_a_login_manager_that_has_gone_by_the_last_second_is_one_warning(session: Terminal) -> None:
+    mark = begin_countdown(session)
+    session.logind.leave()
+    session.advance(60)
+    assert [line.partition(":")[0] for line in warnings(session, mark)] == ["cannot call Terminate"]
+    session.logind.appear()
+    session.advance(FIVE_MINUTES)
+    assert forced_actions(session, mark) == []
 
 
-def test_a_countdown_goes_on_without_the_daemon_that_ordered_it(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = begin_countdown(terminal)
-    terminal.daemon.leave()
-    terminal.daemon.appear()
-    terminal.advance(60)
-    assert forced_actions(terminal, mark) == ["Terminate"]
+def test_a_countdown_goes_on_without_the_daemon_that_ordered_it(session: Terminal) -> None:
+    mark = begin_countdown(session)
+    session.daemon.leave()
+    session.daemon.appear()
+    session.advance(60)
+    assert forced_actions(session, mark) == ["Terminate"]
 
 
-def leave_domain(terminal: Terminal) -> int:
-    """Push the policy and wait for the step before the last; the result is the mark before it."""
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1200})
-    terminal.events.wait_for(target="daemon", member="onDomainConfig", after=mark)
-    return mark
+def test_an_identity_service_that_comes_after_the_exit_stays_as_it_is(session: Terminal) -> None:
+    session.identity.leave()
+    mark = begin_countdown(session, 1200)
+    session.identity.appear()
+    session.advance(60)
+    assert forced_actions(session, mark) == ["Reboot"]
+    assert session.identity.value("Enable") is True
 
 
-def test_an_identity_service_that_comes_after_the_exit_is_not_told(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.identity.leave()
-    mark = leave_domain(terminal)
-    terminal.identity.appear()
-    terminal.advance(60)
-    assert forced_actions(terminal, mark) == ["Reboot"]
-    assert terminal.identity.value("Enable") is True
+def test_an_identity_service_that_was_restarted_is_switched_off(session: Terminal) -> None:
+    session.identity.restart()
+    mark = begin_countdown(session, 1200)
+    session.events.wait_for(target="identity", member="Set", after=mark)
+    assert session.identity.value("Enable") is False
 
 
-def test_an_identity_service_that_was_restarted_is_switched_off(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.identity.restart()
-    mark = leave_domain(terminal)
-    terminal.events.wait_for(target="identity", member="Set", after=mark)
-    assert terminal.identity.value("Enable") is False
-
-
-def test_an_identity_service_may_reply_what_it_likes(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.identity.answers["Set"] = Reply("a{sv}", ({},))
-    mark = leave_domain(terminal)
-    terminal.advance(60)
-    assert (forced_actions(terminal, mark), warnings(terminal, mark)) == (["Reboot"], [])
+def test_the_reply_of_the_identity_service_is_ignored(session: Terminal) -> None:
+    session.identity.answers["Set"] = Reply("a{sv}", ({},))
+    mark = begin_countdown(session, 1200)
+    session.advance(60)
+    assert (forced_actions(session, mark), warnings(session, mark)) == (["Reboot"], [])
 
 
 def test_notices_go_to_the_notification_service_that_is_there_at_the_time(terminal: Terminal) -> None:
@@ -173,29 +148,24 @@ def test_notices_go_to_the_notification_service_that_is_there_at_the_time(termin
     terminal.start_agent()
     for change in (terminal.notifications.appear, terminal.notifications.restart):
         change()
-        mark = terminal.events.mark()
-        terminal.daemon.push_policy(NOTICE)
+        mark = push(terminal, NOTICE)
         assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
 
 
-def test_a_notification_service_that_has_gone_does_not_keep_the_log_out_back(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.notifications.leave()
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    terminal.advance(60)
-    assert forced_actions(terminal, mark) == ["Terminate"]
-    assert [line.partition("(")[0] for line in warnings(terminal, mark)] == ["--@@@@-- QDBusError"]
+def test_a_notification_service_that_has_gone_does_not_keep_the_log_out_back(session: Terminal) -> None:
+    session.notifications.leave()
+    mark = push(session, {"type": 1201})
+    session.advance(60)
+    assert forced_actions(session, mark) == ["Terminate"]
+    assert [line.partition("(")[0] for line in warnings(session, mark)] == ["--@@@@-- QDBusError"]
 
 
 @pytest.mark.parametrize("reply", [Reply("", ()), Reply("a{sv}", ({},)), Reply("s", ("one",))], ids=str)
-def test_a_notification_service_may_reply_what_it_likes(terminal: Terminal, reply: Reply) -> None:
-    terminal.start_agent()
-    terminal.notifications.answers["Notify"] = reply
-    mark = terminal.events.mark()
-    terminal.daemon.push_policy({"type": 1201})
-    terminal.advance(60)
-    assert (forced_actions(terminal, mark), warnings(terminal, mark)) == (["Terminate"], [])
+def test_any_reply_of_the_notification_service_lets_the_log_out_come(session: Terminal, reply: Reply) -> None:
+    session.notifications.answers["Notify"] = reply
+    mark = push(session, {"type": 1201})
+    session.advance(60)
+    assert (forced_actions(session, mark), warnings(session, mark)) == (["Terminate"], [])
 
 
 @pytest.mark.parametrize(("name", "status"), [("screensaver", SCREEN_SAVER), ("session_manager", LOCKED)])

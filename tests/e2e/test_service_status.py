@@ -1,4 +1,4 @@
-"""What the service manager shows of the agent: a countdown, in which nobody should restart it."""
+"""What the service manager shows of the agent: a countdown, during which it should not be restarted."""
 
 from __future__ import annotations
 
@@ -18,7 +18,7 @@ _LARGEST = 4096
 
 @pytest.fixture
 def manager(tmp_path: Path) -> Iterator[socket.socket]:
-    """The socket on which a service manager hears its services."""
+    """The socket to which services send their status."""
     with socket.socket(socket.AF_UNIX, socket.SOCK_DGRAM) as heard:
         heard.bind(str(tmp_path / "notify"))
         heard.settimeout(_WAIT_SECONDS)

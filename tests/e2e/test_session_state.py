@@ -1,4 +1,4 @@
-"""What the daemon is told of the session: active (1), locked (2), behind the screen saver (3)."""
+"""What the agent reports of the session: active (1), locked (2), behind the screen saver (3)."""
 
 from __future__ import annotations
 
@@ -11,7 +11,7 @@ from sandbox.fakes.fault import Fault
 from sandbox.fakes.logind import USER
 from sandbox.machine import layout
 from sandbox.terminal import Terminal
-from tests.e2e.wire import FIVE_MINUTES, log_lines, next_status
+from tests.e2e.wire import FIVE_MINUTES, log_lines, next_status, start_agent, warnings
 
 ACTIVE, LOCKED, SCREEN_SAVER = 1, 2, 3
 
@@ -119,56 +119,50 @@ def test_absent_service_is_not_logged(terminal: Terminal, absent: str, logged: l
     mark = terminal.events.mark()
     five_minute_report(terminal)
     assert [line for line in log_lines(terminal, mark) if line.startswith("get screen")] == logged
-    assert terminal.events.all(kind="log", member="warning", after=mark) == []
+    assert warnings(terminal, mark) == []
 
 
-def test_report_reads_the_name_then_the_screen_saver_then_the_lock(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    five_minute_report(terminal)
-    calls = terminal.events.all(source="velks", kind="call", after=mark)
+def test_report_reads_the_name_then_the_screen_saver_then_the_lock(session: Terminal) -> None:
+    mark = session.events.mark()
+    five_minute_report(session)
+    calls = session.events.all(source="velks", kind="call", after=mark)
     assert [call.target for call in calls] == ["logind", "screensaver", "session_manager", "daemon"]
 
 
 def test_status_at_start_is_active_whatever_the_screen_shows(terminal: Terminal) -> None:
     show(terminal, running=True, locked=True)
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     assert next_status(terminal, mark) == (ACTIVE, "zhang.wei")
 
 
-def test_report_comes_every_five_minutes_even_without_a_change(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.advance(299)
-    assert terminal.events.all(member="SendUserStatus", after=mark) == []
-    terminal.advance(2)
-    next_status(terminal, mark, count=1)
-    terminal.advance(FIVE_MINUTES)
-    next_status(terminal, mark, count=2)
-    assert len(terminal.events.all(member="SendUserStatus", after=mark)) == 2
+def test_report_comes_every_five_minutes_even_without_a_change(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.advance(299)
+    assert session.events.all(member="SendUserStatus", after=mark) == []
+    session.advance(2)
+    next_status(session, mark, count=1)
+    session.advance(FIVE_MINUTES)
+    next_status(session, mark, count=2)
+    assert len(session.events.all(member="SendUserStatus", after=mark)) == 2
 
 
-def test_change_between_two_reports_waits_for_the_next(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.session_manager.set("Locked", True)
-    terminal.advance(299)
-    assert terminal.events.all(member="SendUserStatus", after=mark) == []
-    terminal.advance(2)
-    assert next_status(terminal, mark)[0] == LOCKED
+def test_change_between_two_reports_waits_for_the_next(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.session_manager.set("Locked", True)
+    session.advance(299)
+    assert session.events.all(member="SendUserStatus", after=mark) == []
+    session.advance(2)
+    assert next_status(session, mark)[0] == LOCKED
 
 
-def test_name_is_read_afresh_and_loses_every_at_sign(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.logind.rename("@new@name@")
-    assert five_minute_report(terminal) == (ACTIVE, "newname")
+def test_name_is_read_afresh_and_loses_every_at_sign(session: Terminal) -> None:
+    session.logind.rename("@new@name@")
+    assert five_minute_report(session) == (ACTIVE, "newname")
 
 
-def test_login_manager_without_user_object_gives_an_empty_name(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.logind.forget_user()
-    assert five_minute_report(terminal) == (ACTIVE, "")
+def test_login_manager_without_user_object_gives_an_empty_name(session: Terminal) -> None:
+    session.logind.forget_user()
+    assert five_minute_report(session) == (ACTIVE, "")
 
 
 WRONG_VALUES = [("s", "true?"), ("as", ["a", "b"]), ("(ii)", (1, 2)), ("a{sv}", {}), ("i", 7)]
@@ -192,8 +186,7 @@ def test_properties_of_another_type_do_not_keep_the_report_back(
 def test_user_of_another_type_is_reported_as_unknown(terminal: Terminal, signature: str, value: Any) -> None:
     for name in ("Name", "UID"):
         terminal.logind.set(name, value, signature, path=USER)
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     announced = terminal.events.wait_for(target="daemon", member="UpdateUserInfo", after=mark)
     assert announced.args == ("", 0)
     assert five_minute_report(terminal) == (ACTIVE, "")
@@ -214,10 +207,9 @@ def test_replies_of_another_form_read_as_no(terminal: Terminal, service: str, re
 
 
 @pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
-def test_failing_service_reads_as_no(terminal: Terminal, service: str) -> None:
-    terminal.start_agent()
-    terminal.fakes[service].fault = Fault.fail()
-    assert five_minute_report(terminal) == (ACTIVE, "" if service == "logind" else "zhang.wei")
+def test_failing_service_reads_as_no(session: Terminal, service: str) -> None:
+    session.fakes[service].fault = Fault.fail()
+    assert five_minute_report(session) == (ACTIVE, "" if service == "logind" else "zhang.wei")
 
 
 @pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])

@@ -90,12 +90,10 @@ def test_change_without_items_reports_the_change_alone(terminal: Terminal) -> No
     assert [url for url, _ in uploads(terminal)] == [CHANGE]
 
 
-def test_nothing_is_reported_of_an_empty_inventory(terminal: Terminal) -> None:
-    terminal.start_agent()
+def test_nothing_is_reported_of_an_empty_inventory(session: Terminal) -> None:
+    announce(session, "deleted", EDITOR)
 
-    announce(terminal, "deleted", EDITOR)
-
-    assert uploads(terminal) == []
+    assert uploads(session) == []
 
 
 def test_records_come_in_the_launchers_order(terminal: Terminal) -> None:
@@ -120,27 +118,24 @@ def test_any_display_name_is_reported_as_it_is(terminal: Terminal, name: str) ->
     assert next_inventory(terminal)[0]["name"] == name
 
 
-def test_change_of_an_unknown_file_has_no_known_version(terminal: Terminal) -> None:
-    terminal.start_agent()
+def test_change_of_an_unknown_file_has_no_known_version(session: Terminal) -> None:
+    session.launcher.announce("created", EDITOR)
 
-    terminal.launcher.announce("created", EDITOR)
-
-    assert next_change(terminal)["software_version"] == "failed"
+    assert next_change(session)["software_version"] == "failed"
 
 
-def test_change_tells_the_time_and_the_alias_of_that_moment(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.files.write_userinfo(terminal_name="another name")
-    terminal.advance(61)
+def test_change_has_the_time_and_the_alias_of_that_moment(session: Terminal) -> None:
+    session.files.write_userinfo(terminal_name="another name")
+    session.advance(61)
 
-    terminal.launcher.announce("created", EDITOR)
+    session.launcher.announce("created", EDITOR)
 
-    change = next_change(terminal)
+    change = next_change(session)
     assert (change["operated_at"], change["pc_name"]) == (now(), "another name")
 
 
-def test_change_tells_the_time_of_the_sessions_zone(terminal: Terminal) -> None:
-    """The terminal's clock stands for the local time of whatever zone a program lives in."""
+def test_change_has_the_time_of_the_sessions_zone(terminal: Terminal) -> None:
+    """The terminal's clock shows the local time of the program's zone."""
     terminal.start_agent(extra_env={"TZ": "Asia/Shanghai"})
 
     terminal.launcher.announce("created", EDITOR)
@@ -177,57 +172,52 @@ def test_inventory_alone_asks_the_daemon_nothing(terminal: Terminal) -> None:
     ("signature", "value"), [("i", (7,)), ("b", (True,)), ("as", (["x"],)), ("v", ("x",)), ("", ())], ids=str
 )
 def test_machine_of_a_wrong_type_is_reported_as_empty(
-    terminal: Terminal, signature: str, value: tuple[object, ...]
+    session: Terminal, signature: str, value: tuple[object, ...]
 ) -> None:
-    terminal.start_agent()
-    terminal.daemon.answers["GetMachineID"] = Reply(signature, value)
+    session.daemon.answers["GetMachineID"] = Reply(signature, value)
 
-    terminal.launcher.announce("created", EDITOR)
+    session.launcher.announce("created", EDITOR)
 
-    assert next_change(terminal)["machine_id"] == ""
-
-
-def test_machine_that_the_daemon_refuses_to_tell_is_reported_as_empty(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.daemon.faults["GetMachineID"] = Fault.fail("com.norix.Error")
-
-    terminal.launcher.announce("created", EDITOR)
-
-    assert next_change(terminal)["machine_id"] == ""
+    assert next_change(session)["machine_id"] == ""
 
 
-def test_daemon_that_does_not_tell_the_machine_is_waited_for_until_the_limit(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.daemon.faults["GetMachineID"] = Fault.hang()
-    mark = terminal.events.mark()
+def test_machine_that_the_daemon_refuses_is_reported_as_empty(session: Terminal) -> None:
+    session.daemon.faults["GetMachineID"] = Fault.fail("com.norix.Error")
 
-    terminal.launcher.announce("created", EDITOR)
-    terminal.events.wait_for(member="GetMachineID", after=mark)
-    terminal.jump(DBUS_LIMIT)
+    session.launcher.announce("created", EDITOR)
 
-    assert next_change(terminal, mark)["machine_id"] == ""
+    assert next_change(session)["machine_id"] == ""
 
 
-def test_slow_daemon_is_waited_for(terminal: Terminal) -> None:
-    terminal.start_agent()
-    terminal.daemon.faults["GetMachineID"] = Fault.hold()
-    mark = terminal.events.mark()
+def test_daemon_that_does_not_return_the_machine_is_waited_for_until_the_limit(session: Terminal) -> None:
+    session.daemon.faults["GetMachineID"] = Fault.hang()
+    mark = session.events.mark()
 
-    terminal.launcher.announce("created", EDITOR)
-    terminal.events.wait_for(member="GetMachineID", after=mark)
-    terminal.jump(DBUS_LIMIT - 5)
-    terminal.daemon.release()
+    session.launcher.announce("created", EDITOR)
+    session.events.wait_for(member="GetMachineID", after=mark)
+    session.jump(DBUS_LIMIT)
 
-    assert next_change(terminal, mark)["machine_id"] == "box-machine-0001"
+    assert next_change(session, mark)["machine_id"] == ""
 
 
-def test_without_a_daemon_the_report_is_made_with_an_empty_machine(terminal: Terminal) -> None:
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    terminal.daemon.leave()
+def test_slow_daemon_is_waited_for(session: Terminal) -> None:
+    session.daemon.faults["GetMachineID"] = Fault.hold()
+    mark = session.events.mark()
 
-    terminal.launcher.announce("created", EDITOR)
-    line = terminal.events.wait_for(
+    session.launcher.announce("created", EDITOR)
+    session.events.wait_for(member="GetMachineID", after=mark)
+    session.jump(DBUS_LIMIT - 5)
+    session.daemon.release()
+
+    assert next_change(session, mark)["machine_id"] == "box-machine-0001"
+
+
+def test_without_a_daemon_the_report_is_made_with_an_empty_machine(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.leave()
+
+    session.launcher.announce("created", EDITOR)
+    line = session.events.wait_for(
         lambda event: event.args[0].startswith("uploadSoftware ---------"), kind="log", after=mark
     )
 
@@ -260,10 +250,8 @@ def test_change_is_logged(terminal: Terminal) -> None:
     ]
 
 
-def test_levels_of_the_logged_lines(terminal: Terminal) -> None:
-    terminal.start_agent()
+def test_levels_of_the_logged_lines(session: Terminal) -> None:
+    mark = announce(session, "created", EDITOR)
 
-    mark = announce(terminal, "created", EDITOR)
-
-    levels = [event.member for event in terminal.events.all(kind="log", after=mark)]
+    levels = [event.member for event in session.events.all(kind="log", after=mark)]
     assert levels[:5] == ["info", "warning", "warning", "debug", "info"]

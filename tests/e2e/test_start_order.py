@@ -5,7 +5,7 @@ from __future__ import annotations
 from sandbox.fakes import dock
 from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import CLOSED, OPENED, settle, told
+from tests.e2e.dockwatch import CLOSED, OPENED, settle, reported
 from tests.e2e.software import CHANGE, EDITOR, INVENTORY, install, next_inventory, uploads
 from tests.e2e.wire import SHUTDOWN_NOTICE, log_lines, next_notification
 
@@ -28,19 +28,6 @@ def test_dock_is_not_asked_before_the_launcher_has_answered(terminal: Terminal) 
     terminal.events.wait_for(target="dock", member="Get", after=mark)
 
 
-def test_login_manager_is_not_asked_before_the_first_inventory_is_made(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    mark = start_until(terminal, "launcher", "GetAllItemInfos")
-    terminal.receive_all()
-    assert terminal.events.all(target="logind", after=mark) == []
-
-    terminal.launcher.release()
-
-    terminal.events.wait_for(target="logind", member="Get", after=mark)
-    terminal.receive_all()
-    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY]
-
-
 def test_session_is_announced_before_the_dock_has_answered(terminal: Terminal) -> None:
     install(terminal, EDITOR)
     terminal.dock.open_app("mail", "Mail")
@@ -52,7 +39,7 @@ def test_session_is_announced_before_the_dock_has_answered(terminal: Terminal) -
     terminal.dock.faults.clear()
     terminal.dock.release()
     settle(terminal)
-    assert told(terminal, mark) == [(OPENED, "Mail")]
+    assert reported(terminal, mark) == [(OPENED, "Mail")]
 
 
 def test_what_the_dock_says_while_it_is_read_is_heard(terminal: Terminal) -> None:
@@ -84,7 +71,7 @@ def test_windows_that_change_while_a_slow_dock_is_read_are_known_afterwards(term
     terminal.dock.set_windows("mail", 0)
     settle(terminal)
 
-    assert told(terminal, mark) == [(CLOSED, "Mail")]
+    assert reported(terminal, mark) == [(CLOSED, "Mail")]
 
 
 def test_policy_that_comes_while_the_launcher_is_asked_is_carried_out(terminal: Terminal) -> None:
@@ -108,9 +95,7 @@ def test_change_that_comes_while_the_first_inventory_is_made_is_reported_after_i
     assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY, CHANGE, INVENTORY]
 
 
-def test_first_inventory_is_logged_like_a_report_without_an_action(terminal: Terminal) -> None:
-    terminal.start_agent()
-
-    lines = [(line.member, line.args[0]) for line in terminal.events.all(kind="log")]
+def test_first_inventory_is_logged_like_a_report_without_an_action(session: Terminal) -> None:
+    lines = [(line.member, line.args[0]) for line in session.events.all(kind="log")]
     first = lines.index(("debug", '"" ()'))
     assert lines[first + 1] == ("info", 'GetLauncerItems -------- QDBusError("", "")')

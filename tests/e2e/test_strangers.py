@@ -1,18 +1,18 @@
-"""Strangers who wait for a name, claim that a name has changed hands, or speak like the launcher."""
+"""Strangers that queue for a name, forge a new owner of a name, or send the launcher's signals."""
 
 from __future__ import annotations
 
-from typing import Any, Iterator
+from typing import Any
 
 import pytest
 
-from sandbox.bus.buses import Bus
 from sandbox.bus.stranger import Stranger
 from sandbox.fakes import daemon, dock, launcher
 from sandbox.fakes.base import Fake
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import settle, told
+from tests.e2e.dockwatch import settle, reported
 from tests.e2e.software import EDITOR, install, uploads
+from tests.e2e.strangers import BUS, BUS_PATH, let_reach_the_bus, receivers, straight_or_not
 from tests.e2e.wire import (
     SHUTDOWN_NOTICE,
     carries_out_policies,
@@ -20,39 +20,10 @@ from tests.e2e.wire import (
     next_notification,
     next_status,
     settled,
+    start_agent,
 )
 
-BUS = "org.freedesktop.DBus"
-BUS_PATH = "/org/freedesktop/DBus"
 ITEM = ("/usr/share/applications/spoof.desktop", "Spoof", "", "", 0, 0)
-
-straight_or_not = pytest.mark.parametrize("straight", [False, True], ids=["broadcast", "straight"])
-
-
-@pytest.fixture
-def on_system(terminal: Terminal) -> Iterator[Stranger]:
-    """Someone else on the system bus."""
-    someone = Stranger(terminal.system_bus)
-    yield someone
-    someone.close()
-
-
-@pytest.fixture
-def on_session(terminal: Terminal) -> Iterator[Stranger]:
-    """Someone else on the session bus."""
-    someone = Stranger(terminal.session_bus)
-    yield someone
-    someone.close()
-
-
-def receivers(terminal: Terminal, bus: Bus, straight: bool) -> list[str | None]:
-    """Whom a signal names: everyone, or the agent."""
-    return [*terminal.agent.bus_names(bus)] if straight else [None]
-
-
-def let_reach_the_bus(stranger: Stranger) -> None:
-    """Return once the bus has passed on what the stranger sent."""
-    stranger.call(BUS, BUS_PATH, BUS, "GetId")
 
 
 def push(stranger: Stranger, payload: str) -> None:
@@ -61,37 +32,35 @@ def push(stranger: Stranger, payload: str) -> None:
     let_reach_the_bus(stranger)
 
 
-def say_that_it_owns(stranger: Stranger, name: str, old: str, receiver: str | None) -> None:
-    """Let the stranger say, as the bus does, that a name is its own now."""
+def forge_owner(stranger: Stranger, name: str, old: str, receiver: str | None) -> None:
+    """Let the stranger announce, as the bus does, that it owns a name now."""
     args = (name, old, stranger.unique_name)
     stranger.emit(BUS_PATH, BUS, "NameOwnerChanged", *args, signature="sss", destination=receiver)
 
 
 def test_stranger_in_the_queue_is_obeyed_once_it_owns_the_name_and_not_before(
-    terminal: Terminal, on_system: Stranger
+    session: Terminal, on_system: Stranger
 ) -> None:
-    terminal.start_agent()
     assert on_system.own(daemon.INTERFACE, queue=True) == 2
-    mark = terminal.events.mark()
+    mark = session.events.mark()
     push(on_system, '{"type":1301}')
-    assert settled(terminal, mark) == []
+    assert settled(session, mark) == []
 
-    terminal.daemon.leave()
+    session.daemon.leave()
     push(on_system, '{"type":1300}')
-    assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
+    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
 @straight_or_not
-def test_daemon_is_not_replaced_by_somebody_who_says_so(
-    terminal: Terminal, on_system: Stranger, straight: bool
+def test_forged_new_owner_does_not_replace_the_daemon(
+    session: Terminal, on_system: Stranger, straight: bool
 ) -> None:
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    for receiver in receivers(terminal, terminal.system_bus, straight):
-        say_that_it_owns(on_system, daemon.INTERFACE, str(terminal.daemon.unique_name), receiver)
+    mark = session.events.mark()
+    for receiver in receivers(session, session.system_bus, straight):
+        forge_owner(on_system, daemon.INTERFACE, str(session.daemon.unique_name), receiver)
     push(on_system, '{"type":1201}')
-    assert settled(terminal, mark) == []
-    carries_out_policies(terminal)
+    assert settled(session, mark) == []
+    carries_out_policies(session)
 
 
 @straight_or_not
@@ -99,15 +68,14 @@ def test_daemon_is_not_replaced_by_somebody_who_says_so(
     ("name", "bus_name", "arrived"),
     [("dock", dock.INTERFACE, "dock entry size: 0"), ("launcher", launcher.INTERFACE, "software inited")],
 )
-def test_awaited_service_has_not_come_because_somebody_says_so(
+def test_forged_new_owner_is_no_arrival_of_an_awaited_service(
     terminal: Terminal, on_session: Stranger, straight: bool, name: str, bus_name: str, arrived: str
 ) -> None:
     fake: Fake = terminal.fakes[name]
     fake.leave()
-    mark = terminal.events.mark()
-    terminal.start_agent()
+    mark = start_agent(terminal)
     for receiver in receivers(terminal, terminal.session_bus, straight):
-        say_that_it_owns(on_session, bus_name, "", receiver)
+        forge_owner(on_session, bus_name, "", receiver)
     let_reach_the_bus(on_session)
     carries_out_policies(terminal)
     assert arrived not in log_lines(terminal, mark)
@@ -139,8 +107,8 @@ def test_stranger_that_speaks_like_the_launcher_is_ignored(
     assert (settled(terminal, mark), uploads(terminal, mark)) == ([], [])
 
 
-# Every signal with arguments that the agent listens to: whose it is, where it is sent from, and what it
-# should carry. The one without, pushOnlineMsg, says all by its name.
+# Every signal with arguments that the agent listens to: its sender, path, interface and signature.
+# pushOnlineMsg has none.
 SIGNALS = [
     ("daemon", daemon.PATH, daemon.INTERFACE, "pushPolicyMsg", "ss"),
     ("dock", dock.PATH, dock.INTERFACE, "EntryAdded", "oi"),
@@ -149,7 +117,9 @@ SIGNALS = [
 ]
 ARGUMENTS: list[tuple[str, tuple[Any, ...]]] = [
     ("", ()),
-    ("s", ("x",)),
+    ("s", ('{"type":1201}',)),
+    ("is", (1, '{"type":1201}')),
+    ("sss", ("box", '{"type":1201}', "x")),
     ("i", (1,)),
     ("v", ("x",)),
     ("as", (["x", "y"],)),
@@ -187,7 +157,7 @@ def test_signal_with_other_arguments_than_its_own_does_nothing(
     fake.appear()
     settle(terminal)
     assert settled(terminal, mark) == []
-    assert told(terminal, mark) == []
+    assert reported(terminal, mark) == []
 
     terminal.daemon.push_online()
     next_status(terminal, mark)

@@ -3,10 +3,11 @@
 from __future__ import annotations
 
 from dataclasses import dataclass
-from typing import Any, Callable
+from typing import Any, Callable, Mapping
 from uuid import uuid4
 
 from sandbox.events import Event
+from sandbox.fakes.fault import Fault
 from sandbox.periods import STATE_REPORT
 from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
@@ -31,11 +32,48 @@ class Notification:
     timeout: int
 
 
+def start_agent(terminal: Terminal) -> int:
+    """Start the agent; the mark before it."""
+    mark = terminal.events.mark()
+    terminal.start_agent()
+    return mark
+
+
+def push(terminal: Terminal, policy: str | Mapping[str, Any], app_id: str = "box") -> int:
+    """Let the daemon push a policy; the mark before it."""
+    mark = terminal.events.mark()
+    terminal.daemon.push_policy(policy, app_id)
+    return mark
+
+
+def push_online(terminal: Terminal) -> int:
+    """Let the daemon announce itself; the mark before it."""
+    mark = terminal.events.mark()
+    terminal.daemon.push_online()
+    return mark
+
+
 def next_notification(terminal: Terminal, after: int, count: int = 1) -> Notification:
     """The `count`th notification since a mark; waits for it."""
     event = terminal.events.wait_for(target="notifications", member="Notify", after=after, count=count)
     assert event.detail["signature"] == "susssasa{sv}i"
     return Notification(*event.args)
+
+
+def begin_countdown(terminal: Terminal, code: int = 1201) -> int:
+    """Push a policy that ends the session in a minute and wait for its warning; the mark before it."""
+    mark = push(terminal, {"type": code})
+    next_notification(terminal, mark)
+    terminal.sync()
+    return mark
+
+
+def wait_on_notification(terminal: Terminal, fault: Fault, code: int = 1300) -> int:
+    """Let the agent wait for the reply to a notification of a policy; the mark before it."""
+    terminal.notifications.fault = fault
+    mark = push(terminal, {"type": code})
+    terminal.events.wait_for(target="notifications", member="Notify", after=mark)
+    return mark
 
 
 def carries_out_policies(terminal: Terminal) -> None:
@@ -56,6 +94,14 @@ def forced_actions(terminal: Terminal, after: int) -> list[str]:
     """Which forced actions the login manager was asked for since a mark."""
     events = terminal.events.all(source="velks", target="logind", kind="call", after=after)
     return [event.member for event in events if event.member in ("Reboot", "Terminate")]
+
+
+def comes_in_a_minute(terminal: Terminal, action: str, after: int) -> None:
+    """Assert that a forced action comes after a minute, not before, and nothing else since a mark."""
+    terminal.advance(59)
+    assert forced_actions(terminal, after) == []
+    terminal.advance(1)
+    assert forced_actions(terminal, after) == [action]
 
 
 def settled(terminal: Terminal, after: int) -> list[Event]:
@@ -84,6 +130,11 @@ def asked_of_the_session_bus(terminal: Terminal, change: Callable[[], object]) -
     present = [fake.bus_name for fake in terminal.fakes.values() if fake.present]
     calls = terminal.session_monitor.calls[before:]
     return [(call.member, *call.args) for call in calls if call.destination not in present]
+
+
+def warnings(terminal: Terminal, after: int) -> list[str]:
+    """What the agent has warned of since a mark."""
+    return [event.args[0] for event in terminal.events.all(kind="log", member="warning", after=after)]
 
 
 def log_lines(terminal: Terminal, after: int) -> list[str]:

@@ -1,12 +1,13 @@
-#include "appopenspy.h"
-#include "log_recorder.h"
-#include "meta_order.h"
-#include "property_service.h"
-
 #include <QDBusMetaType>
 #include <QDBusObjectPath>
 #include <QSignalSpy>
 #include <QTest>
+
+#include "appopenspy.h"
+#include "at_log_line.h"
+#include "log_recorder.h"
+#include "meta_order.h"
+#include "property_service.h"
 
 using velk::module::software::AppOpenSpy;
 
@@ -14,26 +15,6 @@ namespace {
 
 const QString service = QStringLiteral("com.norix.kpx.daemon.Dock");
 const QString path = QStringLiteral("/com/norix/kpx/daemon/Dock");
-
-QtMessageHandler previousHandler = nullptr;
-const PropertyService* dockThatSpeaks = nullptr;
-
-void tell(const char* member, const QVariantList& arguments)
-{
-    auto signal = QDBusMessage::createSignal(path, service, QString::fromLatin1(member));
-    signal.setArguments(arguments);
-    dockThatSpeaks->service().send(signal);
-}
-
-/// Lets the dock remove an entry, and add one again, while the agent still reads it.
-void speakWhenTheDockIsRead(QtMsgType type, const QMessageLogContext& context, const QString& text)
-{
-    previousHandler(type, context, text);
-    if (text.startsWith(QLatin1String("dock entry size:"))) {
-        tell("EntryRemoved", {QStringLiteral("z")});
-        tell("EntryAdded", {QVariant::fromValue(QDBusObjectPath("/z")), 0});
-    }
-}
 
 } // namespace
 
@@ -43,59 +24,61 @@ class AppOpenSpyTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void signalsAndSlotsStandInTheirOrder();
-    void whatWasOpenIsToldOnceAndBeforeWhatHappensMeanwhile();
+    void signalsAndSlotsStandInTheirOrder()
+    {
+        QCOMPARE(methodsInOrder(AppOpenSpy::staticMetaObject),
+                 (QStringList{QStringLiteral("appStateChange(int,QString)"),
+                              QStringLiteral("onEntryAdded(QDBusObjectPath)"),
+                              QStringLiteral("onEntryRemoved(QString)")}));
+    }
+
+    void openApplicationsAreSignalledOnceAndBeforeLaterChanges()
+    {
+        qDBusRegisterMetaType<QMap<uint, QString>>();
+        PropertyService dock(service);
+        QList<QDBusObjectPath> paths;
+        for (const QString& name : {QStringLiteral("z"), QStringLiteral("y"), QStringLiteral("a")}) {
+            addEntry(dock, name, name == QLatin1String("y"));
+            paths.append(QDBusObjectPath(QLatin1Char('/') + name));
+        }
+        dock.set(path, QStringLiteral("Entries"), QVariant::fromValue(paths));
+
+        // Until the event loop has run once, Qt holds back what comes in.
+        QVERIFY(QDBusConnection::sessionBus().isConnected());
+        QCoreApplication::processEvents();
+        const LogRecorder log;
+        const auto send = [&dock](const char* member, const QVariantList& arguments) {
+            dock.service().send(signalOf(path, service, member, arguments));
+        };
+        AppOpenSpy* spy = nullptr;
+        {
+            const AtLogLine whileTheAgentReads("dock entry size:", [&send] {
+                send("EntryRemoved", {QStringLiteral("z")});
+                send("EntryAdded", {QVariant::fromValue(QDBusObjectPath("/z")), 0});
+            });
+            spy = AppOpenSpy::instance();
+        }
+
+        QCOMPARE(log.lines(), QStringList{QStringLiteral("info: dock entry size: 3")});
+        QCOMPARE(AppOpenSpy::instance(), spy);
+        QSignalSpy states(spy, &AppOpenSpy::appStateChange);
+        QCOMPARE(states.size(), 0);
+        const QString removedOne = QStringLiteral("Z");
+        QTRY_COMPARE(states,
+                     (QList<QVariantList>{
+                         {1, removedOne}, {1, QStringLiteral("A")}, {2, removedOne}, {1, removedOne}}));
+    }
 
 private:
-    static void addEntry(PropertyService& dock, const QString& name, bool docked);
-};
-
-void AppOpenSpyTest::addEntry(PropertyService& dock, const QString& name, bool docked)
-{
-    const QString entry = QLatin1Char('/') + name;
-    dock.set(entry, QStringLiteral("Id"), name);
-    dock.set(entry, QStringLiteral("Name"), name.toUpper());
-    dock.set(entry, QStringLiteral("IsDocked"), docked);
-    dock.set(entry, QStringLiteral("WindowInfos"), QVariant::fromValue(QMap<uint, QString>{{1, name}}));
-}
-
-void AppOpenSpyTest::signalsAndSlotsStandInTheirOrder()
-{
-    QCOMPARE(methodsInOrder(AppOpenSpy::staticMetaObject),
-             (QStringList{QStringLiteral("appStateChange(int,QString)"),
-                          QStringLiteral("onEntryAdded(QDBusObjectPath)"),
-                          QStringLiteral("onEntryRemoved(QString)")}));
-}
-
-void AppOpenSpyTest::whatWasOpenIsToldOnceAndBeforeWhatHappensMeanwhile()
-{
-    qDBusRegisterMetaType<QMap<uint, QString>>();
-    PropertyService dock(service);
-    QList<QDBusObjectPath> paths;
-    for (const QString& name : {QStringLiteral("z"), QStringLiteral("y"), QStringLiteral("a")}) {
-        addEntry(dock, name, name == QLatin1String("y"));
-        paths.append(QDBusObjectPath(QLatin1Char('/') + name));
+    static void addEntry(PropertyService& dock, const QString& name, bool docked)
+    {
+        const QString entry = QLatin1Char('/') + name;
+        dock.set(entry, QStringLiteral("Id"), name);
+        dock.set(entry, QStringLiteral("Name"), name.toUpper());
+        dock.set(entry, QStringLiteral("IsDocked"), docked);
+        dock.set(entry, QStringLiteral("WindowInfos"), QVariant::fromValue(QMap<uint, QString>{{1, name}}));
     }
-    dock.set(path, QStringLiteral("Entries"), QVariant::fromValue(paths));
-    dockThatSpeaks = &dock;
-
-    // Until the event loop has run once, Qt holds back what comes in.
-    QVERIFY(QDBusConnection::sessionBus().isConnected());
-    QCoreApplication::processEvents();
-    const LogRecorder log;
-    previousHandler = qInstallMessageHandler(speakWhenTheDockIsRead);
-    AppOpenSpy* spy = AppOpenSpy::instance();
-    qInstallMessageHandler(previousHandler);
-
-    QCOMPARE(log.lines(), QStringList{QStringLiteral("info: dock entry size: 3")});
-    QCOMPARE(AppOpenSpy::instance(), spy);
-    QSignalSpy states(spy, &AppOpenSpy::appStateChange);
-    QCOMPARE(states.size(), 0);
-    const QString removedOne = QStringLiteral("Z");
-    QTRY_COMPARE(
-        states,
-        (QList<QVariantList>{{1, removedOne}, {1, QStringLiteral("A")}, {2, removedOne}, {1, removedOne}}));
-}
+};
 
 QTEST_GUILESS_MAIN(AppOpenSpyTest)
 #include "appopenspy_test.moc"

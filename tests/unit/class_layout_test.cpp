@@ -1,6 +1,5 @@
-#include <QtTest>
-
 #include <QProcess>
+#include <QtTest>
 
 #include <algorithm>
 
@@ -80,6 +79,52 @@ QStringList partsOf(const QString& typeName)
     return parts;
 }
 
+template <typename Class, typename... Parts> void row(const char* name, const char* parts)
+{
+    if constexpr (std::is_base_of_v<QObject, Class>) {
+        // Makes the linker keep the object file whose debug information describes the class.
+        QVERIFY(QByteArray(Class::staticMetaObject.className()).endsWith(name));
+    }
+    QTest::newRow(name) << QString::fromLatin1(parts).split(QStringLiteral("; ")) << quint64(sizeof(Class))
+                        << quint64(sizeWith<Parts...>());
+}
+
+void messageRows()
+{
+    row<NotifyMessageOption, QString, bool, int, int, QString, QString>(
+        "NotifyMessageOption",
+        "QString uid; bool is_not_read; int limit; int offset; QString order; QString desc");
+    row<NotifyMessage, QString, QString, QString, QString, QString, QString, QString>(
+        "NotifyMessage",
+        "QString uuid; QString uid; QString send_uid; QString title; QString content; "
+        "QString created_at; QString read_at");
+    row<NotifyMessageResponse, int, int, int, QVector<NotifyMessage>>(
+        "NotifyMessageResponse", "int total; int offset; int limit; QVector<NotifyMessage> messages");
+    row<MessagePlatform, QObject, QTimer*, QString, QString, QVector<NotifyMessage>, QString, QString,
+        QString, QString, QString, MessageTransfer*>(
+        "MessagePlatform",
+        "QObject; QTimer * m_timer; QString m_userName; QString m_appPath; "
+        "QVector<NotifyMessage> m_messages; QString m_host; QString m_port; QString m_requestUrl; "
+        "QString m_listUrl; QString m_readUrl; MessageTransfer * m_transfer");
+    row<HandleEvent, QObject, HttpClientApi*>("HandleEvent", "QObject; HttpClientApi * m_http");
+}
+
+void desktopRows()
+{
+    row<AppOpenSpy, QObject, __Dock*, QMap<QString, QSharedPointer<EntryInfo>>>(
+        "AppOpenSpy",
+        "QObject; __Dock * m_dock; "
+        "QMap<QString, QSharedPointer<velk::module::software::EntryInfo>> m_entries");
+    row<EntryInfo, QObject, __Entry, QString, QString, qint32>(
+        "EntryInfo", "QObject; __Entry m_entry; QString m_entryId; QString m_appName; qint32 m_winSize");
+    row<SoftwareInfo, QString, QString, qint32, QString, QString, qint32>(
+        "SoftwareInfo",
+        "QString packageName; QString name; qint32 id; QString version; QString architecture; "
+        "qint32 installedType");
+    row<LauncherGuard, QObject, QList<SoftwareInfo>, __Launcherd*>(
+        "LauncherGuard", "QObject; QList<SoftwareInfo> m_softwareList; __Launcherd * m_launcher");
+}
+
 } // namespace
 
 /// Other code is compiled against these classes: base and members are those listed here, of these types and
@@ -89,104 +134,37 @@ class ClassLayoutTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void classHoldsExactlyTheseParts_data();
-    void classHoldsExactlyTheseParts();
-    void screenStatesAreExactlyThese();
-};
-
-namespace {
-
-template <typename Class, typename... Parts> void row(const char* name, const QStringList& parts)
-{
-    if constexpr (std::is_base_of_v<QObject, Class>) {
-        // It stands in the source file whose debug information holds the class, and brings it along.
-        QVERIFY(QByteArray(Class::staticMetaObject.className()).endsWith(name));
+    void classHoldsExactlyTheseParts_data()
+    {
+        QTest::addColumn<QStringList>("parts");
+        QTest::addColumn<quint64>("size");
+        QTest::addColumn<quint64>("sizeOfParts");
+        messageRows();
+        desktopRows();
+        row<MessageTransfer, QObject, velkgInterface*, prysInterface*, LauncherGuard*, QTimer*, QTimer*,
+            QString, QString, qint32, qint32>(
+            "MessageTransfer",
+            "QObject; velkgInterface * m_velkgInterface; prysInterface * m_prysInterface; "
+            "LauncherGuard * m_launcherGuard; QTimer * m_actionTimer; QTimer * m_stateTimer; "
+            "QString m_machineId; QString m_userName; qint32 m_uid; qint32 m_pendingAction");
     }
-    QTest::newRow(name) << parts << quint64(sizeof(Class)) << quint64(sizeWith<Parts...>());
-}
 
-void messageRows()
-{
-    row<NotifyMessageOption, QString, bool, int, int, QString, QString>(
-        "NotifyMessageOption",
-        {QStringLiteral("QString uid"), QStringLiteral("bool is_not_read"), QStringLiteral("int limit"),
-         QStringLiteral("int offset"), QStringLiteral("QString order"), QStringLiteral("QString desc")});
-    row<NotifyMessage, QString, QString, QString, QString, QString, QString, QString>(
-        "NotifyMessage",
-        {QStringLiteral("QString uuid"), QStringLiteral("QString uid"), QStringLiteral("QString send_uid"),
-         QStringLiteral("QString title"), QStringLiteral("QString content"),
-         QStringLiteral("QString created_at"), QStringLiteral("QString read_at")});
-    row<NotifyMessageResponse, int, int, int, QVector<NotifyMessage>>(
-        "NotifyMessageResponse",
-        {QStringLiteral("int total"), QStringLiteral("int offset"), QStringLiteral("int limit"),
-         QStringLiteral("QVector<NotifyMessage> messages")});
-    row<MessagePlatform, QObject, QTimer*, QString, QString, QVector<NotifyMessage>, QString, QString,
-        QString, QString, QString, MessageTransfer*>(
-        "MessagePlatform",
-        {QStringLiteral("QObject"), QStringLiteral("QTimer * m_timer"), QStringLiteral("QString m_userName"),
-         QStringLiteral("QString m_appPath"), QStringLiteral("QVector<NotifyMessage> m_messages"),
-         QStringLiteral("QString m_host"), QStringLiteral("QString m_port"),
-         QStringLiteral("QString m_requestUrl"), QStringLiteral("QString m_listUrl"),
-         QStringLiteral("QString m_readUrl"), QStringLiteral("MessageTransfer * m_transfer")});
-    row<HandleEvent, QObject, HttpClientApi*>(
-        "HandleEvent", {QStringLiteral("QObject"), QStringLiteral("HttpClientApi * m_http")});
-}
+    void classHoldsExactlyTheseParts()
+    {
+        QFETCH(quint64, size);
+        QTEST(partsOf(QString::fromLatin1(QTest::currentDataTag())), "parts");
+        QTEST(size, "sizeOfParts");
+    }
 
-void desktopRows()
-{
-    row<AppOpenSpy, QObject, __Dock*, QMap<QString, QSharedPointer<EntryInfo>>>(
-        "AppOpenSpy",
-        {QStringLiteral("QObject"), QStringLiteral("__Dock * m_dock"),
-         QStringLiteral("QMap<QString, QSharedPointer<velk::module::software::EntryInfo>> m_entries")});
-    row<EntryInfo, QObject, __Entry, QString, QString, qint32>(
-        "EntryInfo",
-        {QStringLiteral("QObject"), QStringLiteral("__Entry m_entry"), QStringLiteral("QString m_entryId"),
-         QStringLiteral("QString m_appName"), QStringLiteral("qint32 m_winSize")});
-    row<SoftwareInfo, QString, QString, qint32, QString, QString, qint32>(
-        "SoftwareInfo",
-        {QStringLiteral("QString packageName"), QStringLiteral("QString name"), QStringLiteral("qint32 id"),
-         QStringLiteral("QString version"), QStringLiteral("QString architecture"),
-         QStringLiteral("qint32 installedType")});
-    row<LauncherGuard, QObject, QList<SoftwareInfo>, __Launcherd*>(
-        "LauncherGuard",
-        {QStringLiteral("QObject"), QStringLiteral("QList<SoftwareInfo> m_softwareList"),
-         QStringLiteral("__Launcherd * m_launcher")});
-}
-
-} // namespace
-
-void ClassLayoutTest::classHoldsExactlyTheseParts_data()
-{
-    QTest::addColumn<QStringList>("parts");
-    QTest::addColumn<quint64>("size");
-    QTest::addColumn<quint64>("sizeOfParts");
-    messageRows();
-    desktopRows();
-    row<MessageTransfer, QObject, velkgInterface*, prysInterface*, LauncherGuard*, QTimer*, QTimer*, QString,
-        QString, qint32, qint32>(
-        "MessageTransfer",
-        {QStringLiteral("QObject"), QStringLiteral("velkgInterface * m_velkgInterface"),
-         QStringLiteral("prysInterface * m_prysInterface"), QStringLiteral("LauncherGuard * m_launcherGuard"),
-         QStringLiteral("QTimer * m_actionTimer"), QStringLiteral("QTimer * m_stateTimer"),
-         QStringLiteral("QString m_machineId"), QStringLiteral("QString m_userName"),
-         QStringLiteral("qint32 m_uid"), QStringLiteral("qint32 m_pendingAction")});
-}
-
-void ClassLayoutTest::classHoldsExactlyTheseParts()
-{
-    QFETCH(quint64, size);
-    QTEST(partsOf(QString::fromLatin1(QTest::currentDataTag())), "parts");
-    QTEST(size, "sizeOfParts");
-}
-
-void ClassLayoutTest::screenStatesAreExactlyThese()
-{
-    const QStringList expected{QStringLiteral("ScreenSaverRunning = 0"), QStringLiteral("ScreenLocked = 1"),
-                               QStringLiteral("ScreenActive = 2")};
-    QCOMPARE(partsOf(QStringLiteral("Screen_State")), expected);
-    static_assert(std::is_same_v<decltype(&MessageTransfer::getScreenState),
-                                 MessageTransfer::Screen_State (MessageTransfer::*)()>);
-}
+    void screenStatesAreExactlyThese()
+    {
+        const QStringList expected{QStringLiteral("ScreenSaverRunning = 0"),
+                                   QStringLiteral("ScreenLocked = 1"), QStringLiteral("ScreenActive = 2")};
+        QCOMPARE(partsOf(QStringLiteral("Screen_State")), expected);
+        static_assert(std::is_same_v<decltype(&MessageTransfer::getScreenState),
+                                     MessageTransfer::Screen_State (MessageTransfer::*)()>);
+    }
+};
 
 QTEST_GUILESS_MAIN(ClassLayoutTest)
 #include "class_layout_test.moc"

@@ -1,10 +1,10 @@
-#include "curl_library.h"
-
 #include <QLibrary>
 #include <QtTest>
 
 #include <cstdlib>
 #include <cstring>
+
+#include "curl_library.h"
 
 namespace {
 
@@ -30,22 +30,20 @@ class CurlLibraryTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void isInitialisedBeforeAnythingElse();
+    /// libcurl takes other functions for its memory only as long as it is not initialised.
+    void isInitialisedBeforeAnythingElse()
+    {
+        const CurlLibrary& library = curl();
+        QLibrary file(QStringLiteral("curl"), 4);
+        const auto initialiseOtherwise =
+            reinterpret_cast<decltype(&curl_global_init_mem)>(file.resolve("curl_global_init_mem"));
+        QCOMPARE(initialiseOtherwise(CURL_GLOBAL_DEFAULT, countedMalloc, std::free, std::realloc, strdup,
+                                     countedCalloc),
+                 CURLE_OK);
+        library.easyCleanup(library.easyInit());
+        QCOMPARE(allocations, 0);
+    }
 };
-
-/// libcurl takes other functions for its memory only as long as it is not initialised.
-void CurlLibraryTest::isInitialisedBeforeAnythingElse()
-{
-    const CurlLibrary& library = curl();
-    QLibrary file(QStringLiteral("curl"), 4);
-    const auto initialiseOtherwise =
-        reinterpret_cast<decltype(&curl_global_init_mem)>(file.resolve("curl_global_init_mem"));
-    QCOMPARE(initialiseOtherwise(CURL_GLOBAL_DEFAULT, countedMalloc, std::free, std::realloc, strdup,
-                                 countedCalloc),
-             CURLE_OK);
-    library.easyCleanup(library.easyInit());
-    QCOMPARE(allocations, 0);
-}
 
 QTEST_GUILESS_MAIN(CurlLibraryTest)
 #include "curl_library_test.moc"

@@ -1,14 +1,14 @@
-#include "bus_client.h"
-#include "proxies.h"
-#include "pryg_adapter.h"
-#include "prys_adapter.h"
-#include "velkg_adapter.h"
-
 #include <QDBusPendingReply>
 #include <QRegularExpression>
 #include <QTest>
 
 #include <functional>
+
+#include "bus_client.h"
+#include "proxies.h"
+#include "pryg_adapter.h"
+#include "prys_adapter.h"
+#include "velkg_adapter.h"
 
 namespace {
 
@@ -145,95 +145,91 @@ class DBusAdaptersTest : public QObject
 
 private Q_SLOTS:
     void callReachesTheParentAndItsReplyTheCaller_data() { addMethods(); }
-    void callReachesTheParentAndItsReplyTheCaller();
+    void callReachesTheParentAndItsReplyTheCaller()
+    {
+        QFETCH(const QString, interface);
+        QFETCH(const QString, method);
+        QFETCH(const QVariantList, arguments);
+        QFETCH(const QVariantList, reply);
+        BusClient server;
+        Implementation implementation;
+        exportObject(server, implementation);
+        BusClient client;
+
+        const QDBusPendingCall call = client.bus().asyncCall(callOf(server, interface, method, arguments));
+        QVERIFY(finished(call));
+
+        QVERIFY2(!call.isError(), qPrintable(call.error().message()));
+        QCOMPARE(call.reply().arguments(), reply);
+        QCOMPARE(implementation.calls, QList<QVariantList>{QVariantList{method} + arguments});
+    }
+
     void parentWithoutTheMethodRepliesEmpty_data() { addMethods(); }
-    void parentWithoutTheMethodRepliesEmpty();
-    void signalOfTheParentArrivesAtTheProxy_data();
-    void signalOfTheParentArrivesAtTheProxy();
+    void parentWithoutTheMethodRepliesEmpty()
+    {
+        QFETCH(const QString, interface);
+        QFETCH(const QString, method);
+        QFETCH(const QVariantList, arguments);
+        QFETCH(const QVariantList, emptyReply);
+        BusClient server;
+        QObject bare;
+        exportObject(server, bare);
+        BusClient client;
+        QTest::ignoreMessage(QtWarningMsg, QRegularExpression(QStringLiteral("No such method.*") + method));
+
+        const QDBusPendingCall call = client.bus().asyncCall(callOf(server, interface, method, arguments));
+        QVERIFY(finished(call));
+
+        QVERIFY2(!call.isError(), qPrintable(call.error().message()));
+        QCOMPARE(call.reply().arguments(), emptyReply);
+    }
+
+    void signalOfTheParentArrivesAtTheProxy_data()
+    {
+        QTest::addColumn<QString>("interface");
+        QTest::addColumn<QString>("name");
+        QTest::addColumn<QVariantList>("arguments");
+        QTest::addColumn<Emit>("emitIt");
+
+        const QString text = QStringLiteral("策略");
+        const QString id = QStringLiteral("1d6b");
+        addSignal(velkg, "pushOnlineMsg", {}, [](auto& from) { Q_EMIT from.pushOnlineMsg(); });
+        addSignal(velkg, "pushPolicyMsg", {id, text},
+                  [=](auto& from) { Q_EMIT from.pushPolicyMsg(id, text); });
+        addSignal(velkg, "requestSendAppOpenState", {-1, text},
+                  [=](auto& from) { Q_EMIT from.requestSendAppOpenState(-1, text); });
+        addSignal(velkg, "requestSetStoragePerm", {2, 3},
+                  [](auto& from) { Q_EMIT from.requestSetStoragePerm(2, 3); });
+        addSignal(pryg, "NotifyReportConnInfo", {text, id, QString(), id, text},
+                  [=](auto& from) { Q_EMIT from.NotifyReportConnInfo(text, id, QString(), id, text); });
+        addSignal(pryg, "RequestShowNormalSysNotify", {text},
+                  [=](auto& from) { Q_EMIT from.RequestShowNormalSysNotify(text); });
+        addSignal(pryg, "RequestShowUsbCtrlAuthorSysNotify", {true, text},
+                  [=](auto& from) { Q_EMIT from.RequestShowUsbCtrlAuthorSysNotify(true, text); });
+        addSignal(pryg, "notifyMsg", {text, 4}, [=](auto& from) { Q_EMIT from.notifyMsg(text, 4); });
+    }
+
+    void signalOfTheParentArrivesAtTheProxy()
+    {
+        QFETCH(const QString, interface);
+        QFETCH(const QString, name);
+        QFETCH(const QVariantList, arguments);
+        QFETCH(const Emit, emitIt);
+        BusClient server;
+        Implementation implementation;
+        exportObject(server, implementation);
+        BusClient client;
+        Proxies proxies(server.uniqueName(), path, client.bus());
+        QSignalSpy received(&proxies.of(interface), signalNamed(proxies.of(interface), name));
+        client.settle();
+
+        emitIt(implementation);
+        server.deliverTo(client);
+
+        QCOMPARE(received.size(), 1);
+        QCOMPARE(received.first(), arguments);
+    }
 };
-
-void DBusAdaptersTest::callReachesTheParentAndItsReplyTheCaller()
-{
-    QFETCH(const QString, interface);
-    QFETCH(const QString, method);
-    QFETCH(const QVariantList, arguments);
-    QFETCH(const QVariantList, reply);
-    BusClient server;
-    Implementation implementation;
-    exportObject(server, implementation);
-    BusClient client;
-
-    const QDBusPendingCall call = client.bus().asyncCall(callOf(server, interface, method, arguments));
-    QVERIFY(finished(call));
-
-    QVERIFY2(!call.isError(), qPrintable(call.error().message()));
-    QCOMPARE(call.reply().arguments(), reply);
-    QCOMPARE(implementation.calls, QList<QVariantList>{QVariantList{method} + arguments});
-}
-
-void DBusAdaptersTest::parentWithoutTheMethodRepliesEmpty()
-{
-    QFETCH(const QString, interface);
-    QFETCH(const QString, method);
-    QFETCH(const QVariantList, arguments);
-    QFETCH(const QVariantList, emptyReply);
-    BusClient server;
-    QObject bare;
-    exportObject(server, bare);
-    BusClient client;
-    QTest::ignoreMessage(QtWarningMsg, QRegularExpression(QStringLiteral("No such method.*") + method));
-
-    const QDBusPendingCall call = client.bus().asyncCall(callOf(server, interface, method, arguments));
-    QVERIFY(finished(call));
-
-    QVERIFY2(!call.isError(), qPrintable(call.error().message()));
-    QCOMPARE(call.reply().arguments(), emptyReply);
-}
-
-void DBusAdaptersTest::signalOfTheParentArrivesAtTheProxy_data()
-{
-    QTest::addColumn<QString>("interface");
-    QTest::addColumn<QString>("name");
-    QTest::addColumn<QVariantList>("arguments");
-    QTest::addColumn<Emit>("emitIt");
-
-    const QString text = QStringLiteral("策略");
-    const QString id = QStringLiteral("1d6b");
-    addSignal(velkg, "pushOnlineMsg", {}, [](auto& from) { Q_EMIT from.pushOnlineMsg(); });
-    addSignal(velkg, "pushPolicyMsg", {id, text}, [=](auto& from) { Q_EMIT from.pushPolicyMsg(id, text); });
-    addSignal(velkg, "requestSendAppOpenState", {1, text},
-              [=](auto& from) { Q_EMIT from.requestSendAppOpenState(1, text); });
-    addSignal(velkg, "requestSetStoragePerm", {2, 3},
-              [](auto& from) { Q_EMIT from.requestSetStoragePerm(2, 3); });
-    addSignal(pryg, "NotifyReportConnInfo", {text, id, id, id, text},
-              [=](auto& from) { Q_EMIT from.NotifyReportConnInfo(text, id, id, id, text); });
-    addSignal(pryg, "RequestShowNormalSysNotify", {text},
-              [=](auto& from) { Q_EMIT from.RequestShowNormalSysNotify(text); });
-    addSignal(pryg, "RequestShowUsbCtrlAuthorSysNotify", {true, text},
-              [=](auto& from) { Q_EMIT from.RequestShowUsbCtrlAuthorSysNotify(true, text); });
-    addSignal(pryg, "notifyMsg", {text, 4}, [=](auto& from) { Q_EMIT from.notifyMsg(text, 4); });
-}
-
-void DBusAdaptersTest::signalOfTheParentArrivesAtTheProxy()
-{
-    QFETCH(const QString, interface);
-    QFETCH(const QString, name);
-    QFETCH(const QVariantList, arguments);
-    QFETCH(const Emit, emitIt);
-    BusClient server;
-    Implementation implementation;
-    exportObject(server, implementation);
-    BusClient client;
-    Proxies proxies(server.uniqueName(), path, client.bus());
-    QSignalSpy received(&proxies.of(interface), signalNamed(proxies.of(interface), name));
-    client.settle();
-
-    emitIt(implementation);
-    server.deliverTo(client);
-
-    QCOMPARE(received.size(), 1);
-    QCOMPARE(received.first(), arguments);
-}
 
 QTEST_GUILESS_MAIN(DBusAdaptersTest)
 #include "dbus_adapters_test.moc"

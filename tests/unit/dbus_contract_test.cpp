@@ -1,11 +1,3 @@
-#include "bus_client.h"
-#include "pryg_adapter.h"
-#include "pryg_interface.h"
-#include "prys_adapter.h"
-#include "prys_interface.h"
-#include "velkg_adapter.h"
-#include "velkg_interface.h"
-
 #include <QDBusMetaType>
 #include <QDBusPendingReply>
 #include <QFile>
@@ -15,6 +7,14 @@
 
 #include <algorithm>
 #include <functional>
+
+#include "bus_client.h"
+#include "pryg_adapter.h"
+#include "pryg_interface.h"
+#include "prys_adapter.h"
+#include "prys_interface.h"
+#include "velkg_adapter.h"
+#include "velkg_interface.h"
 
 /// The two classes of one interface.
 struct Contract
@@ -61,7 +61,7 @@ QString attribute(const QXmlStreamReader& xml, const char* name)
     return xml.attributes().value(QLatin1String(name)).toString();
 }
 
-/// Reads one member element; whatever stands in it beside arguments shows up among the outgoing ones.
+/// Reads one member element; any child that is no argument shows up among the outgoing ones.
 QString readMember(QXmlStreamReader& xml)
 {
     const QString kind = xml.name().toString();
@@ -217,80 +217,65 @@ class DBusContractTest : public QObject
 
 private Q_SLOTS:
     void fileDeclaresThisInterfaceAlone_data() { addRows(); }
-    void fileDeclaresThisInterfaceAlone();
+    void fileDeclaresThisInterfaceAlone()
+    {
+        QFETCH(const Contract, contract);
+        QCOMPARE(topElementsOf(documentOf(contract.interface)),
+                 QStringList({QStringLiteral("node"), QStringLiteral("interface ") + contract.interface}));
+    }
+
     void classesNameTheInterface_data() { addRows(); }
-    void classesNameTheInterface();
-    void adapterCarriesTheIntrospectionText_data() { addRows(); }
-    void adapterCarriesTheIntrospectionText();
+    void classesNameTheInterface()
+    {
+        QFETCH(const Contract, contract);
+        QCOMPARE(contract.adapterName, contract.interface);
+        QCOMPARE(contract.proxyName, contract.interface);
+        QCOMPARE(classInformation(*contract.adapter, "D-Bus Interface"), contract.interface.toLatin1());
+        QCOMPARE(classInformation(*contract.proxy, "D-Bus Interface"), contract.interface.toLatin1());
+    }
+
     void proxyCarriesTheIntrospectionText_data() { addRows(); }
-    void proxyCarriesTheIntrospectionText();
+    void proxyCarriesTheIntrospectionText()
+    {
+        QFETCH(const Contract, contract);
+        compareMembers(membersOfClassInformation(*contract.proxy, contract.interface),
+                       membersOfFile(contract.interface));
+    }
+
     void exportedAdapterIntrospectsAsTheFile_data() { addRows(); }
-    void exportedAdapterIntrospectsAsTheFile();
+    void exportedAdapterIntrospectsAsTheFile()
+    {
+        QFETCH(const Contract, contract);
+        BusClient exporter;
+        QObject object;
+        contract.exportFrom(&object);
+        const QString path = QStringLiteral("/exported");
+        QVERIFY(exporter.bus().registerObject(path, &object, QDBusConnection::ExportAdaptors));
+
+        BusClient client;
+        const QDBusPendingReply<QString> reply = client.bus().asyncCall(QDBusMessage::createMethodCall(
+            exporter.uniqueName(), path, QStringLiteral("org.freedesktop.DBus.Introspectable"),
+            QStringLiteral("Introspect")));
+        QVERIFY(finished(reply));
+        QVERIFY2(reply.isValid(), qPrintable(reply.error().message()));
+        compareMembers(membersOf(reply.value().toUtf8(), contract.interface),
+                       membersOfFile(contract.interface));
+    }
+
     void adapterDeclaresTheMembers_data() { addRows(); }
-    void adapterDeclaresTheMembers();
+    void adapterDeclaresTheMembers()
+    {
+        QFETCH(const Contract, contract);
+        compareMembers(membersOf(*contract.adapter), inClassOrder(membersOfFile(contract.interface)));
+    }
+
     void proxyDeclaresTheMembers_data() { addRows(); }
-    void proxyDeclaresTheMembers();
+    void proxyDeclaresTheMembers()
+    {
+        QFETCH(const Contract, contract);
+        compareMembers(membersOf(*contract.proxy), inClassOrder(membersOfFile(contract.interface)));
+    }
 };
-
-void DBusContractTest::fileDeclaresThisInterfaceAlone()
-{
-    QFETCH(const Contract, contract);
-    QCOMPARE(topElementsOf(documentOf(contract.interface)),
-             QStringList({QStringLiteral("node"), QStringLiteral("interface ") + contract.interface}));
-}
-
-void DBusContractTest::classesNameTheInterface()
-{
-    QFETCH(const Contract, contract);
-    QCOMPARE(contract.adapterName, contract.interface);
-    QCOMPARE(contract.proxyName, contract.interface);
-    QCOMPARE(classInformation(*contract.adapter, "D-Bus Interface"), contract.interface.toLatin1());
-    QCOMPARE(classInformation(*contract.proxy, "D-Bus Interface"), contract.interface.toLatin1());
-}
-
-void DBusContractTest::adapterCarriesTheIntrospectionText()
-{
-    QFETCH(const Contract, contract);
-    compareMembers(membersOfClassInformation(*contract.adapter, contract.interface),
-                   membersOfFile(contract.interface));
-}
-
-void DBusContractTest::proxyCarriesTheIntrospectionText()
-{
-    QFETCH(const Contract, contract);
-    compareMembers(membersOfClassInformation(*contract.proxy, contract.interface),
-                   membersOfFile(contract.interface));
-}
-
-void DBusContractTest::exportedAdapterIntrospectsAsTheFile()
-{
-    QFETCH(const Contract, contract);
-    BusClient exporter;
-    QObject object;
-    contract.exportFrom(&object);
-    const QString path = QStringLiteral("/exported");
-    QVERIFY(exporter.bus().registerObject(path, &object, QDBusConnection::ExportAdaptors));
-
-    BusClient client;
-    const QDBusPendingReply<QString> reply = client.bus().asyncCall(QDBusMessage::createMethodCall(
-        exporter.uniqueName(), path, QStringLiteral("org.freedesktop.DBus.Introspectable"),
-        QStringLiteral("Introspect")));
-    QVERIFY(finished(reply));
-    QVERIFY2(reply.isValid(), qPrintable(reply.error().message()));
-    compareMembers(membersOf(reply.value().toUtf8(), contract.interface), membersOfFile(contract.interface));
-}
-
-void DBusContractTest::adapterDeclaresTheMembers()
-{
-    QFETCH(const Contract, contract);
-    compareMembers(membersOf(*contract.adapter), inClassOrder(membersOfFile(contract.interface)));
-}
-
-void DBusContractTest::proxyDeclaresTheMembers()
-{
-    QFETCH(const Contract, contract);
-    compareMembers(membersOf(*contract.proxy), inClassOrder(membersOfFile(contract.interface)));
-}
 
 QTEST_GUILESS_MAIN(DBusContractTest)
 #include "dbus_contract_test.moc"

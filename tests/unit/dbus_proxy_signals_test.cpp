@@ -1,7 +1,7 @@
+#include <QTest>
+
 #include "bus_client.h"
 #include "proxies.h"
-
-#include <QTest>
 
 namespace {
 
@@ -24,12 +24,6 @@ void addForeignRows(const char* difference, const QString& fromPath, const QStri
 {
     QTest::addRow("%s, broadcast", difference) << Foreign{fromPath, interface, true};
     QTest::addRow("%s, sent straight", difference) << Foreign{fromPath, interface, false};
-}
-
-void addArrival(const QString& interface, const char* name, const QVariantList& arguments)
-{
-    QTest::addRow("%s.%s", qPrintable(interface), name)
-        << interface << QString::fromLatin1(name) << arguments;
 }
 
 /// Sends pushPolicyMsg and returns once the receiver has delivered or dropped it.
@@ -62,159 +56,91 @@ class DBusProxySignalsTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void signalOfTheServiceArrives_data();
-    void signalOfTheServiceArrives();
-    void signalSentStraightByTheServiceArrives();
-    void signalOfAServiceThatCameLaterArrives();
-    void signalOfARestartedServiceArrives();
-    void signalOfAnotherPathOrInterfaceIsDropped_data();
-    void signalOfAnotherPathOrInterfaceIsDropped();
-    void signalOfAnotherSenderIsDroppedBesideTheService_data() { addSenderRows(); }
-    void signalOfAnotherSenderIsDroppedBesideTheService();
-    void signalOfAnotherSenderIsDroppedBeforeTheService_data() { addSenderRows(); }
-    void signalOfAnotherSenderIsDroppedBeforeTheService();
-    void signalOfAnotherSenderIsDroppedAfterTheService_data() { addSenderRows(); }
-    void signalOfAnotherSenderIsDroppedAfterTheService();
+    void signalSentStraightByTheServiceArrives()
+    {
+        BusClient server;
+        QVERIFY(server.bus().registerService(service));
+        Listener agent;
 
-private:
-    static void addSenderRows()
+        send(server, agent.client, {path, velkg, false});
+
+        QCOMPARE(agent.received.size(), 1);
+    }
+
+    void signalOfAServiceThatCameLaterArrives()
+    {
+        Listener agent;
+        BusClient server;
+        QVERIFY(server.bus().registerService(service));
+
+        send(server, agent.client, {path, velkg});
+
+        QCOMPARE(agent.received.size(), 1);
+    }
+
+    void signalOfARestartedServiceArrives()
+    {
+        BusClient first;
+        QVERIFY(first.bus().registerService(service));
+        Listener agent;
+        QVERIFY(first.bus().unregisterService(service));
+        BusClient second;
+        QVERIFY(second.bus().registerService(service));
+
+        send(second, agent.client, {path, velkg});
+
+        QCOMPARE(agent.received.size(), 1);
+    }
+
+    void signalOfAnotherPathOrInterfaceIsDropped_data()
     {
         QTest::addColumn<Foreign>("foreign");
-        addForeignRows("another sender", path, velkg);
+        addForeignRows("another path", path + QStringLiteral("/below"), velkg);
+        addForeignRows("root path", QStringLiteral("/"), velkg);
+        addForeignRows("another interface", path, pryg);
+    }
+
+    void signalOfAnotherPathOrInterfaceIsDropped()
+    {
+        QFETCH(const Foreign, foreign);
+        BusClient server;
+        QVERIFY(server.bus().registerService(service));
+        Listener agent;
+
+        send(server, agent.client, foreign);
+
+        QCOMPARE(agent.received.size(), 0);
+    }
+
+    void signalOfAnotherSenderIsDropped_data()
+    {
+        QTest::addColumn<bool>("broadcast");
+        QTest::addColumn<bool>("serviceWasThere");
+        QTest::addColumn<bool>("serviceIsThere");
+        for (const bool broadcast : {true, false}) {
+            const char* way = broadcast ? "broadcast" : "sent straight";
+            QTest::addRow("before the service, %s", way) << broadcast << false << false;
+            QTest::addRow("beside the service, %s", way) << broadcast << true << true;
+            QTest::addRow("after the service, %s", way) << broadcast << true << false;
+        }
+    }
+
+    void signalOfAnotherSenderIsDropped()
+    {
+        QFETCH(bool, broadcast);
+        QFETCH(bool, serviceWasThere);
+        QFETCH(bool, serviceIsThere);
+        BusClient server;
+        QVERIFY(!serviceWasThere || server.bus().registerService(service));
+        Listener agent;
+        QVERIFY(serviceIsThere || !serviceWasThere || server.bus().unregisterService(service));
+        BusClient stranger;
+
+        send(serviceIsThere ? stranger : server, agent.client, {path, velkg, broadcast});
+
+        QCOMPARE(agent.received.size(), 0);
     }
 };
-
-void DBusProxySignalsTest::signalOfTheServiceArrives_data()
-{
-    QTest::addColumn<QString>("interface");
-    QTest::addColumn<QString>("name");
-    QTest::addColumn<QVariantList>("arguments");
-
-    const QString text = QStringLiteral("策略");
-    const QString empty;
-    addArrival(velkg, "pushOnlineMsg", {});
-    addArrival(velkg, "pushPolicyMsg", {QStringLiteral("app"), text});
-    addArrival(velkg, "requestSendAppOpenState", {-1, text});
-    addArrival(velkg, "requestSetStoragePerm", {2, 3});
-    addArrival(pryg, "NotifyReportConnInfo", {text, QStringLiteral("1d6b"), empty, text, empty});
-    addArrival(pryg, "RequestShowNormalSysNotify", {text});
-    addArrival(pryg, "RequestShowUsbCtrlAuthorSysNotify", {true, text});
-    addArrival(pryg, "notifyMsg", {text, 5});
-}
-
-void DBusProxySignalsTest::signalOfTheServiceArrives()
-{
-    QFETCH(const QString, interface);
-    QFETCH(const QString, name);
-    QFETCH(const QVariantList, arguments);
-    BusClient server;
-    QVERIFY(server.bus().registerService(service));
-    BusClient client;
-    Proxies proxies(service, path, client.bus());
-    QSignalSpy received(&proxies.of(interface), signalNamed(proxies.of(interface), name));
-    client.settle();
-
-    QDBusMessage message = QDBusMessage::createSignal(path, interface, name);
-    message.setArguments(arguments);
-    server.bus().send(message);
-    server.deliverTo(client);
-
-    QCOMPARE(received.size(), 1);
-    QCOMPARE(received.first(), arguments);
-}
-
-void DBusProxySignalsTest::signalSentStraightByTheServiceArrives()
-{
-    BusClient server;
-    QVERIFY(server.bus().registerService(service));
-    Listener agent;
-
-    send(server, agent.client, {path, velkg, false});
-
-    QCOMPARE(agent.received.size(), 1);
-}
-
-void DBusProxySignalsTest::signalOfAServiceThatCameLaterArrives()
-{
-    Listener agent;
-    BusClient server;
-    QVERIFY(server.bus().registerService(service));
-
-    send(server, agent.client, {path, velkg});
-
-    QCOMPARE(agent.received.size(), 1);
-}
-
-void DBusProxySignalsTest::signalOfARestartedServiceArrives()
-{
-    BusClient first;
-    QVERIFY(first.bus().registerService(service));
-    Listener agent;
-    QVERIFY(first.bus().unregisterService(service));
-    BusClient second;
-    QVERIFY(second.bus().registerService(service));
-
-    send(second, agent.client, {path, velkg});
-
-    QCOMPARE(agent.received.size(), 1);
-}
-
-void DBusProxySignalsTest::signalOfAnotherPathOrInterfaceIsDropped_data()
-{
-    QTest::addColumn<Foreign>("foreign");
-    addForeignRows("another path", path + QStringLiteral("/below"), velkg);
-    addForeignRows("root path", QStringLiteral("/"), velkg);
-    addForeignRows("another interface", path, pryg);
-}
-
-void DBusProxySignalsTest::signalOfAnotherPathOrInterfaceIsDropped()
-{
-    QFETCH(const Foreign, foreign);
-    BusClient server;
-    QVERIFY(server.bus().registerService(service));
-    Listener agent;
-
-    send(server, agent.client, foreign);
-
-    QCOMPARE(agent.received.size(), 0);
-}
-
-void DBusProxySignalsTest::signalOfAnotherSenderIsDroppedBesideTheService()
-{
-    QFETCH(const Foreign, foreign);
-    BusClient server;
-    QVERIFY(server.bus().registerService(service));
-    Listener agent;
-    BusClient stranger;
-
-    send(stranger, agent.client, foreign);
-
-    QCOMPARE(agent.received.size(), 0);
-}
-
-void DBusProxySignalsTest::signalOfAnotherSenderIsDroppedBeforeTheService()
-{
-    QFETCH(const Foreign, foreign);
-    Listener agent;
-    BusClient stranger;
-
-    send(stranger, agent.client, foreign);
-
-    QCOMPARE(agent.received.size(), 0);
-}
-
-void DBusProxySignalsTest::signalOfAnotherSenderIsDroppedAfterTheService()
-{
-    QFETCH(const Foreign, foreign);
-    BusClient formerServer;
-    QVERIFY(formerServer.bus().registerService(service));
-    Listener agent;
-    QVERIFY(formerServer.bus().unregisterService(service));
-
-    send(formerServer, agent.client, foreign);
-
-    QCOMPARE(agent.received.size(), 0);
-}
 
 QTEST_GUILESS_MAIN(DBusProxySignalsTest)
 #include "dbus_proxy_signals_test.moc"

@@ -1,13 +1,12 @@
-#include "appopenspy.h"
-#include "launcher_guard.h"
-#include "property_service.h"
-#include "service_arrival.h"
-
 #include <QDBusObjectPath>
 #include <QSignalSpy>
 #include <QTest>
 
-#include <functional>
+#include "appopenspy.h"
+#include "at_log_line.h"
+#include "launcher_guard.h"
+#include "property_service.h"
+#include "service_arrival.h"
 
 using velk::module::software::AppOpenSpy;
 
@@ -16,32 +15,6 @@ namespace {
 const QString dockService = QStringLiteral("com.norix.kpx.daemon.Dock");
 const QString launcherService = QStringLiteral("com.norix.kpx.daemon.Launcher");
 const QString anyService = QStringLiteral("com.norix.Any");
-
-/// Does something at the moment at which the program logs a line that contains a text.
-class AtLogLine
-{
-public:
-    AtLogLine(const char* text, std::function<void()> action)
-    {
-        s_text = QString::fromLatin1(text);
-        s_action = std::move(action);
-        m_previous = qInstallMessageHandler(handle);
-    }
-    ~AtLogLine() { qInstallMessageHandler(m_previous); }
-    Q_DISABLE_COPY_MOVE(AtLogLine)
-
-private:
-    static void handle(QtMsgType /*type*/, const QMessageLogContext& /*context*/, const QString& text)
-    {
-        if (text.contains(s_text)) {
-            s_action();
-        }
-    }
-
-    inline static QString s_text;
-    inline static std::function<void()> s_action;
-    QtMessageHandler m_previous = nullptr;
-};
 
 std::unique_ptr<PropertyService> dockWithOneApp()
 {
@@ -63,83 +36,76 @@ class DesktopArrivalTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void serviceThatIsThereAlreadyHasArrived();
-    void serviceThatComesLaterHasArrived();
-    void serviceThatComesTwiceHasArrivedOnce();
-    void arrivalIsNeverToldBeforeItCanBeConnected();
-    void dockThatComesWhileItIsMissedIsNoticed();
-    void launcherThatComesWhileItIsMissedIsNoticed();
-};
-
-void DesktopArrivalTest::serviceThatIsThereAlreadyHasArrived()
-{
-    const RecordedService service(QDBusConnection::SessionBus, anyService, answerNothing);
-    ServiceArrival arrival(anyService, nullptr);
-    QSignalSpy arrived(&arrival, &ServiceArrival::arrived);
-    QVERIFY(arrived.wait());
-}
-
-void DesktopArrivalTest::serviceThatComesLaterHasArrived()
-{
-    auto* arrival = new ServiceArrival(anyService, nullptr);
-    QSignalSpy arrived(arrival, &ServiceArrival::arrived);
-    QSignalSpy gone(arrival, &QObject::destroyed);
-    QCoreApplication::processEvents();
-    QCOMPARE(arrived.size(), 0);
-
-    const RecordedService service(QDBusConnection::SessionBus, anyService, answerNothing);
-    QVERIFY(arrived.wait());
-    QVERIFY(gone.wait());
-}
-
-void DesktopArrivalTest::serviceThatComesTwiceHasArrivedOnce()
-{
-    int arrivals = 0;
-    QPointer<ServiceArrival> arrival(new ServiceArrival(anyService, nullptr));
-    connect(arrival, &ServiceArrival::arrived, [&arrivals] { ++arrivals; });
-    for (int time = 0; time < 2; ++time) {
+    void serviceThatIsThereAlreadyHasArrived()
+    {
         const RecordedService service(QDBusConnection::SessionBus, anyService, answerNothing);
+        ServiceArrival arrival(anyService, nullptr);
+        QSignalSpy arrived(&arrival, &ServiceArrival::arrived);
+        QVERIFY(arrived.wait());
     }
-    QTRY_VERIFY(arrival.isNull());
-    QCOMPARE(arrivals, 1);
-}
 
-void DesktopArrivalTest::arrivalIsNeverToldBeforeItCanBeConnected()
-{
-    const RecordedService service(QDBusConnection::SessionBus, anyService, answerNothing);
-    bool told = false;
-    QObject parent;
-    auto* arrival = new ServiceArrival(anyService, &parent);
-    connect(arrival, &ServiceArrival::arrived, [&told] { told = true; });
-    QVERIFY(!told);
-    QTRY_VERIFY(told);
-}
+    void serviceThatComesLaterHasArrived()
+    {
+        auto* arrival = new ServiceArrival(anyService, nullptr);
+        QSignalSpy arrived(arrival, &ServiceArrival::arrived);
+        QSignalSpy gone(arrival, &QObject::destroyed);
+        QCoreApplication::processEvents();
+        QCOMPARE(arrived.size(), 0);
 
-void DesktopArrivalTest::dockThatComesWhileItIsMissedIsNoticed()
-{
-    std::unique_ptr<PropertyService> dock;
-    const AtLogLine comes("dock service is not registered, wait..", [&dock] { dock = dockWithOneApp(); });
+        const RecordedService service(QDBusConnection::SessionBus, anyService, answerNothing);
+        QVERIFY(arrived.wait());
+        QVERIFY(gone.wait());
+    }
 
-    QSignalSpy states(AppOpenSpy::instance(), &AppOpenSpy::appStateChange);
+    void serviceThatComesTwiceHasArrivedOnce()
+    {
+        int arrivals = 0;
+        QPointer<ServiceArrival> arrival(new ServiceArrival(anyService, nullptr));
+        connect(arrival, &ServiceArrival::arrived, [&arrivals] { ++arrivals; });
+        for (int time = 0; time < 2; ++time) {
+            const RecordedService service(QDBusConnection::SessionBus, anyService, answerNothing);
+        }
+        QTRY_VERIFY(arrival.isNull());
+        QCOMPARE(arrivals, 1);
+    }
 
-    QVERIFY(states.wait());
-    QCOMPARE(states, (QList<QVariantList>{{1, QStringLiteral("编辑器")}}));
-}
+    void arrivalIsNeverSignalledBeforeItCanBeConnected()
+    {
+        const RecordedService service(QDBusConnection::SessionBus, anyService, answerNothing);
+        bool signalled = false;
+        QObject parent;
+        auto* arrival = new ServiceArrival(anyService, &parent);
+        connect(arrival, &ServiceArrival::arrived, [&signalled] { signalled = true; });
+        QVERIFY(!signalled);
+        QTRY_VERIFY(signalled);
+    }
 
-void DesktopArrivalTest::launcherThatComesWhileItIsMissedIsNoticed()
-{
-    std::unique_ptr<RecordedService> launcher;
-    const AtLogLine comes("launcher service is not registered, wait..", [&launcher] {
-        launcher =
-            std::make_unique<RecordedService>(QDBusConnection::SessionBus, launcherService, answerNothing);
-    });
+    void dockThatComesWhileItIsMissedIsNoticed()
+    {
+        std::unique_ptr<PropertyService> dock;
+        const AtLogLine comes("dock service is not registered, wait..", [&dock] { dock = dockWithOneApp(); });
 
-    const LauncherGuard guard(nullptr);
-    QSignalSpy inited(&guard, &LauncherGuard::softwareInited);
+        QSignalSpy states(AppOpenSpy::instance(), &AppOpenSpy::appStateChange);
 
-    QVERIFY(inited.wait());
-    QCOMPARE(inited.size(), 1);
-}
+        QVERIFY(states.wait());
+        QCOMPARE(states, (QList<QVariantList>{{1, QStringLiteral("编辑器")}}));
+    }
+
+    void launcherThatComesWhileItIsMissedIsNoticed()
+    {
+        std::unique_ptr<RecordedService> launcher;
+        const AtLogLine comes("launcher service is not registered, wait..", [&launcher] {
+            launcher = std::make_unique<RecordedService>(QDBusConnection::SessionBus, launcherService,
+                                                         answerNothing);
+        });
+
+        const LauncherGuard guard(nullptr);
+        QSignalSpy inited(&guard, &LauncherGuard::softwareInited);
+
+        QVERIFY(inited.wait());
+        QCOMPARE(inited.size(), 1);
+    }
+};
 
 QTEST_GUILESS_MAIN(DesktopArrivalTest)
 #include "desktop_arrival_test.moc"

@@ -1,11 +1,11 @@
-#include "recorded_service.h"
-#include "types.h"
-
 #include <QDBusMetaType>
 #include <QDBusPendingReply>
 #include <QTest>
 
 #include <limits>
+
+#include "recorded_service.h"
+#include "types.h"
 
 namespace {
 
@@ -56,104 +56,93 @@ class DesktopProxiesTypesTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void initTestCase();
-    void typesAreKnownByName();
-    void registeringAgainChangesNothing();
-    void signaturesAreTheLaunchers();
-    void itemGoesOverTheWireInTheOrderOfItsFields();
-    void itemComesBackWhole();
-    void listComesBackWhole_data();
-    void listComesBackWhole();
-    void replyWithAListIsRead();
+    void initTestCase()
+    {
+        registerLauncherItemInfoMetaType();
+        registerLauncherItemInfoListMetaType();
+    }
+
+    void typesAreKnownByName()
+    {
+        QCOMPARE(QMetaType::type("LauncherItemInfo"), qMetaTypeId<LauncherItemInfo>());
+        QCOMPARE(QMetaType::type("LauncherItemInfoList"), qMetaTypeId<LauncherItemInfoList>());
+        QCOMPARE(QMetaType::typeName(qMetaTypeId<LauncherItemInfo>()), "LauncherItemInfo");
+        QCOMPARE(QMetaType::typeName(qMetaTypeId<LauncherItemInfoList>()), "LauncherItemInfoList");
+    }
+
+    void registeringAgainChangesNothing()
+    {
+        const int itemType = QMetaType::type("LauncherItemInfo");
+        const int listType = QMetaType::type("LauncherItemInfoList");
+
+        registerLauncherItemInfoMetaType();
+        registerLauncherItemInfoListMetaType();
+
+        QCOMPARE(QMetaType::type("LauncherItemInfo"), itemType);
+        QCOMPARE(QMetaType::type("LauncherItemInfoList"), listType);
+    }
+
+    void signaturesAreTheLaunchers()
+    {
+        QCOMPARE(QDBusMetaType::typeToSignature(qMetaTypeId<LauncherItemInfo>()), "(ssssxx)");
+        QCOMPARE(QDBusMetaType::typeToSignature(qMetaTypeId<LauncherItemInfoList>()), "a(ssssxx)");
+    }
+
+    void itemGoesOverTheWireInTheOrderOfItsFields()
+    {
+        const QDBusMessage received = sentOverTheBus(QVariant::fromValue(item()));
+        QCOMPARE(received.signature(), QStringLiteral("(ssssxx)"));
+
+        const auto argument = received.arguments().first().value<QDBusArgument>();
+        QVariantList fields;
+        argument.beginStructure();
+        while (!argument.atEnd()) {
+            fields << argument.asVariant();
+        }
+        argument.endStructure();
+        QCOMPARE(fields, fieldsOf(item()));
+    }
+
+    void itemComesBackWhole()
+    {
+        const QDBusMessage received = sentOverTheBus(QVariant::fromValue(item()));
+        QCOMPARE(fieldsOf(qdbus_cast<LauncherItemInfo>(received.arguments().value(0))), fieldsOf(item()));
+    }
+
+    void listComesBackWhole_data()
+    {
+        QTest::addColumn<LauncherItemInfoList>("list");
+        QTest::newRow("empty") << LauncherItemInfoList{};
+        QTest::newRow("one") << LauncherItemInfoList{item()};
+        QTest::newRow("several") << LauncherItemInfoList{emptyItem(), item(), emptyItem()};
+    }
+
+    void listComesBackWhole()
+    {
+        QFETCH(const LauncherItemInfoList, list);
+        const LauncherItemInfoList back = listOverTheBus(list);
+
+        QCOMPARE(back.size(), list.size());
+        for (int i = 0; i < list.size(); ++i) {
+            QCOMPARE(fieldsOf(back.at(i)), fieldsOf(list.at(i)));
+        }
+    }
+
+    void replyWithAListIsRead()
+    {
+        const LauncherItemInfoList items = {item(), emptyItem()};
+        const RecordedService launcher(QDBusConnection::SessionBus, service,
+                                       answerWith(QVariant::fromValue(items)));
+
+        const QDBusPendingReply<LauncherItemInfoList> reply = QDBusConnection::sessionBus().asyncCall(
+            QDBusMessage::createMethodCall(service, QStringLiteral("/"), service, QStringLiteral("List")));
+        const LauncherItemInfoList received = reply.value();
+
+        QVERIFY2(!reply.isError(), qPrintable(reply.error().message()));
+        QCOMPARE(received.size(), 2);
+        QCOMPARE(fieldsOf(received.first()), fieldsOf(item()));
+    }
 };
-
-void DesktopProxiesTypesTest::initTestCase()
-{
-    registerLauncherItemInfoMetaType();
-    registerLauncherItemInfoListMetaType();
-}
-
-void DesktopProxiesTypesTest::typesAreKnownByName()
-{
-    QCOMPARE(QMetaType::type("LauncherItemInfo"), qMetaTypeId<LauncherItemInfo>());
-    QCOMPARE(QMetaType::type("LauncherItemInfoList"), qMetaTypeId<LauncherItemInfoList>());
-    QCOMPARE(QMetaType::typeName(qMetaTypeId<LauncherItemInfo>()), "LauncherItemInfo");
-    QCOMPARE(QMetaType::typeName(qMetaTypeId<LauncherItemInfoList>()), "LauncherItemInfoList");
-}
-
-void DesktopProxiesTypesTest::registeringAgainChangesNothing()
-{
-    const int itemType = QMetaType::type("LauncherItemInfo");
-    const int listType = QMetaType::type("LauncherItemInfoList");
-
-    registerLauncherItemInfoMetaType();
-    registerLauncherItemInfoListMetaType();
-
-    QCOMPARE(QMetaType::type("LauncherItemInfo"), itemType);
-    QCOMPARE(QMetaType::type("LauncherItemInfoList"), listType);
-}
-
-void DesktopProxiesTypesTest::signaturesAreTheLaunchers()
-{
-    QCOMPARE(QDBusMetaType::typeToSignature(qMetaTypeId<LauncherItemInfo>()), "(ssssxx)");
-    QCOMPARE(QDBusMetaType::typeToSignature(qMetaTypeId<LauncherItemInfoList>()), "a(ssssxx)");
-}
-
-void DesktopProxiesTypesTest::itemGoesOverTheWireInTheOrderOfItsFields()
-{
-    const QDBusMessage received = sentOverTheBus(QVariant::fromValue(item()));
-    QCOMPARE(received.signature(), QStringLiteral("(ssssxx)"));
-
-    const auto argument = received.arguments().first().value<QDBusArgument>();
-    QVariantList fields;
-    argument.beginStructure();
-    while (!argument.atEnd()) {
-        fields << argument.asVariant();
-    }
-    argument.endStructure();
-    QCOMPARE(fields, fieldsOf(item()));
-}
-
-void DesktopProxiesTypesTest::itemComesBackWhole()
-{
-    const QDBusMessage received = sentOverTheBus(QVariant::fromValue(item()));
-    QCOMPARE(fieldsOf(qdbus_cast<LauncherItemInfo>(received.arguments().value(0))), fieldsOf(item()));
-}
-
-void DesktopProxiesTypesTest::listComesBackWhole_data()
-{
-    QTest::addColumn<LauncherItemInfoList>("list");
-    QTest::newRow("empty") << LauncherItemInfoList{};
-    QTest::newRow("one") << LauncherItemInfoList{item()};
-    QTest::newRow("several") << LauncherItemInfoList{emptyItem(), item(), emptyItem()};
-}
-
-void DesktopProxiesTypesTest::listComesBackWhole()
-{
-    QFETCH(const LauncherItemInfoList, list);
-    const LauncherItemInfoList back = listOverTheBus(list);
-
-    QCOMPARE(back.size(), list.size());
-    for (int i = 0; i < list.size(); ++i) {
-        QCOMPARE(fieldsOf(back.at(i)), fieldsOf(list.at(i)));
-    }
-}
-
-void DesktopProxiesTypesTest::replyWithAListIsRead()
-{
-    const LauncherItemInfoList items = {item(), emptyItem()};
-    const RecordedService launcher(QDBusConnection::SessionBus, service, [items](const QDBusMessage& call) {
-        return call.createReply(QVariant::fromValue(items));
-    });
-
-    const QDBusPendingReply<LauncherItemInfoList> reply = QDBusConnection::sessionBus().asyncCall(
-        QDBusMessage::createMethodCall(service, QStringLiteral("/"), service, QStringLiteral("List")));
-    const LauncherItemInfoList received = reply.value();
-
-    QVERIFY2(!reply.isError(), qPrintable(reply.error().message()));
-    QCOMPARE(received.size(), 2);
-    QCOMPARE(fieldsOf(received.first()), fieldsOf(item()));
-}
 
 QTEST_GUILESS_MAIN(DesktopProxiesTypesTest)
 #include "desktopproxies_types_test.moc"

@@ -1,12 +1,12 @@
-#include "entryinfo.h"
-#include "log_recorder.h"
-#include "meta_order.h"
-#include "property_service.h"
-
 #include <QDBusMetaType>
 #include <QDBusObjectPath>
 #include <QSignalSpy>
 #include <QTest>
+
+#include "entryinfo.h"
+#include "log_recorder.h"
+#include "meta_order.h"
+#include "property_service.h"
 
 using velk::module::software::EntryInfo;
 
@@ -32,109 +32,95 @@ class EntryInfoTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void init();
-    void cleanup();
+    void init()
+    {
+        qDBusRegisterMetaType<QMap<uint, QString>>();
+        m_dock = std::make_unique<PropertyService>(QStringLiteral("com.norix.kpx.daemon.Dock"));
+        m_dock->set(path, QStringLiteral("Id"), QStringLiteral("e0"));
+        m_dock->set(path, QStringLiteral("Name"), mail);
+        m_dock->set(path, QStringLiteral("IsDocked"), true);
+        m_dock->set(path, QStringLiteral("WindowInfos"),
+                    QVariant::fromValue(QMap<uint, QString>{{7, {}}, {8, {}}}));
+    }
 
-    void signalsAndSlotsStandInTheirOrder();
-    void entryIsKnownAsItWasFound();
-    void whetherItIsDockedIsAskedEachTime();
-    void unreachableEntryIsEmptyAndUsable();
-    void changedNumberOfWindowsIsToldOnce_data();
-    void changedNumberOfWindowsIsToldOnce();
-    void emptyNameIsIgnored();
+    void cleanup() { m_dock.reset(); }
+
+    void signalsAndSlotsStandInTheirOrder()
+    {
+        QCOMPARE(methodsInOrder(EntryInfo::staticMetaObject),
+                 (QStringList{QStringLiteral("windowSizeChanged(int,QString)"),
+                              QStringLiteral("onWinInfoChanged(QMap<uint,WindowInfo>)"),
+                              QStringLiteral("onNameChanged(QString)")}));
+    }
+
+    void entryIsKnownAsItWasFound()
+    {
+        const EntryInfo entry{QDBusObjectPath(path)};
+        m_dock->set(path, QStringLiteral("Id"), QStringLiteral("another"));
+        m_dock->set(path, QStringLiteral("Name"), QStringLiteral("another"));
+
+        QCOMPARE(entry.entryId(), QStringLiteral("e0"));
+        QCOMPARE(entry.appName(), mail);
+        QCOMPARE(entry.winSize(), 2);
+    }
+
+    void whetherItIsDockedIsAskedEachTime()
+    {
+        const EntryInfo entry{QDBusObjectPath(path)};
+        QVERIFY(entry.isDocked());
+        m_dock->set(path, QStringLiteral("IsDocked"), false);
+        QVERIFY(!entry.isDocked());
+    }
+
+    void unreachableEntryIsEmptyAndUsable()
+    {
+        m_dock.reset();
+        const LogRecorder log;
+        EntryInfo entry{QDBusObjectPath(path)};
+        QSignalSpy changed(&entry, &EntryInfo::windowSizeChanged);
+
+        QCOMPARE(log.lines(), QStringList{QStringLiteral("warning: entry is invalid, path: \"/entry\"")});
+        QCOMPARE(entry.entryId() + entry.appName(), QString());
+        QCOMPARE(entry.winSize(), 0);
+        QVERIFY(!entry.isDocked());
+        entry.onWinInfoChanged(windows(1));
+        QCOMPARE(changed, (QList<QVariantList>{{1, QString()}}));
+    }
+
+    void changedNumberOfWindowsIsSignalledOnce_data()
+    {
+        QTest::addColumn<int>("count");
+        QTest::addColumn<QList<QVariantList>>("signals");
+        QTest::newRow("more") << 5 << QList<QVariantList>{{1, mail}};
+        QTest::newRow("one less") << 1 << QList<QVariantList>{{2, mail}};
+        QTest::newRow("none left") << 0 << QList<QVariantList>{{2, mail}};
+        QTest::newRow("others, as many") << 2 << QList<QVariantList>();
+    }
+
+    void changedNumberOfWindowsIsSignalledOnce()
+    {
+        QFETCH(int, count);
+        EntryInfo entry{QDBusObjectPath(path)};
+        QSignalSpy changed(&entry, &EntryInfo::windowSizeChanged);
+
+        entry.onWinInfoChanged(windows(count));
+        entry.onWinInfoChanged(windows(count));
+
+        QTEST(static_cast<QList<QVariantList>>(changed), "signals");
+        QCOMPARE(entry.winSize(), count);
+    }
+
+    void emptyNameIsIgnored()
+    {
+        EntryInfo entry{QDBusObjectPath(path)};
+        entry.onNameChanged(QStringLiteral("Post"));
+        entry.onNameChanged(QString());
+        QCOMPARE(entry.appName(), QStringLiteral("Post"));
+    }
 
 private:
     std::unique_ptr<PropertyService> m_dock;
 };
-
-void EntryInfoTest::init()
-{
-    qDBusRegisterMetaType<QMap<uint, QString>>();
-    m_dock = std::make_unique<PropertyService>(QStringLiteral("com.norix.kpx.daemon.Dock"));
-    m_dock->set(path, QStringLiteral("Id"), QStringLiteral("e0"));
-    m_dock->set(path, QStringLiteral("Name"), mail);
-    m_dock->set(path, QStringLiteral("IsDocked"), true);
-    m_dock->set(path, QStringLiteral("WindowInfos"),
-                QVariant::fromValue(QMap<uint, QString>{{7, {}}, {8, {}}}));
-}
-
-void EntryInfoTest::cleanup()
-{
-    m_dock.reset();
-}
-
-void EntryInfoTest::signalsAndSlotsStandInTheirOrder()
-{
-    QCOMPARE(methodsInOrder(EntryInfo::staticMetaObject),
-             (QStringList{QStringLiteral("windowSizeChanged(int,QString)"),
-                          QStringLiteral("onWinInfoChanged(QMap<uint,WindowInfo>)"),
-                          QStringLiteral("onNameChanged(QString)")}));
-}
-
-void EntryInfoTest::entryIsKnownAsItWasFound()
-{
-    const EntryInfo entry{QDBusObjectPath(path)};
-    m_dock->set(path, QStringLiteral("Id"), QStringLiteral("another"));
-    m_dock->set(path, QStringLiteral("Name"), QStringLiteral("another"));
-
-    QCOMPARE(entry.entryId(), QStringLiteral("e0"));
-    QCOMPARE(entry.appName(), mail);
-    QCOMPARE(entry.winSize(), 2);
-}
-
-void EntryInfoTest::whetherItIsDockedIsAskedEachTime()
-{
-    const EntryInfo entry{QDBusObjectPath(path)};
-    QVERIFY(entry.isDocked());
-    m_dock->set(path, QStringLiteral("IsDocked"), false);
-    QVERIFY(!entry.isDocked());
-}
-
-void EntryInfoTest::unreachableEntryIsEmptyAndUsable()
-{
-    m_dock.reset();
-    const LogRecorder log;
-    EntryInfo entry{QDBusObjectPath(path)};
-    QSignalSpy changed(&entry, &EntryInfo::windowSizeChanged);
-
-    QCOMPARE(log.lines(), QStringList{QStringLiteral("warning: entry is invalid, path: \"/entry\"")});
-    QCOMPARE(entry.entryId() + entry.appName(), QString());
-    QCOMPARE(entry.winSize(), 0);
-    QVERIFY(!entry.isDocked());
-    entry.onWinInfoChanged(windows(1));
-    QCOMPARE(changed, (QList<QVariantList>{{1, QString()}}));
-}
-
-void EntryInfoTest::changedNumberOfWindowsIsToldOnce_data()
-{
-    QTest::addColumn<int>("count");
-    QTest::addColumn<QList<QVariantList>>("told");
-    QTest::newRow("more") << 5 << QList<QVariantList>{{1, mail}};
-    QTest::newRow("one less") << 1 << QList<QVariantList>{{2, mail}};
-    QTest::newRow("none left") << 0 << QList<QVariantList>{{2, mail}};
-    QTest::newRow("others, as many") << 2 << QList<QVariantList>();
-}
-
-void EntryInfoTest::changedNumberOfWindowsIsToldOnce()
-{
-    QFETCH(int, count);
-    EntryInfo entry{QDBusObjectPath(path)};
-    QSignalSpy changed(&entry, &EntryInfo::windowSizeChanged);
-
-    entry.onWinInfoChanged(windows(count));
-    entry.onWinInfoChanged(windows(count));
-
-    QTEST(static_cast<QList<QVariantList>>(changed), "told");
-    QCOMPARE(entry.winSize(), count);
-}
-
-void EntryInfoTest::emptyNameIsIgnored()
-{
-    EntryInfo entry{QDBusObjectPath(path)};
-    entry.onNameChanged(QStringLiteral("Post"));
-    entry.onNameChanged(QString());
-    QCOMPARE(entry.appName(), QStringLiteral("Post"));
-}
 
 QTEST_GUILESS_MAIN(EntryInfoTest)
 #include "entryinfo_test.moc"

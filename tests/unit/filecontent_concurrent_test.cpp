@@ -1,6 +1,5 @@
-#include <QtTest>
-
 #include <QSet>
+#include <QtTest>
 
 #include <functional>
 
@@ -11,17 +10,6 @@
 #include "log_recorder.h"
 
 using velk::base::FileContent;
-
-/// Reads while another process truncates and writes the file all the time, as the daemon may.
-class FileContentConcurrentTest : public QObject
-{
-    Q_OBJECT
-
-private Q_SLOTS:
-    void hostAndPortBelongTogether();
-    void recordIsOfOneWrite();
-    void identifierIsOneOfTheTwo();
-};
 
 namespace {
 
@@ -51,49 +39,56 @@ QSet<QString> readUntilSeen(const QSet<QString>& outcomes, const std::function<Q
 
 } // namespace
 
-void FileContentConcurrentTest::hostAndPortBelongTogether()
+/// Reads while another process truncates and writes the file all the time, as the daemon may.
+class FileContentConcurrentTest : public QObject
 {
-    const QString both = QStringLiteral("%1:%1");
-    const QSet<QString> outcomes{both.arg(QString::fromLatin1(kShort)), both.arg(QString::fromLatin1(kLong)),
-                                 QStringLiteral("none")};
-    writeBytes(kUserInfo, userInfo(kShort));
-    const FileRewriter daemon(kUserInfo, {userInfo(kLong), userInfo(kShort)});
-    QCOMPARE(readUntilSeen(outcomes,
-                           [] {
-                               QString host;
-                               QString port;
-                               const bool found = FileContent::getHostAndPort(host, port);
-                               return found ? QStringLiteral("%1:%2").arg(host, port)
-                                            : QStringLiteral("none%1%2").arg(host, port);
-                           }),
-             outcomes);
-}
+    Q_OBJECT
 
-void FileContentConcurrentTest::recordIsOfOneWrite()
-{
-    const QString all = QStringLiteral("%1 %1 %1 %1 %1");
-    const QSet<QString> outcomes{all.arg(QString::fromLatin1(kShort)), all.arg(QString::fromLatin1(kLong)),
-                                 QStringLiteral("    ")};
-    writeBytes(kUserInfo, userInfo(kShort));
-    const FileRewriter daemon(kUserInfo, {userInfo(kLong), userInfo(kShort)});
-    QCOMPARE(readUntilSeen(outcomes,
-                           [] {
-                               const auto info = FileContent::getUserInfo(nullptr);
-                               return QStringList{info.serverPort, info.serverHost, info.domainHost,
-                                                  info.domainPort, info.terminalName}
-                                   .join(QLatin1Char(' '));
-                           }),
-             outcomes);
-}
+private Q_SLOTS:
+    void hostAndPortBelongTogether()
+    {
+        const QString both = QStringLiteral("%1:%1");
+        const QSet<QString> outcomes{both.arg(QString::fromLatin1(kShort)),
+                                     both.arg(QString::fromLatin1(kLong)), QStringLiteral("none")};
+        writeBytes(kUserInfo, userInfo(kShort));
+        const FileRewriter daemon(kUserInfo, {userInfo(kLong), userInfo(kShort)});
+        QCOMPARE(readUntilSeen(outcomes,
+                               [] {
+                                   QString host;
+                                   QString port;
+                                   const bool found = FileContent::getHostAndPort(host, port);
+                                   return found ? QStringLiteral("%1:%2").arg(host, port)
+                                                : QStringLiteral("none%1%2").arg(host, port);
+                               }),
+                 outcomes);
+    }
 
-void FileContentConcurrentTest::identifierIsOneOfTheTwo()
-{
-    const QSet<QString> outcomes{QStringLiteral("id-1"), QStringLiteral("id-2"), QString()};
-    writeBytes(kMachineId, "id-1\n");
-    const FileRewriter daemon(kMachineId, {"id-2\n", "id-1\n"});
-    QCOMPARE(readUntilSeen(outcomes, [] { return FileContent::instace()->getMachineID(nullptr, true); }),
-             outcomes);
-}
+    void recordIsOfOneWrite()
+    {
+        const QString all = QStringLiteral("%1 %1 %1 %1 %1");
+        const QSet<QString> outcomes{all.arg(QString::fromLatin1(kShort)),
+                                     all.arg(QString::fromLatin1(kLong)), QStringLiteral("    ")};
+        writeBytes(kUserInfo, userInfo(kShort));
+        const FileRewriter daemon(kUserInfo, {userInfo(kLong), userInfo(kShort)});
+        QCOMPARE(readUntilSeen(outcomes,
+                               [] {
+                                   const auto info = FileContent::getUserInfo(nullptr);
+                                   return QStringList{info.serverPort, info.serverHost, info.domainHost,
+                                                      info.domainPort, info.terminalName}
+                                       .join(QLatin1Char(' '));
+                               }),
+                 outcomes);
+    }
+
+    void identifierIsOneOfTheTwo()
+    {
+        const QSet<QString> outcomes{QStringLiteral("id-1"), QStringLiteral("id-2"), QString()};
+        writeBytes(kMachineId, "id-1\n");
+        const FileRewriter daemon(kMachineId, {"id-2\n", "id-1\n"});
+        QCOMPARE(readUntilSeen(outcomes, [] { return FileContent::instace()->getMachineID(nullptr, true); }),
+                 outcomes);
+    }
+};
 
 QTEST_GUILESS_MAIN(FileContentConcurrentTest)
 #include "filecontent_concurrent_test.moc"

@@ -1,6 +1,5 @@
-#include <QtTest>
-
 #include <QTemporaryDir>
+#include <QtTest>
 
 #include <memory>
 #include <optional>
@@ -19,179 +18,162 @@ class FileProxyTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void init();
+    void init() { removeAny(m_path); }
 
-    void openedFileIsReadSilently();
-    void failedOpenIsLoggedWithItsCause_data();
-    void failedOpenIsLoggedWithItsCause();
-    void folderIsNoFile();
-    void reopeningClosesFirstHandle();
-    void failedReopeningClosesFirstHandle();
-    void destructionClosesFile();
-    void writingEmptiesFileFirst();
-    void writeTellsHowMuchReachedFile_data();
-    void writeTellsHowMuchReachedFile();
-    void fullDeviceTakesNothing();
-    void unopenedProxyReadsAndWritesNothing();
-    void parentOwnsProxy();
+    void openedFileIsReadSilently()
+    {
+        writeBytes(m_path,
+                   "some\0bytes\r\n"
+                   "\xff");
+        const LogRecorder log;
+        FileProxy proxy;
+        QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
+        QCOMPARE(proxy.readAll(), readBytes(m_path));
+        QCOMPARE(log.lines(), QStringList());
+    }
+
+    void failedOpenIsLoggedWithItsCause_data()
+    {
+        QTest::addColumn<std::optional<QFile::Permissions>>("permissions");
+        QTest::addColumn<QIODevice::OpenMode>("mode");
+        QTest::addColumn<QString>("shownMode");
+        QTest::addColumn<QString>("exists");
+
+        const std::optional<QFile::Permissions> missing;
+        const std::optional<QFile::Permissions> locked{kNoAccess};
+        const QString readOnly = QStringLiteral(R"(OpenMode( "ReadOnly" ))");
+        const QString no = QStringLiteral("false");
+        const QString yes = QStringLiteral("true");
+
+        QTest::newRow("read missing")
+            << missing << QIODevice::OpenMode(QIODevice::ReadOnly) << readOnly << no;
+        QTest::newRow("read unreadable")
+            << locked << QIODevice::OpenMode(QIODevice::ReadOnly) << readOnly << yes;
+        QTest::newRow("write unwritable") << locked << QIODevice::OpenMode(QIODevice::WriteOnly)
+                                          << QStringLiteral(R"(OpenMode( "WriteOnly" ))") << yes;
+        QTest::newRow("several flags") << locked << (QIODevice::WriteOnly | QIODevice::Truncate)
+                                       << QStringLiteral(R"(OpenMode( "Truncate|WriteOnly" ))") << yes;
+    }
+
+    void failedOpenIsLoggedWithItsCause()
+    {
+        QFETCH(std::optional<QFile::Permissions>, permissions);
+        QFETCH(QIODevice::OpenMode, mode);
+        QFETCH(QString, shownMode);
+        QFETCH(QString, exists);
+        if (permissions) {
+            writeBytes(m_path, "kept");
+            setPermissions(m_path, *permissions);
+        }
+
+        const LogRecorder log;
+        FileProxy proxy;
+        QVERIFY(!proxy.open(m_path, mode));
+        const QString line = QStringLiteral("warning: open file failed, file: \"%1\" , mode: %2 , exist: %3");
+        QCOMPARE(log.lines(), QStringList(line.arg(m_path, shownMode, exists)));
+        QCOMPARE(readBytes(m_path), permissions ? QByteArray("kept") : QByteArray());
+    }
+
+    void folderIsNoFile()
+    {
+        const LogRecorder log;
+        FileProxy proxy;
+        QVERIFY(!proxy.open(m_folder.path(), QIODevice::ReadOnly));
+        QVERIFY(log.lines().join(QChar()).endsWith(QLatin1String(", exist: true")));
+    }
+
+    void reopeningClosesFirstHandle()
+    {
+        writeBytes(m_path, "text");
+        const LogRecorder log;
+        FileProxy proxy;
+        QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
+        QCOMPARE(openHandles(m_path), 1);
+        QVERIFY(proxy.open(m_path, QIODevice::WriteOnly));
+        QCOMPARE(log.lines(), QStringList()); // Qt warns of a handle that is still open
+        QCOMPARE(openHandles(m_path), 1);
+        QCOMPARE(proxy.write("new"), 3);
+        QCOMPARE(readBytes(m_path), QByteArray("new"));
+    }
+
+    void failedReopeningClosesFirstHandle()
+    {
+        writeBytes(m_path, "text");
+        const LogRecorder log;
+        FileProxy proxy;
+        QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
+        QVERIFY(!proxy.open(m_path + QStringLiteral(".missing"), QIODevice::ReadOnly));
+        QCOMPARE(openHandles(m_path), 0);
+    }
+
+    void destructionClosesFile()
+    {
+        writeBytes(m_path, "text");
+        {
+            FileProxy proxy;
+            QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
+            QCOMPARE(openHandles(m_path), 1);
+        }
+        QCOMPARE(openHandles(m_path), 0);
+    }
+
+    void writingEmptiesFileFirst()
+    {
+        writeBytes(m_path, "a longer text");
+        FileProxy proxy;
+        QVERIFY(proxy.open(m_path, QIODevice::WriteOnly));
+        QCOMPARE(readBytes(m_path), QByteArray(""));
+    }
+
+    void writeReturnsHowMuchReachedFile_data()
+    {
+        QTest::addColumn<int>("room");
+        QTest::addColumn<qint64>("written");
+        QTest::newRow("no room") << 0 << qint64(-1);
+        QTest::newRow("room for a part") << 4 << qint64(4);
+        QTest::newRow("room for all") << 10 << qint64(10);
+    }
+
+    void writeReturnsHowMuchReachedFile()
+    {
+        QFETCH(int, room);
+        QFETCH(qint64, written);
+        FileProxy proxy;
+        QVERIFY(proxy.open(m_path, QIODevice::WriteOnly));
+        const FileSizeLimit limit(static_cast<rlim_t>(room));
+        QCOMPARE(proxy.write("0123456789"), written);
+    }
+
+    void fullDeviceTakesNothing()
+    {
+        FileProxy proxy;
+        QVERIFY(proxy.open(QStringLiteral("/dev/full"), QIODevice::WriteOnly));
+        QCOMPARE(proxy.write("text"), qint64(-1));
+    }
+
+    void unopenedProxyReadsAndWritesNothing()
+    {
+        const LogRecorder log;
+        FileProxy proxy;
+        QCOMPARE(proxy.readAll(), QByteArray());
+        QCOMPARE(proxy.write("text"), qint64(-1));
+    }
+
+    void parentOwnsProxy()
+    {
+        writeBytes(m_path, "text");
+        auto parent = std::make_unique<QObject>();
+        auto* proxy = new FileProxy(parent.get());
+        QVERIFY(proxy->open(m_path, QIODevice::ReadOnly));
+        QCOMPARE(proxy->metaObject()->className(), "velk::base::FileProxy");
+        parent.reset();
+        QCOMPARE(openHandles(m_path), 0);
+    }
 
 private:
     QTemporaryDir m_folder;
     QString m_path = m_folder.filePath(QStringLiteral("file"));
 };
-
-void FileProxyTest::init()
-{
-    removeAny(m_path);
-}
-
-void FileProxyTest::openedFileIsReadSilently()
-{
-    writeBytes(m_path,
-               "some\0bytes\r\n"
-               "\xff");
-    const LogRecorder log;
-    FileProxy proxy;
-    QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
-    QCOMPARE(proxy.readAll(), readBytes(m_path));
-    QCOMPARE(log.lines(), QStringList());
-}
-
-void FileProxyTest::failedOpenIsLoggedWithItsCause_data()
-{
-    QTest::addColumn<std::optional<QFile::Permissions>>("permissions");
-    QTest::addColumn<QIODevice::OpenMode>("mode");
-    QTest::addColumn<QString>("shownMode");
-    QTest::addColumn<QString>("exists");
-
-    const std::optional<QFile::Permissions> missing;
-    const std::optional<QFile::Permissions> locked{kNoAccess};
-    const QString readOnly = QStringLiteral(R"(OpenMode( "ReadOnly" ))");
-    const QString no = QStringLiteral("false");
-    const QString yes = QStringLiteral("true");
-
-    QTest::newRow("read missing") << missing << QIODevice::OpenMode(QIODevice::ReadOnly) << readOnly << no;
-    QTest::newRow("read unreadable") << locked << QIODevice::OpenMode(QIODevice::ReadOnly) << readOnly << yes;
-    QTest::newRow("write unwritable") << locked << QIODevice::OpenMode(QIODevice::WriteOnly)
-                                      << QStringLiteral(R"(OpenMode( "WriteOnly" ))") << yes;
-    QTest::newRow("several flags") << locked << (QIODevice::WriteOnly | QIODevice::Truncate)
-                                   << QStringLiteral(R"(OpenMode( "Truncate|WriteOnly" ))") << yes;
-}
-
-void FileProxyTest::failedOpenIsLoggedWithItsCause()
-{
-    QFETCH(std::optional<QFile::Permissions>, permissions);
-    QFETCH(QIODevice::OpenMode, mode);
-    QFETCH(QString, shownMode);
-    QFETCH(QString, exists);
-    if (permissions) {
-        writeBytes(m_path, "kept");
-        setPermissions(m_path, *permissions);
-    }
-
-    const LogRecorder log;
-    FileProxy proxy;
-    QVERIFY(!proxy.open(m_path, mode));
-    const QString line = QStringLiteral("warning: open file failed, file: \"%1\" , mode: %2 , exist: %3");
-    QCOMPARE(log.lines(), QStringList(line.arg(m_path, shownMode, exists)));
-    QCOMPARE(readBytes(m_path), permissions ? QByteArray("kept") : QByteArray());
-}
-
-void FileProxyTest::folderIsNoFile()
-{
-    const LogRecorder log;
-    FileProxy proxy;
-    QVERIFY(!proxy.open(m_folder.path(), QIODevice::ReadOnly));
-    QVERIFY(log.lines().join(QChar()).endsWith(QLatin1String(", exist: true")));
-}
-
-void FileProxyTest::reopeningClosesFirstHandle()
-{
-    writeBytes(m_path, "text");
-    const LogRecorder log;
-    FileProxy proxy;
-    QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
-    QCOMPARE(openHandles(m_path), 1);
-    QVERIFY(proxy.open(m_path, QIODevice::WriteOnly));
-    QCOMPARE(log.lines(), QStringList()); // Qt warns of a handle that is still open
-    QCOMPARE(openHandles(m_path), 1);
-    QCOMPARE(proxy.write("new"), 3);
-    QCOMPARE(readBytes(m_path), QByteArray("new"));
-}
-
-void FileProxyTest::failedReopeningClosesFirstHandle()
-{
-    writeBytes(m_path, "text");
-    const LogRecorder log;
-    FileProxy proxy;
-    QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
-    QVERIFY(!proxy.open(m_path + QStringLiteral(".missing"), QIODevice::ReadOnly));
-    QCOMPARE(openHandles(m_path), 0);
-}
-
-void FileProxyTest::destructionClosesFile()
-{
-    writeBytes(m_path, "text");
-    {
-        FileProxy proxy;
-        QVERIFY(proxy.open(m_path, QIODevice::ReadOnly));
-        QCOMPARE(openHandles(m_path), 1);
-    }
-    QCOMPARE(openHandles(m_path), 0);
-}
-
-void FileProxyTest::writingEmptiesFileFirst()
-{
-    writeBytes(m_path, "a longer text");
-    FileProxy proxy;
-    QVERIFY(proxy.open(m_path, QIODevice::WriteOnly));
-    QCOMPARE(readBytes(m_path), QByteArray(""));
-}
-
-void FileProxyTest::writeTellsHowMuchReachedFile_data()
-{
-    QTest::addColumn<int>("room");
-    QTest::addColumn<qint64>("written");
-    QTest::newRow("no room") << 0 << qint64(-1);
-    QTest::newRow("room for a part") << 4 << qint64(4);
-    QTest::newRow("room for all") << 10 << qint64(10);
-}
-
-void FileProxyTest::writeTellsHowMuchReachedFile()
-{
-    QFETCH(int, room);
-    QFETCH(qint64, written);
-    FileProxy proxy;
-    QVERIFY(proxy.open(m_path, QIODevice::WriteOnly));
-    const FileSizeLimit limit(static_cast<rlim_t>(room));
-    QCOMPARE(proxy.write("0123456789"), written);
-}
-
-void FileProxyTest::fullDeviceTakesNothing()
-{
-    FileProxy proxy;
-    QVERIFY(proxy.open(QStringLiteral("/dev/full"), QIODevice::WriteOnly));
-    QCOMPARE(proxy.write("text"), qint64(-1));
-}
-
-void FileProxyTest::unopenedProxyReadsAndWritesNothing()
-{
-    const LogRecorder log;
-    FileProxy proxy;
-    QCOMPARE(proxy.readAll(), QByteArray());
-    QCOMPARE(proxy.write("text"), qint64(-1));
-}
-
-void FileProxyTest::parentOwnsProxy()
-{
-    writeBytes(m_path, "text");
-    auto parent = std::make_unique<QObject>();
-    auto* proxy = new FileProxy(parent.get());
-    QVERIFY(proxy->open(m_path, QIODevice::ReadOnly));
-    QCOMPARE(proxy->metaObject()->className(), "velk::base::FileProxy");
-    parent.reset();
-    QCOMPARE(openHandles(m_path), 0);
-}
 
 QTEST_GUILESS_MAIN(FileProxyTest)
 #include "fileproxy_test.moc"

@@ -1,6 +1,3 @@
-#include "http_outcome.h"
-#include "https_server.h"
-
 #include <QProcess>
 #include <QTimer>
 #include <QtTest>
@@ -8,6 +5,9 @@
 #include <netinet/in.h>
 #include <netinet/tcp.h>
 #include <sys/socket.h>
+
+#include "http_outcome.h"
+#include "https_server.h"
 
 namespace {
 
@@ -54,159 +54,143 @@ class HttpClientApiConnectionTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void init();
-    void cleanup();
+    void init()
+    {
+        m_server.forgetRequests();
+        m_client = std::make_unique<HttpClientApi>(nullptr, false);
+        m_client->setSSLConfig(m_server.file("ca"), {}, {});
+    }
 
-    void hundredRequestsShareOneConnection();
-    void connectsAnewWhenTheServerHasClosed_data();
-    void connectsAnewWhenTheServerHasClosed();
-    void sendsAgainWhatWentIntoADeadPath();
-    void kernelWatchesAnIdleConnection();
-    void resumesItsTlsSessionOnANewConnection_data();
-    void resumesItsTlsSessionOnANewConnection();
-    void servesTheNextRequestAfterOneWithoutResponse();
-    void speaksHttp11ToAServerThatPrefersHttp2();
-    void usesNoProxyOfTheEnvironment();
-    void followsNoRedirect();
-    void deliversNoEventWhileARequestRuns();
-    void childProcessesInheritNothing();
+    void cleanup()
+    {
+        qunsetenv("https_proxy");
+        qunsetenv("ALL_PROXY");
+    }
+
+    void hundredRequestsShareOneConnection()
+    {
+        QSet<int> handshakes;
+        for (int i = 0; i < 100; ++i) {
+            QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+            handshakes << m_server.nextRequest()[QStringLiteral("handshake")].toInt();
+        }
+        QCOMPARE(handshakes.size(), 1);
+    }
+
+    void connectsAnewWhenTheServerHasClosed_data()
+    {
+        QTest::addColumn<QString>("path");
+        QTest::newRow("idle connection closed") << QStringLiteral("/idle-close");
+        QTest::newRow("idle connection reset") << QStringLiteral("/idle-reset");
+        QTest::newRow("close announced in the response") << QStringLiteral("/announced-close");
+    }
+
+    void connectsAnewWhenTheServerHasClosed()
+    {
+        QFETCH(QString, path);
+
+        QCOMPARE(get(*m_client, m_server.url("proper", qUtf8Printable(path))).status, 200);
+        QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
+    }
+
+    void sendsAgainWhatWentIntoADeadPath()
+    {
+        QCOMPARE(get(*m_client, m_server.url("proper", "/idle-death")).status, 200);
+        QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
+        const QJsonObject before = m_server.nextRequest();
+        const QJsonObject after = m_server.nextRequest();
+        QCOMPARE(after[QStringLiteral("line")].toString(), QStringLiteral("PUT /text HTTP/1.1"));
+        QVERIFY(after[QStringLiteral("handshake")] != before[QStringLiteral("handshake")]);
+    }
+
+    void kernelWatchesAnIdleConnection()
+    {
+        constexpr int shortestPoll = 60;
+        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+        QCOMPARE(connections().size(), 1);
+        const int connection = connections().first();
+        QCOMPARE(option(connection, SOL_SOCKET, SO_KEEPALIVE), 1);
+        QVERIFY(option(connection, IPPROTO_TCP, TCP_KEEPIDLE) + option(connection, IPPROTO_TCP, TCP_KEEPINTVL)
+                < shortestPoll);
+        QCOMPARE(option(connection, IPPROTO_TCP, TCP_USER_TIMEOUT), 10000);
+    }
+
+    void resumesItsTlsSessionOnANewConnection_data()
+    {
+        QTest::addColumn<QString>("door");
+        QTest::addColumn<QString>("version");
+        QTest::newRow("TLS 1.3") << QStringLiteral("demanding") << QStringLiteral("TLSv1.3");
+        QTest::newRow("TLS 1.2") << QStringLiteral("demanding older") << QStringLiteral("TLSv1.2");
+    }
+
+    void resumesItsTlsSessionOnANewConnection()
+    {
+        QFETCH(QString, door);
+        QFETCH(QString, version);
+        m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
+        for (const bool isResumed : {false, true, true}) {
+            QCOMPARE(get(*m_client, m_server.url(qUtf8Printable(door), "/announced-close")).status, 200);
+            const QJsonObject request = m_server.nextRequest();
+            QCOMPARE(request[QStringLiteral("tls")].toString(), version);
+            QCOMPARE(request[QStringLiteral("resumed")].toBool(), isResumed);
+        }
+    }
+
+    void servesTheNextRequestAfterOneWithoutResponse()
+    {
+        QCOMPARE(get(*m_client, m_server.url("proper", "/cut-length")).status, 0);
+        QCOMPARE(get(*m_client, m_server.url("proper", "/body-over-cap")).status, 0);
+        QCOMPARE(get(*m_client, m_server.url("proper", "/text")).reply, QStringLiteral("用户 ü {}"));
+    }
+
+    void speaksHttp11ToAServerThatPrefersHttp2()
+    {
+        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+        QCOMPARE(m_server.nextRequest()[QStringLiteral("protocol")].toString(), QStringLiteral("http/1.1"));
+    }
+
+    void usesNoProxyOfTheEnvironment()
+    {
+        const QByteArray closedPort = m_server.url("refusing", "").toUtf8().replace("https:", "http:");
+        qputenv("https_proxy", closedPort);
+        qputenv("ALL_PROXY", closedPort);
+        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+    }
+
+    void followsNoRedirect()
+    {
+        QCOMPARE(get(*m_client, m_server.url("proper", "/redirect")).status, 302);
+        QCOMPARE(get(*m_client, m_server.url("proper", "/next")).status, 200);
+        QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(),
+                 QStringLiteral("GET /redirect HTTP/1.1"));
+        QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(),
+                 QStringLiteral("GET /next HTTP/1.1"));
+    }
+
+    void deliversNoEventWhileARequestRuns()
+    {
+        QTimer timer;
+        timer.setSingleShot(true);
+        QSignalSpy fired(&timer, &QTimer::timeout);
+        timer.start(0);
+        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+        QCOMPARE(fired.count(), 0);
+        QVERIFY(fired.wait());
+    }
+
+    void childProcessesInheritNothing()
+    {
+        m_client.reset();
+        const QString before = descriptorsOfAChild();
+        init();
+        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+        QCOMPARE(descriptorsOfAChild(), before);
+    }
 
 private:
     HttpsServer m_server;
     std::unique_ptr<HttpClientApi> m_client;
 };
-
-void HttpClientApiConnectionTest::init()
-{
-    m_server.forgetRequests();
-    m_client = std::make_unique<HttpClientApi>(nullptr, false);
-    m_client->setSSLConfig(m_server.file("ca"), {}, {});
-}
-
-void HttpClientApiConnectionTest::cleanup()
-{
-    qunsetenv("https_proxy");
-    qunsetenv("ALL_PROXY");
-}
-
-void HttpClientApiConnectionTest::hundredRequestsShareOneConnection()
-{
-    QSet<int> handshakes;
-    for (int i = 0; i < 100; ++i) {
-        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
-        handshakes << m_server.nextRequest()[QStringLiteral("handshake")].toInt();
-    }
-    QCOMPARE(handshakes.size(), 1);
-}
-
-void HttpClientApiConnectionTest::connectsAnewWhenTheServerHasClosed_data()
-{
-    QTest::addColumn<QString>("path");
-    QTest::newRow("idle connection closed") << QStringLiteral("/idle-close");
-    QTest::newRow("idle connection reset") << QStringLiteral("/idle-reset");
-    QTest::newRow("close announced in the response") << QStringLiteral("/announced-close");
-}
-
-void HttpClientApiConnectionTest::connectsAnewWhenTheServerHasClosed()
-{
-    QFETCH(QString, path);
-
-    QCOMPARE(get(*m_client, m_server.url("proper", qUtf8Printable(path))).status, 200);
-    QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
-}
-
-void HttpClientApiConnectionTest::sendsAgainWhatWentIntoADeadPath()
-{
-    QCOMPARE(get(*m_client, m_server.url("proper", "/idle-death")).status, 200);
-    QCOMPARE(put(*m_client, m_server.url("proper", "/text"), QStringLiteral("{}")).status, 200);
-    const QJsonObject before = m_server.nextRequest();
-    const QJsonObject after = m_server.nextRequest();
-    QCOMPARE(after[QStringLiteral("line")].toString(), QStringLiteral("PUT /text HTTP/1.1"));
-    QVERIFY(after[QStringLiteral("handshake")] != before[QStringLiteral("handshake")]);
-}
-
-void HttpClientApiConnectionTest::kernelWatchesAnIdleConnection()
-{
-    constexpr int shortestPoll = 60;
-    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
-    QCOMPARE(connections().size(), 1);
-    const int connection = connections().first();
-    QCOMPARE(option(connection, SOL_SOCKET, SO_KEEPALIVE), 1);
-    QVERIFY(option(connection, IPPROTO_TCP, TCP_KEEPIDLE) + option(connection, IPPROTO_TCP, TCP_KEEPINTVL)
-            < shortestPoll);
-    QCOMPARE(option(connection, IPPROTO_TCP, TCP_USER_TIMEOUT), 10000);
-}
-
-void HttpClientApiConnectionTest::resumesItsTlsSessionOnANewConnection_data()
-{
-    QTest::addColumn<QString>("door");
-    QTest::addColumn<QString>("version");
-    QTest::newRow("TLS 1.3") << QStringLiteral("demanding") << QStringLiteral("TLSv1.3");
-    QTest::newRow("TLS 1.2") << QStringLiteral("demanding older") << QStringLiteral("TLSv1.2");
-}
-
-void HttpClientApiConnectionTest::resumesItsTlsSessionOnANewConnection()
-{
-    QFETCH(QString, door);
-    QFETCH(QString, version);
-    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
-    for (const bool isResumed : {false, true, true}) {
-        QCOMPARE(get(*m_client, m_server.url(qUtf8Printable(door), "/announced-close")).status, 200);
-        const QJsonObject request = m_server.nextRequest();
-        QCOMPARE(request[QStringLiteral("tls")].toString(), version);
-        QCOMPARE(request[QStringLiteral("resumed")].toBool(), isResumed);
-    }
-}
-
-void HttpClientApiConnectionTest::servesTheNextRequestAfterOneWithoutResponse()
-{
-    QCOMPARE(get(*m_client, m_server.url("proper", "/cut-length")).status, 0);
-    QCOMPARE(get(*m_client, m_server.url("proper", "/body-over-cap")).status, 0);
-    QCOMPARE(get(*m_client, m_server.url("proper", "/text")).reply, QStringLiteral("用户 ü {}"));
-}
-
-void HttpClientApiConnectionTest::speaksHttp11ToAServerThatPrefersHttp2()
-{
-    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
-    QCOMPARE(m_server.nextRequest()[QStringLiteral("protocol")].toString(), QStringLiteral("http/1.1"));
-}
-
-void HttpClientApiConnectionTest::usesNoProxyOfTheEnvironment()
-{
-    const QByteArray nobody = m_server.url("refusing", "").toUtf8().replace("https:", "http:");
-    qputenv("https_proxy", nobody);
-    qputenv("ALL_PROXY", nobody);
-    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
-}
-
-void HttpClientApiConnectionTest::followsNoRedirect()
-{
-    QCOMPARE(get(*m_client, m_server.url("proper", "/redirect")).status, 302);
-    QCOMPARE(get(*m_client, m_server.url("proper", "/next")).status, 200);
-    QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(),
-             QStringLiteral("GET /redirect HTTP/1.1"));
-    QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(), QStringLiteral("GET /next HTTP/1.1"));
-}
-
-void HttpClientApiConnectionTest::deliversNoEventWhileARequestRuns()
-{
-    QTimer timer;
-    timer.setSingleShot(true);
-    QSignalSpy fired(&timer, &QTimer::timeout);
-    timer.start(0);
-    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
-    QCOMPARE(fired.count(), 0);
-    QVERIFY(fired.wait());
-}
-
-void HttpClientApiConnectionTest::childProcessesInheritNothing()
-{
-    m_client.reset();
-    const QString before = descriptorsOfAChild();
-    init();
-    QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
-    QCOMPARE(descriptorsOfAChild(), before);
-}
 
 QTEST_GUILESS_MAIN(HttpClientApiConnectionTest)
 #include "httpclientapi_connection_test.moc"

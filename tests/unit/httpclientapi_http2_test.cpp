@@ -1,9 +1,9 @@
+#include <QTcpSocket>
+#include <QtTest>
+
 #include "files.h"
 #include "http_outcome.h"
 #include "https_server.h"
-
-#include <QTcpSocket>
-#include <QtTest>
 
 namespace {
 
@@ -45,17 +45,53 @@ bool accepts(quint16 port)
 
 } // namespace
 
-/// Against a web server of somebody else's making, which demands a client certificate and offers HTTP/2.
+/// Against a common web server, which demands a client certificate and offers HTTP/2.
 class HttpClientApiHttp2Test : public QObject
 {
     Q_OBJECT
 
 private Q_SLOTS:
-    void initTestCase();
-    void cleanupTestCase();
+    void initTestCase()
+    {
+        QVERIFY(QDir(m_folder.path()).mkdir(QStringLiteral("pages")));
+        writeBytes(m_folder.filePath(QStringLiteral("pages/list")), "[]");
+        const QString configuration = m_folder.filePath(QStringLiteral("server.conf"));
+        writeBytes(configuration,
+                   QString::fromUtf8(kConfiguration)
+                       .arg(m_folder.path(), QString::number(kPort), m_certificates.file("server"),
+                            m_certificates.file("server-key"), m_certificates.file("ca"))
+                       .toUtf8());
+        m_server.setProcessChannelMode(QProcess::ForwardedChannels);
+        m_server.start(
+            QStringLiteral("/usr/sbin/apache2"),
+            {QStringLiteral("-D"), QStringLiteral("FOREGROUND"), QStringLiteral("-f"), configuration});
+        QTRY_VERIFY(accepts(kPort));
+    }
 
-    void isAnsweredOverHttp11WithHeaderNamesInTheirCase();
-    void isTurnedAwayWithoutClientCertificate();
+    void cleanupTestCase()
+    {
+        m_server.terminate();
+        m_server.waitForFinished();
+    }
+
+    void isAnsweredOverHttp11WithHeaderNamesInTheirCase()
+    {
+        HttpClientApi client(nullptr, false);
+        client.setSSLConfig(m_certificates.file("ca"), m_certificates.file("client"),
+                            m_certificates.file("client-key"));
+        const HttpOutcome outcome = get(client, url());
+        QCOMPARE(outcome.status, 200);
+        QCOMPARE(outcome.reply, QStringLiteral("[]"));
+        QVERIFY(outcome.headers.contains({"X-Total-Count", "5"}));
+        QVERIFY(outcome.headers.contains({"X-Protocol", "HTTP/1.1"}));
+    }
+
+    void isTurnedAwayWithoutClientCertificate()
+    {
+        HttpClientApi client(nullptr, false);
+        client.setSSLConfig(m_certificates.file("ca"), {}, {});
+        QCOMPARE(get(client, url()).status, 403);
+    }
 
 private:
     QString url() const { return QStringLiteral("https://127.0.0.1:%1/list").arg(kPort); }
@@ -64,47 +100,6 @@ private:
     QTemporaryDir m_folder;
     QProcess m_server;
 };
-
-void HttpClientApiHttp2Test::initTestCase()
-{
-    QVERIFY(QDir(m_folder.path()).mkdir(QStringLiteral("pages")));
-    writeBytes(m_folder.filePath(QStringLiteral("pages/list")), "[]");
-    const QString configuration = m_folder.filePath(QStringLiteral("server.conf"));
-    writeBytes(configuration,
-               QString::fromUtf8(kConfiguration)
-                   .arg(m_folder.path(), QString::number(kPort), m_certificates.file("server"),
-                        m_certificates.file("server-key"), m_certificates.file("ca"))
-                   .toUtf8());
-    m_server.setProcessChannelMode(QProcess::ForwardedChannels);
-    m_server.start(QStringLiteral("/usr/sbin/apache2"),
-                   {QStringLiteral("-D"), QStringLiteral("FOREGROUND"), QStringLiteral("-f"), configuration});
-    QTRY_VERIFY(accepts(kPort));
-}
-
-void HttpClientApiHttp2Test::cleanupTestCase()
-{
-    m_server.terminate();
-    m_server.waitForFinished();
-}
-
-void HttpClientApiHttp2Test::isAnsweredOverHttp11WithHeaderNamesInTheirCase()
-{
-    HttpClientApi client(nullptr, false);
-    client.setSSLConfig(m_certificates.file("ca"), m_certificates.file("client"),
-                        m_certificates.file("client-key"));
-    const HttpOutcome outcome = get(client, url());
-    QCOMPARE(outcome.status, 200);
-    QCOMPARE(outcome.reply, QStringLiteral("[]"));
-    QVERIFY(outcome.headers.contains({"X-Total-Count", "5"}));
-    QVERIFY(outcome.headers.contains({"X-Protocol", "HTTP/1.1"}));
-}
-
-void HttpClientApiHttp2Test::isTurnedAwayWithoutClientCertificate()
-{
-    HttpClientApi client(nullptr, false);
-    client.setSSLConfig(m_certificates.file("ca"), {}, {});
-    QCOMPARE(get(client, url()).status, 403);
-}
 
 QTEST_GUILESS_MAIN(HttpClientApiHttp2Test)
 #include "httpclientapi_http2_test.moc"

@@ -1,31 +1,145 @@
-#include "http_outcome.h"
-#include "https_server.h"
-
 #include <QDir>
 #include <QProcess>
 #include <QtTest>
 
 #include <cstdio>
 
-/// Whom the client trusts, and as whom it presents itself.
+#include "files.h"
+#include "http_outcome.h"
+#include "https_server.h"
+
+/// Which servers the client trusts, and which certificate it presents.
 class HttpClientApiTrustTest : public QObject
 {
     Q_OBJECT
 
 private Q_SLOTS:
-    void initTestCase();
-    void init();
+    // OpenSSL's own default rules out what is older than TLS 1.2. Here it allows it, so that it is the client
+    // that refuses.
+    void initTestCase()
+    {
+        const QString config = m_folder.filePath(QStringLiteral("openssl.cnf"));
+        writeBytes(config,
+                   "openssl_conf = all\n[all]\nssl_conf = modules\n[modules]\nsystem_default = tls\n"
+                   "[tls]\nMinProtocol = TLSv1\nCipherString = ALL:@SECLEVEL=0\n");
+        qputenv("OPENSSL_CONF", QFile::encodeName(config));
+    }
 
-    void refuses_data();
-    void refuses();
-    void refusesAnAuthorityThatOnlyTheSystemTrusts();
-    void refusesWithoutConfiguration();
-    void asksNobodyForThePasswordOfAKey();
-    void trustsTheGivenAuthority();
-    void readsAReplacedAuthorityFile();
-    void presentsItsCertificate();
-    void findsTheKeyInTheFileOfTheCertificate();
-    void presentsTheCertificateOfItsLatestConfiguration();
+    void init()
+    {
+        m_server.forgetRequests();
+        m_client = std::make_unique<HttpClientApi>(nullptr, false);
+    }
+
+    void refuses_data()
+    {
+        QTest::addColumn<QString>("door");
+        QTest::addColumn<QString>("authority");
+        QTest::addColumn<QString>("key");
+        QTest::addColumn<QString>("cause");
+
+        const QString ca = m_server.file("ca");
+        const QString key = m_server.file("client-key");
+        const QString none = m_folder.filePath(QStringLiteral("none"));
+        const auto row = [](const char* name, const char* door, const QString& authority,
+                            const QString& keyFile, const char* cause) {
+            QTest::newRow(name) << QString::fromUtf8(door) << authority << keyFile
+                                << QString::fromUtf8(cause);
+        };
+        row("server of another authority", "stranger", ca, key, "unable to get local issuer certificate");
+        row("server of another name", "misnamed", ca, key, "no alternative certificate subject name matches");
+        row("server whose certificate has expired", "expired", ca, key, "certificate has expired");
+        row("server of TLS 1.1", "outdated", ca, key, "protocol version");
+        // Whether its alert or the end of the connection comes first is a matter of timing: any cause will
+        // do.
+        row("server that demands a certificate", "demanding", ca, {}, "");
+        row("missing authority file", "proper", none, key, "certificate file");
+        row("authority file without certificate", "proper", key, key, "certificate file");
+        row("missing key file", "demanding", ca, none, "private key");
+    }
+
+    void refuses()
+    {
+        QFETCH(QString, door);
+        QFETCH(QString, authority);
+        QFETCH(QString, key);
+        QFETCH(QString, cause);
+
+        m_client->setSSLConfig(authority, key.isEmpty() ? QString() : m_server.file("client"), key);
+        const HttpOutcome outcome = plainGet(qUtf8Printable(door));
+        QCOMPARE(summary(outcome), kNoResponse);
+        QVERIFY2(outcome.warnings[0].contains(cause), qUtf8Printable(outcome.warnings[0]));
+    }
+
+    void refusesAnAuthorityThatOnlyTheSystemTrusts()
+    {
+        // Outside of the simulated terminal this would be the machine's own trust.
+        QVERIFY(qEnvironmentVariableIsSet("VELK_BOX_USER"));
+        const QDir trusted(QStringLiteral("/etc/ssl/certs"));
+        QVERIFY(trusted.mkpath(QStringLiteral(".")));
+        const QByteArray stranger = readBytes(m_server.file("stranger-ca"));
+        writeBytes(trusted.filePath(QStringLiteral("stranger.pem")), stranger);
+        QCOMPARE(
+            QProcess::execute(QStringLiteral("/usr/bin/openssl"), {QStringLiteral("rehash"), trusted.path()}),
+            0);
+
+        m_client->setSSLConfig(m_server.file("ca"), {}, {});
+        QCOMPARE(plainGet("stranger").status, 0);
+    }
+
+    void refusesWithoutConfiguration() { QCOMPARE(plainGet("proper").status, 0); }
+
+    void asksForNoPasswordOfAKey()
+    {
+        const QString answer = m_folder.filePath(QStringLiteral("answer"));
+        writeBytes(answer, "secret\n");
+        QVERIFY(std::freopen(qUtf8Printable(answer), "r", stdin) != nullptr);
+
+        m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("encrypted-key"));
+        QCOMPARE(summary(plainGet("demanding")), kNoResponse);
+    }
+
+    void trustsTheGivenAuthority()
+    {
+        m_client->setSSLConfig(m_server.file("stranger-ca"), {}, {});
+        QCOMPARE(plainGet("stranger").status, 200);
+    }
+
+    void readsAReplacedAuthorityFile()
+    {
+        const QString authority = m_folder.filePath(QStringLiteral("authority.pem"));
+        m_client->setSSLConfig(authority, {}, {});
+        writeBytes(authority, readBytes(m_server.file("stranger-ca")));
+        QCOMPARE(plainGet("proper").status, 0);
+        writeBytes(authority, readBytes(m_server.file("ca")));
+        QCOMPARE(plainGet("proper").status, 200);
+    }
+
+    void presentsItsCertificate()
+    {
+        m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
+        QCOMPARE(plainGet("demanding").status, 200);
+        QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
+    }
+
+    void findsTheKeyInTheFileOfTheCertificate()
+    {
+        const QString both = m_folder.filePath(QStringLiteral("both.pem"));
+        writeBytes(both, readBytes(m_server.file("client")) + readBytes(m_server.file("client-key")));
+        m_client->setSSLConfig(m_server.file("ca"), both, {});
+        QCOMPARE(plainGet("demanding").status, 200);
+    }
+
+    void presentsTheCertificateOfItsLatestConfiguration()
+    {
+        m_client->setSSLConfig(m_server.file("ca"), {}, {});
+        QCOMPARE(plainGet("proper").status, 200);
+        QCOMPARE(clientOfNextRequest(), QString());
+
+        m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
+        QCOMPARE(plainGet("proper").status, 200);
+        QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
+    }
 
 private:
     HttpOutcome plainGet(const char* door) { return get(*m_client, m_server.url(door, "/plain")); }
@@ -35,147 +149,6 @@ private:
     QTemporaryDir m_folder;
     std::unique_ptr<HttpClientApi> m_client;
 };
-
-static QByteArray contentOf(const QString& path)
-{
-    QFile file(path);
-    file.open(QIODevice::ReadOnly);
-    return file.readAll();
-}
-
-static void replace(const QString& path, const QByteArray& content)
-{
-    QFile file(path);
-    QVERIFY(file.open(QIODevice::WriteOnly));
-    QCOMPARE(file.write(content), content.size());
-}
-
-// OpenSSL's own default rules out what is older than TLS 1.2. Here it allows it, so that it is the client
-// that refuses.
-void HttpClientApiTrustTest::initTestCase()
-{
-    const QString config = m_folder.filePath(QStringLiteral("openssl.cnf"));
-    replace(config,
-            "openssl_conf = all\n[all]\nssl_conf = modules\n[modules]\nsystem_default = tls\n"
-            "[tls]\nMinProtocol = TLSv1\nCipherString = ALL:@SECLEVEL=0\n");
-    qputenv("OPENSSL_CONF", QFile::encodeName(config));
-}
-
-void HttpClientApiTrustTest::init()
-{
-    m_server.forgetRequests();
-    m_client = std::make_unique<HttpClientApi>(nullptr, false);
-}
-
-void HttpClientApiTrustTest::refuses_data()
-{
-    QTest::addColumn<QString>("door");
-    QTest::addColumn<QString>("authority");
-    QTest::addColumn<QString>("key");
-    QTest::addColumn<QString>("cause");
-
-    const QString ca = m_server.file("ca");
-    const QString key = m_server.file("client-key");
-    const QString none = m_folder.filePath(QStringLiteral("none"));
-    const auto row = [](const char* name, const char* door, const QString& authority, const QString& keyFile,
-                        const char* cause) {
-        QTest::newRow(name) << QString::fromUtf8(door) << authority << keyFile << QString::fromUtf8(cause);
-    };
-    row("server of another authority", "stranger", ca, key, "unable to get local issuer certificate");
-    row("server of another name", "misnamed", ca, key, "no alternative certificate subject name matches");
-    row("server whose certificate has expired", "expired", ca, key, "certificate has expired");
-    row("server of TLS 1.1", "outdated", ca, key, "protocol version");
-    // Whether its alert or the end of the connection comes first is a matter of timing: any cause will do.
-    row("server that demands a certificate", "demanding", ca, {}, "");
-    row("missing authority file", "proper", none, key, "certificate file");
-    row("authority file without certificate", "proper", key, key, "certificate file");
-    row("missing key file", "demanding", ca, none, "private key");
-}
-
-void HttpClientApiTrustTest::refuses()
-{
-    QFETCH(QString, door);
-    QFETCH(QString, authority);
-    QFETCH(QString, key);
-    QFETCH(QString, cause);
-
-    m_client->setSSLConfig(authority, key.isEmpty() ? QString() : m_server.file("client"), key);
-    const HttpOutcome outcome = plainGet(qUtf8Printable(door));
-    QCOMPARE(summary(outcome), kNoResponse);
-    QVERIFY2(outcome.warnings[0].contains(cause), qUtf8Printable(outcome.warnings[0]));
-}
-
-void HttpClientApiTrustTest::refusesAnAuthorityThatOnlyTheSystemTrusts()
-{
-    // Outside of the simulated terminal this would be the machine's own trust.
-    QVERIFY(qEnvironmentVariableIsSet("VELK_BOX_USER"));
-    const QDir trusted(QStringLiteral("/etc/ssl/certs"));
-    QVERIFY(trusted.mkpath(QStringLiteral(".")));
-    const QByteArray stranger = contentOf(m_server.file("stranger-ca"));
-    replace(trusted.filePath(QStringLiteral("stranger.pem")), stranger);
-    QCOMPARE(
-        QProcess::execute(QStringLiteral("/usr/bin/openssl"), {QStringLiteral("rehash"), trusted.path()}), 0);
-
-    m_client->setSSLConfig(m_server.file("ca"), {}, {});
-    QCOMPARE(plainGet("stranger").status, 0);
-}
-
-void HttpClientApiTrustTest::refusesWithoutConfiguration()
-{
-    QCOMPARE(plainGet("proper").status, 0);
-}
-
-void HttpClientApiTrustTest::asksNobodyForThePasswordOfAKey()
-{
-    const QString answer = m_folder.filePath(QStringLiteral("answer"));
-    replace(answer, "secret\n");
-    QVERIFY(std::freopen(qUtf8Printable(answer), "r", stdin) != nullptr);
-
-    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("encrypted-key"));
-    QCOMPARE(summary(plainGet("demanding")), kNoResponse);
-}
-
-void HttpClientApiTrustTest::trustsTheGivenAuthority()
-{
-    m_client->setSSLConfig(m_server.file("stranger-ca"), {}, {});
-    QCOMPARE(plainGet("stranger").status, 200);
-}
-
-void HttpClientApiTrustTest::readsAReplacedAuthorityFile()
-{
-    const QString authority = m_folder.filePath(QStringLiteral("authority.pem"));
-    m_client->setSSLConfig(authority, {}, {});
-    replace(authority, contentOf(m_server.file("stranger-ca")));
-    QCOMPARE(plainGet("proper").status, 0);
-    replace(authority, contentOf(m_server.file("ca")));
-    QCOMPARE(plainGet("proper").status, 200);
-}
-
-void HttpClientApiTrustTest::presentsItsCertificate()
-{
-    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
-    QCOMPARE(plainGet("demanding").status, 200);
-    QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
-}
-
-void HttpClientApiTrustTest::findsTheKeyInTheFileOfTheCertificate()
-{
-    const QString both = m_folder.filePath(QStringLiteral("both.pem"));
-    replace(both, contentOf(m_server.file("client")) + contentOf(m_server.file("client-key")));
-    m_client->setSSLConfig(m_server.file("ca"), both, {});
-    QCOMPARE(plainGet("demanding").status, 200);
-}
-
-void HttpClientApiTrustTest::presentsTheCertificateOfItsLatestConfiguration()
-{
-    m_client->setSSLConfig(m_server.file("ca"), {}, {});
-    QCOMPARE(plainGet("proper").status, 200);
-    QCOMPARE(clientOfNextRequest(), QString());
-
-    m_client->setSSLConfig(m_server.file("ca"), m_server.file("client"), m_server.file("client-key"));
-    QCOMPARE(plainGet("proper").status, 200);
-    QCOMPARE(clientOfNextRequest(), QStringLiteral("terminal"));
-}
 
 QTEST_GUILESS_MAIN(HttpClientApiTrustTest)
 #include "httpclientapi_trust_test.moc"

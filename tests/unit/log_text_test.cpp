@@ -1,10 +1,10 @@
-#include "log_text.h"
-
 #include <QDebug>
 #include <QRandomGenerator>
 #include <QTest>
 
 #include <array>
+
+#include "log_text.h"
 
 namespace {
 
@@ -43,38 +43,34 @@ class LogTextTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void isQuotedAsQtQuotesIt_data();
-    void isQuotedAsQtQuotesIt();
-    void anyTextIsQuotedAsQtQuotesIt();
-};
+    void isQuotedAsQtQuotesIt_data()
+    {
+        QTest::addColumn<QString>("text");
+        QTest::newRow("null") << QString();
+        QTest::newRow("empty") << QStringLiteral("");
+        QTest::newRow("a policy") << QStringLiteral("{\"type\":1201,\"text\":\"当前终端 \\\"x\\\"\"}");
+        QTest::newRow("control characters") << QStringLiteral("\x01\x1f\x7f\n");
+        QTest::newRow("NUL") << QString(QLatin1Char('\0')) + QStringLiteral("f");
+        QTest::newRow("half a pair, then letters") << QString(QChar(0xd83d)) + QStringLiteral("ab");
+        QTest::newRow("only quotes") << QStringLiteral("\"\"\\\\");
+    }
 
-void LogTextTest::isQuotedAsQtQuotesIt_data()
-{
-    QTest::addColumn<QString>("text");
-    QTest::newRow("null") << QString();
-    QTest::newRow("empty") << QStringLiteral("");
-    QTest::newRow("a policy") << QStringLiteral(R"({"type":1201,"text":"当前终端 \"x\""})");
-    QTest::newRow("control characters") << QStringLiteral("\x01\x1f\x7f\n");
-    QTest::newRow("NUL") << QString(QLatin1Char('\0')) + QStringLiteral("f");
-    QTest::newRow("half a pair, then letters") << QString(QChar(0xd83d)) + QStringLiteral("ab");
-    QTest::newRow("only quotes") << QStringLiteral("\"\"\\\\");
-}
-
-void LogTextTest::isQuotedAsQtQuotesIt()
-{
-    QFETCH(QString, text);
-    QCOMPARE(quoted(text), quotedByQt(text));
-}
-
-void LogTextTest::anyTextIsQuotedAsQtQuotesIt()
-{
-    constexpr quint32 seed = 20261122;
-    QRandomGenerator random(seed);
-    for (int i = 0; i < 20'000; ++i) {
-        const QString text = anyText(random);
+    void isQuotedAsQtQuotesIt()
+    {
+        QFETCH(QString, text);
         QCOMPARE(quoted(text), quotedByQt(text));
     }
-}
+
+    void anyTextIsQuotedAsQtQuotesIt()
+    {
+        constexpr quint32 seed = 20261122;
+        QRandomGenerator random(seed);
+        for (int i = 0; i < 20'000; ++i) {
+            const QString text = anyText(random);
+            QCOMPARE(quoted(text), quotedByQt(text));
+        }
+    }
+};
 
 QTEST_GUILESS_MAIN(LogTextTest)
 #include "log_text_test.moc"

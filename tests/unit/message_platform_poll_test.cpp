@@ -1,12 +1,10 @@
-#include <QtTest>
-
 #include <QDBusVariant>
+#include <QtTest>
 
 #include <array>
 #include <memory>
 
 #include "handleevent.h"
-#include "https_server.h"
 #include "log_recorder.h"
 #include "message_platform.h"
 #include "message_transfer.h"
@@ -19,13 +17,14 @@ namespace {
 QTimer* pollTimerOf(const MessagePlatform& platform);
 
 /// An explicit instantiation may name what is private. The timer has no parent, so nothing else leads to it.
-template <QTimer* MessagePlatform::*Member> struct PollTimer
+using TimerOfPlatform = QTimer* MessagePlatform::*;
+template <TimerOfPlatform Member> struct PollTimer
 {
     friend QTimer* pollTimerOf(const MessagePlatform& platform) { return platform.*Member; }
 };
 template struct PollTimer<&MessagePlatform::m_timer>;
 
-// Seconds of different days, up to the last that the platform can be told.
+// Seconds of different days, up to the last that fits a request to the platform.
 constexpr std::array<time_t, 6> kMoments = {0, 1234567890, 1800000000, 1900012345, 2147483648, 4294967295};
 
 /// The interval that the generator gives at the pretended time.
@@ -46,122 +45,94 @@ class MessagePlatformPollTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void initTestCase();
-    void cleanup();
+    void cleanup() { pretendedTime().reset(); }
 
-    void firstPollComesInOneToTwoMinutes();
-    void activePollPutsTheNextOffByOneToThreeMinutes();
-    void intervalIsDrawnWhenThePollIsOver();
-    void idleSessionKeepsTheInterval();
-    void intervalIsAtLeastTheShortestAndBelowTheLongest();
-    void intervalBetweenEqualBoundsIsTheBound();
-    void intervalDependsOnTheSecondOfTheDay();
-    void pollTimerOutlivesTheClientAndPollsNoMore();
+    void firstPollComesInOneToTwoMinutes()
+    {
+        for (const time_t moment : kMoments) {
+            pretendedTime() = moment;
+            MessagePlatform platform(nullptr, QStringLiteral("a"), &m_transfer);
+            const QTimer* timer = pollTimerOf(platform);
+            QVERIFY(timer->isActive() && !timer->isSingleShot());
+            QCOMPARE(timer->interval(), intervalNow(120000, 60000));
+        }
+    }
+
+    void activePollPutsTheNextOffByOneToThreeMinutes()
+    {
+        const QTimer* timer = pollTimerOf(m_platform);
+        for (const time_t moment : kMoments) {
+            pretendedTime() = moment;
+            QTest::ignoreMessage(QtInfoMsg, "screen state-----: 2");
+            m_platform.onUnReadMessages();
+            QVERIFY(timer->isActive() && !timer->isSingleShot());
+            QCOMPARE(timer->interval(), intervalNow(180000, 60000));
+        }
+    }
+
+    void intervalIsDrawnWhenThePollIsOver()
+    {
+        pretendedTime() = kMoments[1];
+        const QObject receiver;
+        connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
+                [] { pretendedTime() = kMoments[2]; });
+        m_platform.onUnReadMessages();
+        pretendedTime() = kMoments[2];
+        QCOMPARE(pollTimerOf(m_platform)->interval(), intervalNow(180000, 60000));
+    }
+
+    void idleSessionKeepsTheInterval()
+    {
+        const RecordedService screenSaver(QDBusConnection::SessionBus,
+                                          QStringLiteral("com.norix.ScreenSaver"),
+                                          answerWith(QVariant::fromValue(QDBusVariant(true))));
+        const QTimer* timer = pollTimerOf(m_platform);
+        const int before = timer->interval();
+        for (const time_t moment : kMoments) {
+            pretendedTime() = moment;
+            m_platform.onUnReadMessages();
+            QVERIFY(timer->isActive());
+            QCOMPARE(timer->interval(), before);
+        }
+    }
+
+    void intervalIsAtLeastTheShortestAndBelowTheLongest()
+    {
+        for (int max = 60001; max < 180000; max += 37) {
+            const int interval = m_platform.generateRandnum(max, 60000);
+            QVERIFY2(interval >= 60000 && interval < max, qPrintable(QString::number(interval)));
+        }
+    }
+
+    void intervalBetweenEqualBoundsIsTheBound() { QCOMPARE(m_platform.generateRandnum(60000, 60000), 60000); }
+
+    void intervalDependsOnTheSecondOfTheDay()
+    {
+        for (const time_t moment : kMoments) {
+            pretendedTime() = moment;
+            QCOMPARE(m_platform.generateRandnum(99999, 7), intervalNow(99999, 7));
+        }
+    }
+
+    void pollTimerOutlivesTheClientAndPollsNoMore()
+    {
+        auto platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("a"), &m_transfer);
+        const QPointer<QTimer> timer = pollTimerOf(*platform);
+        QVERIFY(timer->parent() == nullptr);
+        platform.reset();
+        QVERIFY(!timer.isNull());
+        timer->start(0);
+        const LogRecorder log;
+        QVERIFY(QSignalSpy(timer, &QTimer::timeout).wait());
+        QCOMPARE(log.lines(), QStringList());
+        timer->stop();
+    }
 
 private:
-    std::unique_ptr<HttpsServer> m_server;
-    std::unique_ptr<MessageTransfer> m_transfer;
-    std::unique_ptr<MessagePlatform> m_platform;
+    PlatformServer m_server;
+    MessageTransfer m_transfer;
+    MessagePlatform m_platform{nullptr, QStringLiteral("zhang.wei"), &m_transfer};
 };
-
-void MessagePlatformPollTest::initTestCase()
-{
-    m_server = std::make_unique<HttpsServer>();
-    installCertificates(*m_server);
-    writePlatformAddress(*m_server);
-
-    m_transfer = std::make_unique<MessageTransfer>();
-    m_platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("zhang.wei"), m_transfer.get());
-}
-
-void MessagePlatformPollTest::cleanup()
-{
-    pretendedTime().reset();
-}
-
-void MessagePlatformPollTest::pollTimerOutlivesTheClientAndPollsNoMore()
-{
-    auto platform = std::make_unique<MessagePlatform>(nullptr, QStringLiteral("a"), m_transfer.get());
-    const QPointer<QTimer> timer = pollTimerOf(*platform);
-    QVERIFY(timer->parent() == nullptr);
-    platform.reset();
-    QVERIFY(!timer.isNull());
-    timer->start(0);
-    const LogRecorder log;
-    QVERIFY(QSignalSpy(timer, &QTimer::timeout).wait());
-    QCOMPARE(log.lines(), QStringList());
-    timer->stop();
-}
-
-void MessagePlatformPollTest::firstPollComesInOneToTwoMinutes()
-{
-    for (const time_t moment : kMoments) {
-        pretendedTime() = moment;
-        MessagePlatform platform(nullptr, QStringLiteral("a"), m_transfer.get());
-        const QTimer* timer = pollTimerOf(platform);
-        QVERIFY(timer->isActive() && !timer->isSingleShot());
-        QCOMPARE(timer->interval(), intervalNow(120000, 60000));
-    }
-}
-
-void MessagePlatformPollTest::activePollPutsTheNextOffByOneToThreeMinutes()
-{
-    const QTimer* timer = pollTimerOf(*m_platform);
-    for (const time_t moment : kMoments) {
-        pretendedTime() = moment;
-        QTest::ignoreMessage(QtInfoMsg, "screen state-----: 2");
-        m_platform->onUnReadMessages();
-        QVERIFY(timer->isActive() && !timer->isSingleShot());
-        QCOMPARE(timer->interval(), intervalNow(180000, 60000));
-    }
-}
-
-void MessagePlatformPollTest::intervalIsDrawnWhenThePollIsOver()
-{
-    pretendedTime() = kMoments[1];
-    const QObject receiver;
-    connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
-            [] { pretendedTime() = kMoments[2]; });
-    m_platform->onUnReadMessages();
-    pretendedTime() = kMoments[2];
-    QCOMPARE(pollTimerOf(*m_platform)->interval(), intervalNow(180000, 60000));
-}
-
-void MessagePlatformPollTest::idleSessionKeepsTheInterval()
-{
-    const RecordedService screenSaver(
-        QDBusConnection::SessionBus, QStringLiteral("com.norix.ScreenSaver"),
-        [](const QDBusMessage& call) { return call.createReply(QVariant::fromValue(QDBusVariant(true))); });
-    const QTimer* timer = pollTimerOf(*m_platform);
-    const int before = timer->interval();
-    for (const time_t moment : kMoments) {
-        pretendedTime() = moment;
-        m_platform->onUnReadMessages();
-        QVERIFY(timer->isActive());
-        QCOMPARE(timer->interval(), before);
-    }
-}
-
-void MessagePlatformPollTest::intervalIsAtLeastTheShortestAndBelowTheLongest()
-{
-    for (int max = 60001; max < 180000; max += 37) {
-        const int interval = m_platform->generateRandnum(max, 60000);
-        QVERIFY2(interval >= 60000 && interval < max, qPrintable(QString::number(interval)));
-    }
-}
-
-void MessagePlatformPollTest::intervalBetweenEqualBoundsIsTheBound()
-{
-    QCOMPARE(m_platform->generateRandnum(60000, 60000), 60000);
-}
-
-void MessagePlatformPollTest::intervalDependsOnTheSecondOfTheDay()
-{
-    for (const time_t moment : kMoments) {
-        pretendedTime() = moment;
-        QCOMPARE(m_platform->generateRandnum(99999, 7), intervalNow(99999, 7));
-    }
-}
 
 QTEST_GUILESS_MAIN(MessagePlatformPollTest)
 #include "message_platform_poll_test.moc"

@@ -1,30 +1,10 @@
-#include <QtTest>
-
 #include <QJsonDocument>
+#include <QtTest>
 
 #include "files.h"
 #include "message.h"
 
 using namespace velk::module::message;
-
-class MessageTest : public QObject
-{
-    Q_OBJECT
-
-private Q_SLOTS:
-    void recordIsWrittenWithItsKeysInAlphabeticalOrder_data();
-    void recordIsWrittenWithItsKeysInAlphabeticalOrder();
-    void defaultRecordHasEveryKeyAndIsTheContractsExample_data();
-    void defaultRecordHasEveryKeyAndIsTheContractsExample();
-    void emptyListsAreArraysAndTheEmptyMainboardIsAnObject();
-    void listsKeepTheirOrderAndRepetitions();
-    void textsOfAllKindsAreWrittenAsTheyAre_data();
-    void textsOfAllKindsAreWrittenAsTheyAre();
-    void capacityIsExact_data();
-    void capacityIsExact();
-    void numbersReachTheirLimits();
-    void partsOfTheSystemAreNestedAsTheyWereBuilt();
-};
 
 namespace {
 
@@ -73,162 +53,146 @@ SystemInfoPlayload wholeSystem()
 
 } // namespace
 
-void MessageTest::recordIsWrittenWithItsKeysInAlphabeticalOrder_data()
+class MessageTest : public QObject
 {
-    QTest::addColumn<QJsonObject>("object");
-    QTest::addColumn<QByteArray>("text");
+    Q_OBJECT
 
-    const QString sn = QStringLiteral("s");
-    const QString model = QStringLiteral("m");
-    const QByteArray part(R"({"model":"m","sn":"s"})");
-    const QByteArray partWithCapacity(R"({"cap":7,"model":"m","sn":"s"})");
+private Q_SLOTS:
+    void recordIsWrittenWithItsKeysInAlphabeticalOrder_data()
+    {
+        QTest::addColumn<QJsonObject>("object");
+        QTest::addColumn<QByteArray>("text");
 
-    QTest::newRow("message") << to_json(Message{5, 2002, {{QStringLiteral("key"), 1}}})
-                             << QByteArray(R"({"id":5,"payload":{"key":1},"type":2002})");
-    QTest::newRow("task")
-        << to_json(TaskBody{3,
-                            QStringLiteral("s.sh"),
-                            QStringLiteral("bash"),
-                            {QStringLiteral("A=1")},
-                            {QStringLiteral("-x")}})
-        << QByteArray(R"({"args":["-x"],"env":["A=1"],"program":"bash","script":"s.sh","type":3})");
-    QTest::newRow("network device") << to_json(
-        NetworkDevicePlayload{QStringLiteral("00:1A"), model, QStringLiteral("10.0.0.5")})
-                                    << QByteArray(R"({"ip_address":"10.0.0.5","mac":"00:1A","model":"m"})");
-    QTest::newRow("CPU") << to_json(CPUPlayload{sn, model}) << part;
-    QTest::newRow("disk") << to_json(DiskPlayload{sn, model, 7}) << partWithCapacity;
-    QTest::newRow("memory") << to_json(MemoryPlayload{sn, model, 7}) << partWithCapacity;
-    QTest::newRow("mainboard") << to_json(MainboardPlayload{sn, model}) << part;
-    QTest::newRow("graphics") << to_json(GraphiscPlayload{sn, model}) << part;
-    QTest::newRow("system")
-        << to_json(wholeSystem())
-        << QByteArray(
-               R"({"active_state":1,"arch":"amd64","client_version":"1.2",)"
-               R"("cpu_list":[{"model":"cpu","sn":"c"}],"developer_mode":2,)"
-               R"("disk_list":[{"cap":512,"model":"disk","sn":"d"},{"cap":0,"model":"disk","sn":"e"}],)"
-               R"("graphisc_list":[{"model":"gpu","sn":"g"}],"host_name":"pc","machine_id":"m1",)"
-               R"("mainboard":{"model":"board","sn":"b"},)"
-               R"("memory_list":[{"cap":16,"model":"ram","sn":"r"}],"name":"终端一","need_upgrade":true,)"
-               R"("network_device_list":)"
-               R"([{"ip_address":"10.0.0.5","mac":"00:1A:2B:3C:4D:5E","model":"net"}],)"
-               R"("old_machine_id":"m0","os":"desktop","platform":"x86","product_name":"box",)"
-               R"("sn":"s1","version":"20"})");
-}
+        const QString sn = QStringLiteral("s");
+        const QString model = QStringLiteral("m");
+        const QByteArray part(R"({"model":"m","sn":"s"})");
+        const QByteArray partWithCapacity(R"({"cap":7,"model":"m","sn":"s"})");
 
-void MessageTest::recordIsWrittenWithItsKeysInAlphabeticalOrder()
-{
-    QFETCH(QJsonObject, object);
-    QTEST(compact(object), "text");
-}
-
-void MessageTest::defaultRecordHasEveryKeyAndIsTheContractsExample_data()
-{
-    QTest::addColumn<QJsonObject>("object");
-
-    QTest::newRow("upload-message") << to_json(Message{});
-    QTest::newRow("upload-task-body") << to_json(TaskBody{});
-    QTest::newRow("upload-network-device") << to_json(NetworkDevicePlayload{});
-    QTest::newRow("upload-cpu") << to_json(CPUPlayload{});
-    QTest::newRow("upload-disk") << to_json(DiskPlayload{});
-    QTest::newRow("upload-memory") << to_json(MemoryPlayload{});
-    QTest::newRow("upload-mainboard") << to_json(MainboardPlayload{});
-    QTest::newRow("upload-graphisc") << to_json(GraphiscPlayload{});
-    QTest::newRow("upload-system-info") << to_json(SystemInfoPlayload{});
-}
-
-void MessageTest::defaultRecordHasEveryKeyAndIsTheContractsExample()
-{
-    QFETCH(QJsonObject, object);
-    const auto schema = QString::fromLatin1(QTest::currentDataTag());
-    QCOMPARE(compact(object), compact(contractExample(schema, QStringLiteral("valid-default"))));
-}
-
-void MessageTest::emptyListsAreArraysAndTheEmptyMainboardIsAnObject()
-{
-    QCOMPARE(compact(to_json(Message{})), QByteArray(R"({"id":0,"payload":{},"type":0})"));
-    QCOMPARE(compact(to_json(TaskBody{})),
-             QByteArray(R"({"args":[],"env":[],"program":"","script":"","type":0})"));
-
-    const QJsonObject system = to_json(SystemInfoPlayload{});
-    for (const char* list :
-         {"cpu_list", "disk_list", "memory_list", "graphisc_list", "network_device_list"}) {
-        QCOMPARE(system.value(QLatin1String(list)), QJsonValue(QJsonArray()));
+        QTest::newRow("message") << to_json(Message{5, 2002, {{QStringLiteral("key"), 1}}})
+                                 << QByteArray(R"({"id":5,"payload":{"key":1},"type":2002})");
+        QTest::newRow("task")
+            << to_json(TaskBody{3,
+                                QStringLiteral("s.sh"),
+                                QStringLiteral("bash"),
+                                {QStringLiteral("A=1")},
+                                {QStringLiteral("-x")}})
+            << QByteArray(R"({"args":["-x"],"env":["A=1"],"program":"bash","script":"s.sh","type":3})");
+        QTest::newRow("network device")
+            << to_json(NetworkDevicePlayload{QStringLiteral("00:1A"), model, QStringLiteral("10.0.0.5")})
+            << QByteArray(R"({"ip_address":"10.0.0.5","mac":"00:1A","model":"m"})");
+        QTest::newRow("CPU") << to_json(CPUPlayload{sn, model}) << part;
+        QTest::newRow("disk") << to_json(DiskPlayload{sn, model, 7}) << partWithCapacity;
+        QTest::newRow("memory") << to_json(MemoryPlayload{sn, model, 7}) << partWithCapacity;
+        QTest::newRow("mainboard") << to_json(MainboardPlayload{sn, model}) << part;
+        QTest::newRow("graphics") << to_json(GraphiscPlayload{sn, model}) << part;
     }
-    QCOMPARE(system.value(QLatin1String("mainboard")), QJsonValue(QJsonObject()));
-}
 
-void MessageTest::listsKeepTheirOrderAndRepetitions()
-{
-    TaskBody task;
-    task.env = QStringList{QStringLiteral("B=2"), QStringLiteral("A=1"), QStringLiteral("B=2")};
-    task.args = QStringList{QStringLiteral("--"), QString(), QStringLiteral("a b")};
-    QCOMPARE(compact(to_json(task)),
-             QByteArray(R"({"args":["--","","a b"],"env":["B=2","A=1","B=2"],)"
-                        R"("program":"","script":"","type":0})"));
-}
+    void recordIsWrittenWithItsKeysInAlphabeticalOrder()
+    {
+        QFETCH(QJsonObject, object);
+        QTEST(compact(object), "text");
+    }
 
-void MessageTest::textsOfAllKindsAreWrittenAsTheyAre_data()
-{
-    QTest::addColumn<QString>("text");
-    QTest::addColumn<QByteArray>("written");
+    void defaultRecordHasEveryKeyAndIsTheContractsExample_data()
+    {
+        QTest::addColumn<QJsonObject>("object");
 
-    QTest::newRow("Chinese") << QStringLiteral("中央处理器") << QByteArray("\"中央处理器\"");
-    QTest::newRow("beyond the basic plane") << QStringLiteral("盘😀") << QByteArray("\"盘😀\"");
-    QTest::newRow("quotes and backslash") << QStringLiteral(R"(a "b" \c)") << QByteArray(R"("a \"b\" \\c")");
-    QTest::newRow("line break and tab") << QStringLiteral("a\n\tb") << QByteArray(R"("a\n\tb")");
-    QTest::newRow("control character") << QStringLiteral("a\u0001b") << QByteArray(R"("a\u0001b")");
-    QTest::newRow("blanks") << QStringLiteral("  a ") << QByteArray("\"  a \"");
-    QTest::newRow("no text at all") << QString() << QByteArray("\"\"");
-}
+        QTest::newRow("upload-message") << to_json(Message{});
+        QTest::newRow("upload-task-body") << to_json(TaskBody{});
+        QTest::newRow("upload-network-device") << to_json(NetworkDevicePlayload{});
+        QTest::newRow("upload-cpu") << to_json(CPUPlayload{});
+        QTest::newRow("upload-disk") << to_json(DiskPlayload{});
+        QTest::newRow("upload-memory") << to_json(MemoryPlayload{});
+        QTest::newRow("upload-mainboard") << to_json(MainboardPlayload{});
+        QTest::newRow("upload-graphisc") << to_json(GraphiscPlayload{});
+        QTest::newRow("upload-system-info") << to_json(SystemInfoPlayload{});
+    }
 
-void MessageTest::textsOfAllKindsAreWrittenAsTheyAre()
-{
-    QFETCH(QString, text);
-    QFETCH(QByteArray, written);
-    QCOMPARE(compact(to_json(CPUPlayload{text, text})),
-             QByteArray("{\"model\":" + written + ",\"sn\":" + written + "}"));
-}
+    void defaultRecordHasEveryKeyAndIsTheContractsExample()
+    {
+        QFETCH(QJsonObject, object);
+        const auto schema = QString::fromLatin1(QTest::currentDataTag());
+        QCOMPARE(compact(object), compact(contractExample(schema, QStringLiteral("valid-default"))));
+    }
 
-void MessageTest::capacityIsExact_data()
-{
-    QTest::addColumn<qint64>("capacity");
-    QTest::addColumn<QByteArray>("written");
+    void listsKeepTheirOrderAndRepetitions()
+    {
+        TaskBody task;
+        task.env = QStringList{QStringLiteral("B=2"), QStringLiteral("A=1"), QStringLiteral("B=2")};
+        task.args = QStringList{QStringLiteral("--"), QString(), QStringLiteral("a b")};
+        QCOMPARE(compact(to_json(task)),
+                 QByteArray(R"({"args":["--","","a b"],"env":["B=2","A=1","B=2"],)"
+                            R"("program":"","script":"","type":0})"));
+    }
 
-    QTest::newRow("nothing") << Q_INT64_C(0) << QByteArray("0");
-    QTest::newRow("one") << Q_INT64_C(1) << QByteArray("1");
-    QTest::newRow("unknown") << Q_INT64_C(-1) << QByteArray("-1");
-    QTest::newRow("beyond 32 bits") << Q_INT64_C(4294967297) << QByteArray("4294967297");
-    QTest::newRow("2 TB") << Q_INT64_C(2000398934016) << QByteArray("2000398934016");
-    QTest::newRow("2^53 - 1") << Q_INT64_C(9007199254740991) << QByteArray("9007199254740991");
-    QTest::newRow("2^53") << Q_INT64_C(9007199254740992) << QByteArray("9007199254740992");
-}
+    void textsOfAllKindsAreWrittenAsTheyAre_data()
+    {
+        QTest::addColumn<QString>("text");
+        QTest::addColumn<QByteArray>("written");
 
-void MessageTest::capacityIsExact()
-{
-    QFETCH(qint64, capacity);
-    QFETCH(QByteArray, written);
-    const QByteArray text = R"({"cap":)" + written + R"(,"model":"","sn":""})";
-    QCOMPARE(compact(to_json(DiskPlayload{QString(), QString(), capacity})), text);
-    QCOMPARE(compact(to_json(MemoryPlayload{QString(), QString(), capacity})), text);
-}
+        QTest::newRow("Chinese") << QStringLiteral("中央处理器") << QByteArray("\"中央处理器\"");
+        QTest::newRow("beyond the basic plane") << QStringLiteral("盘😀") << QByteArray("\"盘😀\"");
+        // moc loses the class after a raw string with an escaped quote.
+        // NOLINTBEGIN(modernize-raw-string-literal)
+        QTest::newRow("quotes and backslash")
+            << QStringLiteral(R"(a "b" \c)") << QByteArray("\"a \\\"b\\\" \\\\c\"");
+        // NOLINTEND(modernize-raw-string-literal)
+        QTest::newRow("line break and tab") << QStringLiteral("a\n\tb") << QByteArray(R"("a\n\tb")");
+        QTest::newRow("control character") << QStringLiteral("a\u0001b") << QByteArray(R"("a\u0001b")");
+        QTest::newRow("blanks") << QStringLiteral("  a ") << QByteArray("\"  a \"");
+        QTest::newRow("no text at all") << QString() << QByteArray("\"\"");
+    }
 
-void MessageTest::numbersReachTheirLimits()
-{
-    const qint32 least = std::numeric_limits<qint32>::min();
-    const qint32 most = std::numeric_limits<qint32>::max();
-    QCOMPARE(compact(to_json(Message{least, most, {}})),
-             QByteArray(R"({"id":-2147483648,"payload":{},"type":2147483647})"));
-}
+    void textsOfAllKindsAreWrittenAsTheyAre()
+    {
+        QFETCH(QString, text);
+        QFETCH(QByteArray, written);
+        QCOMPARE(compact(to_json(CPUPlayload{text, text})),
+                 QByteArray("{\"model\":" + written + ",\"sn\":" + written + "}"));
+    }
 
-void MessageTest::partsOfTheSystemAreNestedAsTheyWereBuilt()
-{
-    const QJsonObject system = to_json(wholeSystem());
-    QCOMPARE(system.value(QLatin1String("disk_list")).toArray().size(), 2);
-    QCOMPARE(compact(to_json(Message{1, 2, system})),
-             QByteArray("{\"id\":1,\"payload\":" + compact(system) + ",\"type\":2}"));
-    QCOMPARE(compact(system),
-             compact(contractExample(QStringLiteral("upload-system-info"), QStringLiteral("valid-whole"))));
-}
+    void capacityIsExact_data()
+    {
+        QTest::addColumn<qint64>("capacity");
+        QTest::addColumn<QByteArray>("written");
+
+        QTest::newRow("nothing") << Q_INT64_C(0) << QByteArray("0");
+        QTest::newRow("one") << Q_INT64_C(1) << QByteArray("1");
+        QTest::newRow("unknown") << Q_INT64_C(-1) << QByteArray("-1");
+        QTest::newRow("beyond 32 bits") << Q_INT64_C(4294967297) << QByteArray("4294967297");
+        QTest::newRow("2 TB") << Q_INT64_C(2000398934016) << QByteArray("2000398934016");
+        QTest::newRow("2^53 - 1") << Q_INT64_C(9007199254740991) << QByteArray("9007199254740991");
+        QTest::newRow("2^53") << Q_INT64_C(9007199254740992) << QByteArray("9007199254740992");
+    }
+
+    void capacityIsExact()
+    {
+        QFETCH(qint64, capacity);
+        QFETCH(QByteArray, written);
+        const QByteArray text = R"({"cap":)" + written + R"(,"model":"","sn":""})";
+        QCOMPARE(compact(to_json(DiskPlayload{QString(), QString(), capacity})), text);
+        QCOMPARE(compact(to_json(MemoryPlayload{QString(), QString(), capacity})), text);
+    }
+
+    void numbersReachTheirLimits()
+    {
+        const qint32 least = std::numeric_limits<qint32>::min();
+        const qint32 most = std::numeric_limits<qint32>::max();
+        QCOMPARE(compact(to_json(Message{least, most, {}})),
+                 QByteArray(R"({"id":-2147483648,"payload":{},"type":2147483647})"));
+    }
+
+    void partsOfTheSystemAreNestedAsTheyWereBuilt()
+    {
+        const QJsonObject system = to_json(wholeSystem());
+        QCOMPARE(system.value(QLatin1String("disk_list")).toArray().size(), 2);
+        QCOMPARE(compact(to_json(Message{1, 2, system})),
+                 QByteArray("{\"id\":1,\"payload\":" + compact(system) + ",\"type\":2}"));
+        QCOMPARE(
+            compact(system),
+            compact(contractExample(QStringLiteral("upload-system-info"), QStringLiteral("valid-whole"))));
+    }
+};
 
 QTEST_GUILESS_MAIN(MessageTest)
 #include "message_test.moc"

@@ -1,5 +1,3 @@
-#include "package_tool.h"
-
 #include <QDir>
 #include <QTest>
 
@@ -10,6 +8,8 @@
 #include <csignal>
 #include <ctime>
 
+#include "package_tool.h"
+
 namespace {
 
 // Waits of this program end after this part of their time.
@@ -18,18 +18,18 @@ constexpr int kShortening = 20;
 /// Milliseconds that the program would have spent on waits that nothing ended.
 long waited = 0;
 
-/// The process that was last told to end, and how.
+/// The process that was last sent a signal, and the signal.
 pid_t endedProcess = 0;
 int endingSignal = 0;
 
-bool endsWhenTold = true;
+bool endsWhenKilled = true;
 
 long milliseconds(const timespec& time)
 {
     return time.tv_sec * 1000 + time.tv_nsec / 1000000;
 }
 
-/// Whether one whole limit was waited for; what passed meanwhile in truth was not waited for again.
+/// Whether one whole limit was waited for; real time that passed meanwhile is subtracted.
 bool waitedOneLimit()
 {
     return waited > 25000 && waited <= 30000;
@@ -53,8 +53,7 @@ PackageToolRun runScript(const char* script)
 
 } // namespace
 
-/// Goes before the C library's own, which Qt waits with: a wait is cut short, and counted in full when it was
-/// in vain.
+/// Replaces the C library's, by which Qt waits: shortens each wait; one that nothing ended counts in full.
 // NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name)
 int ppoll(pollfd* files, nfds_t count, const timespec* timeout, const sigset_t* mask)
 {
@@ -71,13 +70,13 @@ int ppoll(pollfd* files, nfds_t count, const timespec* timeout, const sigset_t* 
     return ready;
 }
 
-/// Goes before the C library's own, which Qt ends programs with.
+/// Replaces the C library's, by which Qt ends programs.
 // NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name)
 int kill(pid_t process, int signal) noexcept
 {
     endedProcess = process;
     endingSignal = signal;
-    return endsWhenTold ? static_cast<int>(syscall(SYS_kill, process, signal)) : 0;
+    return endsWhenKilled ? static_cast<int>(syscall(SYS_kill, process, signal)) : 0;
 }
 
 /// Programs that end, and programs that do not; time runs fast while they are waited for.
@@ -86,133 +85,116 @@ class PackageToolTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void initTestCase();
-    void init();
-    void cleanup();
+    void initTestCase()
+    {
+        runScript("true"); // Qt keeps some files open from the first program on.
+        m_openFiles = openFiles();
+    }
 
-    void programsOutputIsRead();
-    void programThatFailsHasEnded();
-    void argumentsArriveAsTheyStand();
-    void givenEnvironmentIsTheWholeOne();
-    void environmentIsTheAgentsOwnUnlessGiven();
-    void complaintsAreNotRead();
-    void inputStaysOpen();
-    void missingProgramIsNotWaitedFor();
-    void hungProgramIsWaitedForUntilTheLimit();
-    void hungProgramsOutputUpToThereCounts();
-    void hungProgramIsEndedAndNothingOfItIsLeft();
-    void programThatCannotBeEndedCostsNoFurtherWaiting();
+    void init()
+    {
+        waited = 0;
+        endedProcess = 0;
+        endingSignal = 0;
+        endsWhenKilled = true;
+    }
+
+    void cleanup()
+    {
+        QTRY_VERIFY(endedProcess == 0 || !exists(endedProcess));
+        QTRY_COMPARE(openFiles(), m_openFiles);
+    }
+
+    void programsOutputIsRead()
+    {
+        const PackageToolRun run = runScript("echo 编辑器; echo two");
+        QVERIFY(run.ended);
+        QCOMPARE(run.output, QStringLiteral("编辑器\ntwo\n"));
+        QCOMPARE(waited, 0L);
+        QCOMPARE(endedProcess, 0);
+    }
+
+    void programThatFailsHasEnded()
+    {
+        for (const char* script : {"echo x; exit 1", "echo x; kill -SEGV $$"}) {
+            const PackageToolRun run = runScript(script);
+            QVERIFY(run.ended);
+            QCOMPARE(run.output, QStringLiteral("x\n"));
+        }
+    }
+
+    void argumentsArriveAsTheyStand()
+    {
+        const QStringList arguments{QStringLiteral("[%s]"), QStringLiteral("two words"), QString(),
+                                    QStringLiteral("\"*'"), QStringLiteral("-x")};
+        QCOMPARE(runPackageTool(QStringLiteral("printf"), arguments).output,
+                 QStringLiteral("[two words][][\"*'][-x]"));
+    }
+
+    void givenEnvironmentIsTheWholeOne()
+    {
+        QProcessEnvironment environment;
+        environment.insert(QStringLiteral("ONLY"), QStringLiteral("this"));
+        QCOMPARE(runPackageTool(QStringLiteral("/usr/bin/env"), {}, environment).output,
+                 QStringLiteral("ONLY=this\n"));
+    }
+
+    void environmentIsTheAgentsOwnUnlessGiven()
+    {
+        qputenv("VELK_TEST_VALUE", "own");
+        QCOMPARE(runScript("echo $VELK_TEST_VALUE").output, QStringLiteral("own\n"));
+    }
+
+    void complaintsAreNotRead()
+    {
+        QCOMPARE(runScript("echo complaint >&2; echo answer").output, QStringLiteral("answer\n"));
+    }
+
+    void inputStaysOpen()
+    {
+        // A program that reads it hangs until its limit.
+        QVERIFY(!runScript("read line").ended);
+    }
+
+    void missingProgramIsNotWaitedFor()
+    {
+        const PackageToolRun run = runPackageTool(QStringLiteral("/nowhere/tool"), {});
+        QVERIFY(!run.ended);
+        QCOMPARE(run.output, QString());
+        QCOMPARE(waited, 0L);
+    }
+
+    void hungProgramIsWaitedForUntilTheLimit()
+    {
+        QVERIFY(!runScript("exec sleep 1000").ended);
+        QVERIFY(waitedOneLimit());
+    }
+
+    void hungProgramsOutputUpToThereCounts()
+    {
+        QCOMPARE(runScript("echo first; exec sleep 1000").output, QStringLiteral("first\n"));
+    }
+
+    void hungProgramIsEndedAndNothingOfItIsLeft()
+    {
+        runScript("trap '' TERM; while :; do sleep 0.1; done");
+        QCOMPARE(endingSignal, SIGKILL);
+        QTRY_VERIFY(!exists(endedProcess));
+        QTRY_COMPARE(openFiles(), m_openFiles);
+    }
+
+    void programThatCannotBeEndedCostsNoFurtherWaiting()
+    {
+        endsWhenKilled = false;
+        QVERIFY(!runScript("exec sleep 1000").ended);
+        QVERIFY(waitedOneLimit());
+        QVERIFY(exists(endedProcess));
+        syscall(SYS_kill, endedProcess, SIGKILL);
+    }
 
 private:
     int m_openFiles = 0;
 };
-
-void PackageToolTest::initTestCase()
-{
-    runScript("true"); // Qt keeps some files open from the first program on.
-    m_openFiles = openFiles();
-}
-
-void PackageToolTest::init()
-{
-    waited = 0;
-    endedProcess = 0;
-    endingSignal = 0;
-    endsWhenTold = true;
-}
-
-void PackageToolTest::cleanup()
-{
-    QTRY_VERIFY(endedProcess == 0 || !exists(endedProcess));
-    QTRY_COMPARE(openFiles(), m_openFiles);
-}
-
-void PackageToolTest::programsOutputIsRead()
-{
-    const PackageToolRun run = runScript("echo 编辑器; echo two");
-    QVERIFY(run.ended);
-    QCOMPARE(run.output, QStringLiteral("编辑器\ntwo\n"));
-    QCOMPARE(waited, 0L);
-    QCOMPARE(endedProcess, 0);
-}
-
-void PackageToolTest::programThatFailsHasEnded()
-{
-    for (const char* script : {"echo x; exit 1", "echo x; kill -SEGV $$"}) {
-        const PackageToolRun run = runScript(script);
-        QVERIFY(run.ended);
-        QCOMPARE(run.output, QStringLiteral("x\n"));
-    }
-}
-
-void PackageToolTest::argumentsArriveAsTheyStand()
-{
-    const QStringList arguments{QStringLiteral("[%s]"), QStringLiteral("two words"), QString(),
-                                QStringLiteral("\"*'"), QStringLiteral("-x")};
-    QCOMPARE(runPackageTool(QStringLiteral("printf"), arguments).output,
-             QStringLiteral("[two words][][\"*'][-x]"));
-}
-
-void PackageToolTest::givenEnvironmentIsTheWholeOne()
-{
-    QProcessEnvironment environment;
-    environment.insert(QStringLiteral("ONLY"), QStringLiteral("this"));
-    QCOMPARE(runPackageTool(QStringLiteral("/usr/bin/env"), {}, environment).output,
-             QStringLiteral("ONLY=this\n"));
-}
-
-void PackageToolTest::environmentIsTheAgentsOwnUnlessGiven()
-{
-    qputenv("VELK_TEST_VALUE", "own");
-    QCOMPARE(runScript("echo $VELK_TEST_VALUE").output, QStringLiteral("own\n"));
-}
-
-void PackageToolTest::complaintsAreNotRead()
-{
-    QCOMPARE(runScript("echo complaint >&2; echo answer").output, QStringLiteral("answer\n"));
-}
-
-void PackageToolTest::inputStaysOpen()
-{
-    // Whoever reads it waits, and is given up.
-    QVERIFY(!runScript("read line").ended);
-}
-
-void PackageToolTest::missingProgramIsNotWaitedFor()
-{
-    const PackageToolRun run = runPackageTool(QStringLiteral("/nowhere/tool"), {});
-    QVERIFY(!run.ended);
-    QCOMPARE(run.output, QString());
-    QCOMPARE(waited, 0L);
-}
-
-void PackageToolTest::hungProgramIsWaitedForUntilTheLimit()
-{
-    QVERIFY(!runScript("exec sleep 1000").ended);
-    QVERIFY(waitedOneLimit());
-}
-
-void PackageToolTest::hungProgramsOutputUpToThereCounts()
-{
-    QCOMPARE(runScript("echo first; exec sleep 1000").output, QStringLiteral("first\n"));
-}
-
-void PackageToolTest::hungProgramIsEndedAndNothingOfItIsLeft()
-{
-    runScript("trap '' TERM; while :; do sleep 0.1; done");
-    QCOMPARE(endingSignal, SIGKILL);
-    QTRY_VERIFY(!exists(endedProcess));
-    QTRY_COMPARE(openFiles(), m_openFiles);
-}
-
-void PackageToolTest::programThatCannotBeEndedCostsNoFurtherWaiting()
-{
-    endsWhenTold = false;
-    QVERIFY(!runScript("exec sleep 1000").ended);
-    QVERIFY(waitedOneLimit());
-    QVERIFY(exists(endedProcess));
-    syscall(SYS_kill, endedProcess, SIGKILL);
-}
 
 QTEST_GUILESS_MAIN(PackageToolTest)
 #include "package_tool_test.moc"

@@ -1,30 +1,11 @@
-#include <QtTest>
-
 #include <QDBusVariant>
 #include <QSemaphore>
+#include <QtTest>
 
 #include <atomic>
 
 #include "recorded_service.h"
 #include "remote_object.h"
-
-/// Each test has one service on the session bus, and answers for it.
-class RemoteObjectTest : public QObject
-{
-    Q_OBJECT
-
-private Q_SLOTS:
-    void absentServiceReadsAsNothing();
-    void presentServiceThatDoesNotAnswerReadsAsInvalid();
-    void propertyIsReadByOneStandardCall();
-    void severalPropertiesComeInTheOrderOfTheirNames();
-    void failedReadIsInvalid();
-    void replyOfAnotherTypeIsInvalid();
-    void valueOfAnotherTypeIsHandedOn();
-    void propertyIsWrittenByOneStandardCall();
-    void writingDoesNotWaitForTheReply();
-    void unconnectedBusIsHarmless();
-};
 
 namespace {
 
@@ -46,105 +27,112 @@ QDBusMessage answerWithNameOfProperty(const QDBusMessage& call)
 
 } // namespace
 
-void RemoteObjectTest::absentServiceReadsAsNothing()
+/// Each test has one service on the session bus, and answers for it.
+class RemoteObjectTest : public QObject
 {
-    QVERIFY(!testObject().propertyIfPresent(QStringLiteral("Any")).has_value());
-    QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
-}
+    Q_OBJECT
 
-void RemoteObjectTest::presentServiceThatDoesNotAnswerReadsAsInvalid()
-{
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), [](const QDBusMessage& call) {
-        return call.createErrorReply(QDBusError::Failed, QStringLiteral("refused"));
-    });
-    QCOMPARE(testObject().propertyIfPresent(QStringLiteral("Any")), std::optional(QVariant()));
-}
+private Q_SLOTS:
+    void absentServiceReadsAsNothing()
+    {
+        QVERIFY(!testObject().propertyIfPresent(QStringLiteral("Any")).has_value());
+        QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
+    }
 
-void RemoteObjectTest::propertyIsReadByOneStandardCall()
-{
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerWithNameOfProperty);
-    QCOMPARE(testObject().property(QStringLiteral("Color")), QVariant(QStringLiteral("Color")));
+    void presentServiceThatDoesNotAnswerReadsAsInvalid()
+    {
+        const RecordedService service(
+            QDBusConnection::SessionBus, serviceName(),
+            answerError(QDBusError::errorString(QDBusError::Failed), QStringLiteral("refused")));
+        QCOMPARE(testObject().propertyIfPresent(QStringLiteral("Any")), std::optional(QVariant()));
+    }
 
-    QCOMPARE(service.calls().size(), 1);
-    const QDBusMessage call = service.calls().constFirst();
-    QCOMPARE(call.path(), QStringLiteral("/com/norix/Test"));
-    QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.DBus.Properties"));
-    QCOMPARE(call.member(), QStringLiteral("Get"));
-    QCOMPARE(call.arguments(),
-             QVariantList({QStringLiteral("com.norix.Test.Interface"), QStringLiteral("Color")}));
-}
+    void propertyIsReadByOneStandardCall()
+    {
+        const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerWithNameOfProperty);
+        QCOMPARE(testObject().property(QStringLiteral("Color")), QVariant(QStringLiteral("Color")));
 
-void RemoteObjectTest::severalPropertiesComeInTheOrderOfTheirNames()
-{
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerWithNameOfProperty);
-    const QStringList names{QStringLiteral("b"), QStringLiteral("a"), QStringLiteral("c")};
-    QCOMPARE(testObject().properties(names), QVariantList({names.at(0), names.at(1), names.at(2)}));
-}
+        QCOMPARE(service.calls().size(), 1);
+        const QDBusMessage call = service.calls().constFirst();
+        QCOMPARE(call.path(), QStringLiteral("/com/norix/Test"));
+        QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.DBus.Properties"));
+        QCOMPARE(call.member(), QStringLiteral("Get"));
+        QCOMPARE(call.arguments(),
+                 QVariantList({QStringLiteral("com.norix.Test.Interface"), QStringLiteral("Color")}));
+    }
 
-void RemoteObjectTest::failedReadIsInvalid()
-{
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), [](const QDBusMessage& call) {
-        return call.createErrorReply(QDBusError::UnknownProperty, QStringLiteral("no such property"));
-    });
-    QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
-}
+    void severalPropertiesComeInTheOrderOfTheirNames()
+    {
+        const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerWithNameOfProperty);
+        const QStringList names{QStringLiteral("b"), QStringLiteral("a"), QStringLiteral("c")};
+        QCOMPARE(testObject().properties(names), QVariantList({names.at(0), names.at(1), names.at(2)}));
+    }
 
-void RemoteObjectTest::replyOfAnotherTypeIsInvalid()
-{
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), [](const QDBusMessage& call) {
-        return call.createReply(QStringLiteral("bare"));
-    });
-    QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
-}
+    void failedReadIsInvalid()
+    {
+        const RecordedService service(QDBusConnection::SessionBus, serviceName(),
+                                      answerError(QDBusError::errorString(QDBusError::UnknownProperty),
+                                                  QStringLiteral("no such property")));
+        QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
+    }
 
-void RemoteObjectTest::valueOfAnotherTypeIsHandedOn()
-{
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), [](const QDBusMessage& call) {
-        return call.createReply(QVariant::fromValue(QDBusVariant(QStringList{QStringLiteral("a list")})));
-    });
-    const QVariant value = testObject().property(QStringLiteral("Any"));
-    QVERIFY(value.isValid());
-    QVERIFY(!value.toBool());
-}
+    void replyOfAnotherTypeIsInvalid()
+    {
+        const RecordedService service(QDBusConnection::SessionBus, serviceName(),
+                                      answerWith(QStringLiteral("bare")));
+        QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
+    }
 
-void RemoteObjectTest::propertyIsWrittenByOneStandardCall()
-{
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerNothing);
-    testObject().setProperty(QStringLiteral("Enable"), false);
-    QTRY_COMPARE(service.calls().size(), 1);
-    const QDBusMessage call = service.calls().constFirst();
-    QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.DBus.Properties"));
-    QCOMPARE(call.member(), QStringLiteral("Set"));
-    QCOMPARE(call.signature(), QStringLiteral("ssv"));
-    QCOMPARE(call.arguments().mid(0, 2),
-             QVariantList({QStringLiteral("com.norix.Test.Interface"), QStringLiteral("Enable")}));
-    QCOMPARE(call.arguments().at(2).value<QDBusVariant>().variant(), QVariant(false));
-}
+    void valueOfAnotherTypeIsHandedOn()
+    {
+        const RecordedService service(
+            QDBusConnection::SessionBus, serviceName(),
+            answerWith(QVariant::fromValue(QDBusVariant(QStringList{QStringLiteral("a list")}))));
+        const QVariant value = testObject().property(QStringLiteral("Any"));
+        QVERIFY(value.isValid());
+        QVERIFY(!value.toBool());
+    }
 
-void RemoteObjectTest::writingDoesNotWaitForTheReply()
-{
-    QSemaphore written;
-    QSemaphore answered;
-    std::atomic_bool answeredAfterWriting = false;
-    const RecordedService service(QDBusConnection::SessionBus, serviceName(), [&](const QDBusMessage& call) {
-        answeredAfterWriting = written.tryAcquire(1, 10000);
-        answered.release();
-        return call.createReply();
-    });
-    testObject().setProperty(QStringLiteral("Enable"), false);
-    written.release();
-    answered.acquire();
-    QVERIFY(answeredAfterWriting);
-}
+    void propertyIsWrittenByOneStandardCall()
+    {
+        const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerNothing);
+        testObject().setProperty(QStringLiteral("Enable"), false);
+        QTRY_COMPARE(service.calls().size(), 1);
+        const QDBusMessage call = service.calls().constFirst();
+        QCOMPARE(call.interface(), QStringLiteral("org.freedesktop.DBus.Properties"));
+        QCOMPARE(call.member(), QStringLiteral("Set"));
+        QCOMPARE(call.signature(), QStringLiteral("ssv"));
+        QCOMPARE(call.arguments().mid(0, 2),
+                 QVariantList({QStringLiteral("com.norix.Test.Interface"), QStringLiteral("Enable")}));
+        QCOMPARE(call.arguments().at(2).value<QDBusVariant>().variant(), QVariant(false));
+    }
 
-void RemoteObjectTest::unconnectedBusIsHarmless()
-{
-    const RemoteObject object(QDBusConnection(QStringLiteral("never connected")), serviceName(),
-                              QStringLiteral("/"), serviceName());
-    QVERIFY(!object.propertyIfPresent(QStringLiteral("Any")).has_value());
-    QVERIFY(!object.property(QStringLiteral("Any")).isValid());
-    object.setProperty(QStringLiteral("Any"), true);
-}
+    void writingDoesNotWaitForTheReply()
+    {
+        QSemaphore written;
+        QSemaphore answered;
+        std::atomic_bool answeredAfterWriting = false;
+        const RecordedService service(QDBusConnection::SessionBus, serviceName(),
+                                      [&](const QDBusMessage& call) {
+                                          answeredAfterWriting = written.tryAcquire(1, 10000);
+                                          answered.release();
+                                          return call.createReply();
+                                      });
+        testObject().setProperty(QStringLiteral("Enable"), false);
+        written.release();
+        answered.acquire();
+        QVERIFY(answeredAfterWriting);
+    }
+
+    void unconnectedBusIsHarmless()
+    {
+        const RemoteObject object(QDBusConnection(QStringLiteral("never connected")), serviceName(),
+                                  QStringLiteral("/"), serviceName());
+        QVERIFY(!object.propertyIfPresent(QStringLiteral("Any")).has_value());
+        QVERIFY(!object.property(QStringLiteral("Any")).isValid());
+        object.setProperty(QStringLiteral("Any"), true);
+    }
+};
 
 QTEST_GUILESS_MAIN(RemoteObjectTest)
 #include "remote_object_test.moc"

@@ -1,9 +1,10 @@
-#include <QtTest>
-
 #include <QFile>
 #include <QTemporaryDir>
+#include <QtTest>
 
+#include "files.h"
 #include "libvelkkpx.h"
+#include "log_recorder.h"
 #include "message_transfer.h"
 
 namespace {
@@ -12,7 +13,7 @@ const QString kBackup = QStringLiteral("/etc/velk/config.ini");
 
 QString recordPath;
 
-/// Appends a step to the record; the answer of every setter is an error's text, which nobody may mind.
+/// Appends a step to the record; every setter returns an error's text, which the caller must ignore.
 QString record(const QString& step)
 {
     QFile file(recordPath);
@@ -34,16 +35,9 @@ QString quoted(const QStringList& list)
     return text;
 }
 
-void writeFile(const QString& path, const QByteArray& content)
-{
-    QFile file(path);
-    QVERIFY(file.open(QIODevice::WriteOnly));
-    QCOMPARE(file.write(content), content.size());
-}
-
 } // namespace
 
-// These go before the library's own: a library that only records, so that the order of the steps shows.
+// These replace the library's functions by ones that only record the order of the calls.
 void Libvelkkpx::SetControlConfig(const QStringList& modules, const QStringList& extra)
 {
     record(QStringLiteral("SetControlConfig %1 %2").arg(quoted(modules), quoted(extra)));
@@ -105,99 +99,84 @@ class RestoreConfigurationTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void initTestCase();
-    void init();
+    void initTestCase()
+    {
+        recordPath = m_folder.filePath(QStringLiteral("record"));
+        const QString systemctl = m_folder.filePath(QStringLiteral("systemctl"));
+        writeBytes(systemctl,
+                   "#!/bin/sh\necho systemctl \"$@\" >>" + QFile::encodeName(recordPath) + "\nexit 1\n");
+        QVERIFY(QFile::setPermissions(systemctl, QFile::ReadOwner | QFile::ExeOwner));
+        qputenv("PATH", QFile::encodeName(m_folder.path()) + ':' + qgetenv("PATH"));
+    }
 
-    void stepsComeInTheirOrderWhateverFails();
-    void moduleListIsTheBackedUpOne_data();
-    void moduleListIsTheBackedUpOne();
-    void missingBackupGivesAnEmptyListAndAllOtherSteps();
-    void nothingIsLogged();
+    void init()
+    {
+        writeBytes(kBackup, "[config]\nControlCenterList=network, display\n");
+        QFile::remove(recordPath);
+    }
+
+    void stepsComeInTheirOrderWhateverFails()
+    {
+        const QStringList expected{QStringLiteral(R"(SetControlConfig ("network", "display") (""))"),
+                                   QStringLiteral("SetHotspotEnable 1"),
+                                   QStringLiteral("SetShortcutKeyEnable true"),
+                                   QStringLiteral("SetLauncherDisplayable true"),
+                                   QStringLiteral("SetTaskbarRightclickMenuEnable true"),
+                                   QStringLiteral("SetResidentTaskbarAppDisplayable true"),
+                                   QStringLiteral("SetRecycleBinDisplayable true"),
+                                   QStringLiteral("SetWebTrayIconClickable true"),
+                                   QStringLiteral("SetUsbTrayIconClickable true"),
+                                   QStringLiteral("systemctl --global stop prys")};
+        QCOMPARE(restore(), expected);
+    }
+
+    void moduleListIsTheBackedUpOne_data()
+    {
+        QTest::addColumn<QByteArray>("backup");
+        QTest::addColumn<QString>("list");
+
+        QTest::newRow("one module") << QByteArray("[config]\nControlCenterList=network\n")
+                                    << QStringLiteral(R"(("network"))");
+        QTest::newRow("no such key") << QByteArray("[config]\nOther=a, b\n") << QStringLiteral("()");
+        QTest::newRow("other group") << QByteArray("[other]\nControlCenterList=a, b\n")
+                                     << QStringLiteral("()");
+        QTest::newRow("no group") << QByteArray("ControlCenterList=a, b\n") << QStringLiteral("()");
+        QTest::newRow("no INI file") << QByteArray("not at all\n") << QStringLiteral("()");
+    }
+
+    void moduleListIsTheBackedUpOne()
+    {
+        QFETCH(QByteArray, backup);
+        QFETCH(QString, list);
+        writeBytes(kBackup, backup);
+        QCOMPARE(restore().value(0), QStringLiteral("SetControlConfig %1 (\"\")").arg(list));
+    }
+
+    void missingBackupGivesAnEmptyListAndAllOtherSteps()
+    {
+        QVERIFY(QFile::remove(kBackup));
+        const QStringList steps = restore();
+        QCOMPARE(steps.value(0), QStringLiteral(R"(SetControlConfig () (""))"));
+        QCOMPARE(steps.size(), 10);
+    }
+
+    void nothingIsLogged()
+    {
+        const LogRecorder log;
+        restore();
+        QCOMPARE(log.lines(), QStringList());
+    }
 
 private:
-    QStringList restore();
+    QStringList restore()
+    {
+        m_transfer.restoreConfiguration();
+        return QString::fromUtf8(readBytes(recordPath)).split(QLatin1Char('\n'), Qt::SkipEmptyParts);
+    }
 
     QTemporaryDir m_folder;
     MessageTransfer m_transfer;
 };
-
-void RestoreConfigurationTest::initTestCase()
-{
-    recordPath = m_folder.filePath(QStringLiteral("record"));
-    const QString systemctl = m_folder.filePath(QStringLiteral("systemctl"));
-    writeFile(systemctl,
-              "#!/bin/sh\necho systemctl \"$@\" >>" + QFile::encodeName(recordPath) + "\nexit 1\n");
-    QVERIFY(QFile::setPermissions(systemctl, QFile::ReadOwner | QFile::ExeOwner));
-    qputenv("PATH", QFile::encodeName(m_folder.path()) + ':' + qgetenv("PATH"));
-}
-
-void RestoreConfigurationTest::init()
-{
-    writeFile(kBackup, "[config]\nControlCenterList=network, display\n");
-    QFile::remove(recordPath);
-}
-
-QStringList RestoreConfigurationTest::restore()
-{
-    m_transfer.restoreConfiguration();
-    QFile file(recordPath);
-    file.open(QIODevice::ReadOnly);
-    return QString::fromUtf8(file.readAll()).split(QLatin1Char('\n'), Qt::SkipEmptyParts);
-}
-
-void RestoreConfigurationTest::stepsComeInTheirOrderWhateverFails()
-{
-    const QStringList expected{QStringLiteral(R"(SetControlConfig ("network", "display") (""))"),
-                               QStringLiteral("SetHotspotEnable 1"),
-                               QStringLiteral("SetShortcutKeyEnable true"),
-                               QStringLiteral("SetLauncherDisplayable true"),
-                               QStringLiteral("SetTaskbarRightclickMenuEnable true"),
-                               QStringLiteral("SetResidentTaskbarAppDisplayable true"),
-                               QStringLiteral("SetRecycleBinDisplayable true"),
-                               QStringLiteral("SetWebTrayIconClickable true"),
-                               QStringLiteral("SetUsbTrayIconClickable true"),
-                               QStringLiteral("systemctl --global stop prys")};
-    QCOMPARE(restore(), expected);
-}
-
-void RestoreConfigurationTest::moduleListIsTheBackedUpOne_data()
-{
-    QTest::addColumn<QByteArray>("backup");
-    QTest::addColumn<QString>("list");
-
-    QTest::newRow("one module") << QByteArray("[config]\nControlCenterList=network\n")
-                                << QStringLiteral(R"(("network"))");
-    QTest::newRow("no such key") << QByteArray("[config]\nOther=a, b\n") << QStringLiteral("()");
-    QTest::newRow("other group") << QByteArray("[other]\nControlCenterList=a, b\n") << QStringLiteral("()");
-    QTest::newRow("no group") << QByteArray("ControlCenterList=a, b\n") << QStringLiteral("()");
-    QTest::newRow("no INI file") << QByteArray("not at all\n") << QStringLiteral("()");
-}
-
-void RestoreConfigurationTest::moduleListIsTheBackedUpOne()
-{
-    QFETCH(QByteArray, backup);
-    QFETCH(QString, list);
-    writeFile(kBackup, backup);
-    QCOMPARE(restore().value(0), QStringLiteral("SetControlConfig %1 (\"\")").arg(list));
-}
-
-void RestoreConfigurationTest::missingBackupGivesAnEmptyListAndAllOtherSteps()
-{
-    QVERIFY(QFile::remove(kBackup));
-    const QStringList steps = restore();
-    QCOMPARE(steps.value(0), QStringLiteral(R"(SetControlConfig () (""))"));
-    QCOMPARE(steps.size(), 10);
-}
-
-void RestoreConfigurationTest::nothingIsLogged()
-{
-    static QStringList logged;
-    const auto previous = qInstallMessageHandler(
-        [](QtMsgType, const QMessageLogContext&, const QString& text) { logged.append(text); });
-    restore();
-    qInstallMessageHandler(previous);
-    QCOMPARE(logged, QStringList());
-}
 
 QTEST_GUILESS_MAIN(RestoreConfigurationTest)
 #include "restore_configuration_test.moc"

@@ -1,8 +1,7 @@
-#include <QtTest>
-
 #include <QFile>
 #include <QJsonArray>
 #include <QMetaEnum>
+#include <QtTest>
 
 #include "session_policy.h"
 
@@ -54,92 +53,84 @@ class SessionPolicyTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void codeAsksForWhatTheContractSays_data();
-    void codeAsksForWhatTheContractSays();
-    void everyOtherCodeIsForwarded();
-    void payloadWithoutPolicyIsIgnored_data();
-    void payloadWithoutPolicyIsIgnored();
-    void typeIsReadFromObject();
-    void charactersOutsideLatin1BecomeQuestionMarks();
-};
-
-void SessionPolicyTest::codeAsksForWhatTheContractSays_data()
-{
-    QTest::addColumn<int>("code");
-    QTest::addColumn<QString>("audience");
-    QTest::addColumn<QString>("action");
-    QTest::addColumn<QString>("notice");
-    forEachOwnCode([](const QString& audience, const QJsonValue& entry) {
-        QTest::addRow("%d", codeOf(entry))
-            << codeOf(entry) << audience << entry[QLatin1String("x-action")].toString()
-            << entry[QLatin1String("x-notice")][QLatin1String("zh")].toString();
-    });
-}
-
-void SessionPolicyTest::codeAsksForWhatTheContractSays()
-{
-    QFETCH(int, code);
-    QFETCH(QString, notice);
-    const SessionPolicy policy = sessionPolicy(code);
-    QTEST(nameOf(policy.audience), "audience");
-    QTEST(nameOf(policy.action), "action");
-    // The request for a password change has its text where it is shown.
-    QCOMPARE(policy.text, policy.action == Action::RequestPasswordChange ? QString() : notice);
-}
-
-void SessionPolicyTest::everyOtherCodeIsForwarded()
-{
-    QSet<int> ownCodes;
-    forEachOwnCode([&](const QString&, const QJsonValue& entry) { ownCodes.insert(codeOf(entry)); });
-    QVERIFY(!ownCodes.isEmpty());
-
-    QList<int> codes{INT_MIN, -1, INT_MAX};
-    for (int code = 0; code < 10000; ++code) {
-        codes.append(code);
+    void codeAsksForWhatTheContractSays_data()
+    {
+        QTest::addColumn<int>("code");
+        QTest::addColumn<QString>("audience");
+        QTest::addColumn<QString>("action");
+        QTest::addColumn<QString>("notice");
+        forEachOwnCode([](const QString& audience, const QJsonValue& entry) {
+            QTest::addRow("%d", codeOf(entry))
+                << codeOf(entry) << audience << entry[QLatin1String("x-action")].toString()
+                << entry[QLatin1String("x-notice")][QLatin1String("zh")].toString();
+        });
     }
-    for (const int code : qAsConst(codes)) {
+
+    void codeAsksForWhatTheContractSays()
+    {
+        QFETCH(int, code);
+        QFETCH(QString, notice);
         const SessionPolicy policy = sessionPolicy(code);
-        const bool isForwarded = policy.action == Action::Forward;
-        QVERIFY2(isForwarded != ownCodes.contains(code), qPrintable(QString::number(code)));
-        QVERIFY(!isForwarded || policy.audience == Audience::EverySession);
+        QTEST(nameOf(policy.audience), "audience");
+        QTEST(nameOf(policy.action), "action");
+        // The request for a password change has its text where it is shown.
+        QCOMPARE(policy.text, policy.action == Action::RequestPasswordChange ? QString() : notice);
     }
-}
 
-void SessionPolicyTest::payloadWithoutPolicyIsIgnored_data()
-{
-    QTest::addColumn<QString>("payload");
-    QTest::newRow("empty") << QString();
-    QTest::newRow("no JSON") << QStringLiteral("type=1201");
-    QTest::newRow("null") << QStringLiteral("null");
-    QTest::newRow("array") << QStringLiteral(R"([{"type":1201}])");
-    QTest::newRow("object without type") << QStringLiteral(R"({"payload":{"type":1201}})");
-    QTest::newRow("letter case of type") << QStringLiteral(R"({"Type":1201})");
-    QTest::newRow("cut off") << QStringLiteral(R"({"type":1201)");
-    QTest::newRow("text after the object") << QStringLiteral(R"({"type":1201} x)");
-    // In Latin-1 the letter is one byte that is no UTF-8, which JSON has to be.
-    QTest::newRow("Latin-1 letter") << QStringLiteral(R"({"type":1201,"name":"é"})");
-    QTest::newRow("syntax broken by a question mark") << QStringLiteral(R"({"type":1201，"a":1})");
-}
+    void everyOtherCodeIsForwarded()
+    {
+        QSet<int> ownCodes;
+        forEachOwnCode([&](const QString&, const QJsonValue& entry) { ownCodes.insert(codeOf(entry)); });
+        QVERIFY(!ownCodes.isEmpty());
 
-void SessionPolicyTest::payloadWithoutPolicyIsIgnored()
-{
-    QFETCH(QString, payload);
-    QVERIFY(!parsePolicyMessage(payload).has_value());
-}
+        QList<int> codes{INT_MIN, -1, INT_MAX};
+        for (int code = 0; code < 10000; ++code) {
+            codes.append(code);
+        }
+        for (const int code : qAsConst(codes)) {
+            const SessionPolicy policy = sessionPolicy(code);
+            const bool isForwarded = policy.action == Action::Forward;
+            QVERIFY2(isForwarded != ownCodes.contains(code), qPrintable(QString::number(code)));
+            QVERIFY(!isForwarded || policy.audience == Audience::EverySession);
+        }
+    }
 
-void SessionPolicyTest::typeIsReadFromObject()
-{
-    const auto message = parsePolicyMessage(QStringLiteral(R"( {"type":1202,"payload":{"uid":7}} )"));
-    QVERIFY(message.has_value());
-    QCOMPARE(message->value(QLatin1String("type")).toInt(), 1202);
-}
+    void payloadWithoutPolicyIsIgnored_data()
+    {
+        QTest::addColumn<QString>("payload");
+        QTest::newRow("empty") << QString();
+        QTest::newRow("no JSON") << QStringLiteral("type=1201");
+        QTest::newRow("null") << QStringLiteral("null");
+        QTest::newRow("array") << QStringLiteral(R"([{"type":1201}])");
+        QTest::newRow("object without type") << QStringLiteral(R"({"payload":{"type":1201}})");
+        QTest::newRow("letter case of type") << QStringLiteral(R"({"Type":1201})");
+        QTest::newRow("cut off") << QStringLiteral(R"({"type":1201)");
+        QTest::newRow("text after the object") << QStringLiteral(R"({"type":1201} x)");
+        // In Latin-1 the letter is one byte that is no UTF-8, which JSON has to be.
+        QTest::newRow("Latin-1 letter") << QStringLiteral(R"({"type":1201,"name":"é"})");
+        QTest::newRow("syntax broken by a question mark") << QStringLiteral(R"({"type":1201，"a":1})");
+    }
 
-void SessionPolicyTest::charactersOutsideLatin1BecomeQuestionMarks()
-{
-    const auto message = parsePolicyMessage(QStringLiteral(R"({"type":5,"text":"停用a"})"));
-    QVERIFY(message.has_value());
-    QCOMPARE(message->value(QLatin1String("text")).toString(), QStringLiteral("??a"));
-}
+    void payloadWithoutPolicyIsIgnored()
+    {
+        QFETCH(QString, payload);
+        QVERIFY(!parsePolicyMessage(payload).has_value());
+    }
+
+    void typeIsReadFromObject()
+    {
+        const auto message = parsePolicyMessage(QStringLiteral(R"( {"type":1202,"payload":{"uid":7}} )"));
+        QVERIFY(message.has_value());
+        QCOMPARE(message->value(QLatin1String("type")).toInt(), 1202);
+    }
+
+    void charactersOutsideLatin1BecomeQuestionMarks()
+    {
+        const auto message = parsePolicyMessage(QStringLiteral(R"({"type":5,"text":"停用a"})"));
+        QVERIFY(message.has_value());
+        QCOMPARE(message->value(QLatin1String("text")).toString(), QStringLiteral("??a"));
+    }
+};
 
 QTEST_GUILESS_MAIN(SessionPolicyTest)
 #include "session_policy_test.moc"

@@ -1,7 +1,7 @@
+#include <QTest>
+
 #include "launcher_guard.h"
 #include "software_report.h"
-
-#include <QTest>
 
 namespace {
 
@@ -25,70 +25,64 @@ class SoftwareReportTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void onlyTwoActionsAreChanges_data();
-    void onlyTwoActionsAreChanges();
-    void changeIsReportedToTheLetter();
-    void unknownValuesOfAChangeAreEmpty();
-    void inventoryIsReportedToTheLetter();
+    void onlyTwoActionsAreChanges_data()
+    {
+        QTest::addColumn<QString>("action");
+        QTest::addColumn<int>("code");
+        QTest::newRow("created") << QStringLiteral("created") << 1;
+        QTest::newRow("update") << QStringLiteral("update") << 2;
+        QTest::newRow("deleted") << QStringLiteral("deleted") << 0;
+        QTest::newRow("another case") << QStringLiteral("Created") << 0;
+        QTest::newRow("longer") << QStringLiteral("updated") << 0;
+        QTest::newRow("none") << QString() << 0;
+    }
+
+    void onlyTwoActionsAreChanges()
+    {
+        QFETCH(QString, action);
+        QTEST(softwareChange(action), "code");
+    }
+
+    void changeIsReportedToTheLetter()
+    {
+        SoftwareChange change;
+        change.change = 1;
+        change.machineId = QStringLiteral("m-1");
+        change.ipAddress = QStringLiteral("192.168.1.7");
+        change.hardwareAddress = QStringLiteral("F4:0B:00:00:00:01");
+        change.name = QStringLiteral("编辑器 %1");
+        change.version = QStringLiteral("2.1");
+        change.terminalName = QStringLiteral("终端");
+        change.time = QDateTime(QDate(2026, 1, 2), QTime(3, 4, 5));
+        QCOMPARE(
+            softwareChangeReport(change),
+            QStringLiteral(R"({"payload":{"mac":"F4:0B:00:00:00:01","machine_id":"m-1",)"
+                           R"("operated_at":"2026-01-02 03:04:05","pc_ip":"192.168.1.7","pc_name":"终端",)"
+                           R"("software_name":"编辑器 %1","software_version":"2.1","type":1},"type":2002})"));
+    }
+
+    void unknownValuesOfAChangeAreEmpty()
+    {
+        SoftwareChange change;
+        change.change = 2;
+        change.time = QDateTime(QDate(2026, 12, 31), QTime(23, 59, 59));
+        const QString expected =
+            QString::fromUtf8(R"({"payload":{"mac":"","machine_id":"","operated_at":"2026-12-31 23:59:59",)"
+                              R"("pc_ip":"","pc_name":"","software_name":"","software_version":"","type":2},)"
+                              R"("type":2002})");
+        QCOMPARE(softwareChangeReport(change), expected);
+    }
+
+    void inventoryIsReportedToTheLetter()
+    {
+        const QString expected = QString::fromUtf8(
+            R"({"payload":{"list":[{"arch":"amd64","installed_type":2,)"
+            "\"name\":\"文本 \\\"编辑器\\\"\",\"package_name\":\"editor\",\"software_id\":-1,"
+            R"("version":"1.2-3"},{"arch":"","installed_type":0,"name":"","package_name":"",)"
+            R"("software_id":0,"version":""}],"machine_id":"m-2"},"type":1103})");
+        QCOMPARE(inventoryReport(QStringLiteral("m-2"), {software(), {}}), expected);
+    }
 };
-
-void SoftwareReportTest::onlyTwoActionsAreChanges_data()
-{
-    QTest::addColumn<QString>("action");
-    QTest::addColumn<int>("code");
-    QTest::newRow("created") << QStringLiteral("created") << 1;
-    QTest::newRow("update") << QStringLiteral("update") << 2;
-    QTest::newRow("deleted") << QStringLiteral("deleted") << 0;
-    QTest::newRow("another case") << QStringLiteral("Created") << 0;
-    QTest::newRow("longer") << QStringLiteral("updated") << 0;
-    QTest::newRow("none") << QString() << 0;
-}
-
-void SoftwareReportTest::onlyTwoActionsAreChanges()
-{
-    QFETCH(QString, action);
-    QTEST(softwareChange(action), "code");
-}
-
-void SoftwareReportTest::changeIsReportedToTheLetter()
-{
-    SoftwareChange change;
-    change.change = 1;
-    change.machineId = QStringLiteral("m-1");
-    change.ipAddress = QStringLiteral("192.168.1.7");
-    change.hardwareAddress = QStringLiteral("F4:0B:00:00:00:01");
-    change.name = QStringLiteral("编辑器 %1");
-    change.version = QStringLiteral("2.1");
-    change.terminalName = QStringLiteral("终端");
-    change.time = QDateTime(QDate(2026, 1, 2), QTime(3, 4, 5));
-    QCOMPARE(
-        softwareChangeReport(change),
-        QStringLiteral(R"({"payload":{"mac":"F4:0B:00:00:00:01","machine_id":"m-1",)"
-                       R"("operated_at":"2026-01-02 03:04:05","pc_ip":"192.168.1.7","pc_name":"终端",)"
-                       R"("software_name":"编辑器 %1","software_version":"2.1","type":1},"type":2002})"));
-}
-
-void SoftwareReportTest::unknownValuesOfAChangeAreEmpty()
-{
-    SoftwareChange change;
-    change.change = 2;
-    change.time = QDateTime(QDate(2026, 12, 31), QTime(23, 59, 59));
-    const QString expected =
-        QString::fromUtf8(R"({"payload":{"mac":"","machine_id":"","operated_at":"2026-12-31 23:59:59",)"
-                          R"("pc_ip":"","pc_name":"","software_name":"","software_version":"","type":2},)"
-                          R"("type":2002})");
-    QCOMPARE(softwareChangeReport(change), expected);
-}
-
-void SoftwareReportTest::inventoryIsReportedToTheLetter()
-{
-    const QString expected =
-        QString::fromUtf8(R"({"payload":{"list":[{"arch":"amd64","installed_type":2,)"
-                          R"("name":"文本 \"编辑器\"","package_name":"editor","software_id":-1,)"
-                          R"("version":"1.2-3"},{"arch":"","installed_type":0,"name":"","package_name":"",)"
-                          R"("software_id":0,"version":""}],"machine_id":"m-2"},"type":1103})");
-    QCOMPARE(inventoryReport(QStringLiteral("m-2"), {software(), {}}), expected);
-}
 
 QTEST_GUILESS_MAIN(SoftwareReportTest)
 #include "software_report_test.moc"

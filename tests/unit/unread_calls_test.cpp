@@ -1,11 +1,11 @@
+#include <QTest>
+
+#include <atomic>
+
 #include "bus_client.h"
 #include "prys_interface.h"
 #include "recorded_service.h"
 #include "velkg_interface.h"
-
-#include <QTest>
-
-#include <atomic>
 
 namespace {
 
@@ -24,117 +24,105 @@ class UnreadCallsTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void everyCallArrivesInOrderThoughNoneIsAnswered();
-    void onlyTheFirstUnansweredCallsAskForAReply();
-    void longTextIsSentWithoutAskingForAReply();
-    void answeredCallsMakeRoomForOthersThatAsk();
-    void callsAnsweredBehindAHangingOneMakeRoomToo();
-    void callWithoutAReplyCountsAsFinished();
-    void failedCallIsAnErrorForWhoeverLooks();
+    void everyCallArrivesInOrderThoughNoneIsAnswered()
+    {
+        const RecordedService daemon(QDBusConnection::SystemBus, service, neverAnswer);
+        auto bus = QDBusConnection::systemBus();
+        velkgInterface proxy(service, path, bus);
+
+        for (int number = 0; number < kMany; ++number) {
+            proxy.sendAppOpenState(number, QStringLiteral("应用"));
+        }
+
+        QTRY_COMPARE(daemon.calls().size(), kMany);
+        for (int number = 0; number < kMany; ++number) {
+            QCOMPARE(daemon.calls().at(number).arguments(), (QVariantList{number, QStringLiteral("应用")}));
+        }
+    }
+
+    void onlyTheFirstUnansweredCallsAskForAReply()
+    {
+        const RecordedService daemon(QDBusConnection::SystemBus, service, neverAnswer);
+        velkgInterface proxy(service, path, QDBusConnection::systemBus());
+
+        for (int number = 0; number < kMany; ++number) {
+            proxy.SendUserStatus(1, QString());
+        }
+
+        QTRY_COMPARE(daemon.calls().size(), kMany);
+        int asking = 0;
+        for (const QDBusMessage& call : daemon.calls()) {
+            asking += call.isReplyRequired() ? 1 : 0;
+        }
+        QCOMPARE(asking, kAskedFor);
+    }
+
+    void longTextIsSentWithoutAskingForAReply()
+    {
+        const RecordedService daemon(QDBusConnection::SystemBus, service, neverAnswer);
+        velkgInterface proxy(service, path, QDBusConnection::systemBus());
+        const QString url(8, QLatin1Char('u'));
+
+        for (const int length : {kLongestAskedFor, kLongestAskedFor + 1, url.size()}) {
+            proxy.onUploadFinished(url, QString(length - url.size(), QLatin1Char('x')));
+        }
+
+        QTRY_COMPARE(daemon.calls().size(), 3);
+        QVERIFY(daemon.calls().at(0).isReplyRequired());
+        QVERIFY(!daemon.calls().at(1).isReplyRequired());
+        QVERIFY(daemon.calls().at(2).isReplyRequired());
+    }
+
+    void answeredCallsMakeRoomForOthersThatAsk()
+    {
+        const RecordedService daemon(QDBusConnection::SystemBus, service, answerNothing);
+        velkgInterface proxy(service, path, QDBusConnection::systemBus());
+        for (int number = 0; number < 3 * kAskedFor; ++number) {
+            QVERIFY(finished(proxy.UpdateUserInfo(QString(), number)));
+        }
+        QTRY_COMPARE(daemon.calls().size(), 3 * kAskedFor);
+        for (const QDBusMessage& call : daemon.calls()) {
+            QVERIFY(call.isReplyRequired());
+        }
+    }
+
+    void callsAnsweredBehindAHangingOneMakeRoomToo()
+    {
+        const RecordedService daemon(QDBusConnection::SystemBus, service, [](const QDBusMessage& call) {
+            return call.arguments().constFirst() == 0 ? QDBusMessage() : call.createReply();
+        });
+        velkgInterface proxy(service, path, QDBusConnection::systemBus());
+        proxy.sendAppOpenState(0, QString());
+        for (int number = 1; number < 3 * kAskedFor; ++number) {
+            QVERIFY(finished(proxy.sendAppOpenState(number, QString())));
+        }
+        QTRY_COMPARE(daemon.calls().size(), 3 * kAskedFor);
+        for (const QDBusMessage& call : daemon.calls()) {
+            QVERIFY(call.isReplyRequired());
+        }
+    }
+
+    void callWithoutAReplyCountsAsFinished()
+    {
+        const RecordedService daemon(QDBusConnection::SystemBus, service, neverAnswer);
+        velkgInterface proxy(service, path, QDBusConnection::systemBus());
+        for (int number = 0; number < kAskedFor; ++number) {
+            QVERIFY(!proxy.onUploadFinished(QString(), QString()).isFinished());
+        }
+        const QDBusPendingReply<> reply = proxy.onUploadFinished(QString(), QString());
+        QVERIFY(reply.isFinished());
+        QVERIFY(!reply.isError());
+    }
+
+    void failedCallIsAnErrorToItsCaller()
+    {
+        prysInterface proxy(QStringLiteral("com.norix.velk.prys"), QStringLiteral("/com/norix/velk/prys"),
+                            QDBusConnection::sessionBus());
+        const QDBusPendingReply<> reply = proxy.onPolicyMsg(QStringLiteral("{}"));
+        QVERIFY(finished(reply));
+        QVERIFY(reply.isError());
+    }
 };
-
-void UnreadCallsTest::everyCallArrivesInOrderThoughNoneIsAnswered()
-{
-    const RecordedService daemon(QDBusConnection::SystemBus, service,
-                                 [](const QDBusMessage&) { return QDBusMessage(); });
-    auto bus = QDBusConnection::systemBus();
-    velkgInterface proxy(service, path, bus);
-
-    for (int number = 0; number < kMany; ++number) {
-        proxy.sendAppOpenState(number, QStringLiteral("应用"));
-    }
-
-    QTRY_COMPARE(daemon.calls().size(), kMany);
-    for (int number = 0; number < kMany; ++number) {
-        QCOMPARE(daemon.calls().at(number).arguments(), (QVariantList{number, QStringLiteral("应用")}));
-    }
-}
-
-void UnreadCallsTest::onlyTheFirstUnansweredCallsAskForAReply()
-{
-    const RecordedService daemon(QDBusConnection::SystemBus, service,
-                                 [](const QDBusMessage&) { return QDBusMessage(); });
-    velkgInterface proxy(service, path, QDBusConnection::systemBus());
-
-    for (int number = 0; number < kMany; ++number) {
-        proxy.SendUserStatus(1, QString());
-    }
-
-    QTRY_COMPARE(daemon.calls().size(), kMany);
-    int asking = 0;
-    for (const QDBusMessage& call : daemon.calls()) {
-        asking += call.isReplyRequired() ? 1 : 0;
-    }
-    QCOMPARE(asking, kAskedFor);
-}
-
-void UnreadCallsTest::longTextIsSentWithoutAskingForAReply()
-{
-    const RecordedService daemon(QDBusConnection::SystemBus, service,
-                                 [](const QDBusMessage&) { return QDBusMessage(); });
-    velkgInterface proxy(service, path, QDBusConnection::systemBus());
-    const QString url(8, QLatin1Char('u'));
-
-    for (const int length : {kLongestAskedFor, kLongestAskedFor + 1, url.size()}) {
-        proxy.onUploadFinished(url, QString(length - url.size(), QLatin1Char('x')));
-    }
-
-    QTRY_COMPARE(daemon.calls().size(), 3);
-    QVERIFY(daemon.calls().at(0).isReplyRequired());
-    QVERIFY(!daemon.calls().at(1).isReplyRequired());
-    QVERIFY(daemon.calls().at(2).isReplyRequired());
-}
-
-void UnreadCallsTest::answeredCallsMakeRoomForOthersThatAsk()
-{
-    const RecordedService daemon(QDBusConnection::SystemBus, service, answerNothing);
-    velkgInterface proxy(service, path, QDBusConnection::systemBus());
-    for (int number = 0; number < 3 * kAskedFor; ++number) {
-        QVERIFY(finished(proxy.UpdateUserInfo(QString(), number)));
-    }
-    QTRY_COMPARE(daemon.calls().size(), 3 * kAskedFor);
-    for (const QDBusMessage& call : daemon.calls()) {
-        QVERIFY(call.isReplyRequired());
-    }
-}
-
-void UnreadCallsTest::callsAnsweredBehindAHangingOneMakeRoomToo()
-{
-    const RecordedService daemon(QDBusConnection::SystemBus, service, [](const QDBusMessage& call) {
-        return call.arguments().constFirst() == 0 ? QDBusMessage() : call.createReply();
-    });
-    velkgInterface proxy(service, path, QDBusConnection::systemBus());
-    proxy.sendAppOpenState(0, QString());
-    for (int number = 1; number < 3 * kAskedFor; ++number) {
-        QVERIFY(finished(proxy.sendAppOpenState(number, QString())));
-    }
-    QTRY_COMPARE(daemon.calls().size(), 3 * kAskedFor);
-    for (const QDBusMessage& call : daemon.calls()) {
-        QVERIFY(call.isReplyRequired());
-    }
-}
-
-void UnreadCallsTest::callWithoutAReplyCountsAsFinished()
-{
-    const RecordedService daemon(QDBusConnection::SystemBus, service,
-                                 [](const QDBusMessage&) { return QDBusMessage(); });
-    velkgInterface proxy(service, path, QDBusConnection::systemBus());
-    for (int number = 0; number < kAskedFor; ++number) {
-        QVERIFY(!proxy.onUploadFinished(QString(), QString()).isFinished());
-    }
-    const QDBusPendingReply<> reply = proxy.onUploadFinished(QString(), QString());
-    QVERIFY(reply.isFinished());
-    QVERIFY(!reply.isError());
-}
-
-void UnreadCallsTest::failedCallIsAnErrorForWhoeverLooks()
-{
-    prysInterface proxy(QStringLiteral("com.norix.velk.prys"), QStringLiteral("/com/norix/velk/prys"),
-                        QDBusConnection::sessionBus());
-    const QDBusPendingReply<> reply = proxy.onPolicyMsg(QStringLiteral("{}"));
-    QVERIFY(finished(reply));
-    QVERIFY(reply.isError());
-}
 
 QTEST_GUILESS_MAIN(UnreadCallsTest)
 #include "unread_calls_test.moc"

@@ -4,11 +4,12 @@
 #include <QFile>
 #include <QVector>
 
-#include <csignal>
 #include <fcntl.h>
 #include <sys/prctl.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+#include <csignal>
 
 /// A process that, while this object lives, truncates a file and writes it anew without end, each time with
 /// the next of the contents.

@@ -5,8 +5,9 @@
 #include <QFileInfo>
 #include <QStringList>
 
-#include <csignal>
 #include <sys/resource.h>
+
+#include <csignal>
 
 inline const QFile::Permissions kReadWrite = QFile::ReadOwner | QFile::WriteOwner;
 inline const QFile::Permissions kNoAccess{};

@@ -23,8 +23,25 @@ inline void writePlatformAddress(const QByteArray& host, const QByteArray& port)
     writeBytes(kUserInfo, R"({"server_host":")" + host + R"(","server_port":")" + port + R"("})");
 }
 
-/// Makes the server the platform of the information file.
-inline void writePlatformAddress(const HttpsServer& server)
+/// The scripted HTTPS server as the agent's platform.
+class PlatformServer : public HttpsServer
 {
-    writePlatformAddress("127.0.0.1", QByteArray::number(QUrl(server.url("demanding", "/")).port()));
-}
+public:
+    PlatformServer()
+    {
+        installCertificates(*this);
+        writeAddress();
+    }
+
+    /// Makes it the platform of the information file.
+    void writeAddress() const
+    {
+        writePlatformAddress("127.0.0.1", QByteArray::number(QUrl(url("demanding", "/")).port()));
+    }
+
+    /// Path and query of the next request.
+    QString nextTarget()
+    {
+        return nextRequest()[QStringLiteral("line")].toString().section(QLatin1Char(' '), 1, 1);
+    }
+};

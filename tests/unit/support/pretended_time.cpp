@@ -8,7 +8,7 @@ std::optional<time_t>& pretendedTime()
     return time;
 }
 
-/// Goes before the C library's own.
+/// Replaces the C library's.
 // The header's names of the parameters are reserved.
 // NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name)
 int gettimeofday(timeval* now, void* /*zone*/) noexcept

@@ -1,10 +1,10 @@
 #pragma once
 
+#include <QMetaMethod>
+
 #include "pryg_interface.h"
 #include "prys_interface.h"
 #include "velkg_interface.h"
-
-#include <QMetaMethod>
 
 /// The three proxies, all of one object of one service.
 struct Proxies

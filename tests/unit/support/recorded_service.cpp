@@ -91,3 +91,26 @@ QDBusMessage answerNothing(const QDBusMessage& call)
 {
     return call.createReply();
 }
+
+QDBusMessage neverAnswer(const QDBusMessage& /*call*/)
+{
+    return {};
+}
+
+RecordedService::Answer answerWith(const QVariant& value)
+{
+    return [value](const QDBusMessage& call) { return call.createReply(value); };
+}
+
+RecordedService::Answer answerError(const QString& name, const QString& text)
+{
+    return [name, text](const QDBusMessage& call) { return call.createErrorReply(name, text); };
+}
+
+QDBusMessage signalOf(const QString& path, const QString& interface, const char* member,
+                      const QVariantList& arguments)
+{
+    QDBusMessage signal = QDBusMessage::createSignal(path, interface, QString::fromLatin1(member));
+    signal.setArguments(arguments);
+    return signal;
+}

@@ -43,3 +43,10 @@ private:
 
 /// Answers every call without values.
 QDBusMessage answerNothing(const QDBusMessage& call);
+/// Answers no call at all.
+QDBusMessage neverAnswer(const QDBusMessage& call);
+RecordedService::Answer answerWith(const QVariant& value);
+RecordedService::Answer answerError(const QString& name, const QString& text);
+
+QDBusMessage signalOf(const QString& path, const QString& interface, const char* member,
+                      const QVariantList& arguments = {});
