@@ -14,12 +14,23 @@ run_booted_tests() {
     require_space 500
     need_packages build package tests booted
     build_booted_package
+    trap forget_machines EXIT
     # In namespaces of their own, all processes and mounts end with the tests. sudo passes no variables on.
     narrate "testing" "${as_root[@]}" env PYTHONDONTWRITEBYTECODE=1 \
         VELK_BOOTED_ROOT="${VELK_BOOTED_ROOT:-/}" VELK_PACKAGE="$(echo "$PWD/$folder"/velk-session-agent_*.deb)" \
         unshare --mount --pid --fork --kill-child --mount-proc \
         "$PYTHON" -m pytest -p no:cacheprovider "$(colour)" -n "$BOOTED_JOBS" \
         --confcutdir tests/booted tests/booted "$@"
+}
+
+# Machines whose tests were interrupted leave empty control groups, and folders that were mount points.
+forget_machines() {
+    local group
+    for group in /sys/fs/cgroup/{,unified/}velks-booted-*; do
+        grep -qs 'populated 0' "$group/cgroup.events" || continue
+        "${as_root[@]}" find "$group" -depth -type d -exec rmdir {} +
+        "${as_root[@]}" rmdir "/run/velks-booted/${group##*/velks-booted-}"
+    done
 }
 
 require_machines() {

@@ -4,8 +4,8 @@
         unshare --mount --pid --fork --kill-child --mount-proc \\
         /usr/bin/python3 -m pytest --confcutdir=tests/booted tests/booted
 
-In namespaces of its own nothing is left behind, whatever happens to the tests. Each worker of pytest boots a
-machine for itself.
+In namespaces of its own no process and no mount is left behind, whatever happens to the tests. Each worker of
+pytest boots a machine for itself.
 """
 
 from __future__ import annotations
@@ -17,10 +17,12 @@ from typing import Iterator
 
 import pytest
 
-from tests.booted.machine import Machine
+from tests.booted.machine import USERS, Machine
+from tests.booted.patience import wait_for
 from tests.booted.platform import Platform
 
 PACKAGE = Path(os.environ["VELK_PACKAGE"])
+REACH_DEFAULT = ["systemctl", "--user", "start", "default.target"]
 DROP_IN = "/run/systemd/user/velks.service.d"
 _FASTER = 20
 _FAST_CLOCK = f"""[Service]
@@ -64,6 +66,15 @@ def hasty(machine: Machine) -> Iterator[Machine]:
     yield machine
     machine.end_sessions()
     machine.run("rm", "-rf", DROP_IN)
+
+
+@pytest.fixture
+def lingering(machine: Machine) -> Iterator[Machine]:
+    """A machine where alice's service manager runs without a log-in, as where it lingers."""
+    machine.run("systemctl", "start", f"user@{USERS['alice']}.service")
+    wait_for("alice's manager", lambda: machine.run(*REACH_DEFAULT, user="alice", check=False).returncode == 0)
+    yield machine
+    machine.run("systemctl", "stop", f"user@{USERS['alice']}.service")
 
 
 @pytest.fixture

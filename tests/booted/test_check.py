@@ -85,9 +85,20 @@ def test_agent_without_a_graphical_session_is_bad(machine: Machine) -> None:
     start = ["systemctl", "--user", "start", "velks"]
     wait_for("alice's manager", lambda: machine.run(*start, user="alice", check=False).returncode == 0)
     machine.wait_for_agent("alice")
-    told = machine.check()
-    assert "[good]    agent: runs" in told
-    assert "[bad]     session: this user has no graphical one" in told
+    assert_agent_lacks_a_graphical_session(machine)
+
+
+def test_agent_without_any_session_is_bad(lingering: Machine) -> None:
+    lingering.run("systemctl", "--user", "start", "velks", user="alice")
+    lingering.wait_for_agent("alice")
+    assert_agent_lacks_a_graphical_session(lingering)
+
+
+def assert_agent_lacks_a_graphical_session(machine: Machine) -> None:
+    """velks-check tells an agent that runs from a session that a user sees."""
+    said = machine.check()
+    assert "[good]    agent: runs" in said
+    assert "[bad]     session: this user has no graphical one" in said
 
 
 def test_agent_that_is_frozen_is_bad(session: Machine) -> None:

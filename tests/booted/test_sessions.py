@@ -4,6 +4,7 @@ from __future__ import annotations
 
 import pytest
 
+from tests.booted.conftest import REACH_DEFAULT
 from tests.booted.machine import USERS, Machine
 from tests.booted.patience import wait_for
 
@@ -83,16 +84,19 @@ def test_greeter_has_none(machine: Machine, user: str, way: str) -> None:
 
 def test_user_without_a_graphical_session_has_none(machine: Machine) -> None:
     machine.log_in("alice", kind="tty", seat="")
-    begin = ["systemctl", "--user", "start", "default.target"]
-    wait_for("alice's manager", lambda: machine.run(*begin, user="alice", check=False).returncode == 0)
+    wait_for("alice's manager", lambda: machine.run(*REACH_DEFAULT, user="alice", check=False).returncode == 0)
     assert machine.agents() == []
+
+
+def test_lingering_user_has_none(lingering: Machine) -> None:
+    assert lingering.agents() == []
 
 
 def test_agent_does_not_run_where_an_administrator_has_disabled_it(machine: Machine) -> None:
     machine.run("systemctl", "--global", "disable", "velks.service")
     for way in ("target", "autostart"):
         session = machine.log_in("alice", way)
-        machine.run("systemctl", "--user", "start", "default.target", user="alice")
+        machine.run(*REACH_DEFAULT, user="alice")
         assert machine.agents() == []
         machine.log_out(session)
     machine.run("systemctl", "--global", "enable", "velks.service")

@@ -149,13 +149,18 @@ Findings checkReboot(const QDBusConnection& bus)
                  .arg(answer)}};
 }
 
-/// A property of the user or of a session; invalid if the login manager does not answer.
-QVariant loginProperty(const QDBusConnection& bus, const QString& object, const QString& kind,
-                       const QString& name)
+/// The login manager's answer about a property of the user or of a session.
+QDBusMessage askLoginManager(const QDBusConnection& bus, const QString& object, const QString& kind,
+                             const QString& name)
 {
     const QString interface = QStringLiteral("org.freedesktop.login1.") + kind;
-    const QDBusMessage reply = ask(bus, service::kLoginManager, property(object, interface, name));
-    return reply.arguments().value(0).value<QDBusVariant>().variant();
+    return ask(bus, service::kLoginManager, property(object, interface, name));
+}
+
+/// Invalid if there was no answer.
+QVariant value(const QDBusMessage& answer)
+{
+    return answer.arguments().value(0).value<QDBusVariant>().variant();
 }
 
 /// The login manager's type, class and activity of one session.
@@ -177,8 +182,12 @@ Finding judgeSession(const QString& type, const QString& sessionClass, bool isAc
 /// The session that the login manager prefers among those of the user, which a policy ends.
 Findings checkSession(const QDBusConnection& bus)
 {
-    const QVariant display = loginProperty(bus, QStringLiteral("/org/freedesktop/login1/user/self"),
-                                           QStringLiteral("User"), QStringLiteral("Display"));
+    const QDBusMessage answer = askLoginManager(bus, QStringLiteral("/org/freedesktop/login1/user/self"),
+                                                QStringLiteral("User"), QStringLiteral("Display"));
+    if (QDBusError(answer).type() == QDBusError::UnknownObject) { // of a user without any session
+        return {judgeSession({}, {}, false)};
+    }
+    const QVariant display = value(answer);
     if (display.userType() != qMetaTypeId<QDBusArgument>()) {
         return {}; // checkService() has reported a login manager that does not answer
     }
@@ -192,7 +201,7 @@ Findings checkSession(const QDBusConnection& bus)
         return {judgeSession({}, {}, false)};
     }
     const auto ofSession = [&](const QString& property) {
-        return loginProperty(bus, object.path(), QStringLiteral("Session"), property);
+        return value(askLoginManager(bus, object.path(), QStringLiteral("Session"), property));
     };
     return {judgeSession(ofSession(QStringLiteral("Type")).toString(),
                          ofSession(QStringLiteral("Class")).toString(),
