@@ -14,8 +14,8 @@ from bench.programs import Program, agent, floor
 from sandbox.machine import layout
 from sandbox.machine.packages import Packages
 
-_ITEMS = (10,)
-_UPGRADED, _UPGRADED_ITEMS = 2, 5  # packages of an upgrade, items of the launcher meanwhile
+_ITEMS = (10, 100, 300)
+_UPGRADED, _UPGRADED_ITEMS = 30, 100  # packages of an upgrade, items of the launcher meanwhile
 _LOG_OUT = 1201
 _BEHIND = 0.5  # seconds until the agent has all changes in its queue
 _MINUTE = 60
