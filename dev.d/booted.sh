@@ -13,6 +13,7 @@ run_booted_tests() {
     require_machines
     require_space 500
     need_packages build package tests booted
+    require_pytest_arguments "$@"
     build_booted_package
     trap forget_machines EXIT
     # In namespaces of their own, all processes and mounts end with the tests. sudo passes no variables on.

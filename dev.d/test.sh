@@ -1,7 +1,9 @@
 # The tests, layer by layer.
 
 readonly LEAST_COVERAGE=95 # per cent of the lines
-readonly PYTEST_CHOSE_NONE=5 # exit status of pytest when no test was left
+# Exit statuses of pytest.
+readonly PYTEST_REFUSES=4
+readonly PYTEST_CHOSE_NONE=5
 
 run_test() {
     local layer=${1:-all}
@@ -13,6 +15,7 @@ run_test() {
     require_boxes
     require_space 1000
     need_packages build terminal tests
+    [[ $layer == unit ]] || require_pytest_arguments "$@"
     case $layer in
         unit) build_unit_tests "$@" ;;
         all) build ;;
@@ -25,6 +28,15 @@ run_test() {
         sandbox | e2e) run_for_each_user "tests/$layer" "$@" ;;
         all) run_all_layers ;;
     esac
+}
+
+# Has pytest read its arguments and do nothing else.
+require_pytest_arguments() {
+    local trouble status=0
+    (($#)) || return 0
+    trouble=$("$PYTHON" -m pytest --noconftest --version "$@" 2>&1 >/dev/null) || status=$?
+    ((status != PYTEST_REFUSES)) ||
+        fail "test: $(sed -n 's/.*error: //p' <<<"$trouble"); see $PYTHON -m pytest --help" "$WRONG_ARGUMENTS"
 }
 
 # Runs all layers, even if one fails.

@@ -179,6 +179,14 @@ def test_a_source_to_change_may_be_named_by_its_path(tree: Tree) -> None:
     assert tree.calls("mutate") == ["mutate domain_exit.cpp --quick"]
 
 
+@pytest.mark.parametrize("layer", ["dev", "bench", "contracts", "sandbox", "e2e"])
+def test_what_pytest_does_not_understand_is_refused_before_anything_is_built(tree: Tree, layer: str) -> None:
+    (tree.root / "pytest.py").unlink()  # the real one reads them
+    line = refused(tree.dev("test", layer, "--no-such"), WRONG_ARGUMENTS)
+    assert line.startswith("test: unrecognized arguments: --no-such; see ")
+    assert tree.calls("cmake") == []
+
+
 @pytest.mark.parametrize("command", commands())
 def test_each_command_shows_its_help_and_does_nothing_else(tree: Tree, command: str) -> None:
     ended = tree.dev(command, "--help")
