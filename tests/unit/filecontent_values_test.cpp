@@ -123,8 +123,7 @@ private Q_SLOTS:
         QTest::newRow("number") << QByteArray("17");
         QTest::newRow("text") << QByteArray(R"("server_host")");
         QTest::newRow("null") << QByteArray("null");
-        // NOLINTNEXTLINE(modernize-raw-string-literal): moc loses the class after a raw string with a lone
-        // brace
+        // NOLINTNEXTLINE(modernize-raw-string-literal): moc loses the class after one with a lone brace
         QTest::newRow("cut off") << QByteArray("{\"server_host\":\"a.example\",\"server_");
         QTest::newRow("text after it") << QByteArray(R"({"server_host":"a.example"} x)");
         QTest::newRow("no UTF-8") << QByteArray("{\"server_host\":\"a.example\",\"x\":\"\xe9\xff\"}");

@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include <algorithm>
+#include <memory>
 #include <optional>
 
 #include "message_transfer.h"
@@ -59,9 +60,10 @@ class MessageTransferTest : public QObject
 private Q_SLOTS:
     void init()
     {
-        m_logind.emplace(QDBusConnection::SystemBus, QStringLiteral("org.freedesktop.login1"), answerNothing);
-        m_notifications.emplace(QDBusConnection::SessionBus, QStringLiteral("com.norix.kpx.Notification"),
-                                answerNothing);
+        m_logind = std::make_unique<RecordedService>(QDBusConnection::SystemBus,
+                                                     QStringLiteral("org.freedesktop.login1"), answerNothing);
+        m_notifications = std::make_unique<RecordedService>(
+            QDBusConnection::SessionBus, QStringLiteral("com.norix.kpx.Notification"), answerNothing);
     }
 
     void cleanup()
@@ -257,8 +259,8 @@ private Q_SLOTS:
     }
 
 private:
-    std::optional<RecordedService> m_logind;
-    std::optional<RecordedService> m_notifications;
+    std::unique_ptr<RecordedService> m_logind;
+    std::unique_ptr<RecordedService> m_notifications;
 };
 
 QTEST_GUILESS_MAIN(MessageTransferTest)

@@ -42,8 +42,7 @@ bool exists(pid_t process)
 
 int openFiles()
 {
-    return static_cast<int>(
-        QDir(QStringLiteral("/proc/self/fd")).entryList(QDir::Files | QDir::System).size());
+    return QDir(QStringLiteral("/proc/self/fd")).entryList(QDir::Files | QDir::System).size();
 }
 
 PackageToolRun runScript(const char* script)
@@ -99,7 +98,7 @@ private Q_SLOTS:
         endsWhenKilled = true;
     }
 
-    void cleanup()
+    void cleanup() const
     {
         QTRY_VERIFY(endedProcess == 0 || !exists(endedProcess));
         QTRY_COMPARE(openFiles(), m_openFiles);
@@ -175,7 +174,7 @@ private Q_SLOTS:
         QCOMPARE(runScript("echo first; exec sleep 1000").output, QStringLiteral("first\n"));
     }
 
-    void hungProgramIsEndedAndNothingOfItIsLeft()
+    void hungProgramIsEndedAndNothingOfItIsLeft() const
     {
         runScript("trap '' TERM; while :; do sleep 0.1; done");
         QCOMPARE(endingSignal, SIGKILL);

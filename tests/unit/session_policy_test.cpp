@@ -119,16 +119,17 @@ private Q_SLOTS:
 
     void typeIsReadFromObject()
     {
-        const auto message = parsePolicyMessage(QStringLiteral(R"( {"type":1202,"payload":{"uid":7}} )"));
-        QVERIFY(message.has_value());
-        QCOMPARE(message->value(QLatin1String("type")).toInt(), 1202);
+        const QJsonObject message =
+            parsePolicyMessage(QStringLiteral(R"( {"type":1202,"payload":{"uid":7}} )"))
+                .value_or(QJsonObject());
+        QCOMPARE(message.value(QLatin1String("type")).toInt(), 1202);
     }
 
     void charactersOutsideLatin1BecomeQuestionMarks()
     {
-        const auto message = parsePolicyMessage(QStringLiteral(R"({"type":5,"text":"停用a"})"));
-        QVERIFY(message.has_value());
-        QCOMPARE(message->value(QLatin1String("text")).toString(), QStringLiteral("??a"));
+        const QJsonObject message =
+            parsePolicyMessage(QStringLiteral(R"({"type":5,"text":"停用a"})")).value_or(QJsonObject());
+        QCOMPARE(message.value(QLatin1String("text")).toString(), QStringLiteral("??a"));
     }
 };
 

@@ -15,7 +15,11 @@ public:
         s_current = this;
         s_previous = qInstallMessageHandler(record);
     }
-    ~LogRecorder() { qInstallMessageHandler(s_previous); }
+    ~LogRecorder()
+    {
+        qInstallMessageHandler(s_previous);
+        s_current = nullptr;
+    }
     Q_DISABLE_COPY_MOVE(LogRecorder)
 
     /// Each line with its level before it, as in "warning: text".
