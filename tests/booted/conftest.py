@@ -18,11 +18,9 @@ from typing import Iterator
 import pytest
 
 from tests.booted.machine import USERS, Machine
-from tests.booted.patience import wait_for
 from tests.booted.platform import Platform
 
 PACKAGE = Path(os.environ["VELK_PACKAGE"])
-REACH_DEFAULT = ["systemctl", "--user", "start", "default.target"]
 DROP_IN = "/run/systemd/user/velks.service.d"
 _FASTER = 20
 _FAST_CLOCK = f"""[Service]
@@ -72,7 +70,7 @@ def hasty(machine: Machine) -> Iterator[Machine]:
 def lingering(machine: Machine) -> Iterator[Machine]:
     """A machine where alice's service manager runs without a log-in, as where it lingers."""
     machine.run("systemctl", "start", f"user@{USERS['alice']}.service")
-    wait_for("alice's manager", lambda: machine.run(*REACH_DEFAULT, user="alice", check=False).returncode == 0)
+    machine.wait_for_manager("alice")
     yield machine
     machine.run("systemctl", "stop", f"user@{USERS['alice']}.service")
 

@@ -158,6 +158,11 @@ class Machine:
 
         return wait_for(f"an agent of {user}", ready)
 
+    def wait_for_manager(self, user: str) -> None:
+        """Return when the user's service manager has started all that it starts by itself."""
+        start = ["systemctl", "--user", "start", "default.target"]
+        wait_for(f"the manager of {user}", lambda: self.run(*start, user=user, check=False).returncode == 0)
+
     def starts_skipped(self) -> int:
         """How often conditions have kept an agent from starting, as the service managers tell."""
         return len(

@@ -4,7 +4,6 @@ from __future__ import annotations
 
 import pytest
 
-from tests.booted.conftest import REACH_DEFAULT
 from tests.booted.machine import USERS, Machine
 from tests.booted.patience import wait_for
 
@@ -84,7 +83,7 @@ def test_greeter_has_none(machine: Machine, user: str, way: str) -> None:
 
 def test_user_without_a_graphical_session_has_none(machine: Machine) -> None:
     machine.log_in("alice", kind="tty", seat="")
-    wait_for("alice's manager", lambda: machine.run(*REACH_DEFAULT, user="alice", check=False).returncode == 0)
+    machine.wait_for_manager("alice")
     assert machine.agents() == []
 
 
@@ -96,7 +95,7 @@ def test_agent_does_not_run_where_an_administrator_has_disabled_it(machine: Mach
     machine.run("systemctl", "--global", "disable", "velks.service")
     for way in ("target", "autostart"):
         session = machine.log_in("alice", way)
-        machine.run(*REACH_DEFAULT, user="alice")
+        machine.wait_for_manager("alice")
         assert machine.agents() == []
         machine.log_out(session)
     machine.run("systemctl", "--global", "enable", "velks.service")
