@@ -91,16 +91,12 @@ def _measure_group(
 
 
 def _merged(known: Report, fresh: Report) -> Report:
-    replaced = {_group(figure) for figure in fresh.figures}
-    kept = [figure for figure in known.figures if _group(figure) not in replaced]
+    replaced = {figure.group for figure in fresh.figures}
+    kept = [figure for figure in known.figures if figure.group not in replaced]
     prefixes = [group.removesuffix("_agents") for group in GROUPS]
     return Report(
-        fresh.circumstances, sorted([*kept, *fresh.figures], key=lambda one: prefixes.index(_group(one)))
+        fresh.circumstances, sorted([*kept, *fresh.figures], key=lambda one: prefixes.index(one.group))
     )
-
-
-def _group(figure: Figure) -> str:
-    return figure.name.split(".")[0]
 
 
 def _judge(report: Report, console: Console) -> int:
@@ -156,7 +152,8 @@ def main() -> int:
 
 def _show(report: Report, options: Options, console: Console) -> None:
     """The figures, and how far they can be trusted."""
-    console.print(table.terminal_table(report.figures))
+    for group in dict.fromkeys(figure.group for figure in report.figures):
+        console.print(table.terminal_table(report.group(group)))
     measured = [figure for figure in report.figures if figure.kind not in comparison.STEADY_KINDS]
     for line in table.unstable(measured):
         console.print(line)

@@ -34,7 +34,7 @@ class Goal:
         """The goal as text for a table."""
         sign = "≤" if self.bound == "at most" else "≥"
         if self.of == "floor":
-            return f"{sign} {self.limit:g} ×"
+            return f"{sign} {self.limit:.4g} ×"
         above = "+" if self.of == "above floor" else ""
         return f"{sign} {above}{number(self.limit)} {unit}".rstrip()
 
@@ -64,6 +64,11 @@ class Figure:
     goal: Goal | None = None
     series: str = ""
     x: float = 0
+
+    @property
+    def group(self) -> str:
+        """The group's name."""
+        return self.name.partition(".")[0]
 
     @property
     def middle(self) -> float:
@@ -102,6 +107,10 @@ class Report:
 
     circumstances: dict[str, Any]
     figures: list[Figure] = field(default_factory=list)
+
+    def group(self, name: str) -> list[Figure]:
+        """The figures of one group."""
+        return [figure for figure in self.figures if figure.group == name]
 
     def save(self, path: Path) -> None:
         """Write the report as JSON."""

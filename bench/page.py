@@ -30,11 +30,11 @@ def page(report: Report) -> str:
     text = _TEMPLATE.read_text()
     for name, part in parts.items():
         text = text.replace(f"@{name}@", part)
-    return re.sub(r"@table (\w+)@", lambda found: page_table(_group(report, found[1])), text)
+    return re.sub(r"@table (\w+)@", lambda found: page_table(report.group(found[1])), text)
 
 
 def _neighbours(report: Report) -> str:
-    known = {figure.name: figure for figure in _group(report, "neighbours")}
+    known = {figure.name: figure for figure in report.group("neighbours")}
     if not known:
         return "Not measured yet: `./dev bench neighbours`."
     return markdown([("program", *_NEIGHBOURS.values()), *_neighbour_rows(known)])
@@ -48,10 +48,6 @@ def _neighbour_rows(known: dict[str, Figure]) -> Iterator[tuple[str, ...]]:
             cells = (known[f"{prefix}.{column}"] for column in _NEIGHBOURS)
             title = figure.title.partition(", ")[2]
             yield (title, *(f"{number(cell.middle)} {cell.unit}".rstrip() for cell in cells))
-
-
-def _group(report: Report, group: str) -> list[Figure]:
-    return [figure for figure in report.figures if figure.name.split(".")[0] == group]
 
 
 def _circumstances(report: Report) -> str:

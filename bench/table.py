@@ -14,21 +14,30 @@ from bench.stability import WORST_WRITTEN, is_stable
 _HEADERS = ("figure", "agent", "known to", "floor", "ratio", "to reach", "")
 _VERDICTS = {True: "reached", False: "**missed**", None: ""}
 # On a terminal of 80 columns the numbers stay whole, the titles share what is left.
+_TERMINAL_HEADERS = ("figure", "agent", "±", "floor", "ratio", "to reach", "")
 _NARROW = {"reached": "", "**missed**": "missed"}
 _LEAST_TITLE = 14
 
 
 def terminal_table(figures: Sequence[Figure]) -> Table:
-    """The table that is printed after a run."""
+    """The table of a group that is printed after a run, without columns that would be empty."""
     table = Table(box=box.SIMPLE_HEAD, padding=(0, 1, 0, 0), pad_edge=False)
-    table.add_column(_HEADERS[0], min_width=_LEAST_TITLE, overflow="fold")
-    for header in ("agent", "±", "floor", "ratio", "to reach", ""):
-        table.add_column(header, justify="right", no_wrap=True)
-    for figure in figures:
+    rows = [_terminal_cells(figure) for figure in figures]
+    used = [place for place in range(len(_TERMINAL_HEADERS)) if any(row[place] for row in rows)]
+    for place in used:
+        if place == 0:
+            table.add_column(_TERMINAL_HEADERS[place], min_width=_LEAST_TITLE, overflow="fold")
+        else:
+            table.add_column(_TERMINAL_HEADERS[place], justify="right", no_wrap=True)
+    for figure, row in zip(figures, rows):
         style = "red" if figure.is_met is False else None
-        *cells, verdict = _cells(figure)
-        table.add_row(*(cell.replace("± ", "") for cell in cells), _NARROW.get(verdict, ""), style=style)
+        table.add_row(*(row[place] for place in used), style=style)
     return table
+
+
+def _terminal_cells(figure: Figure) -> list[str]:
+    *cells, verdict = _cells(figure)
+    return [*(cell.replace("± ", "") for cell in cells), _NARROW.get(verdict, "")]
 
 
 def page_table(figures: Sequence[Figure]) -> str:

@@ -56,6 +56,11 @@ def test_missed_goal_is_marked_without_colours() -> None:
     assert "missed" in next(line for line in lines if "memory" in line)
 
 
+def test_columns_that_would_be_empty_leave_their_place_to_the_titles() -> None:
+    lines = piped([figure(floor=(), goal=None, values=[1])])
+    assert any(_TITLE in line and "1 KiB" in line for line in lines)
+
+
 def test_page_gives_the_cause_of_a_missed_goal() -> None:
     goal = Goal("at most", 0.5, otherwise="it does more; half of it would reach it")
 
