@@ -1,16 +1,43 @@
-"""What the agent reports to the daemon of the applications on the dock."""
+"""What happens on the dock, and what the agent reports of it to the daemon."""
 
 from __future__ import annotations
 
 from typing import Callable
 from uuid import uuid4
 
+import pytest
+
 from sandbox.fakes import dock
+from sandbox.fakes.dock import Dock
 from sandbox.terminal import Terminal
 from tests.e2e import wire
 
 OPENED, CLOSED = 1, 2
 UNKNOWN = "unknown entry"
+
+Change = Callable[[Dock], object]
+
+at_start_or_later = pytest.mark.parametrize("at_start", [True, False], ids=["at start", "later"])
+
+
+def opens(app: str = "mail", docked: bool = False, windows: int = 1) -> Change:
+    """An application's entry comes to the dock, called like the application with a capital."""
+    return lambda dock: dock.open_app(app, app.capitalize(), docked, windows)
+
+
+def closes(app: str = "mail") -> Change:
+    """An application's entry goes."""
+    return lambda dock: dock.close_app(app)
+
+
+def has_windows(number: int, app: str = "mail") -> Change:
+    """An application has so many windows now, all of them new."""
+    return lambda dock: dock.set_windows(app, number)
+
+
+def is_called(name: str, app: str = "mail") -> Change:
+    """An application gets another name."""
+    return lambda dock: dock.rename(app, name)
 
 
 def settle(terminal: Terminal) -> None:
@@ -40,16 +67,30 @@ def reported(terminal: Terminal, after: int = 0) -> list[tuple[int, str]]:
     return [(call.args[0], call.args[1]) for call in calls]
 
 
-def follows(terminal: Terminal, *changes: Callable[[], object]) -> list[tuple[int, str]]:
-    """What the agent reports of these changes; each waits until the agent has handled the one before."""
-    mark = terminal.events.mark()
+def start_with(terminal: Terminal, change: Change, at_start: bool) -> None:
+    """Start the agent; a change happens before, or after."""
+    if at_start:
+        change(terminal.dock)
+    start(terminal)
+    if not at_start:
+        let_happen(terminal, change)
+
+
+def let_happen(terminal: Terminal, *changes: Change) -> None:
+    """Let changes happen; each waits until the agent has handled the one before."""
     for change in changes:
-        change()
+        change(terminal.dock)
         settle(terminal)
+
+
+def follows(terminal: Terminal, *changes: Change) -> list[tuple[int, str]]:
+    """What the agent reports of these changes."""
+    mark = terminal.events.mark()
+    let_happen(terminal, *changes)
     return reported(terminal, mark)
 
 
-def warnings(terminal: Terminal, after: int = 0) -> list[str]:
+def dock_warnings(terminal: Terminal, after: int = 0) -> list[str]:
     """What the agent has warned of since a mark, but for what `settle` provoked and for the missing address
     of a terminal without a platform."""
     provoked = (f'"{UNKNOWN} ', '"getHostAndPort"')

@@ -7,7 +7,19 @@ import pytest
 from sandbox.fakes import dock
 from sandbox.fakes.dock import Announcement
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import CLOSED, OPENED, follows, settle, start, warnings
+from tests.e2e.dockwatch import (
+    CLOSED,
+    Change,
+    OPENED,
+    at_start_or_later,
+    closes,
+    dock_warnings,
+    follows,
+    has_windows,
+    is_called,
+    opens,
+    start_with,
+)
 
 WAYS: list[tuple[Announcement, ...]] = [
     ("values",),
@@ -30,65 +42,42 @@ WAYS: list[tuple[Announcement, ...]] = [
         (0, 0, []),
     ],
 )
-@pytest.mark.parametrize("at_start", [True, False], ids=["known at start", "came later"])
+@at_start_or_later
 def test_a_change_of_the_number_of_windows_is_one_event(
     terminal: Terminal, at_start: bool, before: int, after: int, events: list[tuple[int, str]]
 ) -> None:
-    if at_start:
-        terminal.dock.open_app("mail", "Mail", docked=True, windows=before)
-        start(terminal)
-    else:
-        start(terminal)
-        terminal.dock.open_app("mail", "Mail", docked=True, windows=before)
-        settle(terminal)
+    start_with(terminal, opens(docked=True, windows=before), at_start)
 
-    assert follows(terminal, lambda: terminal.dock.set_windows("mail", after)) == events
+    assert follows(terminal, has_windows(after)) == events
 
 
 @pytest.mark.parametrize("ways", WAYS, ids=str)
-def test_each_change_of_windows_is_reported_once_however_the_dock_announces_it(
-    session: Terminal, ways: tuple[Announcement, ...]
+@pytest.mark.parametrize(
+    ("changes", "events"),
+    [
+        pytest.param(
+            [opens(docked=True, windows=0), *map(has_windows, (2, 2, 0, 3, 1))],
+            [(OPENED, "Mail"), (CLOSED, "Mail")] * 2,
+            id="each change of windows is one event",
+        ),
+        pytest.param(
+            [opens(), is_called("Post"), has_windows(2), is_called("邮件"), closes()],
+            [(OPENED, "Mail"), (OPENED, "Post"), (CLOSED, "邮件")],
+            id="a new name stands in later events",
+        ),
+        pytest.param(
+            [opens(), is_called(""), has_windows(2)],
+            [(OPENED, "Mail"), (OPENED, "Mail")],
+            id="an empty name leaves the old one",
+        ),
+    ],
+)
+def test_changes_count_however_the_dock_announces_them(
+    session: Terminal, ways: tuple[Announcement, ...], changes: list[Change], events: list[tuple[int, str]]
 ) -> None:
     session.dock.announces = ways
-    session.dock.open_app("mail", "Mail", docked=True, windows=0)
-    settle(session)
 
-    counts = [lambda number=number: session.dock.set_windows("mail", number) for number in (2, 2, 0, 3, 1)]
-
-    kinds = [kind for kind, _ in follows(session, *counts)]
-    assert kinds == [OPENED, CLOSED, OPENED, CLOSED]
-
-
-@pytest.mark.parametrize("ways", WAYS, ids=str)
-def test_a_new_name_stands_in_later_events_however_the_dock_announces_it(
-    session: Terminal, ways: tuple[Announcement, ...]
-) -> None:
-    session.dock.announces = ways
-    session.dock.open_app("mail", "Mail")
-    settle(session)
-
-    events = follows(
-        session,
-        lambda: session.dock.rename("mail", "Post"),
-        lambda: session.dock.set_windows("mail", 2),
-        lambda: session.dock.rename("mail", "邮件"),
-        lambda: session.dock.close_app("mail"),
-    )
-
-    assert events == [(OPENED, "Post"), (CLOSED, "邮件")]
-
-
-@pytest.mark.parametrize("ways", WAYS, ids=str)
-def test_an_empty_name_leaves_the_old_one(session: Terminal, ways: tuple[Announcement, ...]) -> None:
-    session.dock.announces = ways
-    session.dock.open_app("mail", "Mail")
-    settle(session)
-
-    events = follows(
-        session, lambda: session.dock.rename("mail", ""), lambda: session.dock.set_windows("mail", 2)
-    )
-
-    assert events == [(OPENED, "Mail")]
+    assert follows(session, *changes) == events
 
 
 @pytest.mark.parametrize("window_type", dock.WINDOW_TYPES)
@@ -98,10 +87,9 @@ def test_windows_count_whatever_the_dock_knows_of_them(
 ) -> None:
     terminal.dock.window_type = window_type
     terminal.dock.announces = (way,)
-    terminal.dock.open_app("mail", "Mail", docked=True, windows=2)
-    start(terminal)
+    start_with(terminal, opens(docked=True, windows=2), at_start=True)
 
-    counts = [lambda number=number: terminal.dock.set_windows("mail", number) for number in (1, 3, 0)]
+    events = follows(terminal, *map(has_windows, (1, 3, 0)))
 
-    assert [kind for kind, _ in follows(terminal, *counts)] == [CLOSED, OPENED, CLOSED]
-    assert warnings(terminal) == []
+    assert [kind for kind, _ in events] == [CLOSED, OPENED, CLOSED]
+    assert dock_warnings(terminal) == []

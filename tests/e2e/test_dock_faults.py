@@ -9,21 +9,43 @@ import pytest
 from sandbox.fakes import dock
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault, FirstCalls
+from sandbox.periods import DBUS_LIMIT
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import CLOSED, OPENED, follows, scans, settle, start, reported, warnings
+from tests.e2e.dockwatch import (
+    CLOSED,
+    OPENED,
+    closes,
+    dock_warnings,
+    follows,
+    has_windows,
+    is_called,
+    let_happen,
+    opens,
+    reported,
+    scans,
+    settle,
+    start,
+)
 from tests.e2e.wire import carries_out_policies
 
-DBUS_LIMIT = 25
 
-
-def test_a_failing_dock_counts_as_empty_and_is_followed_when_it_is_well(terminal: Terminal) -> None:
+@pytest.mark.parametrize(
+    ("fault", "seconds"), [(Fault.fail(), 0), (Fault.hang(), DBUS_LIMIT)], ids=["fails", "hangs"]
+)
+def test_a_dock_that_does_not_answer_at_start_counts_as_empty_and_is_followed_when_it_is_well(
+    terminal: Terminal, fault: Fault, seconds: int
+) -> None:
     terminal.dock.open_app("a", "A")
-    terminal.dock.fault = Fault.fail()
-    start(terminal)
-    terminal.dock.fault = Fault.none()
+    terminal.dock.fault = fault
+    terminal.start_agent(ready=lambda: terminal.events.wait_for(target="dock", member="Get"))
 
+    terminal.jump(seconds)
+
+    terminal.events.wait_for(kind="log", member="info", args=("dock entry size: 0",))
+    carries_out_policies(terminal)
+    terminal.dock.fault = Fault.none()
     assert (reported(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
-    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+    assert follows(terminal, opens("b")) == [(OPENED, "B")]
 
 
 def test_a_dock_that_does_not_introspect_is_read_all_the_same(terminal: Terminal) -> None:
@@ -33,19 +55,6 @@ def test_a_dock_that_does_not_introspect_is_read_all_the_same(terminal: Terminal
     start(terminal)
 
     assert reported(terminal) == [(OPENED, "A")]
-
-
-def test_a_hung_dock_at_start_costs_the_limit_and_counts_as_empty(terminal: Terminal) -> None:
-    terminal.dock.open_app("a", "A")
-    terminal.dock.fault = Fault.hang()
-    terminal.start_agent(ready=lambda: terminal.events.wait_for(target="dock", member="Get"))
-
-    terminal.jump(DBUS_LIMIT)
-
-    terminal.events.wait_for(kind="log", member="info", args=("dock entry size: 0",))
-    carries_out_policies(terminal)
-    terminal.dock.fault = Fault.none()
-    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
 
 
 def test_a_dock_that_hangs_later_holds_the_agent_up_by_the_limit_for_each_question(
@@ -64,7 +73,7 @@ def test_a_dock_that_hangs_later_holds_the_agent_up_by_the_limit_for_each_questi
     carries_out_policies(terminal)
     terminal.dock.fault = Fault.none()
     settle(terminal)
-    assert warnings(terminal, mark) == []
+    assert dock_warnings(terminal, mark) == []
     assert reported(terminal, mark) == [(OPENED, "")]
 
 
@@ -82,11 +91,8 @@ def test_an_entry_that_once_fails_to_answer_keeps_its_windows_and_signals(
         terminal.jump(DBUS_LIMIT)
     settle(terminal)
 
-    assert (reported(terminal, mark), warnings(terminal, mark)) == ([(OPENED, "A")], [])
-    events = follows(
-        terminal, lambda: terminal.dock.set_windows("a", 1), lambda: terminal.dock.close_app("a")
-    )
-    assert events == [(CLOSED, "A"), (CLOSED, "A")]
+    assert (reported(terminal, mark), dock_warnings(terminal, mark)) == ([(OPENED, "A")], [])
+    assert follows(terminal, has_windows(1, "a"), closes("a")) == [(CLOSED, "A"), (CLOSED, "A")]
 
 
 def test_an_entry_whose_identifier_cannot_be_read_is_followed_all_the_same(terminal: Terminal) -> None:
@@ -94,8 +100,8 @@ def test_an_entry_whose_identifier_cannot_be_read_is_followed_all_the_same(termi
     terminal.dock.open_app("a", "A", windows=2)
     start(terminal)
 
-    assert (reported(terminal), warnings(terminal)) == ([(OPENED, "A")], [])
-    assert follows(terminal, lambda: terminal.dock.set_windows("a", 1)) == [(CLOSED, "A")]
+    assert (reported(terminal), dock_warnings(terminal)) == ([(OPENED, "A")], [])
+    assert follows(terminal, has_windows(1, "a")) == [(CLOSED, "A")]
 
 
 def test_a_slow_answer_about_an_invalidated_property_blocks_nothing(terminal: Terminal) -> None:
@@ -121,13 +127,10 @@ def test_an_invalidated_property_that_cannot_be_read_changes_nothing(terminal: T
     terminal.dock.announces = ("invalidated",)
     terminal.dock.faults["Get"] = Fault.fail()
 
-    events = follows(
-        terminal, lambda: terminal.dock.set_windows("a", 0), lambda: terminal.dock.rename("a", "B")
-    )
-    assert events == []
+    assert follows(terminal, has_windows(0, "a"), is_called("B", "a")) == []
 
     terminal.dock.faults.clear()
-    assert follows(terminal, lambda: terminal.dock.set_windows("a", 2)) == [(OPENED, "A")]
+    assert follows(terminal, has_windows(2, "a")) == [(OPENED, "A")]
 
 
 @pytest.mark.parametrize(
@@ -142,7 +145,7 @@ def test_a_list_of_entries_of_another_type_counts_as_empty(
 
     assert (reported(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
     terminal.dock.set("Entries", [])
-    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+    assert follows(terminal, opens("b")) == [(OPENED, "B")]
 
 
 @pytest.mark.parametrize("name", ["Id", "Name", "WindowInfos"])
@@ -158,7 +161,7 @@ def test_an_entry_with_a_property_of_another_type_does_not_stop_the_agent(
     start(terminal)
 
     assert reported(terminal) == [(OPENED, "" if name == "Name" else "A")]
-    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+    assert follows(terminal, opens("b")) == [(OPENED, "B")]
 
 
 @pytest.mark.parametrize("name", ["Name", "WindowInfos"])
@@ -171,11 +174,7 @@ def test_a_change_to_a_value_of_another_type_is_passed_over(
     start(terminal)
     terminal.dock.announces = (way,)
 
-    events = follows(
-        terminal,
-        lambda: terminal.dock.set(name, value, signature, path),
-        lambda: terminal.dock.set_windows("a", 3),
-    )
+    events = follows(terminal, lambda dock: dock.set(name, value, signature, path), has_windows(3, "a"))
 
     assert events == [(OPENED, "A")]
 
@@ -184,9 +183,8 @@ def test_a_change_to_a_value_of_another_type_is_passed_over(
 def test_replies_of_another_form_do_not_stop_the_agent(terminal: Terminal, reply: Reply) -> None:
     start(terminal)
     terminal.dock.answers["Get"] = reply
-    terminal.dock.open_app("a", "A")
-    settle(terminal)
+    let_happen(terminal, opens("a"))
     del terminal.dock.answers["Get"]
 
-    assert (reported(terminal), warnings(terminal)) == ([(OPENED, "")], [])
-    assert follows(terminal, lambda: terminal.dock.open_app("b", "B")) == [(OPENED, "B")]
+    assert (reported(terminal), dock_warnings(terminal)) == ([(OPENED, "")], [])
+    assert follows(terminal, opens("b")) == [(OPENED, "B")]

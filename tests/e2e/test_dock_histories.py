@@ -13,7 +13,7 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from tests.e2e.dockmodel import Act, DockModel, acts
-from tests.e2e.dockwatch import settle, start, reported
+from tests.e2e.dockwatch import reported, settle, start
 
 Pace = Literal["one by one", "at once", "during a notification", "during an inventory"]
 PACES: tuple[Pace, ...] = ("one by one", "at once", "during a notification", "during an inventory")

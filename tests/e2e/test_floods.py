@@ -18,7 +18,7 @@ from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.policies import FORWARDED_CODES
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import CLOSED, OPENED, settle, reported
+from tests.e2e.dockwatch import CLOSED, OPENED, reported, settle
 from tests.e2e.strangers import receivers, straight_or_not
 from tests.e2e.wire import carries_out_policies, log_lines, push, wait_on_notification
 

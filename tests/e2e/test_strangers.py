@@ -1,4 +1,4 @@
-"""Strangers that queue for a name, forge a new owner of a name, or send the launcher's signals."""
+"""Strangers that send a service's signals, with or without its name, queue for a name, or forge its owner."""
 
 from __future__ import annotations
 
@@ -8,11 +8,19 @@ import pytest
 
 from sandbox.bus.stranger import Stranger
 from sandbox.fakes import daemon, dock, launcher
-from sandbox.fakes.base import Fake
+from sandbox.fakes.exported import PROPERTIES
 from sandbox.terminal import Terminal
-from tests.e2e.dockwatch import settle, reported
-from tests.e2e.software import EDITOR, install, uploads
-from tests.e2e.strangers import BUS, BUS_PATH, let_reach_the_bus, receivers, straight_or_not
+from tests.e2e.dockwatch import CLOSED, closes, dock_warnings, follows, opens, settle, start_with
+from tests.e2e.software import EDITOR, install
+from tests.e2e.strangers import (
+    BUS,
+    BUS_PATH,
+    Spoken,
+    receivers,
+    send,
+    send_in_the_name_of,
+    straight_or_not,
+)
 from tests.e2e.wire import (
     SHUTDOWN_NOTICE,
     carries_out_policies,
@@ -24,18 +32,73 @@ from tests.e2e.wire import (
 )
 
 ITEM = ("/usr/share/applications/spoof.desktop", "Spoof", "", "", 0, 0)
+MAIL = f"{dock.ENTRIES}/e1"
 
 
-def push(stranger: Stranger, payload: str) -> None:
-    """Let the stranger send a policy as the daemon does."""
-    stranger.emit(daemon.PATH, daemon.INTERFACE, "pushPolicyMsg", "box", payload, signature="ss")
-    let_reach_the_bus(stranger)
+def policy(payload: str) -> Spoken:
+    """A policy as the daemon sends it."""
+    return Spoken(daemon.PATH, daemon.INTERFACE, "pushPolicyMsg", "ss", ("box", payload))
 
 
-def forge_owner(stranger: Stranger, name: str, old: str, receiver: str | None) -> None:
-    """Let the stranger announce, as the bus does, that it owns a name now."""
-    args = (name, old, stranger.unique_name)
-    stranger.emit(BUS_PATH, BUS, "NameOwnerChanged", *args, signature="sss", destination=receiver)
+def log_out_and_report(path: str = daemon.PATH, interface: str = daemon.INTERFACE) -> list[Spoken]:
+    """The policy that logs the user out, and the demand for a report."""
+    log_out = Spoken(path, interface, "pushPolicyMsg", "ss", ("box", '{"type":1201}'))
+    return [log_out, Spoken(path, interface, "pushOnlineMsg")]
+
+
+def new_owner(stranger: Stranger, name: str, old: str) -> Spoken:
+    """What the bus sends when the stranger owns a name."""
+    return Spoken(BUS_PATH, BUS, "NameOwnerChanged", "sss", (name, old, stranger.unique_name))
+
+
+@straight_or_not
+@pytest.mark.parametrize("daemon_is", ["there", "late", "gone"])
+def test_stranger_is_ignored_whether_the_daemon_is_there_or_not(
+    terminal: Terminal, on_system: Stranger, straight: bool, daemon_is: str
+) -> None:
+    if daemon_is == "late":
+        terminal.daemon.leave()
+    terminal.start_agent()
+    if daemon_is == "gone":
+        terminal.daemon.leave()
+    mark = terminal.events.mark()
+    send(on_system, log_out_and_report(), receivers(terminal, terminal.system_bus, straight))
+    if daemon_is != "there":
+        terminal.daemon.appear()
+    assert settled(terminal, mark) == []
+
+
+@straight_or_not
+@pytest.mark.parametrize(
+    ("path", "interface"),
+    [
+        ("/com/norix/velk/other", daemon.INTERFACE),
+        ("/", daemon.INTERFACE),
+        (daemon.PATH, "com.norix.velk.pryg"),
+        (daemon.PATH, "com.norix.velk.velkg.other"),
+    ],
+)
+def test_owner_of_the_name_is_ignored_on_another_path_or_interface(
+    terminal: Terminal, on_system: Stranger, straight: bool, path: str, interface: str
+) -> None:
+    terminal.daemon.leave()
+    assert on_system.own(daemon.INTERFACE) == 1
+    terminal.start_agent()
+    mark = terminal.events.mark()
+    elsewhere = log_out_and_report(path, interface)
+    send(on_system, elsewhere, receivers(terminal, terminal.system_bus, straight))
+    on_system.close()
+    terminal.daemon.appear()
+    assert settled(terminal, mark) == []
+
+
+def test_signals_that_the_agent_does_not_use_do_nothing(session: Terminal) -> None:
+    mark = session.events.mark()
+    session.daemon.emit(daemon.INTERFACE, "requestSendAppOpenState", 1, "editor")
+    session.daemon.emit(daemon.INTERFACE, "requestSetStoragePerm", 1, 2)
+    assert settled(session, mark) == []
+    session.daemon.push_online()
+    next_status(session, mark)
 
 
 def test_stranger_in_the_queue_is_obeyed_once_it_owns_the_name_and_not_before(
@@ -43,11 +106,11 @@ def test_stranger_in_the_queue_is_obeyed_once_it_owns_the_name_and_not_before(
 ) -> None:
     assert on_system.own(daemon.INTERFACE, queue=True) == 2
     mark = session.events.mark()
-    push(on_system, '{"type":1301}')
+    send(on_system, [policy('{"type":1301}')])
     assert settled(session, mark) == []
 
     session.daemon.leave()
-    push(on_system, '{"type":1300}')
+    send(on_system, [policy('{"type":1300}')])
     assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
@@ -56,27 +119,25 @@ def test_forged_new_owner_does_not_replace_the_daemon(
     session: Terminal, on_system: Stranger, straight: bool
 ) -> None:
     mark = session.events.mark()
-    for receiver in receivers(session, session.system_bus, straight):
-        forge_owner(on_system, daemon.INTERFACE, str(session.daemon.unique_name), receiver)
-    push(on_system, '{"type":1201}')
+    forged = new_owner(on_system, daemon.INTERFACE, str(session.daemon.unique_name))
+    send(on_system, [forged], receivers(session, session.system_bus, straight))
+    send(on_system, [policy('{"type":1201}')])
     assert settled(session, mark) == []
     carries_out_policies(session)
 
 
 @straight_or_not
 @pytest.mark.parametrize(
-    ("name", "bus_name", "arrived"),
-    [("dock", dock.INTERFACE, "dock entry size: 0"), ("launcher", launcher.INTERFACE, "software inited")],
+    ("name", "arrived"), [("dock", "dock entry size: 0"), ("launcher", "software inited")]
 )
 def test_forged_new_owner_is_no_arrival_of_an_awaited_service(
-    terminal: Terminal, on_session: Stranger, straight: bool, name: str, bus_name: str, arrived: str
+    terminal: Terminal, on_session: Stranger, straight: bool, name: str, arrived: str
 ) -> None:
-    fake: Fake = terminal.fakes[name]
+    fake = terminal.fakes[name]
     fake.leave()
     mark = start_agent(terminal)
-    for receiver in receivers(terminal, terminal.session_bus, straight):
-        forge_owner(on_session, bus_name, "", receiver)
-    let_reach_the_bus(on_session)
+    forged = new_owner(on_session, fake.bus_name, "")
+    send(on_session, [forged], receivers(terminal, terminal.session_bus, straight))
     carries_out_policies(terminal)
     assert arrived not in log_lines(terminal, mark)
 
@@ -84,27 +145,40 @@ def test_forged_new_owner_is_no_arrival_of_an_awaited_service(
     terminal.events.wait_for(kind="log", args=(arrived,), after=mark)
 
 
-@straight_or_not
-def test_stranger_that_speaks_like_the_launcher_is_ignored(
-    terminal: Terminal, on_session: Stranger, straight: bool
-) -> None:
+@pytest.fixture
+def desk(terminal: Terminal) -> Terminal:
+    """A terminal with an application and a package that the agent knows."""
     install(terminal, EDITOR)
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    for receiver in receivers(terminal, terminal.session_bus, straight):
-        on_session.emit(
-            launcher.PATH,
-            launcher.INTERFACE,
-            "ItemChanged",
-            "created",
-            ITEM,
-            0,
-            signature="s(ssssxx)x",
-            destination=receiver,
-        )
-    let_reach_the_bus(on_session)
-    settle(terminal)
-    assert (settled(terminal, mark), uploads(terminal, mark)) == ([], [])
+    start_with(terminal, opens("mail"), at_start=True)
+    return terminal
+
+
+LIES = {
+    "dock": [
+        Spoken(MAIL, dock.ENTRY, "NameChanged", "s", ("Spoof",)),
+        Spoken(MAIL, dock.ENTRY, "WindowInfosChanged", "a{us}", ({},)),
+        Spoken(MAIL, PROPERTIES, "PropertiesChanged", "sa{sv}as", (dock.ENTRY, {"Name": "Spoof"}, [])),
+        Spoken(MAIL, PROPERTIES, "PropertiesChanged", "sa{sv}as", (dock.ENTRY, {}, ["WindowInfos"])),
+        Spoken(dock.PATH, dock.INTERFACE, "EntryAdded", "oi", (MAIL, 0)),
+        Spoken(dock.PATH, dock.INTERFACE, "EntryRemoved", "s", ("mail",)),
+    ],
+    "launcher": [
+        Spoken(launcher.PATH, launcher.INTERFACE, "ItemChanged", "s(ssssxx)x", ("created", ITEM, 0))
+    ],
+}
+
+
+@straight_or_not
+@pytest.mark.parametrize("signals", LIES.values(), ids=LIES)
+def test_stranger_that_speaks_like_a_service_is_ignored(
+    desk: Terminal, on_session: Stranger, signals: list[Spoken], straight: bool
+) -> None:
+    mark = desk.events.mark()
+    send(on_session, signals, receivers(desk, desk.session_bus, straight))
+    settle(desk)
+
+    assert (settled(desk, mark), dock_warnings(desk, mark)) == ([], [])
+    assert follows(desk, closes("mail")) == [(CLOSED, "Mail")]
 
 
 # Every signal with arguments that the agent listens to: its sender, path, interface and signature.
@@ -122,9 +196,9 @@ ARGUMENTS: list[tuple[str, tuple[Any, ...]]] = [
     ("sss", ("box", '{"type":1201}', "x")),
     ("i", (1,)),
     ("v", ("x",)),
-    ("as", (["x", "y"],)),
+    ("as", (["mail"],)),
     ("a{sv}", ({"x": 1},)),
-    ("si", ("x", 1)),
+    ("si", (MAIL, 0)),
     ("ssi", ("x", '{"type":1201}', 1)),
     ("ass", (["x"], '{"type":1201}')),
     ("o", ("/x",)),
@@ -140,25 +214,14 @@ ARGUMENTS: list[tuple[str, tuple[Any, ...]]] = [
     ("name", "path", "interface", "member", "wanted"), SIGNALS, ids=[known[3] for known in SIGNALS]
 )
 def test_signal_with_other_arguments_than_its_own_does_nothing(
-    terminal: Terminal, name: str, path: str, interface: str, member: str, wanted: str
+    desk: Terminal, name: str, path: str, interface: str, member: str, wanted: str
 ) -> None:
-    fake = terminal.fakes[name]
-    terminal.start_agent()
-    settle(terminal)
-    fake.leave()
-    owner = Stranger(fake.bus)
-    assert owner.own(interface) == 1
-    mark = terminal.events.mark()
-    for signature, args in ARGUMENTS:
-        if signature != wanted:
-            owner.emit(path, interface, member, *args, signature=signature)
-    let_reach_the_bus(owner)
-    owner.close()
-    fake.appear()
-    settle(terminal)
-    assert settled(terminal, mark) == []
-    assert reported(terminal, mark) == []
+    mark = desk.events.mark()
+    others = [Spoken(path, interface, member, *said) for said in ARGUMENTS if said[0] != wanted]
+    send_in_the_name_of(desk.fakes[name], others)
+    settle(desk)
+    assert (settled(desk, mark), dock_warnings(desk, mark)) == ([], [])
 
-    terminal.daemon.push_online()
-    next_status(terminal, mark)
-    carries_out_policies(terminal)
+    desk.daemon.push_online()
+    next_status(desk, mark)
+    carries_out_policies(desk)
