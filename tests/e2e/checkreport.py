@@ -7,13 +7,14 @@ import subprocess
 from dataclasses import dataclass
 from datetime import datetime, timedelta, timezone
 from pathlib import Path
-from typing import Mapping
+from typing import Any, Mapping
 
 from cryptography import x509
 from cryptography.hazmat.primitives import hashes, serialization
 from cryptography.hazmat.primitives.asymmetric import ec
 from cryptography.x509.oid import NameOID
 
+from sandbox.machine import layout
 from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 
@@ -63,7 +64,7 @@ def binary(terminal: Terminal) -> Path:
     return built if built.exists() else folder / built.name
 
 
-def run(
+def run_check(
     terminal: Terminal, *arguments: str, env: Mapping[str, str] | None = None
 ) -> subprocess.CompletedProcess[str]:
     """Run it as the session's user, `env` being added to the session's environment."""
@@ -71,9 +72,9 @@ def run(
     return subprocess.run([*command, *arguments], capture_output=True, text=True, timeout=100)
 
 
-def report(terminal: Terminal, env: Mapping[str, str] | None = None) -> CheckReport:
+def findings(terminal: Terminal, env: Mapping[str, str] | None = None) -> CheckReport:
     """What it finds now."""
-    ended = run(terminal, "--json", env=env)
+    ended = run_check(terminal, "--json", env=env)
     assert ended.stderr == ""
     content = json.loads(ended.stdout)
     lines = [(entry["subject"], Line(entry["result"], entry["text"])) for entry in content["findings"]]
@@ -88,9 +89,9 @@ def make_all_well(terminal: Terminal) -> None:
     terminal.start_agent()
 
 
-def pair(begins_in_days: int = -1, ends_in_days: int = 365) -> Pair:
-    """A fresh certificate with this time of validity, signed by itself."""
-    key = ec.generate_private_key(ec.SECP256R1())
+def pair(begins_in_days: int = -1, ends_in_days: int = 365, password: bytes = b"") -> Pair:
+    """A fresh certificate with this time of validity, signed by itself; a password encrypts its key."""
+    key: Any = ec.generate_private_key(ec.SECP256R1())  # some stubs lack a method
     name = x509.Name([x509.NameAttribute(NameOID.COMMON_NAME, "terminal")])
     now = datetime.now(timezone.utc)
     certificate = (
@@ -103,18 +104,15 @@ def pair(begins_in_days: int = -1, ends_in_days: int = 365) -> Pair:
         .not_valid_after(now + timedelta(days=ends_in_days))
         .sign(key, hashes.SHA256())
     )
+    pem = serialization.Encoding.PEM
+    encryption = serialization.BestAvailableEncryption(password) if password else serialization.NoEncryption()
     return Pair(
-        certificate.public_bytes(serialization.Encoding.PEM), key_text(key, serialization.NoEncryption())
+        certificate.public_bytes(pem),
+        key.private_bytes(pem, serialization.PrivateFormat.PKCS8, encryption),
     )
 
 
-def encrypted(key: bytes) -> bytes:
-    """The same key, to be opened with a password only."""
-    loaded = serialization.load_pem_private_key(key, None)
-    return key_text(loaded, serialization.BestAvailableEncryption(b"secret"))
-
-
-def key_text(key: object, encryption: serialization.KeySerializationEncryption) -> bytes:
-    """A private key in PEM form."""
-    assert isinstance(key, ec.EllipticCurvePrivateKey)
-    return key.private_bytes(serialization.Encoding.PEM, serialization.PrivateFormat.PKCS8, encryption)
+def install_pair(terminal: Terminal, fresh: Pair) -> None:
+    """Make a certificate and its key those of the terminal."""
+    terminal.files.write(layout.CLIENT_CERTIFICATE, fresh.certificate)
+    terminal.files.write(layout.CLIENT_KEY, fresh.key)

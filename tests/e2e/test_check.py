@@ -4,14 +4,14 @@ from __future__ import annotations
 
 import json
 from pathlib import Path
+from typing import Callable
 
 import pytest
 
 from sandbox.machine import layout
 from sandbox.machine.files import DEFAULT_USERINFO
 from sandbox.terminal import Terminal
-from tests.e2e.checkreport import binary, make_all_well, report, run
-
+from tests.e2e.checkreport import binary, findings, run_check
 
 # What it asks the services: nothing that would change them.
 QUESTIONS = [
@@ -21,9 +21,8 @@ QUESTIONS = [
 ]
 
 
-def test_session_that_lacks_nothing_is_good(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    found = report(terminal)
+def test_session_that_lacks_nothing_is_good(working: Terminal) -> None:
+    found = findings(working)
     assert found.worse_than_good() == []
     assert (found.status, found.result) == (0, "good")
     assert found.line("user").text == "domain user @zhang.wei, uid 20001"
@@ -31,9 +30,8 @@ def test_session_that_lacks_nothing_is_good(terminal: Terminal) -> None:
 
 
 @pytest.mark.local_user
-def test_local_session_that_lacks_nothing_is_good_and_asks_no_platform(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    found = report(terminal)
+def test_local_session_that_lacks_nothing_is_good_and_asks_no_platform(working: Terminal) -> None:
+    found = findings(working)
     assert found.worse_than_good() == []
     assert found.status == 0
     assert found.line("user").text.startswith("local user operator, uid 1000: ")
@@ -42,20 +40,18 @@ def test_local_session_that_lacks_nothing_is_good_and_asks_no_platform(terminal:
 
 
 @pytest.mark.local_user
-def test_information_file_is_not_vital_for_a_local_user(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    terminal.files.remove(layout.USERINFO)
-    found = report(terminal)
+def test_information_file_is_not_vital_for_a_local_user(working: Terminal) -> None:
+    layout.USERINFO.unlink()
+    found = findings(working)
     assert (found.status, found.line("information file").result) == (1, "warning")
 
 
-def test_text_report_has_a_marked_line_per_finding_and_a_conclusion(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    terminal.files.write_machine_id("")
-    terminal.screensaver.leave()
-    ended = run(terminal)
+def test_text_report_has_a_marked_line_per_finding_and_a_conclusion(working: Terminal) -> None:
+    working.files.write_machine_id("")
+    working.screensaver.leave()
+    ended = run_check(working)
     *lines, conclusion = ended.stdout.splitlines()
-    known = [(subject, line) for subject, line in report(terminal).lines]
+    known = [(subject, line) for subject, line in findings(working).lines]
     marked = [f"{f'[{line.result}]':9} {subject}: {line.text}" for subject, line in known]
     assert lines == marked
     assert {line.split()[0] for line in lines} == {"[good]", "[warning]", "[bad]"}
@@ -63,78 +59,50 @@ def test_text_report_has_a_marked_line_per_finding_and_a_conclusion(terminal: Te
     assert (ended.returncode, ended.stderr) == (2, "")
 
 
-def test_warnings_alone_are_exit_status_1(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    terminal.screensaver.leave()
-    ended = run(terminal)
+def test_warnings_alone_are_exit_status_1(working: Terminal) -> None:
+    working.screensaver.leave()
+    ended = run_check(working)
     assert ended.returncode == 1
     assert ended.stdout.splitlines()[-1].endswith("only part of its work in this session; see the warnings.")
 
 
-def test_user_without_account_entry_is_bad(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    terminal.files.write_accounts()
-    found = report(terminal)
+def test_user_without_account_entry_is_bad(working: Terminal) -> None:
+    working.files.write_accounts()
+    found = findings(working)
     assert found.line("user").result == "bad"
     assert "uid 20001 has no account entry" in found.line("user").text
 
 
+def unreadable(file: Path) -> None:
+    """The user may not read the file."""
+    file.chmod(0)
+
+
 @pytest.mark.parametrize(
-    ("content", "reason"),
+    ("path", "subject", "result"),
     [
-        (b"", "holds no JSON object (illegal value"),
-        (b'{"server_host": "a"', "holds no JSON object (unterminated string"),
-        (b"[]", "holds no JSON object (another kind of JSON"),
+        (layout.USERINFO, "information file", "bad"),
+        (layout.RESTORE_SCRIPT, "restore", "warning"),
+        (layout.BACKUP_CONFIG, "restore", "warning"),
+        (layout.SERVER_CERTIFICATE, "platform authority", "bad"),
+        (layout.CLIENT_CERTIFICATE, "terminal certificate", "bad"),
+        (layout.CLIENT_KEY, "terminal key", "bad"),
     ],
+    ids=str,
 )
-def test_information_file_that_is_no_json_object_is_bad(
-    terminal: Terminal, content: bytes, reason: str
+@pytest.mark.parametrize(
+    ("spoil", "reason"), [(Path.unlink, "No such file or directory"), (unreadable, "Permission denied")]
+)
+def test_file_that_cannot_be_read_is_named_with_the_reason(
+    working: Terminal, path: Path, subject: str, result: str, spoil: Callable[[Path], None], reason: str
 ) -> None:
-    terminal.files.write_userinfo(content)
-    found = report(terminal)
-    assert found.status == 2
-    assert found.line("information file").result == "bad"
-    assert reason in found.line("information file").text
+    spoil(path)
+    assert findings(working).line(subject, f"{path} cannot be read ({reason})").result == result
 
 
-def test_information_file_that_is_missing_is_bad(terminal: Terminal) -> None:
-    terminal.files.remove(layout.USERINFO)
-    assert report(terminal).line("information file", "No such file").result == "bad"
-
-
-def test_unreadable_information_file_is_bad(terminal: Terminal) -> None:
-    layout.USERINFO.chmod(0)
-    assert report(terminal).line("information file", "Permission denied").result == "bad"
-
-
-def test_address_of_the_platform_is_needed(terminal: Terminal) -> None:
-    found = report(terminal)  # the default file names none
-    assert found.line("platform address", "names no server_host").result == "bad"
-    assert found.line("platform", "address is unknown").result == "bad"
-
-
-def test_port_that_is_none_is_bad(terminal: Terminal) -> None:
-    terminal.files.write_userinfo(json.dumps({"server_host": "a", "server_port": "84430"}))
-    assert report(terminal).line("platform address").text == 'server_port "84430" is no port number'
-
-
-@pytest.mark.parametrize(
-    ("keys", "result", "text"),
-    [
-        ({"is_Domain": False}, "warning", "the terminal is in no domain"),
-        ({"is_Domain": True}, "good", "the terminal is in a domain"),
-        ({}, "warning", "the information file does not say whether the terminal is in a domain"),
-    ],
-)
-def test_domain_of_the_terminal(terminal: Terminal, keys: dict[str, bool], result: str, text: str) -> None:
-    terminal.files.write_userinfo(json.dumps(keys))
-    line = report(terminal).line("domain")
-    assert (line.result, line.text) == (result, text)
-
-
-def test_terminal_without_a_name_is_a_warning(terminal: Terminal) -> None:
-    terminal.files.write_userinfo(json.dumps({"is_Domain": True}))
-    assert report(terminal).line("terminal name").result == "warning"
+def test_machine_identifier_that_is_missing_is_bad(terminal: Terminal) -> None:
+    layout.MACHINE_ID.unlink()
+    assert findings(terminal).line("machine identifier", "cannot be read").result == "bad"
 
 
 @pytest.mark.parametrize(
@@ -142,54 +110,70 @@ def test_terminal_without_a_name_is_a_warning(terminal: Terminal) -> None:
 )
 def test_machine_identifier_is_one_word(terminal: Terminal, identifier: str, result: str) -> None:
     terminal.files.write_machine_id(identifier)
-    assert report(terminal).line("machine identifier").result == result
+    assert findings(terminal).line("machine identifier").result == result
 
 
-def test_machine_identifier_that_is_missing_is_bad(terminal: Terminal) -> None:
-    terminal.files.remove(layout.MACHINE_ID)
-    assert report(terminal).line("machine identifier", "cannot be read").result == "bad"
+NO_OBJECT = f"{layout.USERINFO} holds no JSON object"
 
 
-@pytest.mark.parametrize("path", [layout.RESTORE_SCRIPT, layout.BACKUP_CONFIG])
-def test_file_that_the_exit_restores_from_is_a_warning_where_it_is_missing(
-    terminal: Terminal, path: Path
+@pytest.mark.parametrize(
+    ("content", "subject", "result", "text"),
+    [
+        ("", "information file", "bad", f"{NO_OBJECT} (illegal value"),
+        ('{"server_host": "a"', "information file", "bad", f"{NO_OBJECT} (unterminated string"),
+        ("[]", "information file", "bad", f"{NO_OBJECT} (another kind of JSON"),
+        ("{}", "platform address", "bad", "the information file names no server_host"),
+        ("{}", "platform", "bad", "cannot be reached: its address is unknown"),
+        (
+            '{"server_host": "a", "server_port": "84430"}',
+            "platform address",
+            "bad",
+            'server_port "84430" is no port number',
+        ),
+        ('{"is_Domain": false}', "domain", "warning", "the terminal is in no domain"),
+        ('{"is_Domain": true}', "domain", "good", "the terminal is in a domain"),
+        ("{}", "domain", "warning", "the information file does not say whether the terminal is in a domain"),
+        ('{"is_Domain": true}', "terminal name", "warning", "the information file names none"),
+    ],
+)
+def test_information_file_is_judged_by_its_content(
+    terminal: Terminal, content: str, subject: str, result: str, text: str
 ) -> None:
-    make_all_well(terminal)
-    terminal.files.remove(path)
-    line = report(terminal).line("restore", "cannot be read")
-    assert (line.result, line.text.split()[0]) == ("warning", str(path))
+    terminal.files.write_userinfo(content)
+    line = findings(terminal).line(subject)
+    assert line.result == result
+    assert line.text.startswith(text)
 
 
-def test_changes_nothing(terminal: Terminal) -> None:
-    make_all_well(terminal)
+def test_changes_nothing(working: Terminal) -> None:
     older = {**DEFAULT_USERINFO, "server_host": layout.PLATFORM_HOST, "server_ip": "10.0.0.1"}
     del older["domain_host"]
-    terminal.files.write_userinfo(json.dumps({**older, "server_port": str(terminal.platform.port)}))
-    uid = terminal.user.plain_name
-    terminal.platform.post_message(uid, "T", "C")
+    working.files.write_userinfo(json.dumps({**older, "server_port": str(working.platform.port)}))
+    uid = working.user.plain_name
+    working.platform.post_message(uid, "T", "C")
     before = {path: path.read_bytes() for path in layout.CONFIG.iterdir()}
-    terminal.sync()
-    mark = terminal.events.mark()
+    working.sync()
+    mark = working.events.mark()
 
-    assert report(terminal).status == 0
+    assert findings(working).status == 0
 
     assert {path: path.read_bytes() for path in layout.CONFIG.iterdir()} == before
-    assert [message["read_at"] for message in terminal.platform.messages(uid)] == [""]
-    calls = [(event.target, event.member) for event in terminal.events.all(kind="call", after=mark)]
+    assert [message["read_at"] for message in working.platform.messages(uid)] == [""]
+    calls = [(event.target, event.member) for event in working.events.all(kind="call", after=mark)]
     assert calls == QUESTIONS
-    assert [event.member for event in terminal.events.all(kind="http", after=mark)] == ["list"]
+    assert [event.member for event in working.events.all(kind="http", after=mark)] == ["list"]
 
 
 @pytest.mark.parametrize("arguments", [["--nonsense"], ["something"], ["--json", "something"]])
 def test_wrong_usage_is_no_result(terminal: Terminal, arguments: list[str]) -> None:
-    ended = run(terminal, *arguments)
+    ended = run_check(terminal, *arguments)
     assert ended.returncode == 3
     assert ended.stdout == ""
     assert ended.stderr == "velks-check: wrong usage; see velks-check --help\n"
 
 
 def test_help_names_the_exit_statuses(terminal: Terminal) -> None:
-    ended = run(terminal, "--help")
+    ended = run_check(terminal, "--help")
     assert ended.returncode == 0
     assert "Exit status: 0 good, 1 warnings, 2 bad, 3 wrong usage." in ended.stdout
     assert terminal.events.all(kind="http") == []

@@ -16,7 +16,9 @@ from sandbox.fakes.fault import Fault
 from sandbox.fakes.logind import DISPLAY, USER
 from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
-from tests.e2e.checkreport import Line, make_all_well, report
+from tests.e2e.checkreport import Line, findings
+
+DENIED = Fault.fail("org.freedesktop.DBus.Error.AccessDenied")
 
 
 @pytest.mark.parametrize(
@@ -37,7 +39,7 @@ def test_service_that_is_absent_is_named_with_what_follows(
     terminal: Terminal, fake: str, result: str
 ) -> None:
     terminal.fakes[fake].leave()
-    found = report(terminal)
+    found = findings(terminal)
     line = found.line("service", "is not there: ")
     assert (line.result, line.text.split()[0]) == (result, terminal.fakes[fake].bus_name)
     assert len([name for name, _ in found.lines if name == "service"]) == len(terminal.fakes)
@@ -45,7 +47,7 @@ def test_service_that_is_absent_is_named_with_what_follows(
 
 @pytest.mark.parametrize("kind", ["system", "session"])
 def test_bus_that_cannot_be_reached_is_one_bad_line(terminal: Terminal, kind: str) -> None:
-    found = report(terminal, env={f"DBUS_{kind.upper()}_BUS_ADDRESS": "unix:path=/nowhere"})
+    found = findings(terminal, env={f"DBUS_{kind.upper()}_BUS_ADDRESS": "unix:path=/nowhere"})
     assert found.line(f"{kind} bus", "cannot be reached: ").result == "bad"
     assert found.status == 2
 
@@ -53,45 +55,35 @@ def test_bus_that_cannot_be_reached_is_one_bad_line(terminal: Terminal, kind: st
 @pytest.mark.parametrize("tool", ["dpkg", "dpkg-query", "dpkg-architecture"])
 def test_package_tool_that_does_not_run_is_a_warning(terminal: Terminal, tool: str) -> None:
     terminal.tools.forbid(tool)
-    lines = [line for subject, line in report(terminal).lines if subject == "package tool"]
+    lines = [line for subject, line in findings(terminal).lines if subject == "package tool"]
     broken = [line.text for line in lines if line.result == "warning"]
     assert len(lines) == 3
     assert [text.split()[0].rpartition("/")[2] for text in broken] == [tool]
 
 
+FAILED = "failed; see journalctl --user -u velks, then systemctl --user restart velks"
+INACTIVE = "inactive; start it with systemctl --user start velks"
+MASKED = "masked: an administrator or the user has disabled the agent; "
+NOT_MEANT = "not meant to run for this user: "
+
+
 @pytest.mark.parametrize(
     ("properties", "result", "text"),
     [
-        (
-            "ActiveState=failed",
-            "bad",
-            "failed; see journalctl --user -u velks, then systemctl --user restart velks",
-        ),
-        ("ActiveState=inactive", "warning", "inactive; start it with systemctl --user start velks"),
-        (
-            "ActiveState=inactive LoadState=masked",
-            "warning",
-            "masked: an administrator or the user has disabled the agent; ",
-        ),
+        ("ActiveState=failed", "bad", FAILED),
+        ("ActiveState=inactive", "warning", INACTIVE),
+        ("ActiveState=inactive LoadState=masked", "warning", MASKED),
         ("ActiveState=inactive LoadState=not-found", "warning", "unknown to the service manager; "),
         ("ActiveState=activating", "warning", "about to start again after a failure; see journalctl"),
-        ("ActiveState=inactive Result=exec-condition", "warning", "not meant to run for this user: "),
-        (
-            "ActiveState=inactive ConditionResult=no ConditionTimestampMonotonic=17",
-            "warning",
-            "not meant to run for this user: ",
-        ),
-        (
-            "ActiveState=inactive ConditionResult=no ConditionTimestampMonotonic=0",
-            "warning",
-            "inactive; start it with",
-        ),
+        ("ActiveState=inactive Result=exec-condition", "warning", NOT_MEANT),
+        ("ActiveState=inactive ConditionResult=no ConditionTimestampMonotonic=17", "warning", NOT_MEANT),
+        ("ActiveState=inactive ConditionResult=no ConditionTimestampMonotonic=0", "warning", INACTIVE),
     ],
 )
 def test_unit_that_is_not_active(terminal: Terminal, properties: str, result: str, text: str) -> None:
     said = ("ConditionTimestampMonotonic=0 " + properties).replace(" ", "\n")
     terminal.commands.answer("systemctl", Answer(stdout=f"{said}\n".encode()))
-    line = report(terminal).line("unit")
+    line = findings(terminal).line("unit")
     assert line.result == result
     assert line.text.startswith(f"velks.service is {text}")
     (call,) = terminal.events.all(kind="command", member="systemctl")
@@ -100,7 +92,7 @@ def test_unit_that_is_not_active(terminal: Terminal, properties: str, result: st
 
 def test_without_a_service_manager_the_unit_is_a_warning(terminal: Terminal) -> None:
     terminal.commands.answer("systemctl", Answer(1))
-    assert report(terminal).line("unit").text == "there is no user service manager to ask"
+    assert findings(terminal).line("unit").text == "there is no user service manager to ask"
 
 
 @pytest.mark.parametrize(("fake", "result"), [("daemon", "bad"), ("logind", "bad"), ("identity", "warning")])
@@ -108,77 +100,70 @@ def test_without_a_service_manager_the_unit_is_a_warning(terminal: Terminal) -> 
     ("fault", "text"),
     [
         (Fault.hang(), " does not answer (Did not receive a reply."),
-        (
-            Fault.fail("org.freedesktop.DBus.Error.AccessDenied"),
-            " may not be called by this user; the bus lacks",
-        ),
+        (DENIED, " may not be called by this user; the bus lacks"),
     ],
 )
 def test_service_that_is_of_no_use_is_named_with_what_follows(
     terminal: Terminal, fake: str, result: str, fault: Fault, text: str
 ) -> None:
     terminal.fakes[fake].fault = fault
-    line = report(terminal).line("service", text)
+    line = findings(terminal).line("service", text)
     assert (line.result, line.text.split()[0]) == (result, terminal.fakes[fake].bus_name)
 
 
 @pytest.mark.parametrize("answer", ["challenge", "no", "na"])
-def test_reboot_that_would_be_refused_is_a_warning(terminal: Terminal, answer: str) -> None:
-    make_all_well(terminal)
-    assert report(terminal).line("reboot").result == "good"
-    terminal.logind.answers["CanReboot"] = Reply("s", (answer,))
-    line = report(terminal).line("reboot")
+def test_reboot_that_would_be_refused_is_a_warning(working: Terminal, answer: str) -> None:
+    assert findings(working).line("reboot").result == "good"
+    working.logind.answers["CanReboot"] = Reply("s", (answer,))
+    line = findings(working).line("reboot")
     assert (line.result, line.text.split(":")[0]) == ("warning", f"would be refused now ({answer})")
 
 
-def test_reboot_that_cannot_be_asked_for_without_a_policy_kit_is_a_warning(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    terminal.logind.faults["CanReboot"] = Fault.fail("org.freedesktop.DBus.Error.AccessDenied")
-    line = report(terminal).line("reboot")
+def test_reboot_that_cannot_be_asked_for_without_a_policy_kit_is_a_warning(working: Terminal) -> None:
+    working.logind.faults["CanReboot"] = DENIED
+    line = findings(working).line("reboot")
     assert (line.result, line.text.split(" (")[0]) == ("warning", "would be refused now")
 
 
 @pytest.mark.parametrize("kind", ["wayland", "x11"])
-def test_graphical_session_is_good(terminal: Terminal, kind: str) -> None:
-    make_all_well(terminal)
-    terminal.logind.set("Type", kind, path=DISPLAY)
-    assert report(terminal).line("session") == Line("good", f"is graphical ({kind})")
-    terminal.logind.set("Active", False, path=DISPLAY)
-    assert report(terminal).line("session") == Line("good", f"is graphical ({kind}), in the background")
+def test_graphical_session_is_good(working: Terminal, kind: str) -> None:
+    working.logind.set("Type", kind, path=DISPLAY)
+    assert findings(working).line("session") == Line("good", f"is graphical ({kind})")
+    working.logind.set("Active", False, path=DISPLAY)
+    assert findings(working).line("session") == Line("good", f"is graphical ({kind}), in the background")
 
 
-@pytest.mark.parametrize(("name", "value"), [("Type", "tty"), ("Type", "unspecified"), ("Class", "greeter")])
-def test_session_without_a_desktop_of_the_user_is_bad(terminal: Terminal, name: str, value: str) -> None:
-    make_all_well(terminal)
-    terminal.logind.set(name, value, path=DISPLAY)
-    line = report(terminal).line("session")
+@pytest.mark.parametrize(
+    ("path", "name", "value"),
+    [
+        (DISPLAY, "Type", "tty"),
+        (DISPLAY, "Type", "unspecified"),
+        (DISPLAY, "Class", "greeter"),
+        (USER, "Display", ("", "/")),
+    ],
+)
+def test_agent_without_a_graphical_session_of_the_user_is_bad(
+    working: Terminal, path: str, name: str, value: object
+) -> None:
+    working.logind.set(name, value, path=path)
+    line = findings(working).line("session")
     assert (line.result, line.text.split(":")[0]) == ("bad", "this user has no graphical one")
 
 
-def test_agent_without_any_session_is_bad(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    terminal.logind.set("Display", ("", "/"), path=USER)
-    line = report(terminal).line("session")
-    assert (line.result, line.text.split(":")[0]) == ("bad", "this user has no graphical one")
-
-
-def test_agent_that_is_frozen_is_bad(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    os.kill(terminal.agent.pid, signal.SIGSTOP)
-    line = report(terminal).line("agent")
-    os.kill(terminal.agent.pid, signal.SIGCONT)
+def test_agent_that_is_frozen_is_bad(working: Terminal) -> None:
+    os.kill(working.agent.pid, signal.SIGSTOP)
+    line = findings(working).line("agent")
+    os.kill(working.agent.pid, signal.SIGCONT)
     assert (line.result, line.text.split(" and ")[0]) == ("bad", "is stopped by a signal")
 
 
 def test_agent_that_does_not_run_is_bad(terminal: Terminal) -> None:
-    assert report(terminal).line("agent").text == "does not run"
-    assert report(terminal).line("agent").result == "bad"
+    assert findings(terminal).line("agent") == Line("bad", "does not run")
 
 
-def test_second_agent_is_bad(terminal: Terminal) -> None:
-    make_all_well(terminal)
-    with subprocess.Popen([terminal.agent.binary], stderr=subprocess.DEVNULL) as second:
-        line = report(terminal).line("agent")
+def test_second_agent_is_bad(working: Terminal) -> None:
+    with subprocess.Popen([working.agent.binary], stderr=subprocess.DEVNULL) as second:
+        line = findings(working).line("agent")
         second.terminate()
     assert (line.result, line.text) == ("bad", "runs 2 times; there must be one")
 
@@ -196,7 +181,7 @@ def test_child_of_the_agent_that_is_no_other_program_yet_is_no_second_agent(term
     command = [sys.executable, "-c", FORKS]
     with subprocess.Popen(command, stdin=subprocess.PIPE, stdout=subprocess.PIPE) as forked:
         assert forked.stdout and forked.stdout.readline() == b"forked\n"
-        line = report(terminal).line("agent")
+        line = findings(terminal).line("agent")
     assert (line.result, line.text) == ("good", "runs")
 
 
@@ -216,6 +201,6 @@ def test_agent_whose_program_was_replaced_is_a_warning(terminal: Terminal, tmp_p
 def agent_line(terminal: Terminal, installed: Path) -> Line:
     """What the installed check program says of an agent that was started elsewhere."""
     started, terminal.agent.binary = terminal.agent.binary, installed
-    found = report(terminal).line("agent")
+    found = findings(terminal).line("agent")
     terminal.agent.binary = started
     return found
