@@ -5,7 +5,6 @@ from __future__ import annotations
 import json
 from typing import Any
 
-from sandbox.events import Event
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.machine import layout
 from sandbox.machine.packages import desktop_file
@@ -40,7 +39,14 @@ def uploads(terminal: Terminal, after: int = 0) -> list[tuple[str, str]]:
 
 def next_upload(terminal: Terminal, url: str, after: int = 0, count: int = 1) -> str:
     """Text of the `count`th report to an address since a mark; waits for it."""
-    return _next(terminal, url, after, count).args[1]
+    return terminal.events.wait_for(
+        lambda event: event.args[0] == url,
+        source="velks",
+        target="daemon",
+        member="onUploadFinished",
+        after=after,
+        count=count,
+    ).args[1]
 
 
 def next_inventory(terminal: Terminal, after: int = 0, count: int = 1) -> list[dict[str, Any]]:
@@ -76,14 +82,3 @@ def tool_calls(terminal: Terminal, name: str, after: int = 0) -> list[tuple[str,
 def now() -> str:
     """The agent's time, as reports show it."""
     return layout.CLOCK.read_text().strip()
-
-
-def _next(terminal: Terminal, url: str, after: int, count: int) -> Event:
-    return terminal.events.wait_for(
-        lambda event: event.args[0] == url,
-        source="velks",
-        target="daemon",
-        member="onUploadFinished",
-        after=after,
-        count=count,
-    )

@@ -69,13 +69,12 @@ def unreadable(file: Path) -> None:
 
 
 @pytest.mark.parametrize("whose", FILES)
-def test_what_a_file_knows_of_a_package_is_reported_with_the_launchers_name(
-    terminal: Terminal, whose: str
+def test_what_a_file_knows_is_reported_with_the_launchers_name_and_the_installed_version(
+    stocked: Terminal, whose: str
 ) -> None:
-    install(terminal, EDITOR)
-    write(terminal, whose, record())
+    write(stocked, whose, record(version="99"))
 
-    assert inventory_at_start(terminal) == [
+    assert inventory_at_start(stocked) == [
         {
             "arch": "mips64el",
             "installed_type": 1,
@@ -87,39 +86,50 @@ def test_what_a_file_knows_of_a_package_is_reported_with_the_launchers_name(
     ]
 
 
-def test_daemons_file_goes_before_the_policy_services(terminal: Terminal) -> None:
+@pytest.mark.parametrize(
+    ("daemons", "policy_services", "reported"),
+    [
+        pytest.param(
+            [record("editor", 3)],
+            [record("editor", 1), record("player", 2)],
+            [3, 2],
+            id="daemon's file first",
+        ),
+        pytest.param(
+            [record("Editor", 1), record("editor", 2), record("editor", 3)],
+            [],
+            [2, -1],
+            id="first of a package",
+        ),
+        pytest.param([record("other", 1), record("player", 2)], [], [-1, 2], id="none without an item"),
+        pytest.param(
+            [5, None, "editor", [record()], {}, {"package_name": 5}, record(number=9)],
+            [],
+            [9, -1],
+            id="none of what is no record",
+        ),
+    ],
+)
+def test_record_of_an_item_is_the_first_of_its_package(
+    terminal: Terminal, daemons: list[Any], policy_services: list[Any], reported: list[int]
+) -> None:
     install(terminal, EDITOR, PLAYER)
-    write(terminal, "policy service", record("editor", 1), record("player", 2))
-    write(terminal, "daemon", record("editor", 3))
+    write(terminal, "daemon", *daemons)
+    write(terminal, "policy service", *policy_services)
 
-    assert numbers(inventory_at_start(terminal)) == [3, 2]
-
-
-def test_first_record_of_a_package_goes_before_later_ones(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", record("Editor", 1), record("editor", 2), record("editor", 3))
-
-    assert numbers(inventory_at_start(terminal)) == [2]
+    assert numbers(inventory_at_start(terminal)) == reported
 
 
-def test_items_of_one_package_share_its_record(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    terminal.launcher.items = [EDITOR, LauncherItem(EDITOR.path, "Editor, safe mode")]
-    write(terminal, "daemon", record())
+def test_items_of_one_package_share_its_record(stocked: Terminal) -> None:
+    stocked.launcher.items = [EDITOR, LauncherItem(EDITOR.path, "Editor, safe mode")]
+    write(stocked, "daemon", record())
 
-    found = inventory_at_start(terminal)
+    found = inventory_at_start(stocked)
 
     assert [(known["name"], known["software_id"]) for known in found] == [
         ("Editor", 5),
         ("Editor, safe mode", 5),
     ]
-
-
-def test_record_without_an_item_is_not_reported(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", record("other"), record("player"))
-
-    assert [known["package_name"] for known in inventory_at_start(terminal)] == ["editor"]
 
 
 def test_record_without_a_package_is_that_of_a_file_that_no_package_owns(terminal: Terminal) -> None:
@@ -128,13 +138,6 @@ def test_record_without_a_package_is_that_of_a_file_that_no_package_owns(termina
 
     found = inventory_at_start(terminal)[0]
     assert (found["software_id"], found["package_name"], found["version"]) == (8, "", "failed")
-
-
-def test_version_is_the_installed_one(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", record(version="99"))
-
-    assert inventory_at_start(terminal)[0]["version"] == "1"
 
 
 def test_each_record_costs_one_lookup_and_its_item_no_other(terminal: Terminal) -> None:
@@ -189,13 +192,12 @@ def test_broken_file_is_as_good_as_none(terminal: Terminal, whose: str, content:
 @pytest.mark.parametrize("whose", FILES)
 @pytest.mark.parametrize("spoil", [Path.unlink, in_place_of_it_a_folder, unreadable])
 def test_file_that_cannot_be_read_is_as_good_as_none(
-    terminal: Terminal, whose: str, spoil: Callable[[Path], None]
+    stocked: Terminal, whose: str, spoil: Callable[[Path], None]
 ) -> None:
-    install(terminal, EDITOR)
-    write(terminal, whose, record())
+    write(stocked, whose, record())
     spoil(FILES[whose])
 
-    assert numbers(inventory_at_start(terminal)) == [-1]
+    assert numbers(inventory_at_start(stocked)) == [-1]
 
 
 @pytest.mark.parametrize(
@@ -211,20 +213,12 @@ def test_file_that_cannot_be_read_is_as_good_as_none(
     ids=str,
 )
 def test_missing_or_odd_values_count_as_nothing(
-    terminal: Terminal, stored: dict[str, Any], reported: tuple[int, int, str]
+    stocked: Terminal, stored: dict[str, Any], reported: tuple[int, int, str]
 ) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", {"package_name": "editor", **stored})
+    write(stocked, "daemon", {"package_name": "editor", **stored})
 
-    found = inventory_at_start(terminal)[0]
+    found = inventory_at_start(stocked)[0]
     assert (found["software_id"], found["installed_type"], found["arch"]) == reported
-
-
-def test_elements_that_are_no_records_are_passed_over(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", 5, None, "editor", [record()], {}, {"package_name": 5}, record(number=9))
-
-    assert numbers(inventory_at_start(terminal)) == [9]
 
 
 @pytest.mark.parametrize("name", ["two words", '"quoted"', "wild*", "-dash", "应用", "a\nb"])
@@ -236,25 +230,23 @@ def test_odd_package_names_are_matched_as_they_stand(terminal: Terminal, name: s
     assert numbers(inventory_at_start(terminal)) == [6]
 
 
-def test_files_are_read_anew_for_each_report(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", record(number=1))
-    inventory_at_start(terminal)
-    write(terminal, "daemon", record(number=2))
+def test_files_are_read_anew_for_each_report(stocked: Terminal) -> None:
+    write(stocked, "daemon", record(number=1))
+    inventory_at_start(stocked)
+    write(stocked, "daemon", record(number=2))
 
-    mark = announce(terminal, "deleted", EDITOR)
+    mark = announce(stocked, "deleted", EDITOR)
 
-    assert numbers(next_inventory(terminal, mark)) == [2]
+    assert numbers(next_inventory(stocked, mark)) == [2]
 
 
-def test_reading_is_logged(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    terminal.files.write(FILES["daemon"], '[{"package_name":"editor","id":7}]')
-    terminal.files.write(FILES["policy service"], "broken")
+def test_reading_is_logged(stocked: Terminal) -> None:
+    stocked.files.write(FILES["daemon"], '[{"package_name":"editor","id":7}]')
+    stocked.files.write(FILES["policy service"], "broken")
 
-    terminal.start_agent()
+    stocked.start_agent()
 
-    events = terminal.events.all(lambda event: "SoftwareGuard" in event.args[0], kind="log")
+    events = stocked.events.all(lambda event: "SoftwareGuard" in event.args[0], kind="log")
     assert {event.member for event in events} == {"info"}
     assert [event.args[0] for event in events] == [
         f'{LOGGED} "/var/lib/velk/software_list.list" : "[{{\\"package_name\\":\\"editor\\",\\"id\\":7}}]"',
@@ -266,11 +258,10 @@ def test_reading_is_logged(terminal: Terminal) -> None:
     ]
 
 
-def test_files_stay_as_they_are(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    write(terminal, "daemon", record())
+def test_files_stay_as_they_are(stocked: Terminal) -> None:
+    write(stocked, "daemon", record())
     before = {path: path.read_bytes() for path in FILES.values()}
 
-    inventory_at_start(terminal)
+    inventory_at_start(stocked)
 
     assert {path: Path(path).read_bytes() for path in FILES.values()} == before

@@ -2,11 +2,14 @@
 
 from __future__ import annotations
 
+from typing import Callable
+
 import pytest
 
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
+from sandbox.periods import DBUS_LIMIT
 from sandbox.terminal import Terminal
 from tests.e2e.software import (
     CHANGE,
@@ -21,9 +24,8 @@ from tests.e2e.software import (
 )
 from tests.e2e.wire import asked_of_the_session_bus, log_lines, start_agent
 
-DBUS_LIMIT = 25
 WAITING = "launcher service is not registered, wait.."
-UNKNOWN = "launcher service is not init"
+NOT_THERE = "launcher service is not init"
 ARRIVED = "software inited"
 ASKED = "GetLauncerItems -------- QDBusError("
 
@@ -31,7 +33,7 @@ ASKED = "GetLauncerItems -------- QDBusError("
 def marker_lines(terminal: Terminal, after: int = 0) -> list[tuple[str, str]]:
     """Level and text of the lines about the launcher's arrival."""
     lines = terminal.events.all(kind="log", after=after)
-    return [(line.member, line.args[0]) for line in lines if line.args[0] in (WAITING, UNKNOWN, ARRIVED)]
+    return [(line.member, line.args[0]) for line in lines if line.args[0] in (WAITING, NOT_THERE, ARRIVED)]
 
 
 def wait_for_list(terminal: Terminal, after: int) -> None:
@@ -47,7 +49,7 @@ def start_without_launcher(terminal: Terminal) -> None:
     terminal.start_agent()
 
 
-def start_with(terminal: Terminal, fault: Fault) -> int:
+def start_asking(terminal: Terminal, fault: Fault) -> int:
     """Start the agent; it has just asked the launcher. The mark before it."""
     install(terminal, EDITOR)
     terminal.launcher.fault = fault
@@ -56,21 +58,17 @@ def start_with(terminal: Terminal, fault: Fault) -> int:
     return mark
 
 
-def test_inventory_is_reported_once_to_begin_with(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
+def test_inventory_is_reported_once_to_begin_with(stocked: Terminal) -> None:
+    stocked.start_agent()
 
-    terminal.start_agent()
-
-    assert [url for url, _ in uploads(terminal)] == [INVENTORY]
-    assert marker_lines(terminal) == []
+    assert [url for url, _ in uploads(stocked)] == [INVENTORY]
+    assert marker_lines(stocked) == []
 
 
-def test_inventory_is_reported_before_the_session_is_announced(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
+def test_inventory_is_reported_before_the_session_is_announced(stocked: Terminal) -> None:
+    stocked.start_agent()
 
-    terminal.start_agent()
-
-    on_system_bus = terminal.events.all(kind="call", source="velks")
+    on_system_bus = stocked.events.all(kind="call", source="velks")
     sent = sorted(
         (call for call in on_system_bus if call.target in ("daemon", "logind")),
         key=lambda call: call.detail["serial"],
@@ -86,7 +84,7 @@ def test_inventory_is_reported_before_the_session_is_announced(terminal: Termina
 
 def test_machine_is_read_before_the_launcher_is_asked(terminal: Terminal) -> None:
     """And the list is on its way before the user's name is asked for."""
-    mark = start_with(terminal, Fault.hold())
+    mark = start_asking(terminal, Fault.hold())
     terminal.files.write_machine_id("too-late")
     assert terminal.events.all(target="logind", member="Get", after=mark) == []
 
@@ -95,14 +93,16 @@ def test_machine_is_read_before_the_launcher_is_asked(terminal: Terminal) -> Non
     assert "box-file-machine-0001" in next_upload(terminal, INVENTORY, mark)
 
 
-def test_nothing_is_reported_without_a_launcher(terminal: Terminal) -> None:
+def test_absent_launcher_is_warned_of_once_and_then_waited_for_without_asking(terminal: Terminal) -> None:
     start_without_launcher(terminal)
 
+    assert asked_of_the_session_bus(terminal, lambda: terminal.advance(3600)) == []
+
     assert uploads(terminal) == []
-    assert marker_lines(terminal) == [("warning", WAITING), ("info", UNKNOWN)]
+    assert marker_lines(terminal) == [("warning", WAITING), ("info", NOT_THERE)]
 
 
-def test_inventory_is_reported_when_the_launcher_arrives(terminal: Terminal) -> None:
+def test_late_launcher_is_read_and_then_followed(terminal: Terminal) -> None:
     start_without_launcher(terminal)
     mark = terminal.events.mark()
 
@@ -111,82 +111,57 @@ def test_inventory_is_reported_when_the_launcher_arrives(terminal: Terminal) -> 
 
     assert [url for url, _ in uploads(terminal)] == [INVENTORY]
     assert marker_lines(terminal, mark) == [("debug", ARRIVED)]
-
-
-def test_late_launcher_is_waited_for_without_asking(terminal: Terminal) -> None:
-    start_without_launcher(terminal)
-    mark = terminal.events.mark()
-
-    assert asked_of_the_session_bus(terminal, lambda: terminal.advance(3600)) == []
-    assert (uploads(terminal), marker_lines(terminal, mark)) == ([], [])
-
-
-def test_changes_are_reported_of_a_launcher_that_came_late(terminal: Terminal) -> None:
-    start_without_launcher(terminal)
-    mark = terminal.events.mark()
-    terminal.launcher.appear()
-    wait_for_list(terminal, mark)
-
     mark = announce(terminal, "created", EDITOR)
-
     assert [url for url, _ in uploads(terminal, mark)] == [CHANGE, INVENTORY]
 
 
 @pytest.mark.parametrize("late", [False, True], ids=["present at the start", "late"])
-def test_restart_of_the_launcher_is_not_noticed(terminal: Terminal, late: bool) -> None:
-    install(terminal, EDITOR)
+def test_restart_of_the_launcher_is_not_noticed(stocked: Terminal, late: bool) -> None:
     if late:
-        terminal.launcher.leave()
-    mark = start_agent(terminal)
+        stocked.launcher.leave()
+    mark = start_agent(stocked)
     if late:
-        terminal.launcher.appear()
-    next_inventory(terminal, mark)
-    terminal.sync()
-    mark = terminal.events.mark()
+        stocked.launcher.appear()
+    next_inventory(stocked, mark)
+    stocked.sync()
+    mark = stocked.events.mark()
 
-    terminal.launcher.restart()
+    stocked.launcher.restart()
     # The announcement comes after the news of the restart: the one inventory is its own.
-    announce(terminal, "deleted", EDITOR)
+    announce(stocked, "deleted", EDITOR)
 
-    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY]
-    assert marker_lines(terminal, mark) == []
+    assert [url for url, _ in uploads(stocked, mark)] == [INVENTORY]
+    assert marker_lines(stocked, mark) == []
 
 
-def test_launcher_that_has_gone_lists_nothing(terminal: Terminal) -> None:
-    mark = start_with(terminal, Fault.hang())
+@pytest.mark.parametrize(
+    ("fault", "then", "error"),
+    [
+        (Fault.hang(), lambda terminal: terminal.launcher.leave(), '"org.freedesktop.DBus.Error.'),
+        (Fault.hang(), lambda terminal: terminal.jump(DBUS_LIMIT), '"org.freedesktop.DBus.Error.NoReply"'),
+        (Fault.fail("com.norix.Error"), lambda _: None, '"com.norix.Error", "simulated failure")'),
+    ],
+    ids=["goes", "hangs for the limit", "refuses"],
+)
+def test_launcher_that_does_not_answer_lists_nothing(
+    terminal: Terminal, fault: Fault, then: Callable[[Terminal], None], error: str
+) -> None:
+    mark = start_asking(terminal, fault)
 
-    terminal.launcher.leave()
+    then(terminal)
     wait_for_list(terminal, mark)
 
     assert uploads(terminal) == []
-    assert any(line.startswith(f'{ASKED}"org.freedesktop.DBus.Error.') for line in log_lines(terminal, mark))
-
-
-def test_launcher_that_hangs_costs_the_limit(terminal: Terminal) -> None:
-    mark = start_with(terminal, Fault.hang())
-
-    terminal.jump(DBUS_LIMIT)
-    wait_for_list(terminal, mark)
-
-    assert uploads(terminal) == []
-    assert any("Error.NoReply" in line for line in log_lines(terminal, mark) if line.startswith(ASKED))
+    assert any(line.startswith(f"{ASKED}{error}") for line in log_lines(terminal, mark))
 
 
 def test_slow_launcher_is_waited_for(terminal: Terminal) -> None:
-    mark = start_with(terminal, Fault.hold())
+    mark = start_asking(terminal, Fault.hold())
 
     terminal.jump(DBUS_LIMIT - 5)
     terminal.launcher.release()
 
     assert [record["name"] for record in next_inventory(terminal, mark)] == ["Editor"]
-
-
-def test_launcher_that_refuses_lists_nothing(terminal: Terminal) -> None:
-    mark = start_with(terminal, Fault.fail("com.norix.Error"))
-    wait_for_list(terminal, mark)
-
-    assert uploads(terminal) == []
-    assert f'{ASKED}"com.norix.Error", "simulated failure")' in log_lines(terminal, mark)
 
 
 @pytest.mark.parametrize(
@@ -209,15 +184,6 @@ def test_list_of_a_wrong_type_counts_as_none(
 
     assert uploads(terminal) == []
     assert "SoftwareGuard::getSoftwareList()--- 0" in log_lines(terminal, 0)
-
-
-def test_list_that_could_be_read_is_logged_without_an_error(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-
-    terminal.start_agent()
-
-    lines = [line for line in log_lines(terminal, 0) if line.startswith("GetLauncerItems")]
-    assert lines == ['GetLauncerItems -------- QDBusError("", "")']
 
 
 def test_successive_changes_are_reported_in_their_order(terminal: Terminal) -> None:

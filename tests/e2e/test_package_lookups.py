@@ -12,8 +12,8 @@ from sandbox.fakes.launcher import LauncherItem
 from sandbox.machine.commands import Answer
 from sandbox.machine.packages import desktop_file, native_architecture
 from sandbox.terminal import Terminal
-from tests.e2e.software import EDITOR, PLAYER, announce, install, inventory_at_start, tool_calls
-from tests.e2e.wire import log_lines
+from tests.e2e.software import EDITOR, PLAYER, install, inventory_at_start, tool_calls
+from tests.e2e.wire import warnings
 
 FOREIGN = "i386" if native_architecture() != "i386" else "amd64"
 NO_NAME = "get version failed, empty packageName"
@@ -37,16 +37,21 @@ def link(path: str, target: str) -> str:
     return path
 
 
-@pytest.fixture
-def links(tmp_path: Path) -> Path:
-    """A folder for links, which belongs to no package."""
-    return tmp_path
+@pytest.mark.parametrize(
+    ("version", "kind"),
+    [
+        ("1:2.1~rc1+deb12u3-4", {}),
+        ("3", {"multi_arch": "same"}),  # the tool names its architecture, too
+        ("7", {"architecture": FOREIGN}),
+    ],
+    ids=["plain", "for several architectures", "foreign"],
+)
+def test_item_is_known_by_the_package_of_its_desktop_file(
+    terminal: Terminal, version: str, kind: dict[str, Any]
+) -> None:
+    terminal.packages.install("editor", version, **kind)
 
-
-def test_item_is_known_by_the_package_of_its_desktop_file(terminal: Terminal) -> None:
-    terminal.packages.install("editor", "1:2.1~rc1+deb12u3-4")
-
-    assert lookup(terminal, EDITOR.path) == ("editor", "1:2.1~rc1+deb12u3-4")
+    assert lookup(terminal, EDITOR.path) == ("editor", version)
 
 
 def test_architecture_is_the_machines(terminal: Terminal) -> None:
@@ -58,12 +63,6 @@ def test_architecture_is_the_machines(terminal: Terminal) -> None:
     assert [record["arch"] for record in records] == [shown.stdout.strip()] * 2
 
 
-def test_architecture_is_no_part_of_the_packages_name(terminal: Terminal) -> None:
-    terminal.packages.install("lib", "3", multi_arch="same")
-
-    assert lookup(terminal, desktop_file("lib")) == ("lib", "3")
-
-
 def test_package_for_two_architectures_gives_both_versions(terminal: Terminal) -> None:
     """The quotes between them are the tool's; only the outer ones are taken off."""
     files = [desktop_file("lib")]
@@ -71,12 +70,6 @@ def test_package_for_two_architectures_gives_both_versions(terminal: Terminal) -
         terminal.packages.install("lib", "3", files, architecture, "same")
 
     assert lookup(terminal, files[0]) == ("lib", "3''3")
-
-
-def test_package_of_a_foreign_architecture_is_found(terminal: Terminal) -> None:
-    terminal.packages.install("game", "7", architecture=FOREIGN)
-
-    assert lookup(terminal, desktop_file("game")) == ("game", "7")
 
 
 def test_file_of_several_packages_is_known_by_all_their_names(terminal: Terminal) -> None:
@@ -107,67 +100,52 @@ def test_file_that_no_package_owns_has_no_package(terminal: Terminal) -> None:
     assert lookup(terminal, EDITOR.path) == ("", "failed")
 
 
-def test_file_that_no_package_owns_is_warned_of(terminal: Terminal) -> None:
-    lookup(terminal, EDITOR.path)
+@pytest.mark.parametrize("linked", [False, True], ids=["file", "target of a link"])
+def test_file_that_no_package_owns_is_warned_of(terminal: Terminal, tmp_path: Path, linked: bool) -> None:
+    lookup(terminal, link(f"{tmp_path}/link.desktop", EDITOR.path) if linked else EDITOR.path)
 
-    warnings = [line.args[0] for line in terminal.events.all(kind="log", member="warning")]
-    assert warnings[:2] == [f'get package name failed, desktop: "{EDITOR.path}" ""', NO_NAME]
+    assert warnings(terminal, 0)[:2] == [f'get package name failed, desktop: "{EDITOR.path}" ""', NO_NAME]
 
 
-def test_file_that_is_gone_is_still_its_packages(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
+def test_file_that_is_gone_is_still_its_packages(stocked: Terminal) -> None:
     Path(EDITOR.path).unlink()
 
-    assert lookup(terminal, EDITOR.path) == ("editor", "1")
+    assert lookup(stocked, EDITOR.path) == ("editor", "1")
 
 
-def test_link_is_looked_up_by_its_target(terminal: Terminal, links: Path) -> None:
-    install(terminal, EDITOR)
-
-    assert lookup(terminal, link(f"{links}/a link.desktop", EDITOR.path)) == ("editor", "1")
+def test_link_is_looked_up_by_its_target(stocked: Terminal, tmp_path: Path) -> None:
+    assert lookup(stocked, link(f"{tmp_path}/a link.desktop", EDITOR.path)) == ("editor", "1")
 
 
-def test_link_to_a_file_that_no_package_owns_is_warned_of_by_its_target(
-    terminal: Terminal, links: Path
-) -> None:
-    lookup(terminal, link(f"{links}/link.desktop", EDITOR.path))
-
-    warnings = [line.args[0] for line in terminal.events.all(kind="log", member="warning")]
-    assert warnings[0] == f'get package name failed, desktop: "{EDITOR.path}" ""'
-
-
-def test_links_relative_target_begins_at_the_link(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
+def test_links_relative_target_begins_at_the_link(stocked: Terminal) -> None:
     path = link(desktop_file("sub/link"), "../editor.desktop")
 
-    assert lookup(terminal, path) == ("editor", "1")
+    assert lookup(stocked, path) == ("editor", "1")
 
 
-def test_link_of_a_package_is_not_looked_up_itself(terminal: Terminal, links: Path) -> None:
-    install(terminal, EDITOR)
+def test_link_of_a_package_is_not_looked_up_itself(stocked: Terminal, tmp_path: Path) -> None:
     Path(EDITOR.path).unlink()
 
-    assert lookup(terminal, link(EDITOR.path, f"{links}/unknown.desktop")) == ("", "failed")
+    assert lookup(stocked, link(EDITOR.path, f"{tmp_path}/unknown.desktop")) == ("", "failed")
 
 
-def test_only_one_link_is_followed(terminal: Terminal, links: Path) -> None:
-    install(terminal, EDITOR)
-    first = link(f"{links}/first.desktop", EDITOR.path)
+def test_only_one_link_is_followed(stocked: Terminal, tmp_path: Path) -> None:
+    first = link(f"{tmp_path}/first.desktop", EDITOR.path)
 
-    assert lookup(terminal, link(f"{links}/second.desktop", first)) == ("", "failed")
+    assert lookup(stocked, link(f"{tmp_path}/second.desktop", first)) == ("", "failed")
 
 
-def test_link_to_nowhere_is_looked_up_by_its_target(terminal: Terminal, links: Path) -> None:
+def test_link_to_nowhere_is_looked_up_by_its_target(terminal: Terminal, tmp_path: Path) -> None:
     terminal.packages.install("suite", "5", ["/var/opt/suite.desktop"])
     Path("/var/opt/suite.desktop").unlink()
 
-    assert lookup(terminal, link(f"{links}/link.desktop", "/var/opt/suite.desktop")) == ("suite", "5")
+    assert lookup(terminal, link(f"{tmp_path}/link.desktop", "/var/opt/suite.desktop")) == ("suite", "5")
 
 
-def test_loop_of_links_ends(terminal: Terminal, links: Path) -> None:
-    link(f"{links}/other.desktop", f"{links}/loop.desktop")
+def test_loop_of_links_ends(terminal: Terminal, tmp_path: Path) -> None:
+    link(f"{tmp_path}/other.desktop", f"{tmp_path}/loop.desktop")
 
-    assert lookup(terminal, link(f"{links}/loop.desktop", f"{links}/other.desktop")) == ("", "failed")
+    assert lookup(terminal, link(f"{tmp_path}/loop.desktop", f"{tmp_path}/other.desktop")) == ("", "failed")
 
 
 @pytest.mark.parametrize(
@@ -200,10 +178,8 @@ def test_path_with_blanks_is_found(terminal: Terminal) -> None:
     assert lookup(terminal, path) == ("words", "2")
 
 
-def test_path_with_a_wildcard_gives_the_first_match(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-
-    assert lookup(terminal, desktop_file("edit*")) == ("editor", "1")
+def test_path_with_a_wildcard_gives_the_first_match(stocked: Terminal) -> None:
+    assert lookup(stocked, desktop_file("edit*")) == ("editor", "1")
 
 
 @pytest.mark.parametrize("path", ["", "-l", "--help", "--", "/", "\\", "[", "*" * 5000], ids=range(8))
@@ -269,13 +245,3 @@ def test_package_that_is_gone_has_an_empty_version(terminal: Terminal) -> None:
     terminal.tools.answer("dpkg", Answer(stdout=b"gone: /x\n"))
 
     assert lookup(terminal, EDITOR.path) == ("gone", "")
-
-
-def test_update_is_seen_when_it_is_announced(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    terminal.start_agent()
-    terminal.packages.install("editor", "1.2")
-
-    mark = announce(terminal, "update", EDITOR)
-
-    assert '"update" ("Editor", "1.2")' in log_lines(terminal, mark)

@@ -1,8 +1,7 @@
-"""Package tools that hang, crash, cannot be run or print something unexpected."""
+"""Package tools that hang, crash, cannot be run or print something unexpected, and how they are called."""
 
 from __future__ import annotations
 
-import json
 from pathlib import Path
 
 import pytest
@@ -10,27 +9,22 @@ import pytest
 from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 from tests.e2e.software import (
-    CHANGE,
     EDITOR,
     PLAYER,
     TOOLS,
     announce,
     install,
     inventory_at_start,
+    next_change,
     next_inventory,
-    next_upload,
     tool_calls,
 )
 from tests.e2e.wire import log_lines
 
 TOOL_LIMIT = 30
-# What a record says when that tool failed, by the key that it is about.
-WHEN_GIVEN_UP = {
-    "dpkg": ("package_name", ""),
-    "dpkg-query": ("version", "failed"),
-    "dpkg-architecture": ("arch", "failed"),
-}
-WHEN_SILENT = {"dpkg": ("package_name", ""), "dpkg-query": ("version", ""), "dpkg-architecture": ("arch", "")}
+# What a record says by a tool's answer, and what it says if the tool has been given up.
+KEYS = {"dpkg": "package_name", "dpkg-query": "version", "dpkg-architecture": "arch"}
+GIVEN_UP = {"dpkg": "", "dpkg-query": "failed", "dpkg-architecture": "failed"}
 
 
 def start_with_hung(terminal: Terminal, tool: str) -> tuple[int, int]:
@@ -68,64 +62,42 @@ def is_running(process: int) -> bool:
         return False
 
 
-@pytest.mark.parametrize("tool", TOOLS)
-def test_hung_tool_is_given_up_after_its_limit(terminal: Terminal, tool: str) -> None:
-    install(terminal, EDITOR)
-    mark, _ = start_with_hung(terminal, tool)
-
-    pass_time(terminal, tool, TOOL_LIMIT)
-
-    assert is_given_up(terminal, tool)
-    key, value = WHEN_GIVEN_UP[tool]
-    assert next_inventory(terminal, mark)[0][key] == value
-
-
-@pytest.mark.parametrize("tool", TOOLS)
-def test_hung_tool_is_ended_once_it_is_given_up(terminal: Terminal, tool: str) -> None:
-    install(terminal, EDITOR)
-    mark, process = start_with_hung(terminal, tool)
-
-    pass_time(terminal, tool, TOOL_LIMIT)
-    next_inventory(terminal, mark)
-    terminal.sync()
-
-    assert not is_running(process)
-
-
 @pytest.mark.parametrize(
     ("tool", "printed", "value"),
     [
+        ("dpkg", b"", ""),
         ("dpkg", b"player: /x\n", "player"),
+        ("dpkg-query", b"", "failed"),
         ("dpkg-query", b"'1'", "failed"),
+        ("dpkg-architecture", b"", "failed"),
         ("dpkg-architecture", b"slow\n", "failed"),
     ],
 )
-def test_what_a_tool_printed_before_it_hung_counts_for_the_package_alone(
-    terminal: Terminal, tool: str, printed: bytes, value: str
+def test_hung_tool_is_given_up_after_its_limit_and_ended(
+    stocked: Terminal, tool: str, printed: bytes, value: str
 ) -> None:
-    install(terminal, EDITOR)
-    mark, _ = start_with_hung(terminal, tool)
-    terminal.tools.nudge(tool, printed)
+    """What it printed before counts for the package alone."""
+    mark, process = start_with_hung(stocked, tool)
+    stocked.tools.nudge(tool, printed)
 
-    pass_time(terminal, tool, TOOL_LIMIT)
+    pass_time(stocked, tool, TOOL_LIMIT)
 
-    assert is_given_up(terminal, tool)
-    assert next_inventory(terminal, mark)[0][WHEN_GIVEN_UP[tool][0]] == value
+    assert is_given_up(stocked, tool)
+    assert next_inventory(stocked, mark)[0][KEYS[tool]] == value
+    stocked.sync()
+    assert not is_running(process)
 
 
 @pytest.mark.parametrize("tool", TOOLS)
-def test_slow_tool_is_waited_for(terminal: Terminal, tool: str) -> None:
-    install(terminal, EDITOR)
+def test_slow_tool_is_waited_for(stocked: Terminal, tool: str) -> None:
     answers = {"dpkg": b"editor: /x\n", "dpkg-query": b"'1'", "dpkg-architecture": b"slow\n"}
-    terminal.tools.answer(tool, Answer(stdout=answers[tool]))
-    mark, _ = start_with_hung(terminal, tool)
+    stocked.tools.answer(tool, Answer(stdout=answers[tool]))
+    mark, _ = start_with_hung(stocked, tool)
 
-    pass_time(terminal, tool, TOOL_LIMIT - 10)
-    terminal.tools.release(tool)
+    pass_time(stocked, tool, TOOL_LIMIT - 10)
+    stocked.tools.release(tool)
 
-    record = next_inventory(terminal, mark)[0]
-    key, value = WHEN_GIVEN_UP[tool]
-    assert record[key] not in ("", value)
+    assert next_inventory(stocked, mark)[0][KEYS[tool]] not in ("", GIVEN_UP[tool])
 
 
 def test_each_call_has_the_whole_limit(terminal: Terminal) -> None:
@@ -140,72 +112,67 @@ def test_each_call_has_the_whole_limit(terminal: Terminal) -> None:
     assert len(tool_calls(terminal, "dpkg-query", mark)) == 2
 
 
-def test_what_was_sent_meanwhile_is_handled_afterwards(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    terminal.start_agent()
-    terminal.tools.hold("dpkg")
-    mark = terminal.events.mark()
-    terminal.launcher.announce("deleted", EDITOR)
-    wait_for_call(terminal, "dpkg", mark)
-    terminal.daemon.push_policy({"type": 5})
+def test_what_was_sent_meanwhile_is_handled_afterwards(stocked: Terminal) -> None:
+    stocked.start_agent()
+    stocked.tools.hold("dpkg")
+    mark = stocked.events.mark()
+    stocked.launcher.announce("deleted", EDITOR)
+    wait_for_call(stocked, "dpkg", mark)
+    stocked.daemon.push_policy({"type": 5})
 
-    terminal.tools.release("dpkg")
-    terminal.events.wait_for(
+    stocked.tools.release("dpkg")
+    stocked.events.wait_for(
         lambda event: '"type": 5' in event.args[0], target="policy_service", member="onPolicyMsg", after=mark
     )
 
-    assert next_inventory(terminal, mark)
+    assert next_inventory(stocked, mark)
 
 
 @pytest.mark.real_time
-def test_limit_holds_by_the_clock_on_the_wall(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    mark, process = start_with_hung(terminal, "dpkg-query")
+def test_limit_holds_by_the_clock_on_the_wall(stocked: Terminal) -> None:
+    mark, process = start_with_hung(stocked, "dpkg-query")
 
-    terminal.events.wait_for(member="onUploadFinished", after=mark, timeout=120)
-    terminal.sync()
+    stocked.events.wait_for(member="onUploadFinished", after=mark, timeout=120)
+    stocked.sync()
 
-    assert next_inventory(terminal, mark)[0]["version"] == "failed"
+    assert next_inventory(stocked, mark)[0]["version"] == "failed"
     assert not is_running(process)
-
-
-@pytest.mark.parametrize("tool", TOOLS)
-@pytest.mark.parametrize(
-    "answer", [Answer(), Answer(1), Answer(-11), Answer(2, b"", b"error: no\n")], ids=str
-)
-def test_tool_that_prints_nothing_gives_an_empty_text(terminal: Terminal, tool: str, answer: Answer) -> None:
-    install(terminal, EDITOR)
-    terminal.tools.answer(tool, answer)
-
-    key, value = WHEN_SILENT[tool]
-    assert inventory_at_start(terminal)[0][key] == value
 
 
 @pytest.mark.parametrize(
     ("tool", "printed", "value"),
     [
+        ("dpkg", b"", ""),
         ("dpkg", b"editor", "editor"),
         ("dpkg", b"a: /x\nb: /y\n", "a"),
         ("dpkg", b"::a:b", "a"),
         ("dpkg", b" a : /x", " a "),
+        ("dpkg", b"a\xff\xfeb", "a\ufffd\ufffdb"),
+        ("dpkg-query", b"", ""),
         ("dpkg-query", b"'1'", "1"),
         ("dpkg-query", b"'", ""),
         ("dpkg-query", b"''", ""),
         ("dpkg-query", b"abc", "b"),
         ("dpkg-query", b"'1'\n", "1'"),
         ("dpkg-query", b"'" + b"9" * 1_000_000 + b"'", "9" * 1_000_000),
+        ("dpkg-query", b"'a\xff\xfeb'", "a\ufffd\ufffdb"),
+        ("dpkg-architecture", b"", ""),
         ("dpkg-architecture", b" \t one two \n\n", "one two"),
+        ("dpkg-architecture", b"a\xff\xfeb", "a\ufffd\ufffdb"),
     ],
     ids=lambda value: repr(value)[:20],
 )
-@pytest.mark.parametrize("status", [0, 1, -11])
+@pytest.mark.parametrize(
+    ("status", "complaint"),
+    [(0, b""), (1, b"error: no\n"), (-11, b""), (0, b"warning: a lot\n" * 20_000)],
+    ids=["well", "failing", "crashing", "complaining"],
+)
 def test_what_a_tool_prints_counts_however_it_ends(
-    terminal: Terminal, tool: str, printed: bytes, value: str, status: int
+    stocked: Terminal, tool: str, printed: bytes, value: str, status: int, complaint: bytes
 ) -> None:
-    install(terminal, EDITOR)
-    terminal.tools.answer(tool, Answer(status, printed))
+    stocked.tools.answer(tool, Answer(status, printed, complaint))
 
-    assert inventory_at_start(terminal)[0][WHEN_SILENT[tool][0]] == value
+    assert inventory_at_start(stocked)[0][KEYS[tool]] == value
 
 
 def test_colons_alone_are_no_package_and_warned_of(terminal: Terminal) -> None:
@@ -217,28 +184,10 @@ def test_colons_alone_are_no_package_and_warned_of(terminal: Terminal) -> None:
 
 
 @pytest.mark.parametrize("tool", TOOLS)
-def test_bytes_that_are_no_text_are_replaced(terminal: Terminal, tool: str) -> None:
-    install(terminal, EDITOR)
-    terminal.tools.answer(tool, Answer(stdout=b"'a\xff\xfeb'"))
+def test_tool_that_cannot_be_run_is_given_up_at_once(stocked: Terminal, tool: str) -> None:
+    stocked.tools.forbid(tool)
 
-    value = inventory_at_start(terminal)[0][WHEN_SILENT[tool][0]]
-    assert value.strip("'") == "a\ufffd\ufffdb"
-
-
-def test_complaints_are_no_part_of_the_answer(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    terminal.tools.answer("dpkg-query", Answer(stdout=b"'3'", stderr=b"warning: a lot\n" * 20_000))
-
-    assert inventory_at_start(terminal)[0]["version"] == "3"
-
-
-@pytest.mark.parametrize("tool", TOOLS)
-def test_tool_that_cannot_be_run_is_given_up_at_once(terminal: Terminal, tool: str) -> None:
-    install(terminal, EDITOR)
-    terminal.tools.forbid(tool)
-
-    key, value = WHEN_GIVEN_UP[tool]
-    assert inventory_at_start(terminal)[0][key] == value
+    assert inventory_at_start(stocked)[0][KEYS[tool]] == GIVEN_UP[tool]
 
 
 def test_failed_version_is_reported_with_the_change(session: Terminal) -> None:
@@ -247,4 +196,69 @@ def test_failed_version_is_reported_with_the_change(session: Terminal) -> None:
 
     mark = announce(session, "created", EDITOR)
 
-    assert json.loads(next_upload(session, CHANGE, mark))["payload"]["software_version"] == "failed"
+    assert next_change(session, mark)["software_version"] == "failed"
+
+
+def languages(terminal: Terminal, tool: str) -> list[str | None]:
+    """LC_ALL of each call of a recorded tool."""
+    calls = terminal.events.all(kind="command", target=tool)
+    return [call.detail["environment"].get("LC_ALL") for call in calls]
+
+
+def start_recorded(terminal: Terminal, language: str | None = None) -> None:
+    """Start the agent in a session of this language; each call of a tool is recorded."""
+    for tool in TOOLS:
+        terminal.tools.record(tool)
+    terminal.start_agent(extra_env={"LC_ALL": language} if language else {})
+
+
+@pytest.fixture
+def two_items(terminal: Terminal) -> Terminal:
+    """A terminal with two packages that the launcher lists."""
+    install(terminal, EDITOR, PLAYER)
+    return terminal
+
+
+@pytest.mark.parametrize("language", [None, "zh_CN.UTF-8"])
+def test_tools_speak_plainly_once_a_version_was_asked_for(two_items: Terminal, language: str | None) -> None:
+    start_recorded(two_items, language)
+
+    announce(two_items, "deleted", EDITOR)
+
+    assert languages(two_items, "dpkg-architecture") == [language, "C"]
+    assert languages(two_items, "dpkg") == [language, "C", "C", "C", "C"]
+    assert languages(two_items, "dpkg-query") == [language, "C", "C", "C", "C"]
+
+
+@pytest.mark.parametrize("language", [None, "zh_CN.UTF-8"])
+def test_item_without_a_package_leaves_the_language_to_the_sessions(
+    terminal: Terminal, language: str | None
+) -> None:
+    install(terminal, PLAYER)
+    terminal.launcher.items = [EDITOR, PLAYER]
+    start_recorded(terminal, language)
+
+    assert languages(terminal, "dpkg") == [language] * 2
+    assert languages(terminal, "dpkg-query") == [language]
+
+
+def test_tools_are_called_in_the_order_of_the_items(two_items: Terminal) -> None:
+    start_recorded(two_items)
+
+    calls = [(event.target, *event.args) for event in two_items.events.all(kind="command")]
+    assert calls == [
+        ("dpkg-architecture", "-q", "DEB_HOST_ARCH_CPU"),
+        ("dpkg", "-S", EDITOR.path),
+        ("dpkg-query", "-W", "-f='${Version}'", "editor"),
+        ("dpkg", "-S", PLAYER.path),
+        ("dpkg-query", "-W", "-f='${Version}'", "player"),
+    ]
+
+
+def test_version_is_looked_up_before_the_change_is_reported(two_items: Terminal) -> None:
+    start_recorded(two_items)
+    mark = announce(two_items, "created", EDITOR)
+
+    commands = two_items.events.all(kind="command", after=mark)
+    asked = two_items.events.wait_for(member="GetMachineID", after=mark)
+    assert [event.target for event in commands if event.time < asked.time] == ["dpkg", "dpkg-query"]

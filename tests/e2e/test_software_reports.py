@@ -9,6 +9,7 @@ import pytest
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
+from sandbox.periods import DBUS_LIMIT
 from sandbox.terminal import Terminal
 from tests.e2e.software import (
     CHANGE,
@@ -25,8 +26,6 @@ from tests.e2e.software import (
     uploads,
 )
 from tests.e2e.wire import log_lines
-
-DBUS_LIMIT = 25
 
 
 def test_inventory_is_compact_json_with_sorted_keys(terminal: Terminal) -> None:
@@ -59,26 +58,23 @@ def test_change_is_compact_json_with_sorted_keys(terminal: Terminal, action: str
 
 
 @pytest.mark.parametrize("action", ["created", "update"])
-def test_change_is_followed_by_the_inventory(terminal: Terminal, action: str) -> None:
-    install(terminal, EDITOR)
-    terminal.start_agent()
+def test_change_is_followed_by_the_inventory(stocked_session: Terminal, action: str) -> None:
+    stocked_session.packages.install("editor", "1.1")
+    mark = announce(stocked_session, action, EDITOR)
 
-    terminal.packages.install("editor", "1.1")
-    mark = announce(terminal, action, EDITOR)
-
-    assert [url for url, _ in uploads(terminal, mark)] == [CHANGE, INVENTORY]
-    assert next_change(terminal, mark)["software_version"] == "1.1"
-    assert next_inventory(terminal, mark)[0]["version"] == "1.1"
+    assert [url for url, _ in uploads(stocked_session, mark)] == [CHANGE, INVENTORY]
+    assert next_change(stocked_session, mark)["software_version"] == "1.1"
+    assert next_inventory(stocked_session, mark)[0]["version"] == "1.1"
 
 
 @pytest.mark.parametrize("action", ["deleted", "Created", "UPDATE", "updated", " created", "", "创建"])
-def test_any_other_action_reports_the_inventory_alone(terminal: Terminal, action: str) -> None:
-    install(terminal, EDITOR)
-    terminal.start_agent()
+def test_any_other_action_reports_the_inventory_alone_and_asks_nothing(
+    stocked_session: Terminal, action: str
+) -> None:
+    mark = announce(stocked_session, action, EDITOR)
 
-    mark = announce(terminal, action, EDITOR)
-
-    assert [url for url, _ in uploads(terminal, mark)] == [INVENTORY]
+    assert [url for url, _ in uploads(stocked_session, mark)] == [INVENTORY]
+    assert stocked_session.events.all(member="GetMachineID") == []
 
 
 def test_change_without_items_reports_the_change_alone(terminal: Terminal) -> None:
@@ -144,28 +140,17 @@ def test_change_has_the_time_of_the_sessions_zone(terminal: Terminal) -> None:
 
 
 def test_change_asks_the_daemon_for_the_machine_and_the_inventory_keeps_the_one_of_the_start(
-    terminal: Terminal,
+    stocked_session: Terminal,
 ) -> None:
-    install(terminal, EDITOR)
-    terminal.start_agent()
-    terminal.files.write_machine_id("another-in-the-file")
-    terminal.daemon.answers["GetMachineID"] = Reply("s", ("another-at-the-daemon",))
-    mark = terminal.events.mark()
+    stocked_session.files.write_machine_id("another-in-the-file")
+    stocked_session.daemon.answers["GetMachineID"] = Reply("s", ("another-at-the-daemon",))
+    mark = stocked_session.events.mark()
 
-    terminal.launcher.announce("created", EDITOR)
+    stocked_session.launcher.announce("created", EDITOR)
 
-    assert next_change(terminal, mark)["machine_id"] == "another-at-the-daemon"
-    inventory = json.loads(next_upload(terminal, INVENTORY, mark))
+    assert next_change(stocked_session, mark)["machine_id"] == "another-at-the-daemon"
+    inventory = json.loads(next_upload(stocked_session, INVENTORY, mark))
     assert inventory["payload"]["machine_id"] == "box-file-machine-0001"
-
-
-def test_inventory_alone_asks_the_daemon_nothing(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    terminal.start_agent()
-
-    announce(terminal, "deleted", EDITOR)
-
-    assert terminal.events.all(member="GetMachineID") == []
 
 
 @pytest.mark.parametrize(
@@ -189,27 +174,23 @@ def test_machine_that_the_daemon_refuses_is_reported_as_empty(session: Terminal)
     assert next_change(session)["machine_id"] == ""
 
 
-def test_daemon_that_does_not_return_the_machine_is_waited_for_until_the_limit(session: Terminal) -> None:
-    session.daemon.faults["GetMachineID"] = Fault.hang()
+@pytest.mark.parametrize(
+    ("fault", "seconds", "machine"),
+    [(Fault.hang(), DBUS_LIMIT, ""), (Fault.hold(), DBUS_LIMIT - 5, "box-machine-0001")],
+    ids=["hung", "slow"],
+)
+def test_machine_is_waited_for_until_the_limit(
+    session: Terminal, fault: Fault, seconds: int, machine: str
+) -> None:
+    session.daemon.faults["GetMachineID"] = fault
     mark = session.events.mark()
 
     session.launcher.announce("created", EDITOR)
     session.events.wait_for(member="GetMachineID", after=mark)
-    session.jump(DBUS_LIMIT)
-
-    assert next_change(session, mark)["machine_id"] == ""
-
-
-def test_slow_daemon_is_waited_for(session: Terminal) -> None:
-    session.daemon.faults["GetMachineID"] = Fault.hold()
-    mark = session.events.mark()
-
-    session.launcher.announce("created", EDITOR)
-    session.events.wait_for(member="GetMachineID", after=mark)
-    session.jump(DBUS_LIMIT - 5)
+    session.jump(seconds)
     session.daemon.release()
 
-    assert next_change(session, mark)["machine_id"] == "box-machine-0001"
+    assert next_change(session, mark)["machine_id"] == machine
 
 
 def test_without_a_daemon_the_report_is_made_with_an_empty_machine(session: Terminal) -> None:
@@ -224,14 +205,13 @@ def test_without_a_daemon_the_report_is_made_with_an_empty_machine(session: Term
     assert '\\"machine_id\\":\\"\\"' in line.args[0]
 
 
-def test_replies_to_the_uploads_are_not_waited_for(terminal: Terminal) -> None:
-    install(terminal, EDITOR)
-    terminal.daemon.faults["onUploadFinished"] = Fault.hang()
-    terminal.start_agent()
+def test_replies_to_the_uploads_are_not_waited_for(stocked: Terminal) -> None:
+    stocked.daemon.faults["onUploadFinished"] = Fault.hang()
+    stocked.start_agent()
 
-    mark = announce(terminal, "created", EDITOR)
+    mark = announce(stocked, "created", EDITOR)
 
-    assert [url for url, _ in uploads(terminal, mark)] == [CHANGE, INVENTORY]
+    assert [url for url, _ in uploads(stocked, mark)] == [CHANGE, INVENTORY]
 
 
 def test_change_is_logged(terminal: Terminal) -> None:
