@@ -34,6 +34,11 @@ def begin_poll(terminal: Terminal, route: str = "list", count: int = 1) -> int:
     return mark
 
 
+def titles(terminal: Terminal, after: int) -> list[str]:
+    """Titles of the notifications since a mark."""
+    return [event.args[3] for event in terminal.events.all(member="Notify", after=after)]
+
+
 def answer_always(
     terminal: Terminal, body: bytes, headers: dict[str, str] | None = None, status: int = 200
 ) -> None:

@@ -21,7 +21,7 @@ def replied(terminal: Terminal, body: str) -> int:
     return poll(terminal)
 
 
-def message(title: str, **fields: Any) -> dict[str, Any]:
+def titled(title: str, **fields: Any) -> dict[str, Any]:
     """A message of these fields alone."""
     return {"uuid": title, "title": title, **fields}
 
@@ -36,7 +36,7 @@ def receipts_and_notices(terminal: Terminal, after: int) -> list[tuple[str, str]
 
 
 def test_messages_of_one_reply_are_marked_and_shown_one_by_one(terminal: Terminal) -> None:
-    messages = [message("a"), message("b", read_at=READ), message("c"), message("a")]
+    messages = [titled("a"), titled("b", read_at=READ), titled("c"), titled("a")]
     mark = replied(terminal, json.dumps(messages))
     shown = [(member, title) for title in ("a", "c", "a") for member in ("read", "Notify")]
     assert receipts_and_notices(terminal, mark) == shown
@@ -67,7 +67,7 @@ def test_half_a_character_does_not_keep_the_next_message_from_being_shown(
 
 def test_message_of_a_megabyte_is_shown_whole(terminal: Terminal) -> None:
     content = "终端😀" * 100_000
-    mark = replied(terminal, json.dumps([message("T", content=content)], ensure_ascii=False))
+    mark = replied(terminal, json.dumps([titled("T", content=content)], ensure_ascii=False))
     assert next_notification(terminal, mark).body == content
 
 

@@ -14,37 +14,29 @@ from sandbox.periods import SURELY_NEXT_POLL
 from sandbox.policies import POLICIES
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
-from tests.e2e.messages import USER, answer_always, as_reply, begin_poll, message, poll, requests
+from tests.e2e.messages import USER, answer_always, as_reply, begin_poll, message, poll, requests, titles
 from tests.e2e.wire import FORWARDED_CODE, forced_actions
 
 LESS_THAN_A_REQUEST_MAY_TAKE = 20
 AT_FULL_SPEED, MOST_IN_A_SECOND = 1000, 50
 
 
-@pytest.fixture
-def session(terminal: Terminal) -> Terminal:
-    """A terminal with a platform, and an agent that is ready."""
-    assert terminal.platform
-    terminal.start_agent()
-    return terminal
+def test_count_that_never_falls_does_not_keep_a_log_out_waiting(polling: Terminal) -> None:
+    answer_always(polling, as_reply(message()), {"X-Total-Count": "1000"})
+    mark = begin_poll(polling, count=60)
 
-
-def test_count_that_never_falls_does_not_keep_a_log_out_waiting(session: Terminal) -> None:
-    answer_always(session, as_reply(message()), {"X-Total-Count": "1000"})
-    mark = begin_poll(session, count=60)
-
-    session.daemon.push_policy({"type": 1201})
-    session.events.wait_for(
+    polling.daemon.push_policy({"type": 1201})
+    polling.events.wait_for(
         lambda event: event.args[4] == POLICIES[1201].notice,
         target="notifications",
         member="Notify",
         after=mark,
     )
-    session.sync()
-    session.jump(60)
-    session.events.wait_for(target="logind", member="Terminate", after=mark)
-    answer_always(session, b"[]")
-    session.sync()
+    polling.sync()
+    polling.jump(60)
+    polling.events.wait_for(target="logind", member="Terminate", after=mark)
+    answer_always(polling, b"[]")
+    polling.sync()
 
 
 COUNT_NEVER_FALLS = HttpFault.reply(200, b"[]", {"X-Total-Count": "1000"})
@@ -70,12 +62,12 @@ def policy_goes_before_the_51st_message(terminal: Terminal) -> None:
 
 
 @pytest.fixture
-def held(session: Terminal) -> Iterator[Terminal]:
+def held(polling: Terminal) -> Iterator[Terminal]:
     """A terminal whose agent waits for the reply to its first list request."""
-    session.platform.fault = HttpFault.hang()
-    begin_poll(session)
-    yield session
-    session.platform.release()
+    polling.platform.fault = HttpFault.hang()
+    begin_poll(polling)
+    yield polling
+    polling.platform.release()
 
 
 def test_policies_have_their_turn_after_every_fifty_messages(held: Terminal) -> None:
@@ -92,56 +84,56 @@ def test_poll_that_falls_into_a_drain_does_not_start_a_second_one_beside_it(held
     policy_goes_before_the_51st_message(held)
 
 
-def test_long_drain_needs_no_more_stack_than_a_short_one(session: Terminal) -> None:
+def test_long_drain_needs_no_more_stack_than_a_short_one(polling: Terminal) -> None:
     def stack() -> int:
-        status = (Path("/proc") / str(session.agent.pid) / "status").read_text()
+        status = (Path("/proc") / str(polling.agent.pid) / "status").read_text()
         return int(re.findall(r"VmStk:\s*(\d+) kB", status)[0])
 
     for number in range(5):
-        session.platform.post_message(USER, f"message {number}", "text")
-    poll(session)
+        polling.platform.post_message(USER, f"message {number}", "text")
+    poll(polling)
     short = stack()
     for number in range(600):
-        session.platform.post_message(USER, f"message {number}", "text")
-    poll(session)
-    session.events.wait_for(kind="http", member="read", count=605, timeout=60)
+        polling.platform.post_message(USER, f"message {number}", "text")
+    poll(polling)
+    polling.events.wait_for(kind="http", member="read", count=605, timeout=60)
     assert stack() - short <= 64
 
 
-def test_policy_that_waits_during_a_drain_is_carried_out_after_it(session: Terminal) -> None:
-    session.platform.post_message(USER, "T", "C")
-    session.platform.faults["list"] = HttpFault.hang()
-    mark = begin_poll(session)
-    session.daemon.push_policy({"type": 1201})
-    session.platform.release()
-    session.sync()
-    assert [event.args[3] for event in session.events.all(member="Notify", after=mark)] == ["T", "提醒"]
-    session.advance(60)
-    assert forced_actions(session, mark) == ["Terminate"]
+def test_policy_that_waits_during_a_drain_is_carried_out_after_it(polling: Terminal) -> None:
+    polling.platform.post_message(USER, "T", "C")
+    polling.platform.faults["list"] = HttpFault.hang()
+    mark = begin_poll(polling)
+    polling.daemon.push_policy({"type": 1201})
+    polling.platform.release()
+    polling.sync()
+    assert titles(polling, mark) == ["T", "提醒"]
+    polling.advance(60)
+    assert forced_actions(polling, mark) == ["Terminate"]
 
 
-def test_platform_whose_count_never_falls_is_asked_fifty_times_in_a_second_at_most(session: Terminal) -> None:
-    session.platform.faults["list"] = COUNT_NEVER_FALLS
-    mark = poll(session)
-    session.events.wait_for(kind="http", member="list", count=AT_FULL_SPEED + 1, after=mark, timeout=60)
-    session.sync()
-    assert len(requests(session, "list", mark)) == AT_FULL_SPEED + 1  # and the poll
+def test_platform_whose_count_never_falls_is_asked_fifty_times_in_a_second_at_most(polling: Terminal) -> None:
+    polling.platform.faults["list"] = COUNT_NEVER_FALLS
+    mark = poll(polling)
+    polling.events.wait_for(kind="http", member="list", count=AT_FULL_SPEED + 1, after=mark, timeout=60)
+    polling.sync()
+    assert len(requests(polling, "list", mark)) == AT_FULL_SPEED + 1  # and the poll
 
     for _ in range(5):
-        mark = session.events.mark()
-        session.advance(1)
-        assert 0 < len(requests(session, "list", mark)) <= MOST_IN_A_SECOND
-    answer_always(session, b"[]")
-    session.advance(1)
+        mark = polling.events.mark()
+        polling.advance(1)
+        assert 0 < len(requests(polling, "list", mark)) <= MOST_IN_A_SECOND
+    answer_always(polling, b"[]")
+    polling.advance(1)
 
 
-def test_backlog_of_more_than_a_thousand_is_drained_to_its_end(session: Terminal) -> None:
+def test_backlog_of_more_than_a_thousand_is_drained_to_its_end(polling: Terminal) -> None:
     backlog = AT_FULL_SPEED + MOST_IN_A_SECOND + 20
     for number in range(backlog):
-        session.platform.post_message(USER, f"message {number}", "text")
-    mark = poll(session)
-    session.events.wait_for(kind="http", member="read", count=AT_FULL_SPEED + 1, after=mark, timeout=60)
-    session.advance(1)
-    session.advance(1)
-    assert len(requests(session, "read", mark)) == backlog
-    assert all(sent["read_at"] for sent in session.platform.messages())
+        polling.platform.post_message(USER, f"message {number}", "text")
+    mark = poll(polling)
+    polling.events.wait_for(kind="http", member="read", count=AT_FULL_SPEED + 1, after=mark, timeout=60)
+    polling.advance(1)
+    polling.advance(1)
+    assert len(requests(polling, "read", mark)) == backlog
+    assert all(sent["read_at"] for sent in polling.platform.messages())

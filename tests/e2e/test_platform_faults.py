@@ -5,18 +5,17 @@ from __future__ import annotations
 import subprocess
 from pathlib import Path
 from tempfile import mkdtemp
-from typing import Iterator
+from typing import Callable, Iterator
 
 import pytest
 
 from sandbox.machine import layout
+from sandbox.periods import TRANSFER_LIMIT
 from sandbox.platform.certificates import Authority, CertificateFiles
 from sandbox.platform.server import HttpFault, Platform, trust
 from sandbox.terminal import Terminal
-from tests.e2e.messages import USER, begin_poll, poll
+from tests.e2e.messages import USER, begin_poll, poll, titles
 from tests.e2e.wire import carries_out_policies, log_lines, next_notification, start_agent, warnings
-
-TRANSFER_LIMIT = 30
 
 
 def next_poll_is_well(terminal: Terminal) -> None:
@@ -26,18 +25,17 @@ def next_poll_is_well(terminal: Terminal) -> None:
 
 
 @pytest.mark.parametrize("fault", [HttpFault.close(), HttpFault.cut()], ids=lambda fault: fault.kind)
-def test_broken_reply_is_one_warning_and_shows_nothing(terminal: Terminal, fault: HttpFault) -> None:
-    terminal.platform.post_message(USER, "T", "C")
-    terminal.start_agent()
-    terminal.platform.fault = fault
-    mark = poll(terminal)
-    assert len(warnings(terminal, mark)) == 1
-    assert warnings(terminal, mark)[0].startswith("HTTP GET without a response: ")
-    assert terminal.events.all(member="Notify", after=mark) == []
+def test_broken_reply_is_one_warning_and_shows_nothing(polling: Terminal, fault: HttpFault) -> None:
+    polling.platform.post_message(USER, "T", "C")
+    polling.platform.fault = fault
+    mark = poll(polling)
+    (warning,) = warnings(polling, mark)
+    assert warning.startswith("HTTP GET without a response: ")
+    assert titles(polling, mark) == []
 
-    terminal.platform.release()
-    carries_out_policies(terminal)
-    assert next_notification(terminal, poll(terminal)).summary == "T"
+    polling.platform.release()
+    carries_out_policies(polling)
+    assert next_notification(polling, poll(polling)).summary == "T"
 
 
 def test_platform_that_is_down_is_asked_again_with_every_poll(terminal: Terminal) -> None:
@@ -51,72 +49,65 @@ def test_platform_that_is_down_is_asked_again_with_every_poll(terminal: Terminal
     next_poll_is_well(terminal)
 
 
-def test_hanging_platform_costs_the_transfer_limit_and_no_more(terminal: Terminal) -> None:
-    terminal.platform.post_message(USER, "T", "C")
-    terminal.start_agent()
-    terminal.platform.fault = HttpFault.hang()
-    mark = begin_poll(terminal)
-    terminal.daemon.push_policy({"type": 5})
-    terminal.jump(TRANSFER_LIMIT)
-    terminal.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
-    terminal.sync()
-    assert len(warnings(terminal, mark)) == 1
+def test_hanging_platform_costs_the_transfer_limit_and_no_more(polling: Terminal) -> None:
+    polling.platform.post_message(USER, "T", "C")
+    polling.platform.fault = HttpFault.hang()
+    mark = begin_poll(polling)
+    polling.daemon.push_policy({"type": 5})
+    polling.jump(TRANSFER_LIMIT)
+    polling.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
+    polling.sync()
+    assert len(warnings(polling, mark)) == 1
 
-    terminal.platform.release()
-    assert next_notification(terminal, poll(terminal)).summary == "T"
-
-
-def test_hanging_receipt_does_not_keep_the_message_from_being_shown(terminal: Terminal) -> None:
-    terminal.platform.post_message(USER, "T", "C")
-    terminal.start_agent()
-    terminal.platform.faults["read"] = HttpFault.hang()
-    mark = begin_poll(terminal, "read")
-    terminal.jump(TRANSFER_LIMIT)
-    assert next_notification(terminal, mark).summary == "T"
+    polling.platform.release()
+    assert next_notification(polling, poll(polling)).summary == "T"
 
 
-def test_reply_left_over_counts_are_not_read_again(terminal: Terminal) -> None:
+def test_hanging_receipt_does_not_keep_the_message_from_being_shown(polling: Terminal) -> None:
+    polling.platform.post_message(USER, "T", "C")
+    polling.platform.faults["read"] = HttpFault.hang()
+    mark = begin_poll(polling, "read")
+    polling.jump(TRANSFER_LIMIT)
+    assert next_notification(polling, mark).summary == "T"
+
+
+def test_reply_left_over_counts_are_not_read_again(polling: Terminal) -> None:
     """A reply that counted five is followed by none at all: the chain ends there."""
-    assert terminal.platform
-    terminal.start_agent()
-    terminal.platform.faults["list"] = HttpFault.reply(200, b"[]", {"X-Total-Count": "5"})
+    polling.platform.faults["list"] = HttpFault.reply(200, b"[]", {"X-Total-Count": "5"})
 
     def break_platform(event: object) -> None:
         if getattr(event, "member", "") == "list":
-            terminal.platform.faults["list"] = HttpFault.close()
+            polling.platform.faults["list"] = HttpFault.close()
 
-    terminal.events.subscribe(break_platform)
-    mark = poll(terminal)
-    assert len(warnings(terminal, mark)) == 1
-
-
-def stranger() -> CertificateFiles:
-    """A server's certificate from an authority that the terminal does not know."""
-    return Authority(Path(mkdtemp()), "Stranger").issue_server(layout.PLATFORM_HOST)
+    polling.events.subscribe(break_platform)
+    mark = poll(polling)
+    assert len(warnings(polling, mark)) == 1
 
 
-def misnamed() -> CertificateFiles:
-    """A certificate of the platform's authority for another host."""
-    return trust().authority.issue_server("elsewhere.box")
+def gets_nothing(terminal: Terminal, after: int) -> None:
+    """Assert that the server saw no request, and that the agent has warned of each and goes on."""
+    assert {event.member for event in terminal.events.all(kind="http", after=after)} <= {"tls"}
+    assert len(warnings(terminal, after)) == 2
+    carries_out_policies(terminal)
 
 
-def expired() -> CertificateFiles:
-    """The platform's certificate, too old."""
-    return trust().authority.issue_server(layout.PLATFORM_HOST, expired=True)
+WRONG_CERTIFICATES: dict[str, Callable[[], CertificateFiles]] = {
+    "unknown authority": lambda: Authority(Path(mkdtemp()), "Stranger").issue_server(layout.PLATFORM_HOST),
+    "another host": lambda: trust().authority.issue_server("elsewhere.box"),
+    "expired": lambda: trust().authority.issue_server(layout.PLATFORM_HOST, expired=True),
+}
 
 
-@pytest.mark.parametrize("identity", [stranger, misnamed, expired])
-def test_platform_with_a_wrong_certificate_gets_no_request(terminal: Terminal, identity: object) -> None:
-    assert callable(identity)
+@pytest.mark.parametrize("issue", WRONG_CERTIFICATES.values(), ids=WRONG_CERTIFICATES)
+def test_platform_with_a_wrong_certificate_gets_no_request(
+    terminal: Terminal, issue: Callable[[], CertificateFiles]
+) -> None:
     terminal.platform.close()
-    stranger = Platform(terminal.events, server=identity())
+    stranger = Platform(terminal.events, server=issue())
     try:
         mark = start_agent(terminal)
         poll(terminal)
-        requests = terminal.events.all(kind="http", after=mark)
-        assert {event.member for event in requests} <= {"tls"}
-        assert len(warnings(terminal, mark)) == 2
-        carries_out_policies(terminal)
+        gets_nothing(terminal, mark)
     finally:
         stranger.close()
 
@@ -126,11 +117,7 @@ def test_terminal_without_its_certificate_gets_nothing_and_goes_on(terminal: Ter
     layout.CLIENT_CERTIFICATE.unlink()
     mark = start_agent(terminal)
     poll(terminal)
-    assert [
-        event.member for event in terminal.events.all(kind="http", after=mark) if event.member != "tls"
-    ] == []
-    assert len(warnings(terminal, mark)) == 2
-    carries_out_policies(terminal)
+    gets_nothing(terminal, mark)
 
 
 WEB_SERVER = """
@@ -195,11 +182,7 @@ def test_messages_come_through_a_web_server_that_offers_http_2(terminal: Termina
         terminal.platform.post_message(USER, title, "text")
     terminal.start_agent()
     mark = poll(terminal)
-    assert [event.args[3] for event in terminal.events.all(member="Notify", after=mark)] == [
-        "first",
-        "second",
-        "third",
-    ]
+    assert titles(terminal, mark) == ["first", "second", "third"]
     assert all(sent["read_at"] for sent in terminal.platform.messages())
 
 
