@@ -1,13 +1,15 @@
-"""The daemon is absent, comes, restarts, hangs: what the agent reports of the user, and when."""
+"""What the agent reports of the user, and when: the daemon is there, comes late, restarts, hangs."""
 
 from __future__ import annotations
 
-from sandbox.events import Event
+import pytest
+
 from sandbox.fakes.fault import Fault
+from sandbox.machine.users import DOMAIN_USER, LOCAL_USER, User
 from sandbox.terminal import Terminal
 from tests.e2e.wire import (
     FIVE_MINUTES,
-    SHUTDOWN_NOTICE,
+    carries_out_policies,
     log_lines,
     next_notification,
     next_status,
@@ -17,32 +19,52 @@ from tests.e2e.wire import (
 )
 
 
-def announcements(terminal: Terminal, after: int) -> list[tuple[str, tuple[object, ...]]]:
+def announcements(terminal: Terminal, after: int = 0) -> list[tuple[str, tuple[object, ...]]]:
     """The agent's calls at the daemon since a mark."""
     calls = terminal.events.all(source="velks", target="daemon", kind="call", after=after)
     return [(call.member, call.args) for call in calls]
 
 
-def agent_listens(terminal: Terminal, after: int) -> Event:
-    """Wait until an agent that finds no daemon has come up."""
-    terminal.events.wait_for(
-        lambda event: "---getusername:" in event.args[0], kind="log", count=2, after=after
-    )
-    return terminal.events.all(kind="log", after=after)[-1]
+@pytest.mark.parametrize(
+    "user", [DOMAIN_USER, pytest.param(LOCAL_USER, marks=pytest.mark.local_user)], ids=lambda user: user.name
+)
+def test_user_and_an_active_session_are_reported_when_the_session_begins(
+    session: Terminal, user: User
+) -> None:
+    assert announcements(session) == [
+        ("UpdateUserInfo", (user.plain_name, user.uid)),
+        ("SendUserStatus", (1, user.plain_name)),
+    ]
 
 
-def test_daemon_that_comes_later_gets_a_report_when_it_announces_itself(terminal: Terminal) -> None:
-    terminal.daemon.leave()
-    mark = start_agent(terminal)
-    agent_listens(terminal, mark)
+def test_name_that_is_announced_has_no_at_sign_at_all(terminal: Terminal) -> None:
+    terminal.logind.rename("@zhang@wei@corp")
+    terminal.start_agent()
+    assert ("UpdateUserInfo", ("zhangweicorp", 20001)) in announcements(terminal)
 
-    terminal.session_manager.set("Locked", True)
+
+def test_unknown_user_is_announced_as_empty(terminal: Terminal) -> None:
+    terminal.logind.forget_user()
+    terminal.start_agent()
+    assert announcements(terminal) == [("UpdateUserInfo", ("", 0)), ("SendUserStatus", (1, ""))]
+
+
+@pytest.mark.parametrize("late", [True, False], ids=["late", "restarting"])
+def test_daemon_that_announces_itself_gets_a_report_and_is_obeyed(terminal: Terminal, late: bool) -> None:
+    if late:
+        terminal.daemon.leave()
+    terminal.start_agent()
+    terminal.session_manager.lock()
+    mark = terminal.events.mark()
+    if not late:
+        terminal.daemon.leave()
     terminal.daemon.appear(announce=True)
-    assert next_status(terminal, mark) == (2, "zhang.wei")
+    next_status(terminal, mark)
     assert announcements(terminal, mark) == [
         ("UpdateUserInfo", ("zhang.wei", 20001)),
         ("SendUserStatus", (2, "zhang.wei")),
     ]
+    carries_out_policies(terminal)
 
 
 def test_daemon_that_appears_silently_hears_nothing_until_the_next_report(terminal: Terminal) -> None:
@@ -70,25 +92,10 @@ def test_online_signal_is_logged_with_name_and_uid(session: Terminal) -> None:
     assert 'velkg restart sendonline   "zhang.wei" 20001' in log_lines(session, mark)
 
 
-def test_restarted_daemon_is_announced_to_and_obeyed(session: Terminal) -> None:
-    session.session_manager.lock()
-    mark = session.events.mark()
-    session.daemon.leave()
-    session.daemon.appear(announce=True)
-    next_status(session, mark)
-    assert announcements(session, mark) == [
-        ("UpdateUserInfo", ("zhang.wei", 20001)),
-        ("SendUserStatus", (2, "zhang.wei")),
-    ]
-    session.daemon.push_policy({"type": 1300})
-    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
-
-
 def test_daemon_that_never_answers_still_gets_reports_and_is_obeyed(terminal: Terminal) -> None:
     terminal.daemon.fault = Fault.hang()
     mark = start_agent(terminal)
-    terminal.daemon.push_policy({"type": 1300})
-    next_notification(terminal, mark)
+    carries_out_policies(terminal)
     terminal.advance(FIVE_MINUTES)
     next_status(terminal, mark, count=2)
 

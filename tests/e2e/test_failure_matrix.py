@@ -11,13 +11,11 @@ from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import Reply
 from sandbox.fakes.fault import Fault
 from sandbox.fakes.launcher import LauncherItem
-from sandbox.periods import SURELY_NEXT_POLL
+from sandbox.periods import DBUS_LIMIT, SURELY_NEXT_POLL, TRANSFER_LIMIT
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import FAKES, Terminal
 from tests.e2e.wire import FIVE_MINUTES, SHUTDOWN_NOTICE, next_notification, next_status, push, push_online
 
-DBUS_LIMIT = 25
-TRANSFER_LIMIT = 30
 NONSENSE = Reply("(isa{sv})", ((1, "x", {}),))
 
 

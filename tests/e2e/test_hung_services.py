@@ -5,20 +5,18 @@ from __future__ import annotations
 import pytest
 
 from sandbox.fakes.fault import Fault
+from sandbox.periods import DBUS_LIMIT
 from sandbox.terminal import Terminal
 from tests.e2e.wire import (
-    SHUTDOWN_NOTICE,
     begin_countdown,
+    carries_out_policies,
     comes_in_a_minute,
     log_lines,
-    next_notification,
     next_status,
     push,
     wait_on_notification,
     warnings,
 )
-
-DBUS_LIMIT = 25
 
 
 def test_hung_login_manager_at_start_gives_an_empty_name(terminal: Terminal) -> None:
@@ -86,31 +84,22 @@ def test_hung_service_reads_as_no_and_the_report_comes(terminal: Terminal, hung:
     assert next_status(terminal, mark) == (status, "" if hung == "logind" else "zhang.wei")
 
 
-def test_hung_notifications_delay_a_policy_by_the_limit_and_the_log_out_still_comes(
-    session: Terminal,
+@pytest.mark.parametrize(("code", "action"), [(1201, "Terminate"), (1200, "Reboot")])
+def test_minute_before_a_forced_action_begins_when_its_warning_has_been_tried(
+    session: Terminal, code: int, action: str
 ) -> None:
-    mark = wait_on_notification(session, Fault.hang(), 1201)
+    mark = wait_on_notification(session, Fault.hang(), code)
     session.daemon.push_policy({"type": 5})
     session.jump(DBUS_LIMIT)
     session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
 
-    # The minute begins when the warning has been tried.
-    comes_in_a_minute(session, "Terminate", mark)
-
-
-def test_minute_before_the_reboot_begins_when_the_warning_has_been_tried(session: Terminal) -> None:
-    mark = wait_on_notification(session, Fault.hang(), 1200)
-    session.jump(DBUS_LIMIT)
-    session.events.wait_for(target="identity", member="Set", after=mark)
-
-    comes_in_a_minute(session, "Reboot", mark)
+    comes_in_a_minute(session, action, mark)
 
 
 def test_hung_policy_service_does_not_hold_up_the_agent(session: Terminal) -> None:
     session.policy_service.fault = Fault.hang()
-    mark = push(session, {"type": 5})
-    session.daemon.push_policy({"type": 1300})
-    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
+    session.daemon.push_policy({"type": 5})
+    carries_out_policies(session)
 
 
 def test_no_signal_is_handled_while_a_notification_is_waited_for(session: Terminal) -> None:

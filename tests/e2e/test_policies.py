@@ -39,20 +39,42 @@ def test_user_is_warned_and_logged_out_after_a_minute(session: Terminal, policy:
     assert forced_actions(session, mark) == ["Terminate"]
 
 
-@pytest.mark.parametrize("app_id", ["", "another", "终端"])
-def test_policy_is_obeyed_whatever_its_application(session: Terminal, app_id: str) -> None:
-    mark = push(session, {"type": 1300}, app_id)
+BYTE_ORDER_MARK = "\ufeff"
+
+
+@pytest.mark.parametrize(
+    ("app_id", "text"),
+    [
+        ("", '{"type":1300}'),
+        ("another", '{"type":1300}'),
+        ("终端", '{"type":1300}'),
+        ("box", '{"type":1300,"reason":"停用"}'),  # outside Latin-1
+        ("box", BYTE_ORDER_MARK + '{"type":1300}'),  # the mark is lost on the bus
+    ],
+)
+def test_policy_is_obeyed_whatever_its_application_and_characters(
+    session: Terminal, app_id: str, text: str
+) -> None:
+    mark = push(session, text, app_id)
     assert next_notification(session, mark).body == SHUTDOWN_NOTICE
 
 
-def test_log_out_ends_the_callers_own_session(session: Terminal) -> None:
-    mark = begin_countdown(session)
+@pytest.mark.parametrize(
+    ("code", "action", "path", "interface", "args"),
+    [
+        (1201, "Terminate", "/org/freedesktop/login1/session/auto", "org.freedesktop.login1.Session", ()),
+        (1200, "Reboot", "/org/freedesktop/login1", "org.freedesktop.login1.Manager", (False,)),
+    ],
+    ids=["of the caller's own session", "without asking for a password"],
+)
+def test_login_manager_is_asked_for_the_forced_action(
+    session: Terminal, code: int, action: str, path: str, interface: str, args: tuple[object, ...]
+) -> None:
+    mark = begin_countdown(session, code)
     session.advance(60)
 
-    call = session.events.wait_for(target="logind", member="Terminate", after=mark)
-    assert call.detail["path"] == "/org/freedesktop/login1/session/auto"
-    assert call.detail["interface"] == "org.freedesktop.login1.Session"
-    assert call.args == ()
+    call = session.events.wait_for(target="logind", member=action, after=mark)
+    assert (call.detail["path"], call.detail["interface"], call.args) == (path, interface, args)
 
 
 @pytest.mark.parametrize("policy", policies.for_one_account(), ids=str)
@@ -144,21 +166,9 @@ def test_text_that_is_no_policy_is_logged_and_ignored(session: Terminal, payload
     assert f"onPolicyMsg ---------payload: {quoted}" in log_lines(session, mark)
 
 
-def test_characters_outside_latin1_do_not_hide_a_policy(session: Terminal) -> None:
-    mark = push(session, '{"type":1300,"reason":"停用"}')
-    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
-
-
-BYTE_ORDER_MARK = "\ufeff"
-
-
-def test_leading_byte_order_mark_is_lost_on_the_bus(session: Terminal) -> None:
-    mark = push(session, BYTE_ORDER_MARK + '{"type":1300}')
-    assert next_notification(session, mark).body == SHUTDOWN_NOTICE
-
-    mark = session.events.mark()
+def test_leading_byte_order_mark_alone_is_not_forwarded(session: Terminal) -> None:
     text = f'{{"type":5,"text":"{BYTE_ORDER_MARK}"}}'
-    session.daemon.push_policy(BYTE_ORDER_MARK + text)
+    mark = push(session, BYTE_ORDER_MARK + text)
     assert [event.args for event in settled(session, mark)] == [(text,)]
 
 

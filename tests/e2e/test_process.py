@@ -40,22 +40,20 @@ def test_line_is_logged_at_its_level(terminal: Terminal, beginning: str, level: 
     assert {line.member for line in lines} == {level}
 
 
-def test_login_name_is_logged_as_it_is_and_without_its_first_at_sign(terminal: Terminal) -> None:
-    terminal.files.write_accounts(User("@@zhang@wei", terminal.user.uid))
-    mark = start_agent(terminal)
-    names = [line for line in log_lines(terminal, mark) if "getusername:" in line]
-    assert names == [
-        'getCurrentLoginUser getusername: "@@zhang@wei"',
-        '---getusername: "@@zhang@wei"',
-        '---getusername: "@zhang@wei"',
+@pytest.mark.parametrize(
+    ("name", "language", "plain"), [("@@zhang@wei", "C", "@zhang@wei"), ("张伟é", "C.UTF-8", "张伟é")]
+)
+def test_login_name_is_logged_as_it_is_and_without_its_first_at_sign(
+    terminal: Terminal, name: str, language: str, plain: str
+) -> None:
+    """It is read in the encoding of the locale."""
+    terminal.files.write_accounts(User(name, terminal.user.uid))
+    terminal.start_agent(extra_env={"LANG": language})
+    assert [line for line in log_lines(terminal, 0) if "getusername:" in line] == [
+        f'getCurrentLoginUser getusername: "{name}"',
+        f'---getusername: "{name}"',
+        f'---getusername: "{plain}"',
     ]
-
-
-def test_login_name_is_read_in_the_encoding_of_the_locale(terminal: Terminal) -> None:
-    terminal.files.write_accounts(User("张伟é", terminal.user.uid))
-    mark = terminal.events.mark()
-    terminal.start_agent(extra_env={"LANG": "C.UTF-8"})
-    assert 'getCurrentLoginUser getusername: "张伟é"' in log_lines(terminal, mark)
 
 
 def test_user_without_account_entry_has_an_empty_login_name(terminal: Terminal) -> None:

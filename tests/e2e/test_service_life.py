@@ -9,10 +9,9 @@ from sandbox.fakes.fault import Fault
 from sandbox.terminal import Terminal
 from tests.e2e.wire import (
     FIVE_MINUTES,
-    SHUTDOWN_NOTICE,
     begin_countdown,
+    carries_out_policies,
     forced_actions,
-    next_notification,
     next_status,
     push,
     push_online,
@@ -21,7 +20,6 @@ from tests.e2e.wire import (
 )
 
 ACTIVE, LOCKED, SCREEN_SAVER = 1, 2, 3
-NOTICE = {"type": 1300}
 
 
 def forward(terminal: Terminal, marker: str) -> None:
@@ -36,7 +34,7 @@ def forwarded(terminal: Terminal) -> list[str]:
     return [call.args[0].split('"')[-2] for call in calls]
 
 
-def report(terminal: Terminal) -> tuple[int, str]:
+def asked_for(terminal: Terminal) -> tuple[int, str]:
     """Status and name that the agent reports when the daemon asks."""
     mark = push_online(terminal)
     status, name = next_status(terminal, mark)
@@ -75,12 +73,12 @@ def test_the_name_is_read_from_the_login_manager_that_is_there_at_the_time(termi
     mark = start_agent(terminal)
     assert next_status(terminal, mark) == (ACTIVE, "")
     terminal.logind.appear()
-    assert report(terminal) == (ACTIVE, "zhang.wei")
+    assert asked_for(terminal) == (ACTIVE, "zhang.wei")
     terminal.logind.leave()
     terminal.logind.rename("@other")
-    assert report(terminal) == (ACTIVE, "")
+    assert asked_for(terminal) == (ACTIVE, "")
     terminal.logind.appear()
-    assert report(terminal) == (ACTIVE, "other")
+    assert asked_for(terminal) == (ACTIVE, "other")
 
 
 def test_the_identity_of_the_start_is_announced_although_the_login_manager_came_later(
@@ -90,14 +88,17 @@ def test_the_identity_of_the_start_is_announced_although_the_login_manager_came_
     terminal.start_agent()
     terminal.logind.appear()
     mark = terminal.events.mark()
-    report(terminal)
+    asked_for(terminal)
     announced = terminal.events.wait_for(target="daemon", member="UpdateUserInfo", after=mark)
     assert announced.args == ("", 0)
 
 
-def test_a_login_manager_that_restarts_in_the_last_minute_ends_the_session(session: Terminal) -> None:
+@pytest.mark.parametrize("name", ["logind", "daemon"])
+def test_a_service_that_restarts_in_the_last_minute_does_not_stop_the_countdown(
+    session: Terminal, name: str
+) -> None:
     mark = begin_countdown(session)
-    session.logind.restart()
+    session.fakes[name].restart()
     session.advance(60)
     assert forced_actions(session, mark) == ["Terminate"]
 
@@ -110,14 +111,6 @@ def test_a_login_manager_that_has_gone_by_the_last_second_is_one_warning(session
     session.logind.appear()
     session.advance(FIVE_MINUTES)
     assert forced_actions(session, mark) == []
-
-
-def test_a_countdown_goes_on_without_the_daemon_that_ordered_it(session: Terminal) -> None:
-    mark = begin_countdown(session)
-    session.daemon.leave()
-    session.daemon.appear()
-    session.advance(60)
-    assert forced_actions(session, mark) == ["Terminate"]
 
 
 def test_an_identity_service_that_comes_after_the_exit_stays_as_it_is(session: Terminal) -> None:
@@ -136,20 +129,12 @@ def test_an_identity_service_that_was_restarted_is_switched_off(session: Termina
     assert session.identity.value("Enable") is False
 
 
-def test_the_reply_of_the_identity_service_is_ignored(session: Terminal) -> None:
-    session.identity.answers["Set"] = Reply("a{sv}", ({},))
-    mark = begin_countdown(session, 1200)
-    session.advance(60)
-    assert (forced_actions(session, mark), warnings(session, mark)) == (["Reboot"], [])
-
-
 def test_notices_go_to_the_notification_service_that_is_there_at_the_time(terminal: Terminal) -> None:
     terminal.notifications.leave()
     terminal.start_agent()
     for change in (terminal.notifications.appear, terminal.notifications.restart):
         change()
-        mark = push(terminal, NOTICE)
-        assert next_notification(terminal, mark).body == SHUTDOWN_NOTICE
+        carries_out_policies(terminal)
 
 
 def test_a_notification_service_that_has_gone_does_not_keep_the_log_out_back(session: Terminal) -> None:
@@ -160,12 +145,22 @@ def test_a_notification_service_that_has_gone_does_not_keep_the_log_out_back(ses
     assert [line.partition("(")[0] for line in warnings(session, mark)] == ["--@@@@-- QDBusError"]
 
 
-@pytest.mark.parametrize("reply", [Reply("", ()), Reply("a{sv}", ({},)), Reply("s", ("one",))], ids=str)
-def test_any_reply_of_the_notification_service_lets_the_log_out_come(session: Terminal, reply: Reply) -> None:
-    session.notifications.answers["Notify"] = reply
-    mark = push(session, {"type": 1201})
+@pytest.mark.parametrize(
+    ("name", "member", "reply", "code", "action"),
+    [
+        ("notifications", "Notify", Reply("", ()), 1201, "Terminate"),
+        ("notifications", "Notify", Reply("a{sv}", ({},)), 1201, "Terminate"),
+        ("notifications", "Notify", Reply("s", ("one",)), 1201, "Terminate"),
+        ("identity", "Set", Reply("a{sv}", ({},)), 1200, "Reboot"),
+    ],
+)
+def test_any_reply_lets_the_forced_action_come(
+    session: Terminal, name: str, member: str, reply: Reply, code: int, action: str
+) -> None:
+    session.fakes[name].answers[member] = reply
+    mark = push(session, {"type": code})
     session.advance(60)
-    assert (forced_actions(session, mark), warnings(session, mark)) == (["Terminate"], [])
+    assert (forced_actions(session, mark), warnings(session, mark)) == ([action], [])
 
 
 @pytest.mark.parametrize(("name", "status"), [("screensaver", SCREEN_SAVER), ("session_manager", LOCKED)])
@@ -179,5 +174,5 @@ def test_the_screen_is_as_the_service_says_that_is_there_at_the_time(
     reports = []
     for change in (fake.appear, fake.restart, fake.leave, fake.appear):
         change()
-        reports.append(report(terminal)[0])
+        reports.append(asked_for(terminal)[0])
     assert reports == [status, status, ACTIVE, status]

@@ -25,7 +25,7 @@ def manager(tmp_path: Path) -> Iterator[socket.socket]:
         yield heard
 
 
-def start_agent(terminal: Terminal, manager: socket.socket) -> None:
+def start_as_service(terminal: Terminal, manager: socket.socket) -> None:
     """Start the agent as a service of this manager."""
     terminal.start_agent(extra_env={"NOTIFY_SOCKET": manager.getsockname()})
 
@@ -34,7 +34,7 @@ def start_agent(terminal: Terminal, manager: socket.socket) -> None:
 def test_countdown_is_shown_from_its_begin_to_its_end(
     terminal: Terminal, manager: socket.socket, code: int
 ) -> None:
-    start_agent(terminal, manager)
+    start_as_service(terminal, manager)
     terminal.daemon.push_policy({"type": code})
     assert manager.recv(_LARGEST).rstrip() == PENDING
     terminal.advance(60)
@@ -42,7 +42,7 @@ def test_countdown_is_shown_from_its_begin_to_its_end(
 
 
 def test_countdown_that_begins_anew_is_not_shown_again(terminal: Terminal, manager: socket.socket) -> None:
-    start_agent(terminal, manager)
+    start_as_service(terminal, manager)
     terminal.daemon.push_policy({"type": 1201})
     terminal.sync()
     terminal.advance(30)

@@ -23,6 +23,11 @@ def five_minute_report(terminal: Terminal) -> tuple[Any, ...]:
     return next_status(terminal, mark)
 
 
+def screen_lines(terminal: Terminal, after: int) -> list[str]:
+    """What the agent has logged of the screen since a mark."""
+    return [line for line in log_lines(terminal, after) if line.startswith("get screen")]
+
+
 def show(terminal: Terminal, running: bool, locked: bool) -> None:
     """Set what the desktop's two services answer."""
     terminal.screensaver.set("isRunning", running)
@@ -30,41 +35,62 @@ def show(terminal: Terminal, running: bool, locked: bool) -> None:
 
 
 @pytest.mark.parametrize(
-    ("running", "locked", "status"),
+    ("running", "locked", "absent", "status"),
     [
-        (False, False, ACTIVE),
-        (False, True, LOCKED),
-        (True, False, SCREEN_SAVER),
-        (True, True, SCREEN_SAVER),
+        (False, False, (), ACTIVE),
+        (False, True, (), LOCKED),
+        (True, False, (), SCREEN_SAVER),
+        (True, True, (), SCREEN_SAVER),
+        (True, True, ("screensaver",), LOCKED),
+        (True, True, ("session_manager",), SCREEN_SAVER),
+        (True, True, ("screensaver", "session_manager"), ACTIVE),
     ],
+    ids=str,
 )
-def test_screen_saver_goes_before_lock(terminal: Terminal, running: bool, locked: bool, status: int) -> None:
+def test_screen_saver_goes_before_lock_and_an_absent_service_counts_as_no(
+    terminal: Terminal, running: bool, locked: bool, absent: tuple[str, ...], status: int
+) -> None:
     show(terminal, running, locked)
+    for name in absent:
+        terminal.fakes[name].leave()
     terminal.start_agent()
     assert five_minute_report(terminal) == (status, "zhang.wei")
 
 
 @pytest.mark.parametrize(
-    ("absent", "status"),
+    ("absent", "logged"),
     [
-        (("screensaver",), LOCKED),
-        (("session_manager",), SCREEN_SAVER),
-        (("screensaver", "session_manager"), ACTIVE),
+        ((), ["get screenSaver state  true", "get screenLocked state  false"]),
+        (("session_manager",), ["get screenSaver state  true"]),
+        (("screensaver",), ["get screenLocked state  false"]),
     ],
     ids=str,
 )
-def test_absent_service_counts_as_no(terminal: Terminal, absent: tuple[str, ...], status: int) -> None:
-    show(terminal, running=True, locked=True)
+def test_each_present_service_is_logged(
+    terminal: Terminal, absent: tuple[str, ...], logged: list[str]
+) -> None:
+    show(terminal, running=True, locked=False)
     for name in absent:
         terminal.fakes[name].leave()
     terminal.start_agent()
-    assert five_minute_report(terminal)[0] == status
+    mark = terminal.events.mark()
+    five_minute_report(terminal)
+    assert (screen_lines(terminal, mark), warnings(terminal, mark)) == (logged, [])
 
 
-@pytest.mark.parametrize("name", ["screensaver", "session_manager"])
-@pytest.mark.parametrize("yes", [True, False])
-def test_service_that_the_bus_can_start_is_started_and_read(terminal: Terminal, name: str, yes: bool) -> None:
-    show(terminal, running=yes and name == "screensaver", locked=yes and name == "session_manager")
+@pytest.mark.parametrize(
+    ("name", "running", "locked", "status"),
+    [
+        ("screensaver", True, False, SCREEN_SAVER),
+        ("screensaver", False, False, ACTIVE),
+        ("session_manager", False, True, LOCKED),
+        ("session_manager", False, False, ACTIVE),
+    ],
+)
+def test_service_that_the_bus_can_start_is_started_and_read(
+    terminal: Terminal, name: str, running: bool, locked: bool, status: int
+) -> None:
+    show(terminal, running, locked)
     service = terminal.fakes[name]
     service.leave()
     terminal.start_agent()
@@ -77,11 +103,9 @@ def test_service_that_the_bus_can_start_is_started_and_read(terminal: Terminal, 
     service.appear()
     terminal.commands.release("start-service")
     terminal.sync()
-    no = ACTIVE
-    started = SCREEN_SAVER if name == "screensaver" else LOCKED
 
-    assert next_status(terminal, mark)[0] == (started if yes else no)
-    assert len([line for line in log_lines(terminal, mark) if line.startswith("get screen")]) == 2
+    assert next_status(terminal, mark)[0] == status
+    assert len(screen_lines(terminal, mark)) == 2
 
 
 def test_service_that_the_bus_cannot_start_counts_as_no_and_is_not_logged(terminal: Terminal) -> None:
@@ -92,34 +116,7 @@ def test_service_that_the_bus_cannot_start_counts_as_no_and_is_not_logged(termin
     mark = terminal.events.mark()
 
     assert five_minute_report(terminal)[0] == LOCKED
-    states = [line for line in log_lines(terminal, mark) if line.startswith("get screen")]
-    assert states == ["get screenLocked state  true"]
-
-
-def test_each_present_service_is_logged(terminal: Terminal) -> None:
-    show(terminal, running=True, locked=False)
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    five_minute_report(terminal)
-    states = [line for line in log_lines(terminal, mark) if line.startswith("get screen")]
-    assert states == ["get screenSaver state  true", "get screenLocked state  false"]
-
-
-@pytest.mark.parametrize(
-    ("absent", "logged"),
-    [
-        ("session_manager", ["get screenSaver state  true"]),
-        ("screensaver", ["get screenLocked state  true"]),
-    ],
-)
-def test_absent_service_is_not_logged(terminal: Terminal, absent: str, logged: list[str]) -> None:
-    show(terminal, running=True, locked=True)
-    terminal.fakes[absent].leave()
-    terminal.start_agent()
-    mark = terminal.events.mark()
-    five_minute_report(terminal)
-    assert [line for line in log_lines(terminal, mark) if line.startswith("get screen")] == logged
-    assert warnings(terminal, mark) == []
+    assert screen_lines(terminal, mark) == ["get screenLocked state  true"]
 
 
 def test_report_reads_the_name_then_the_screen_saver_then_the_lock(session: Terminal) -> None:
@@ -135,24 +132,16 @@ def test_status_at_start_is_active_whatever_the_screen_shows(terminal: Terminal)
     assert next_status(terminal, mark) == (ACTIVE, "zhang.wei")
 
 
-def test_report_comes_every_five_minutes_even_without_a_change(session: Terminal) -> None:
-    mark = session.events.mark()
-    session.advance(299)
-    assert session.events.all(member="SendUserStatus", after=mark) == []
-    session.advance(2)
-    next_status(session, mark, count=1)
-    session.advance(FIVE_MINUTES)
-    next_status(session, mark, count=2)
-    assert len(session.events.all(member="SendUserStatus", after=mark)) == 2
-
-
-def test_change_between_two_reports_waits_for_the_next(session: Terminal) -> None:
+def test_report_comes_every_five_minutes_and_a_change_waits_for_it(session: Terminal) -> None:
     mark = session.events.mark()
     session.session_manager.set("Locked", True)
     session.advance(299)
     assert session.events.all(member="SendUserStatus", after=mark) == []
     session.advance(2)
     assert next_status(session, mark)[0] == LOCKED
+    session.advance(FIVE_MINUTES)
+    next_status(session, mark, count=2)
+    assert len(session.events.all(member="SendUserStatus", after=mark)) == 2
 
 
 def test_name_is_read_afresh_and_loses_every_at_sign(session: Terminal) -> None:
@@ -192,24 +181,25 @@ def test_user_of_another_type_is_reported_as_unknown(terminal: Terminal, signatu
     assert five_minute_report(terminal) == (ACTIVE, "")
 
 
-@pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
-@pytest.mark.parametrize("reply", [Reply("", ()), Reply("s", ("bare",))], ids=str)
-def test_replies_of_another_form_read_as_no(terminal: Terminal, service: str, reply: Reply) -> None:
+@pytest.mark.parametrize(
+    ("service", "status", "name"),
+    [
+        ("logind", SCREEN_SAVER, ""),
+        ("screensaver", LOCKED, "zhang.wei"),
+        ("session_manager", SCREEN_SAVER, "zhang.wei"),
+    ],
+)
+@pytest.mark.parametrize("reply", [Reply("", ()), Reply("s", ("bare",)), None], ids=str)
+def test_service_that_fails_or_replies_in_another_form_reads_as_no(
+    terminal: Terminal, service: str, status: int, name: str, reply: Reply | None
+) -> None:
     show(terminal, running=True, locked=True)
     terminal.start_agent()
-    terminal.fakes[service].answers["Get"] = reply
-    expected = {
-        "logind": (SCREEN_SAVER, ""),
-        "screensaver": (LOCKED, "zhang.wei"),
-        "session_manager": (SCREEN_SAVER, "zhang.wei"),
-    }
-    assert five_minute_report(terminal) == expected[service]
-
-
-@pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
-def test_failing_service_reads_as_no(session: Terminal, service: str) -> None:
-    session.fakes[service].fault = Fault.fail()
-    assert five_minute_report(session) == (ACTIVE, "" if service == "logind" else "zhang.wei")
+    if reply:
+        terminal.fakes[service].answers["Get"] = reply
+    else:
+        terminal.fakes[service].fault = Fault.fail()
+    assert five_minute_report(terminal) == (status, name)
 
 
 @pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
