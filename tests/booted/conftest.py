@@ -57,6 +57,14 @@ def machine(booted: Machine) -> Iterator[Machine]:
 
 
 @pytest.fixture
+def session(machine: Machine) -> Machine:
+    """The machine with alice's agent at work."""
+    machine.log_in("alice")
+    machine.wait_for_agent("alice")
+    return machine
+
+
+@pytest.fixture
 def hasty(machine: Machine) -> Iterator[Machine]:
     """A machine whose agents live twenty times as fast, so that a countdown takes three seconds."""
     library = machine.said("sh", "-c", "echo /usr/lib/*/faketime/libfaketime.so.1")

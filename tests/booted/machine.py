@@ -141,10 +141,11 @@ class Machine:
 
     def agent(self, user: str) -> int:
         """Process id of the user's agent, 0 if none runs."""
-        shown = self.said(
-            "systemctl", "--user", "show", "velks.service", "--property=MainPID", "--value", user=user
-        )
-        return int(shown or 0)
+        return int(self.unit("MainPID", user) or 0)
+
+    def unit(self, name: str, user: str = "alice") -> str:
+        """What the service manager shows of the user's agent: a property of its unit."""
+        return self.said("systemctl", "--user", "show", "velks", f"--property={name}", "--value", user=user)
 
     def wait_for_agent(self, user: str, other_than: int = 0) -> int:
         """Process id of an agent that has announced its session to the daemon, and is not an earlier one."""

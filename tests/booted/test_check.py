@@ -15,14 +15,6 @@ pytestmark = pytest.mark.quick
 POLICY = "/usr/share/dbus-1/system.d/com.norix.velk.conf"
 
 
-@pytest.fixture
-def session(machine: Machine) -> Iterator[Machine]:
-    """The machine with alice's agent at work."""
-    machine.log_in("alice")
-    machine.wait_for_agent("alice")
-    yield machine
-
-
 def test_session_that_lacks_nothing_is_good(session: Machine) -> None:
     assert "[bad]" not in session.check()
     assert "[good]    reboot: is permitted to this user now" in session.check()

@@ -53,13 +53,8 @@ def test_log_out_during_the_countdown_ends_it(hasty: Machine) -> None:
     mark = hasty.mark()
     again = hasty.log_in("alice")
     hasty.wait_for_event(lambda event: event.member == "SendUserStatus", mark)
-    assert pending(hasty, "alice") == ""
+    assert hasty.unit("StatusText") == ""
     assert again.name in hasty.session_names()
-
-
-def pending(machine: Machine, user: str) -> str:
-    """What the service manager shows of a countdown."""
-    return machine.said("systemctl", "--user", "show", "velks", "--property=StatusText", "--value", user=user)
 
 
 @pytest.mark.quick
@@ -81,7 +76,7 @@ def test_reboot_is_refused_while_a_program_inhibits_it_and_all_else_of_the_exit_
     wait_for_refusal(hasty)
     done = [event.member for event in hasty.events()[mark:] if event.member in {"onDomainConfig", "Set"}]
     assert done == ["onDomainConfig", "Set"]
-    assert pending(hasty, "alice") == ""
+    assert hasty.unit("StatusText") == ""
 
 
 def test_reboot_is_refused_with_a_greeter_in_front(hasty: Machine) -> None:

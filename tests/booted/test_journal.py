@@ -29,11 +29,9 @@ def push_many(machine: Machine, count: int, text: str) -> None:
 
 
 @pytest.mark.quick
-def test_entry_says_who_logged_what_and_where(machine: Machine) -> None:
-    machine.log_in("alice")
-    machine.wait_for_agent("alice")
-    machine.push_policy("logged once")
-    (entry,) = wait_for("the entry", lambda: entries(machine, "logged once"))
+def test_entry_says_who_logged_what_and_where(session: Machine) -> None:
+    session.push_policy("logged once")
+    (entry,) = wait_for("the entry", lambda: entries(session, "logged once"))
     assert entry["CODE_FUNC"] == "MessageTransfer::onPolicyMsg"
     assert entry["CODE_FILE"] == "src/velk/velks/message_transfer.cpp"
     assert (entry["PRIORITY"], entry["_UID"]) == ("6", str(USERS["alice"]))
@@ -51,31 +49,25 @@ READERS = {
 
 @pytest.mark.quick
 @pytest.mark.parametrize("reader", READERS)
-def test_lines_are_for_the_user_and_administrators(machine: Machine, reader: str) -> None:
-    machine.log_in("alice")
-    machine.wait_for_agent("alice")
-    machine.push_policy("a secret")
-    wait_for("the entry", lambda: entries(machine, "a secret"))
+def test_lines_are_for_the_user_and_administrators(session: Machine, reader: str) -> None:
+    session.push_policy("a secret")
+    wait_for("the entry", lambda: entries(session, "a secret"))
     asked = ["journalctl", "--quiet", "--boot", "--output=cat", "_SYSTEMD_USER_UNIT=velks.service"]
-    assert ("a secret" in machine.said("setpriv", *reader.split(), *asked)) == READERS[reader]
+    assert ("a secret" in session.said("setpriv", *reader.split(), *asked)) == READERS[reader]
 
 
-def test_burst_of_policies_is_forwarded_whole(machine: Machine) -> None:
-    machine.log_in("alice")
-    machine.wait_for_agent("alice")
-    mark = machine.mark()
-    push_many(machine, BURST, '{"type": 5}')
-    wait_for("all policies", lambda: machine.count("onPolicyMsg", mark) == BURST, seconds=240)
+def test_burst_of_policies_is_forwarded_whole(session: Machine) -> None:
+    mark = session.mark()
+    push_many(session, BURST, '{"type": 5}')
+    wait_for("all policies", lambda: session.count("onPolicyMsg", mark) == BURST, seconds=240)
 
 
-def test_journal_that_is_frozen_holds_nothing_up(machine: Machine) -> None:
-    machine.log_in("alice")
-    machine.wait_for_agent("alice")
-    machine.run("systemctl", "kill", "--signal=STOP", "systemd-journald")
-    mark = machine.mark()
-    push_many(machine, MORE_THAN_IT_QUEUES, "no JSON")
-    machine.push_policy({"type": 1300})
-    machine.wait_for_event(lambda event: event.member == "Notify", mark)
-    machine.run("systemctl", "kill", "--signal=CONT", "systemd-journald")
-    machine.push_policy("after the frost")
-    wait_for("the count of lost lines", lambda: entries(machine, "log lines are lost"))
+def test_journal_that_is_frozen_holds_nothing_up(session: Machine) -> None:
+    session.run("systemctl", "kill", "--signal=STOP", "systemd-journald")
+    mark = session.mark()
+    push_many(session, MORE_THAN_IT_QUEUES, "no JSON")
+    session.push_policy({"type": 1300})
+    session.wait_for_event(lambda event: event.member == "Notify", mark)
+    session.run("systemctl", "kill", "--signal=CONT", "systemd-journald")
+    session.push_policy("after the frost")
+    wait_for("the count of lost lines", lambda: entries(session, "log lines are lost"))

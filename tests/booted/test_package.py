@@ -68,25 +68,17 @@ def test_upgrade_and_downgrade_renew_each_running_agent_and_start_no_other(
 
 
 def test_upgrade_leaves_an_agent_alone_that_is_about_to_end_its_session(
-    machine: Machine, newer: Path
+    session: Machine, newer: Path
 ) -> None:
-    machine.log_in("alice")
-    agent = machine.wait_for_agent("alice")
-    mark = machine.mark()
-    machine.push_policy({"type": 1201})
-    machine.wait_for_event(lambda event: event.member == "Notify", mark)
-    wait_for("the countdown in the unit's status", lambda: status_of(machine))
-    printed = machine.install(newer)
+    agent = session.agent("alice")
+    mark = session.mark()
+    session.push_policy({"type": 1201})
+    session.wait_for_event(lambda event: event.member == "Notify", mark)
+    wait_for("the countdown in the unit's status", lambda: session.unit("StatusText"))
+    printed = session.install(newer)
     assert "velks of user 1000 carries out a policy that ends the session; it is not restarted" in printed
-    assert machine.agent("alice") == agent
-    assert "runs an older program than the one installed" in machine.said("velks-check", user="alice")
-
-
-def status_of(machine: Machine) -> str:
-    """What the service manager shows of alice's agent."""
-    return machine.said(
-        "systemctl", "--user", "show", "velks", "--property=StatusText", "--value", user="alice"
-    )
+    assert session.agent("alice") == agent
+    assert "runs an older program than the one installed" in session.said("velks-check", user="alice")
 
 
 def test_removal_ends_the_agents_and_their_start_and_a_new_log_in_brings_them_back(machine: Machine) -> None:
@@ -100,9 +92,7 @@ def test_removal_ends_the_agents_and_their_start_and_a_new_log_in_brings_them_ba
     assert machine.session_names() == sessions
     entry = machine.log_in("alice", "autostart", seat="")  # the entry is configuration, which stays
     machine.run("systemctl", "--user", "restart", "booted-desktop.target", user="bob")
-    assert "not-found" in machine.said(
-        "systemctl", "--user", "show", "velks", "--property=LoadState", user="bob"
-    )
+    assert machine.unit("LoadState", "bob") == "not-found"
     assert machine.agents() == []
     machine.log_out(entry)
     machine.install(PACKAGE)
@@ -134,18 +124,16 @@ def test_removal_reports_a_countdown_that_it_drops(machine: Machine) -> None:
     session = machine.log_in("alice")
     machine.wait_for_agent("alice")
     machine.push_policy({"type": 1201})
-    wait_for("the countdown in the unit's status", lambda: status_of(machine))
+    wait_for("the countdown in the unit's status", lambda: machine.unit("StatusText"))
     printed = machine.run("dpkg", "--remove", NAME).stdout
     assert "velks of user 1000 was about to end the session by a policy; that is dropped" in printed
     assert session.name in machine.session_names()
 
 
-def test_purge_leaves_nothing(machine: Machine) -> None:
-    machine.log_in("alice")
-    machine.wait_for_agent("alice")
-    machine.run("dpkg", "--purge", NAME)
-    assert machine.agents() == []
-    left = machine.said(
+def test_purge_leaves_nothing(session: Machine) -> None:
+    session.run("dpkg", "--purge", NAME)
+    assert session.agents() == []
+    left = session.said(
         "find", "/etc", "/usr", "/var/lib/systemd", "-path", "*velks*", "-not", "-path", "*/booted*"
     )
     assert left == ""
