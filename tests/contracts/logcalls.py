@@ -20,17 +20,17 @@ class LogLine(NamedTuple):
     text: str
 
 
-def log_lines(source: str) -> Iterator[LogLine]:
+def lines_of(source: str) -> Iterator[LogLine]:
     """All lines that a C++ source can write to the log."""
     for call in _CALL.finditer(source):
         statement = source[call.end() : _end_of_statement(source, call.end())]
         yield LogLine(call[1].lower(), _text(statement))
 
 
-def log_lines_of(*folders: Path) -> set[LogLine]:
+def lines_of_all(*folders: Path) -> set[LogLine]:
     """The same of all sources in these folders."""
     files = [file for folder in folders for suffix in ("cpp", "h") for file in folder.rglob(f"*.{suffix}")]
-    return {line for file in files for line in log_lines(file.read_text())}
+    return {line for file in files for line in lines_of(file.read_text())}
 
 
 def _end_of_statement(source: str, start: int) -> int:

@@ -9,7 +9,7 @@ import pytest
 
 from sandbox import REPOSITORY, contracts
 from sandbox.policies import POLICIES, Policy
-from tests.contracts.logcalls import LogLine, log_lines, log_lines_of
+from tests.contracts.logcalls import LogLine, lines_of, lines_of_all
 
 DOCS = REPOSITORY / "docs"
 PAGES = sorted(DOCS.glob("*.md"))
@@ -59,11 +59,11 @@ def links(path: Path) -> list[str]:
     ],
 )
 def test_log_call_is_read_as_the_line_that_it_writes(source: str, text: str) -> None:
-    assert list(log_lines(source)) == [LogLine("info", text)]
+    assert list(lines_of(source)) == [LogLine("info", text)]
 
 
 def test_every_log_line_stands_in_the_catalogue_and_no_other() -> None:
-    written = log_lines_of(REPOSITORY / "src", REPOSITORY / "platform")
+    written = lines_of_all(REPOSITORY / "src", REPOSITORY / "platform")
     catalogued = catalogued_lines()
 
     assert (written - set(catalogued), set(catalogued) - written) == (set(), set())

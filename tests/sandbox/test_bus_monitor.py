@@ -16,7 +16,7 @@ from tests.sandbox import programs
 SOME_POLICY = '{"type": 5}'
 
 
-def play(terminal: Terminal, folder: Path, *actions: str) -> None:
+def play_after_a_call(terminal: Terminal, folder: Path, *actions: str) -> None:
     """Let an agent do this after an ordinary call, and end."""
     terminal.daemon.push_policy(SOME_POLICY)
     programs.play(terminal, folder, "; ".join(actions))
@@ -42,14 +42,14 @@ def test_a_call_to_an_absent_service_fails_the_test(
 ) -> None:
     complaint = f"(?m)^the agent calls {name}.greet of {name}; no contract has that on the {bus} bus$"
     with pytest.raises(AssertionError, match=complaint), Terminal() as terminal:
-        play(terminal, tmp_path, ask(bus, name))
+        play_after_a_call(terminal, tmp_path, ask(bus, name))
 
 
 def test_a_call_to_a_service_without_a_contract_fails_the_test(tmp_path: Path) -> None:
     with pytest.raises(AssertionError, match="com.norix.unknown"), Terminal() as terminal:
         service = Stranger(terminal.session_bus)
         assert service.own("com.norix.unknown") == 1
-        play(terminal, tmp_path, ask("session", "com.norix.unknown"))
+        play_after_a_call(terminal, tmp_path, ask("session", "com.norix.unknown"))
         service.close()
 
 
@@ -57,12 +57,14 @@ def test_a_call_to_an_absent_service_on_a_restarted_bus_fails_the_test(tmp_path:
     with pytest.raises(AssertionError, match="com.norix.absent"), Terminal() as terminal:
         terminal.session_bus.restart()
         terminal.policy_service.appear()
-        play(terminal, tmp_path, ask("session", "com.norix.absent"))
+        play_after_a_call(terminal, tmp_path, ask("session", "com.norix.absent"))
 
 
 def test_an_agent_may_ask_a_service_that_is_absent_and_the_bus_itself(tmp_path: Path) -> None:
     with Terminal(absent=["screensaver"]) as terminal:
-        play(terminal, tmp_path, ask("session", "com.norix.ScreenSaver"), "dbus.SessionBus().list_names()")
+        play_after_a_call(
+            terminal, tmp_path, ask("session", "com.norix.ScreenSaver"), "dbus.SessionBus().list_names()"
+        )
 
         calls = terminal.session_monitor.calls
         assert calls[-2:] == [
@@ -73,7 +75,7 @@ def test_an_agent_may_ask_a_service_that_is_absent_and_the_bus_itself(tmp_path: 
 
 def test_calls_to_the_bus_are_recorded_with_their_arguments(terminal: Terminal, tmp_path: Path) -> None:
     question = "dbus.SystemBus().name_has_owner('com.norix.absent')"
-    play(terminal, tmp_path, "call_daemon('GetMachineID')", question)
+    play_after_a_call(terminal, tmp_path, "call_daemon('GetMachineID')", question)
 
     terminal.receive_all()
     assert terminal.system_monitor.calls[-1] == MonitoredCall(

@@ -72,7 +72,7 @@ BADLY_DONE = [
 ]
 
 
-def play(terminal: Terminal, folder: Path, actions: str) -> None:
+def play_with_policies(terminal: Terminal, folder: Path, actions: str) -> None:
     """Let an agent do this, with two policies pushed before."""
     assert terminal.platform
     for policy in (FORWARDED, '{"type": 1201}'):
@@ -81,7 +81,7 @@ def play(terminal: Terminal, folder: Path, actions: str) -> None:
 
 
 def test_an_agent_that_keeps_to_all_contracts_passes(terminal: Terminal, tmp_path: Path) -> None:
-    play(terminal, tmp_path, "; ".join(WELL_DONE))
+    play_with_policies(terminal, tmp_path, "; ".join(WELL_DONE))
 
     assert len(terminal.events.all(source="velks", kind="call")) == 3
     assert len(terminal.events.all(source="velks", kind="http")) == 3
@@ -90,13 +90,13 @@ def test_an_agent_that_keeps_to_all_contracts_passes(terminal: Terminal, tmp_pat
 @pytest.mark.parametrize(("actions", "complaint"), BADLY_DONE, ids=range(len(BADLY_DONE)))
 def test_an_agent_that_breaks_a_contract_fails_the_test(tmp_path: Path, actions: str, complaint: str) -> None:
     with pytest.raises(AssertionError, match=f"(?s)^the agent.* {complaint}"), Terminal() as terminal:
-        play(terminal, tmp_path, actions)
+        play_with_policies(terminal, tmp_path, actions)
 
 
 def test_an_agent_that_relays_garbage_can_be_excused(terminal: Terminal, tmp_path: Path) -> None:
     terminal.contracts.allow_violations("read-receipt")
 
-    play(terminal, tmp_path, request("PUT", READ, '{"uuid":"""}'))
+    play_with_policies(terminal, tmp_path, request("PUT", READ, '{"uuid":"""}'))
 
 
 @pytest.mark.parametrize("policy", [{"type": 1202}, {"type": "1201"}, {"payload": {}}], ids=str)
@@ -122,10 +122,10 @@ def test_a_platform_that_breaks_a_contract_by_itself_fails_the_test(tmp_path: Pa
     complaint = "^the platform breaks the contract password-tips-reply"
     with pytest.raises(AssertionError, match=complaint), Terminal() as terminal:
         terminal.platform.password_tip("zhang", 7)  # type: ignore[arg-type]
-        play(terminal, tmp_path, request("GET", TIPS, '{"username": "zhang"}'))
+        play_with_policies(terminal, tmp_path, request("GET", TIPS, '{"username": "zhang"}'))
 
 
 def test_a_platform_with_a_fault_may_break_a_contract(terminal: Terminal, tmp_path: Path) -> None:
     terminal.platform.faults["tips"] = HttpFault.reply(200, b'{"code": "0"}')
 
-    play(terminal, tmp_path, request("GET", TIPS, '{"username": "zhang"}'))
+    play_with_policies(terminal, tmp_path, request("GET", TIPS, '{"username": "zhang"}'))
