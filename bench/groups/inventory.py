@@ -15,7 +15,7 @@ from sandbox.machine import layout
 from sandbox.machine.packages import Packages
 
 _ITEMS = (10, 100, 300)
-_UPGRADED, _UPGRADED_ITEMS = 30, 100  # packages of an upgrade, items of the launcher meanwhile
+_UPGRADED, _UPGRADED_ITEMS = 30, 50  # packages of an upgrade, items of the launcher meanwhile
 _LOG_OUT = 1201
 _BEHIND = 0.5  # seconds until the agent has all changes in its queue
 _MINUTE = 60
