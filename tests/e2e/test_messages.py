@@ -69,12 +69,12 @@ def test_all_messages_are_drained_one_after_the_other(polling: Terminal) -> None
         polling.platform.post_message(USER, title, "text")
     mark = poll(polling)
 
-    road = [
+    order = [
         event.member
         for event in polling.events.all(source="velks", after=mark)
         if event.member in ("list", "read", "Notify")
     ]
-    assert road == ["list", "read", "Notify"] * 7
+    assert order == ["list", "read", "Notify"] * 7
     assert titles(polling, mark) == posted
     assert all(sent["read_at"] for sent in polling.platform.messages())
 

@@ -2,7 +2,7 @@
 
 #include <QByteArray>
 
-/// What a fuzz target defines: brings one input in by the road that it takes from outside. It must return
+/// What a fuzz target defines: brings one input in on the path that it takes from outside. It must return
 /// in short time and leave nothing behind, whatever the input; a crash, a leak, a sanitizer's report or a
 /// requirement that is not met is a finding.
 void tryInput(const QByteArray& input);

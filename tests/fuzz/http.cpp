@@ -2,27 +2,12 @@
 #include "httpclientapi.h"
 #include "https_server.h"
 
-namespace {
-
-/// A client of a server of its own. Kept until the process ends.
-struct Road
-{
-    HttpsServer server;
-    HttpClientApi client{nullptr, false};
-};
-
-Road& road()
-{
-    static auto* const made = new Road;
-    return *made;
-}
-
-} // namespace
-
 /// The bytes that a server sends as its reply.
 void tryInput(const QByteArray& input)
 {
-    auto& [server, client] = road();
+    // Kept until the process ends.
+    static auto& server = *new HttpsServer;
+    static auto& client = *new HttpClientApi(nullptr, false);
     client.setSSLConfig(server.file("ca"), server.file("client"), server.file("client-key"));
     const QByteArray end = input.endsWith('!') ? "break_off" : "close";
     const QByteArray path = "/bytes?end=" + end + "&hex=" + input.toHex();

@@ -21,8 +21,7 @@ void replacePackageTools()
 /// What the package tools print. The name of a package becomes part of the next tool's command line.
 void tryInput(const QByteArray& input)
 {
-    static const bool prepared = (replacePackageTools(), true);
-    Q_UNUSED(prepared)
+    [[maybe_unused]] static const bool prepared = (replacePackageTools(), true);
     static LauncherGuard guard(nullptr);
 
     writeBytes(kOutput, input);

@@ -19,20 +19,13 @@ void emptyCommands()
     qputenv("PATH", QFile::encodeName(folder));
 }
 
-MessageTransfer& agent()
-{
-    static MessageTransfer transfer;
-    return transfer;
-}
-
 } // namespace
 
 /// A text that the daemon pushes as a policy.
 void tryInput(const QByteArray& input)
 {
-    MessageTransfer& transfer = agent();
-    static const bool prepared = (emptyCommands(), true);
-    Q_UNUSED(prepared)
+    static MessageTransfer transfer;
+    [[maybe_unused]] static const bool prepared = (emptyCommands(), true);
 
     transfer.onPolicyMsg(QString(), QString::fromUtf8(input.constData(), input.size()));
     // One round trip each, else policies are forwarded faster than the bus takes them.

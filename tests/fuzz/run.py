@@ -7,12 +7,15 @@ target fell over is put into the target's corpus, where the ordinary tests repla
 from __future__ import annotations
 
 import argparse
+import json
 import os
 import re
 import shutil
 import subprocess
 from pathlib import Path
+from typing import Any, Iterator
 
+from sandbox import contracts
 from sandbox.ending import exit_with
 from sandbox.policies import POLICIES
 
@@ -20,6 +23,14 @@ _HERE = Path(__file__).resolve().parent
 _REPOSITORY = _HERE.parents[1]
 _BUILD = _REPOSITORY / "build" / "fuzz"
 _TARGETS = sorted(folder.name for folder in (_HERE / "corpus").iterdir())
+
+# Of the JSON that a target reads.
+_CONTRACTS = {
+    "information": ["user-info"],
+    "inventory": ["software-list"],
+    "platform": ["password-tips-reply", "platform-messages"],
+    "policy": ["policy-message"],
+}
 
 _ANSWER_SECONDS = 40  # longer than any limit of the agent: what takes more than that hangs
 _MOST_MEMORY_MB = 1024
@@ -35,9 +46,25 @@ def _findings(target: str) -> Path:
 
 
 def dictionary(target: str) -> str:
-    """The words that the inputs of a target are made of; the codes of policies come from their contract."""
-    words = (_HERE / f"{target}.dict").read_text()
-    return words + "".join(f'"{code}"\n' for code in POLICIES) if target == "policy" else words
+    """The words that the inputs of a target are made of: its own, and those of JSON and its contracts."""
+    own = _HERE / f"{target}.dict"
+    words = [own.read_text()] if own.exists() else []
+    if target in _CONTRACTS:
+        words.append((_HERE / "json.dict").read_text())
+        schemas = [json.loads(contracts.schema_file(name).read_text()) for name in _CONTRACTS[target]]
+        words += [f'"\\"{name}\\""\n' for name in sorted(set(_property_names(schemas)))]
+    if target == "policy":
+        words += [f'"{code}"\n' for code in POLICIES]
+    return "".join(words)
+
+
+def _property_names(schema: Any) -> Iterator[str]:
+    if isinstance(schema, dict):
+        yield from schema.get("properties", ())
+        schema = list(schema.values())
+    if isinstance(schema, list):
+        for part in schema:
+            yield from _property_names(part)
 
 
 def _dictionary_file(target: str) -> Path:
@@ -61,14 +88,6 @@ def _command(target: str, seconds: int) -> list[str]:
     ]
 
 
-def _environment() -> dict[str, str]:
-    return {
-        **os.environ,
-        # A full quarantine must not look like a leak.
-        "ASAN_OPTIONS": "quarantine_size_mb=16",
-    }
-
-
 def _statistic(log: str, name: str) -> str:
     found = re.search(rf"stat::{name}:\s+(\d+)", log)
     return found[1] if found else "?"
@@ -81,10 +100,11 @@ def _run(target: str, seconds: int) -> bool:
         folder.mkdir(parents=True, exist_ok=True)
     known = len(list(_learnt(target).iterdir()))
     path = _BUILD / f"{target}.log"
+    # A full quarantine must not look like a leak.
+    env = {**os.environ, "ASAN_OPTIONS": "quarantine_size_mb=16"}
     with path.open("wb") as file:
-        status = subprocess.run(
-            _command(target, seconds), env=_environment(), stdout=file, stderr=subprocess.STDOUT
-        ).returncode
+        command = _command(target, seconds)
+        status = subprocess.run(command, env=env, stdout=file, stderr=subprocess.STDOUT).returncode
     log = path.read_text(errors="replace")
     outcome = (
         f"{target}: {_statistic(log, 'number_of_executed_units')} inputs, "
@@ -104,9 +124,8 @@ def main() -> int:
     """Entry point; the exit status is 1 if anything was found."""
     parser = argparse.ArgumentParser(prog="dev fuzz", description=__doc__)
     parser.add_argument("--seconds", type=int, default=60, metavar="N", help="time per target (default: 60)")
-    parser.add_argument(
-        "targets", nargs="*", metavar="TARGET", help=f"of {', '.join(_TARGETS)} (default: all)"
-    )
+    among = f"of {', '.join(_TARGETS)} (default: all)"
+    parser.add_argument("targets", nargs="*", metavar="TARGET", help=among)
     options = parser.parse_args()
     for target in options.targets:
         if target not in _TARGETS:
