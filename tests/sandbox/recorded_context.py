@@ -3,6 +3,7 @@
 from __future__ import annotations
 
 import io
+import subprocess
 
 import pytest
 from rich.console import Console
@@ -27,10 +28,21 @@ class RecordedContext(Context):
         """The printed lines that hold a text."""
         return [line for line in self.context.getvalue().splitlines() if text in line]
 
+    def run(self, *lines: str) -> None:
+        """Let a person type these lines."""
+        for line in lines:
+            run_line(self, line)
+
     def refusal(self, line: str) -> str:
         """Why a line is refused; nothing happens in the terminal."""
-        mark = self.terminal.events.mark()
+        mark, installed = self.terminal.events.mark(), installed_packages()
         with pytest.raises(CommandRefused) as refused:
-            run_line(self, line)
-        assert not self.terminal.events.all(after=mark)
+            self.run(line)
+        assert (self.terminal.events.all(after=mark), installed_packages()) == ([], installed)
         return str(refused.value)
+
+
+def installed_packages() -> dict[str, str]:
+    """Versions of the packages as the package tools know them."""
+    shown = subprocess.run(["dpkg-query", "-W"], capture_output=True, text=True).stdout
+    return dict(line.split("\t", 1) for line in shown.splitlines())

@@ -4,7 +4,6 @@ from __future__ import annotations
 
 import pytest
 
-from sandbox.prompt.registry import run_line
 from tests.sandbox.recorded_context import RecordedContext
 
 
@@ -35,23 +34,20 @@ def on_dock(context: RecordedContext) -> dict[str, tuple[int, bool]]:
 def test_the_dock_is_as_the_user_left_it(
     context: RecordedContext, lines: list[str], expected: dict[str, tuple[int, bool]]
 ) -> None:
-    for line in lines:
-        run_line(context, line)
+    context.run(*lines)
 
     assert on_dock(context) == expected
 
 
 def test_the_applications_are_listed(context: RecordedContext) -> None:
-    for line in ("dock mail", "open editor", "windows editor 4", "apps"):
-        run_line(context, line)
+    context.run("dock mail", "open editor", "windows editor 4", "apps")
 
     mail, editor = [line for line in context.lines_with("│") if "mail" in line or "editor" in line]
     assert ("0" in mail, "yes" in mail, "4" in editor, "no" in editor) == (True, True, True, True)
 
 
 def test_what_the_dock_announces_has_a_meaning(context: RecordedContext) -> None:
-    for line in ("open editor", "windows editor 2", "dock editor", "undock editor", "close editor"):
-        run_line(context, line)
+    context.run("open editor", "windows editor 2", "dock editor", "undock editor", "close editor")
 
     for meaning in (
         "an application was added to the dock",
@@ -65,27 +61,6 @@ def test_what_the_dock_announces_has_a_meaning(context: RecordedContext) -> None
 
 def test_an_entry_that_announces_no_values_shows_what_has_changed(context: RecordedContext) -> None:
     context.terminal.dock.announces = ("invalidated",)
-    run_line(context, "open editor")
-
-    run_line(context, "windows editor 2")
+    context.run("open editor", "windows editor 2")
 
     assert context.lines_with("WindowInfos has changed")
-
-
-@pytest.mark.parametrize(
-    ("line", "reason"),
-    [
-        ("close mail", "there is no application 'mail' on the dock; see: apps"),
-        ("windows mail 1", "there is no application 'mail' on the dock"),
-        ("undock mail", "there is no application 'mail' on the dock"),
-        ("windows editor many", "'many' is not a number"),
-        ("windows editor -1", "an application cannot have -1 windows"),
-        ("open", "usage: open APPLICATION"),
-    ],
-)
-def test_what_cannot_be_done_is_refused_with_a_reason(
-    context: RecordedContext, line: str, reason: str
-) -> None:
-    run_line(context, "open editor")
-
-    assert reason in context.refusal(line)

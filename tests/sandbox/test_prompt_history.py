@@ -21,6 +21,12 @@ from tests.sandbox.recorded_context import RecordedContext
 _ENTER, _END = "\r", "\x04"
 
 
+@pytest.fixture(autouse=True)
+def folder(tmp_path: Path, monkeypatch: pytest.MonkeyPatch) -> None:
+    """Where the history is kept: in a folder that is empty so far."""
+    monkeypatch.setattr(layout, "HISTORY", tmp_path / "history")
+
+
 def type_keys(terminal: Terminal, keys: str) -> None:
     """Run the prompt for a person who types this."""
     with create_pipe_input() as keyboard, create_app_session(input=keyboard, output=DummyOutput()):
@@ -28,10 +34,7 @@ def type_keys(terminal: Terminal, keys: str) -> None:
         assert run_prompt(RecordedContext(terminal)) == 0
 
 
-def test_what_was_typed_is_kept_from_run_to_run(
-    terminal: Terminal, tmp_path: Path, monkeypatch: pytest.MonkeyPatch
-) -> None:
-    monkeypatch.setattr(layout, "HISTORY", tmp_path / "history")
+def test_what_was_typed_is_kept_from_run_to_run(terminal: Terminal) -> None:
     layout.HISTORY.touch()
 
     for command in ("hang logind", "well logind"):
@@ -41,11 +44,7 @@ def test_what_was_typed_is_kept_from_run_to_run(
     assert list(kept) == ["well logind", "hang logind"]
 
 
-def test_nothing_is_kept_where_the_box_shows_no_file(
-    terminal: Terminal, tmp_path: Path, monkeypatch: pytest.MonkeyPatch
-) -> None:
-    monkeypatch.setattr(layout, "HISTORY", tmp_path / "history")
-
+def test_nothing_is_kept_where_the_box_shows_no_file(terminal: Terminal, tmp_path: Path) -> None:
     type_keys(terminal, f"hang logind{_ENTER}{_END}")
 
     assert list(tmp_path.iterdir()) == []
