@@ -2,7 +2,7 @@
 
 from __future__ import annotations
 
-from typing import Any, Sequence
+from typing import Any
 
 import dbus
 import pytest
@@ -15,6 +15,12 @@ from sandbox.terminal import Terminal
 
 PROPERTIES = "org.freedesktop.DBus.Properties"
 EDITOR = LauncherItem("/usr/share/applications/editor.desktop", "编辑器", "a", "b", 3, 1 << 40)
+
+
+@pytest.fixture
+def editor(terminal: Terminal) -> str:
+    """An application with a window; the path of its entry on the dock."""
+    return terminal.dock.open_app("editor", "Editor")
 
 
 def of_dock(on_session: Stranger, name: str) -> Any:
@@ -63,13 +69,12 @@ def test_entries_are_announced_with_their_place_and_keep_their_order(
 
 
 def test_an_entry_that_has_gone_is_no_object_but_asking_for_it_no_mistake(
-    terminal: Terminal, on_session: Stranger
+    terminal: Terminal, on_session: Stranger, editor: str
 ) -> None:
-    path = terminal.dock.open_app("editor", "Editor")
     terminal.dock.close_app("editor")
 
     with pytest.raises(dbus.DBusException) as raised:
-        of_entry(on_session, path, "Id")
+        of_entry(on_session, editor, "Id")
 
     assert raised.value.get_dbus_name() == "org.freedesktop.DBus.Error.UnknownObject"
     assert terminal.violations() == []
@@ -87,47 +92,36 @@ def test_an_entry_that_has_gone_is_no_object_but_asking_for_it_no_mistake(
     ids=str,
 )
 def test_a_change_is_announced_in_the_ways_that_the_dock_knows(
-    terminal: Terminal, on_session: Stranger, announces: Sequence[Announcement], members: list[str]
+    terminal: Terminal, on_session: Stranger, editor: str, announces: list[Announcement], members: list[str]
 ) -> None:
-    path = terminal.dock.open_app("editor", "Editor")
     terminal.dock.announces = tuple(announces)
     mark = terminal.events.mark()
 
     terminal.dock.set_windows("editor", 3)
 
     assert [member for member, *_ in signals(terminal, mark)] == members
-    assert len(of_entry(on_session, path, "WindowInfos")) == 3
+    assert len(of_entry(on_session, editor, "WindowInfos")) == 3
 
 
-def test_invalidated_names_come_without_values(terminal: Terminal) -> None:
-    terminal.dock.open_app("editor", "Editor")
-    terminal.dock.announces = ("invalidated",)
+@pytest.mark.parametrize(
+    ("way", "announced"),
+    [
+        ("invalidated", [("PropertiesChanged", dock.ENTRY, {}, [name]) for name in ("Name", "IsDocked")]),
+        ("signal", [("NameChanged", "Text")]),
+    ],
+    ids=["names without values", "no signal for being kept on the dock"],
+)
+def test_other_changes_are_announced_by_their_names_or_by_a_signal_of_their_own(
+    terminal: Terminal, on_session: Stranger, editor: str, way: Announcement, announced: list[Any]
+) -> None:
+    terminal.dock.announces = (way,)
     mark = terminal.events.mark()
 
     terminal.dock.rename("editor", "Text")
-
-    assert signals(terminal, mark) == [("PropertiesChanged", dock.ENTRY, {}, ["Name"])]
-
-
-def test_a_name_is_announced_by_the_entrys_own_signal(terminal: Terminal) -> None:
-    terminal.dock.open_app("editor", "Editor")
-    terminal.dock.announces = ("signal",)
-    mark = terminal.events.mark()
-
-    terminal.dock.rename("editor", "Text")
-
-    assert signals(terminal, mark) == [("NameChanged", "Text")]
-
-
-def test_being_kept_on_the_dock_has_no_signal_of_its_own(terminal: Terminal, on_session: Stranger) -> None:
-    path = terminal.dock.open_app("editor", "Editor")
-    terminal.dock.announces = ("signal",)
-    mark = terminal.events.mark()
-
     terminal.dock.pin("editor")
 
-    assert signals(terminal, mark) == []
-    assert of_entry(on_session, path, "IsDocked") is True
+    assert signals(terminal, mark) == announced
+    assert [of_entry(on_session, editor, name) for name in ("Name", "IsDocked")] == ["Text", True]
 
 
 @pytest.mark.parametrize("window_type", dock.WINDOW_TYPES)
@@ -145,13 +139,12 @@ def test_windows_are_of_the_type_that_the_dock_knows(terminal: Terminal, window_
     assert [len(signal.args[0]) for signal in signals] == [2, 0]
 
 
-def test_other_windows_are_other_identifiers(terminal: Terminal, on_session: Stranger) -> None:
-    path = terminal.dock.open_app("editor", "Editor", windows=2)
-    before = of_entry(on_session, path, "WindowInfos")
+def test_other_windows_are_other_identifiers(terminal: Terminal, on_session: Stranger, editor: str) -> None:
+    before = of_entry(on_session, editor, "WindowInfos")
 
-    terminal.dock.set_windows("editor", 2)
+    terminal.dock.set_windows("editor", 1)
 
-    assert set(before).isdisjoint(of_entry(on_session, path, "WindowInfos"))
+    assert set(before).isdisjoint(of_entry(on_session, editor, "WindowInfos"))
 
 
 def test_what_happens_on_an_absent_dock_is_there_when_it_appears() -> None:
@@ -177,7 +170,7 @@ def test_a_launcher_lists_its_items(terminal: Terminal, on_session: Stranger) ->
     assert items == [("/usr/share/applications/editor.desktop", "编辑器", "a", "b", 3, 1 << 40)]
 
 
-def test_a_launcher_announces_each_change(terminal: Terminal) -> None:
+def test_a_launcher_announces_each_change_with_the_exact_signature(terminal: Terminal) -> None:
     newer = LauncherItem(EDITOR.path, "Editor 2")
     mark = terminal.events.mark()
 
@@ -186,13 +179,14 @@ def test_a_launcher_announces_each_change(terminal: Terminal) -> None:
     terminal.launcher.remove(newer)
     terminal.launcher.announce("moved", EDITOR, category=7)
 
-    changes = [(action, item[1], category) for _, action, item, category in signals(terminal, mark)]
-    assert changes == [
+    announced = terminal.events.all(member="ItemChanged", after=mark)
+    assert [(change.args[0], change.args[1][1], change.args[2]) for change in announced] == [
         ("created", "编辑器", 0),
         ("update", "Editor 2", 0),
         ("deleted", "Editor 2", 0),
         ("moved", "编辑器", 7),
     ]
+    assert {change.detail["signature"] for change in announced} == {"s(ssssxx)x"}
     assert terminal.launcher.items == []
 
 
@@ -203,9 +197,3 @@ def test_an_update_keeps_the_other_items(terminal: Terminal) -> None:
     terminal.launcher.update(LauncherItem(EDITOR.path, "Editor 2"))
 
     assert [item.name for item in terminal.launcher.items] == ["Editor 2", "Mail"]
-
-
-def test_a_change_has_the_exact_signature(terminal: Terminal) -> None:
-    terminal.launcher.install(EDITOR)
-
-    assert terminal.events.wait_for(member="ItemChanged").detail["signature"] == "s(ssssxx)x"

@@ -30,10 +30,6 @@ def version(name: str) -> str:
     return run("/usr/bin/dpkg-query", "-W", "-f=${Version}\n", name)
 
 
-def test_database_is_empty_at_first(terminal: Terminal) -> None:
-    assert run("dpkg-query", "-W") == ""
-
-
 def test_package_brings_its_desktop_file(terminal: Terminal) -> None:
     terminal.packages.install("editor", "1:2.1-3")
 
