@@ -22,17 +22,13 @@ def figure(
     return Figure(name, "title", kind, "KiB", values, floor, goal)
 
 
-def test_ratio_is_that_of_the_medians() -> None:
-    assert figure([3, 100, 2], [1, 2, 0]).ratio == 3
-
-
-def test_figure_without_a_floor_has_no_ratio() -> None:
-    assert figure([3]).ratio is None
-
-
-def test_nothing_is_as_much_as_nothing_and_anything_is_more() -> None:
-    assert figure([0], [0]).ratio == 1
-    assert figure([1], [0]).ratio == float("inf")
+@pytest.mark.parametrize(
+    ("values", "floor", "ratio"),
+    [([3, 100, 2], [1, 2, 0], 3), ([3], [], None), ([0], [0], 1), ([1], [0], float("inf"))],
+    ids=["of the medians", "none without a floor", "nothing to nothing", "anything to nothing"],
+)
+def test_ratio_to_the_floor(values: list[float], floor: list[float], ratio: float | None) -> None:
+    assert figure(values, floor).ratio == ratio
 
 
 @pytest.mark.parametrize(

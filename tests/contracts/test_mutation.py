@@ -13,17 +13,16 @@ from sandbox import REPOSITORY
 from tests.mutation import explanations, workshop
 from tests.mutation.areas import AREAS, Area, area_of, chosen
 from tests.mutation.explanations import Key
-from tests.mutation.mutants import mutants
+from tests.mutation.mutants import Mutant, mutants
 from tests.mutation.mutate import Task, report
 from tests.mutation.workshop import Workshop, WorkshopTrouble
 
 FUNCTION = "void Thing::act()\n{{\n    {}\n}}\n"
 
 
-def changes(statement: str) -> list[str]:
-    """What a line in a function is changed to."""
-    found, _ = mutants("thing.cpp", FUNCTION.format(statement))
-    return [mutant.after for mutant in found]
+def mutants_of(statement: str) -> list[Mutant]:
+    """The mutants of a line in a function."""
+    return mutants("thing.cpp", FUNCTION.format(statement))[0]
 
 
 @pytest.mark.parametrize(
@@ -44,7 +43,7 @@ def changes(statement: str) -> list[str]:
     ],
 )
 def test_conditions_and_constants_are_changed_one_at_a_time(statement: str, expected: set[str]) -> None:
-    assert set(changes(statement)) == expected
+    assert {mutant.after for mutant in mutants_of(statement)} == expected
 
 
 @pytest.mark.parametrize(
@@ -52,7 +51,7 @@ def test_conditions_and_constants_are_changed_one_at_a_time(statement: str, expe
     ['send("");', "QList<int> list;", "auto&& all = list;", "call();", "// if (a == b) { true; }"],
 )
 def test_what_would_change_nothing_is_left_alone(statement: str) -> None:
-    assert changes(statement) == []
+    assert mutants_of(statement) == []
 
 
 def test_what_only_changes_a_log_text_is_counted_and_left_out() -> None:
@@ -61,7 +60,7 @@ def test_what_only_changes_a_log_text_is_counted_and_left_out() -> None:
 
 
 def test_a_mutant_says_where_it_is() -> None:
-    (mutant,) = mutants("thing.cpp", FUNCTION.format("set(true);"))[0]
+    (mutant,) = mutants_of("set(true);")
     assert str(mutant) == "thing.cpp:3: set(true); → set(false);"
     assert mutant.function == "act"
     assert mutant.content == FUNCTION.format("set(false);")
@@ -97,7 +96,7 @@ def test_sources_are_chosen_by_name_or_pattern() -> None:
 
 
 def test_an_explanation_of_a_mutant_that_is_gone_is_found() -> None:
-    (mutant,) = mutants("thing.cpp", FUNCTION.format("set(true);"))[0]
+    (mutant,) = mutants_of("set(true);")
     of_it = explanations.key_of(mutant)
     gone = Key("thing.cpp act", "set(false);", "set(true);")
     elsewhere = Key("other.cpp act", "set(false);", "set(true);")
@@ -116,7 +115,7 @@ def test_an_explanation_is_for_the_mutants_below_it() -> None:
 
 @pytest.mark.parametrize(("is_sample", "status"), [(False, 1), (True, 0)])
 def test_a_sample_is_not_judged(is_sample: bool, status: int) -> None:
-    (mutant, *_), _ = mutants("thing.cpp", FUNCTION.format("set(true);"))
+    (mutant,) = mutants_of("set(true);")
 
     assert report([Task(mutant, AREAS[0])], ["survived"], 0, is_sample) == status
 

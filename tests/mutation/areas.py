@@ -21,130 +21,113 @@ class Area:
     e2e: tuple[str, ...] = ()
     local: tuple[str, ...] = ()
     functions: tuple[str, ...] = ()
-    by_default: bool = True
+
+    @property
+    def by_default(self) -> bool:
+        """Whether its component is among the most important ones."""
+        return self.component not in ("gateway", "applications")
+
+
+def _area(file: str, component: str, **words: str) -> Area:
+    return Area(_FOLDER + file, component, **{name: tuple(known.split()) for name, known in words.items()})
 
 
 AREAS = (
-    Area(
-        f"{_FOLDER}message_transfer.cpp",
+    _area(
+        "message_transfer.cpp",
         "dispatcher",
-        ("message_transfer_test",),
-        (
-            "startup",
-            "start_order",
-            "policies",
-            "daemon_life",
-            "session_state",
-            "service_life",
-            "hung_services",
-        ),
-        ("local_user", "startup"),
+        unit="message_transfer_test",
+        e2e="startup start_order policies daemon_life session_state service_life hung_services",
+        local="local_user startup",
     ),
-    Area(
-        f"{_FOLDER}message_transfer.cpp",
+    _area(
+        "message_transfer.cpp",
         "dispatcher",
-        ("message_transfer_test", "restore_configuration_test"),
-        ("policies", "domain_exit", "restore_script", "hung_services"),
-        functions=("leaveDomain", "restoreConfiguration", "rebootTime"),
+        unit="message_transfer_test restore_configuration_test",
+        e2e="policies domain_exit restore_script hung_services",
+        functions="leaveDomain restoreConfiguration rebootTime",
     ),
-    Area(
-        f"{_FOLDER}domain_exit.cpp",
+    _area(
+        "domain_exit.cpp",
         "dispatcher",
-        ("restore_configuration_test",),
-        ("domain_exit", "restore_script", "hung_services"),
+        unit="restore_configuration_test",
+        e2e="domain_exit restore_script hung_services",
     ),
-    Area(
-        f"{_FOLDER}session_user.cpp",
+    _area(
+        "session_user.cpp",
         "state report",
-        ("message_transfer_test",),
-        ("startup", "session_state", "messages"),
-        ("local_user",),
+        unit="message_transfer_test",
+        e2e="startup session_state messages",
+        local="local_user",
     ),
-    Area(
-        f"{_FOLDER}message_transfer.cpp",
+    _area(
+        "message_transfer.cpp",
         "state report",
-        ("message_transfer_test",),
-        ("startup", "start_order", "daemon_life", "session_state", "hung_services"),
-        ("local_user", "startup"),
-        ("statusOf", "readLoginUser", "startTimers", "reportAgain", "getUserState", "getScreenState"),
+        unit="message_transfer_test",
+        e2e="startup start_order daemon_life session_state hung_services",
+        local="local_user startup",
+        functions="statusOf readLoginUser startTimers reportAgain getUserState getScreenState",
     ),
-    Area(
-        f"{_FOLDER}session_state.cpp",
+    _area(
+        "session_state.cpp",
         "state report",
-        ("message_transfer_test",),
-        ("startup", "daemon_life", "session_state", "service_life", "hung_services"),
-        ("local_user", "startup"),
+        unit="message_transfer_test",
+        e2e="startup daemon_life session_state service_life hung_services",
+        local="local_user startup",
     ),
-    Area(
-        f"{_FOLDER}message_transfer.cpp",
+    _area(
+        "message_transfer.cpp",
         "uploads",
-        ("message_transfer_test",),
-        ("software_reports", "launcher_life", "start_order"),
-        functions=("startSoftwareReports", "onSoftwareChanged", "uploadSoftware", "uploadSoftwareChange"),
+        unit="message_transfer_test",
+        e2e="software_reports launcher_life start_order",
+        functions="startSoftwareReports onSoftwareChanged uploadSoftware uploadSoftwareChange",
     ),
-    Area(
-        f"{_FOLDER}session_policy.cpp", "dispatcher", ("session_policy_test",), ("policies",), ("local_user",)
-    ),
-    Area(
-        f"{_FOLDER}message_platform.cpp",
+    _area("session_policy.cpp", "dispatcher", unit="session_policy_test", e2e="policies", local="local_user"),
+    _area(
+        "message_platform.cpp",
         "message client",
-        ("message_platform_test", "message_platform_poll_test", "message_platform_drain_test"),
-        ("messages", "message_drain", "message_contents", "password", "platform_faults", "startup"),
-        ("local_user", "startup", "platform_faults"),
+        unit="message_platform_test message_platform_poll_test message_platform_drain_test",
+        e2e="messages message_drain message_contents password platform_faults startup",
+        local="local_user startup platform_faults",
     ),
-    Area(
-        f"{_FOLDER}follow_ups.cpp",
+    _area(
+        "follow_ups.cpp",
         "message client",
-        ("follow_ups_test", "message_platform_drain_test"),
-        ("message_drain",),
+        unit="follow_ups_test message_platform_drain_test",
+        e2e="message_drain",
     ),
-    Area(
-        f"{_FOLDER}remote_object.cpp",
+    _area(
+        "remote_object.cpp",
         "state report",
-        ("remote_object_test",),
-        ("session_state", "daemon_life", "domain_exit", "hung_services"),
+        unit="remote_object_test",
+        e2e="session_state daemon_life domain_exit hung_services",
     ),
-    Area(f"{_FOLDER}software_report.cpp", "uploads", ("software_report_test",), ("software_reports",)),
-    Area(
-        f"{_FOLDER}launcher_guard.cpp",
+    _area("software_report.cpp", "uploads", unit="software_report_test", e2e="software_reports"),
+    _area(
+        "launcher_guard.cpp",
         "uploads",
-        ("launcher_guard_test", "desktop_arrival_test"),
-        (
-            "launcher_life",
-            "software_reports",
-            "inventory_files",
-            "package_lookups",
-            "package_tools",
-            "package_tool_calls",
-        ),
+        unit="launcher_guard_test desktop_arrival_test",
+        e2e="launcher_life software_reports inventory_files package_lookups package_tools package_tool_calls",
     ),
-    Area(
-        f"{_FOLDER}package_tool.cpp",
-        "uploads",
-        ("package_tool_test",),
-        ("package_tools", "package_tool_calls"),
-    ),
-    Area(f"{_FOLDER}terminal_address.cpp", "uploads", ("terminal_address_test",), ("software_reports",)),
-    Area(
-        f"{_FOLDER}handleevent.cpp",
+    _area("package_tool.cpp", "uploads", unit="package_tool_test", e2e="package_tools package_tool_calls"),
+    _area("terminal_address.cpp", "uploads", unit="terminal_address_test", e2e="software_reports"),
+    _area(
+        "handleevent.cpp",
         "gateway",
-        ("handleevent_notification_test", "handleevent_platform_test"),
-        ("password", "messages", "policies", "message_contents"),
-        by_default=False,
+        unit="handleevent_notification_test handleevent_platform_test",
+        e2e="password messages policies message_contents",
     ),
-    Area(
-        f"{_FOLDER}appopenspy.cpp",
+    _area(
+        "appopenspy.cpp",
         "applications",
-        ("appopenspy_test", "desktop_arrival_test"),
-        ("applications", "application_windows", "dock_life", "dock_faults"),
-        by_default=False,
+        unit="appopenspy_test desktop_arrival_test",
+        e2e="applications application_windows dock_life dock_faults",
     ),
-    Area(
-        f"{_FOLDER}entryinfo.cpp",
+    _area(
+        "entryinfo.cpp",
         "applications",
-        ("entryinfo_test",),
-        ("application_windows", "applications", "dock_faults"),
-        by_default=False,
+        unit="entryinfo_test",
+        e2e="application_windows applications dock_faults",
     ),
 )
 

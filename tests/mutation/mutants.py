@@ -4,21 +4,13 @@ from __future__ import annotations
 
 import re
 from dataclasses import dataclass
-from typing import Iterator
+from typing import Iterator, NamedTuple
 
 from tests.mutation.tokens import Token, tokens
 
-_SWAPPED_TEXTS = {
-    "==": ("!=",),
-    "!=": ("==",),
-    "<": ("<=",),
-    "<=": ("<",),
-    ">": (">=",),
-    ">=": (">",),
-    "&&": ("||",),
-    "||": ("&&",),
-    "true": ("false",),
-    "false": ("true",),
+_OPPOSITES = (("==", "!="), ("<", "<="), (">", ">="), ("&&", "||"), ("true", "false"))
+_SWAPPED_TEXTS: dict[str, tuple[str, ...]] = {
+    **{text: (other,) for pair in _OPPOSITES for text, other in (pair, pair[::-1])},
     "?": ("&& false ?", "|| true ?"),
 }
 # Those that do something else without blanks around them: templates, references.
@@ -44,8 +36,7 @@ class Mutant:
         return f"{self.file}:{self.line}: {self.before} → {self.after}"
 
 
-@dataclass(frozen=True)
-class _Change:
+class _Change(NamedTuple):
     start: int
     end: int
     text: str
@@ -56,8 +47,7 @@ def mutants(file: str, source: str) -> tuple[list[Mutant], int]:
     """All changes of a source that make sense, and the number of those left out because they only concern a
     log statement: those texts are held against the log catalogue."""
     all_tokens = tokens(source)
-    changes = [*_token_changes(source, all_tokens), *_negations(source, all_tokens)]
-    changes.sort(key=lambda change: (change.start, change.end, change.text))
+    changes = sorted([*_token_changes(source, all_tokens), *_negations(source, all_tokens)])
     chosen = [_mutant(file, source, change) for change in changes if not change.log]
     return chosen, len(changes) - len(chosen)
 

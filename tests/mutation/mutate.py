@@ -36,11 +36,6 @@ class Task:
     mutant: Mutant
     area: Area
 
-    @property
-    def component(self) -> str:
-        """The part of the agent that it changes."""
-        return self.area.component
-
 
 def tasks_for(areas: Sequence[Area]) -> tuple[list[Task], int]:
     """All mutants of the areas' files, and how many were left out because they change no more than a log."""
@@ -89,9 +84,9 @@ def report(tasks: Sequence[Task], outcomes: Sequence[Outcome], left_out: int, is
     are not explained; a sample is too small to be judged by it."""
     weak = []
     print(f"\n{'component':16}{'mutants':>9}{'explained':>11}{'caught':>9}{'survived':>10}")
-    for component in sorted({task.component for task in tasks}):
+    for component in sorted({task.area.component for task in tasks}):
         pairs = zip(tasks, outcomes)
-        count = Counter(outcome for task, outcome in pairs if task.component == component)
+        count = Counter(outcome for task, outcome in pairs if task.area.component == component)
         caught, survived = count["caught"], count["survived"]
         share = 100 * caught / (caught + survived) if caught + survived else 100.0
         whole = count.total() - count["invalid"]

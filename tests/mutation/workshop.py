@@ -2,7 +2,9 @@
 
 from __future__ import annotations
 
+import filecmp
 import os
+import shutil
 import signal
 import subprocess
 import threading
@@ -165,17 +167,13 @@ def _copy_tree(folder: Path) -> None:
     """Copy what git knows or would add; files that are the same already keep their time, so that they are not
     built again."""
     listed = ["git", "ls-files", "-z", "--cached", "--others", "--exclude-standard"]
-    names = (
-        subprocess.run(listed, cwd=REPOSITORY, capture_output=True, check=True).stdout.decode().split("\0")
-    )
-    wanted = {name for name in names if name and (REPOSITORY / name).is_file()}
+    names = subprocess.run(listed, cwd=REPOSITORY, capture_output=True, text=True, check=True).stdout
+    wanted = {name for name in names.split("\0") if name and (REPOSITORY / name).is_file()}
     for name in sorted(wanted):
         source, target = REPOSITORY / name, folder / name
-        content = source.read_bytes()
-        if not target.exists() or target.read_bytes() != content:
+        if not target.exists() or not filecmp.cmp(source, target, shallow=False):
             target.parent.mkdir(parents=True, exist_ok=True)
-            target.write_bytes(content)
-            target.chmod(source.stat().st_mode & 0o777)
+            shutil.copy(source, target)
     for file in [file for file in folder.rglob("*") if file.is_file()]:
         name = str(file.relative_to(folder))
         if name not in wanted and not name.startswith("build/"):
