@@ -6,7 +6,7 @@ from pathlib import Path
 
 import pytest
 
-from tests.dev.devtree import Tree, have_all_packages, refused
+from tests.dev.devtree import Tree, refused
 from tests.dev.otherroot import let_roots_be_made
 
 
@@ -109,7 +109,6 @@ def test_root_makes_a_root_without_sudo(tree: Tree) -> None:
 
 def test_the_tree_may_lie_in_a_folder_of_any_name(tmp_path: Path) -> None:
     tree = Tree(tmp_path / "pä th" / "vel ks")
-    have_all_packages(tree)
     let_roots_be_made(tree)
 
     ended = tree.dev("elsewhere", "trixie", "cat", "source.cpp")

@@ -5,6 +5,7 @@ from __future__ import annotations
 import re
 import subprocess
 from pathlib import Path
+from typing import Callable
 
 import pytest
 
@@ -15,6 +16,8 @@ PLAN = """Reading package lists...
 Need to get 177 MB/180 MB of archives.
 After this operation, 750 MB of additional disk space will be used.
 """
+ERROR = "Could not resolve 'deb.debian.org'"
+AS_ROOT = "as root, run: apt-get update && apt-get install --no-install-recommends graphviz"
 
 
 @pytest.fixture
@@ -34,25 +37,28 @@ def bare(tree: Tree) -> Tree:
     return tree
 
 
-def names(tree: Tree) -> set[str]:
-    """What was asked of the package manager."""
+def installation(tree: Tree) -> tuple[str, set[str]]:
+    """The options and the names that packages were installed with."""
     (asked,) = [call for call in tree.calls("apt-get") if "install" in call and "assume-no" not in call]
-    return set(asked.split(" install ")[1].split())
+    options, names = asked.split(" install ")
+    return options, set(names.split())
 
 
-def group(tree: Tree, *wanted: str) -> set[str]:
+def groups() -> dict[str, list[str]]:
+    """The names in each group of packages."""
+    parts = (REPOSITORY / "packages.txt").read_text().split("\n[")[1:]
+    known = [part.partition("]") for part in parts]
+    return {group: re.findall(r"^[^#\n].*", names, re.MULTILINE) for group, _, names in known}
+
+
+def packages(*wanted: str) -> set[str]:
     """The packages of these groups."""
-    found: dict[str, set[str]] = {}
-    for line in (tree.root / "packages.txt").read_text().splitlines():
-        if line.startswith("["):
-            current = found.setdefault(line.strip("[]"), set())
-        elif line and not line.startswith("#"):
-            current.add(line)
-    return set.union(*(found[name] for name in wanted or found.keys() - {"booted", "neighbours"}))
+    known = groups()
+    return {name for group in wanted or known.keys() - {"booted", "neighbours"} for name in known[group]}
 
 
 @pytest.mark.parametrize(
-    ("command", "groups"),
+    ("command", "needed"),
     [
         ("demo", "build terminal"),
         ("box", "build terminal"),
@@ -69,10 +75,12 @@ def group(tree: Tree, *wanted: str) -> set[str]:
         ("setup lint plots", "lint plots"),
     ],
 )
-def test_a_command_installs_what_it_needs_and_no_more(bare: Tree, command: str, groups: str) -> None:
+def test_a_command_installs_what_it_needs_and_no_more(bare: Tree, command: str, needed: str) -> None:
     bare.dev(*command.split())
 
-    assert names(bare) == group(bare, *groups.split())
+    options, names = installation(bare)
+    assert names == packages(*needed.split())
+    assert "--no-install-recommends" in options
 
 
 def test_what_is_there_is_not_installed_again(bare: Tree) -> None:
@@ -80,7 +88,7 @@ def test_what_is_there_is_not_installed_again(bare: Tree) -> None:
 
     ended = bare.dev("setup", "diagrams", "plots")
 
-    assert names(bare) == {"graphviz"}
+    assert installation(bare)[1] == {"graphviz"}
     assert "All packages are installed." in ended.stdout
 
 
@@ -97,64 +105,57 @@ def test_names_and_sizes_are_shown_beforehand_and_progress_after(bare: Tree) -> 
     assert [line for line in shown if line in listed] == listed
 
 
-def test_nothing_is_recommended_into_the_machine(bare: Tree) -> None:
-    bare.dev("diagrams")
-
-    (asked,) = [call for call in bare.calls("apt-get") if "assume-no" not in call and "install" in call]
-    assert "--no-install-recommends" in asked
-
-
-def test_without_a_network_the_cause_is_one_line(bare: Tree) -> None:
-    bare.stand_in(
-        "apt-get", "for i in 1 2 3; do echo \"E: Could not resolve 'deb.debian.org'\"; done; exit 100"
+@pytest.mark.parametrize(
+    ("command", "step", "line"),
+    [
+        ("diagrams", "update", f"Debian's package lists could not be fetched: {ERROR}; is there a network?"),
+        ("diagrams", "install", f"the packages could not be installed: {ERROR}; see build/apt.log"),
+        (
+            "bench neighbours",
+            "download",
+            f"the neighbours could not be fetched: {ERROR}; is there a network?",
+        ),
+        (
+            "bench neighbours",
+            "--simulate",
+            "apt-get does not find the neighbours; update its lists with: sudo apt-get update",
+        ),
+    ],
+)
+def test_what_the_package_manager_refuses_is_one_line_with_the_first_cause(
+    tree: Tree, command: str, step: str, line: str
+) -> None:
+    tree.stand_in("dpkg-query", "[[ $* != *graphviz ]] || exit 1; echo installed")
+    tree.stand_in(
+        "apt-get",
+        f"""case $* in
+            *{step}*) echo "E: {ERROR}"; echo "E: more"; exit 100 ;;
+            *--simulate*) echo "Inst kded5" ;;
+        esac""",
     )
 
-    assert refused(bare.dev("diagrams")) == (
-        "Debian's package lists could not be fetched: Could not resolve 'deb.debian.org'; is there a network?"
-    )
+    assert refused(tree.dev(*command.split())) == line
 
 
-def test_a_package_that_cannot_be_installed_is_one_line(bare: Tree) -> None:
-    bare.stand_in(
-        "apt-get", "[[ $* != *install* ]] || { echo 'E: Unable to locate package graphviz'; exit 100; }"
-    )
+@pytest.mark.parametrize(
+    ("lose", "line"),
+    [
+        (
+            lambda tree: tree.take_away("apt-get"),
+            "this needs Debian's apt-get; install the packages of packages.txt by hand",
+        ),
+        (lambda tree: tree.take_away("sudo"), f"packages are missing and there is no sudo; {AS_ROOT}"),
+        (lambda tree: tree.stand_in("sudo", "exit 1"), f"packages are missing and sudo refuses; {AS_ROOT}"),
+    ],
+    ids=["no package manager", "no sudo", "sudo refuses"],
+)
+def test_where_nothing_can_be_installed_a_line_says_what_to_do_by_hand(
+    bare: Tree, lose: Callable[[Tree], None], line: str
+) -> None:
+    lose(bare)
 
-    assert refused(bare.dev("diagrams")) == (
-        "the packages could not be installed: Unable to locate package graphviz; " "see build/apt.log"
-    )
-
-
-def test_an_interrupted_installation_is_named_with_its_remedy(bare: Tree) -> None:
-    words = "dpkg was interrupted, you must manually run 'sudo dpkg --configure -a' to correct the problem."
-    bare.stand_in("apt-get", f"""[[ $* != *install* ]] || {{ echo "E: {words}"; exit 100; }}""")
-
-    assert refused(bare.dev("diagrams")) == (
-        f"the packages could not be installed: {words}; see build/apt.log"
-    )
-
-
-def test_without_sudo_the_line_for_root_is_shown(bare: Tree) -> None:
-    bare.take_away("sudo")
-
-    assert refused(bare.dev("diagrams")) == (
-        "packages are missing and there is no sudo; as root, run: "
-        "apt-get update && apt-get install --no-install-recommends graphviz"
-    )
-
-
-def test_a_refusal_by_sudo_shows_the_line_for_root(bare: Tree) -> None:
-    bare.stand_in("sudo", "exit 1")
-
-    assert refused(bare.dev("diagrams")).startswith("packages are missing and sudo refuses; as root, run: ")
+    assert refused(bare.dev("diagrams")) == line
     assert not bare.calls("apt-get")
-
-
-def test_without_a_package_manager_the_list_is_named(bare: Tree) -> None:
-    bare.take_away("apt-get")
-
-    line = refused(bare.dev("diagrams"))
-
-    assert line == "this needs Debian's apt-get; install the packages of packages.txt by hand"
 
 
 def test_root_needs_no_sudo(bare: Tree) -> None:
@@ -163,16 +164,16 @@ def test_root_needs_no_sudo(bare: Tree) -> None:
     assert not bare.calls("sudo") and bare.calls("apt-get")
 
 
-def test_what_the_package_is_built_from_is_installed(tree: Tree) -> None:
+def test_what_the_package_is_built_from_is_installed() -> None:
     control = Path(REPOSITORY, "debian/control").read_text()
     (wanted,) = re.findall(r"^Build-Depends:((?:.*\n )*.*)", control, re.MULTILINE)
     named = {re.split(r"[ :(]", name.strip())[0] for name in wanted.split(",")}
 
-    assert named - {"", "debhelper-compat"} <= group(tree, "build", "package")
+    assert named - {"", "debhelper-compat"} <= packages("build", "package")
 
 
-def test_no_package_starts_anything_that_stays(tree: Tree) -> None:
-    for name in group(tree):
+def test_no_package_starts_anything_that_stays() -> None:
+    for name in packages():
         listed = subprocess.run(["dpkg", "-L", name], capture_output=True, text=True).stdout
         units = re.findall(
             r"/lib/systemd/system/.*\.(?:service|socket)$|^/etc/init.d/.+", listed, re.MULTILINE
@@ -181,16 +182,11 @@ def test_no_package_starts_anything_that_stays(tree: Tree) -> None:
         assert [unit for unit in units if not listed.count(unit.replace(".service", ".timer"))] == [], name
 
 
-def test_the_names_are_in_order_and_none_is_there_twice_in_a_group(tree: Tree) -> None:
-    text = Path(tree.root, "packages.txt").read_text()
-
-    for part in text.split("[")[1:]:
-        listed = [line for line in part.splitlines()[1:] if line and not line.startswith("#")]
-        assert listed == sorted(set(listed))
+def test_the_names_are_in_order_and_none_is_there_twice_in_a_group() -> None:
+    assert {group: sorted(set(names)) for group, names in groups().items()} == groups()
 
 
 def test_the_help_of_setup_names_every_group() -> None:
-    groups = re.findall(r"^\[(\w+)\]", (REPOSITORY / "packages.txt").read_text(), re.MULTILINE)
     explained = re.findall(r"^  (\w+) ", (REPOSITORY / "dev.d/help/setup.txt").read_text(), re.MULTILINE)
 
-    assert explained == groups
+    assert explained == list(groups())

@@ -7,10 +7,10 @@ from pathlib import Path
 
 import pytest
 
-from tests.dev.devtree import Tree, commands, have_all_packages, refused
+from tests.dev.devtree import Tree, commands, refused
 from tests.dev.otherroot import let_roots_be_made
 
-CHECKS = ("clang-format", "black", "flake8", "mypy", "shellcheck", "xmllint", "clang-tidy")
+CHECKS = ("limits", "clang-format", "black", "flake8", "mypy", "shellcheck", "xmllint", "clang-tidy")
 
 
 @pytest.mark.parametrize("command", ["demo", "box", "soak", "test e2e", "test contracts"])
@@ -63,25 +63,18 @@ def test_warnings_of_a_build_are_shown_and_its_failure_is_named(tree: Tree) -> N
     assert refused(ended) == "the build failed; see the messages above"
 
 
-def test_all_layers_run_even_when_one_fails(tree: Tree) -> None:
+@pytest.mark.parametrize(
+    ("status", "failed"), [("0", "unit"), ("1", "unit, dev, the domain user's, the local user's")]
+)
+def test_all_layers_run_and_each_that_fails_is_named(tree: Tree, status: str, failed: str) -> None:
     tree.stand_in("ctest", "exit 8")
-
-    ended = tree.dev("test")
-
-    assert refused(ended) == "these tests failed: unit; see the messages above"
-    layers = ("tests/dev", "tests/bench tests/contracts tests/sandbox tests/e2e", "tests/sandbox tests/e2e")
-    assert [call.endswith(layer) for call, layer in zip(tree.calls("pytest"), layers)] == [True] * 3
-
-
-def test_every_layer_that_failed_is_named(tree: Tree) -> None:
-    tree.stand_in("ctest", "exit 8")
-    tree.extra = {"STATUS_OF_pytest": "1"}
+    tree.extra = {"STATUS_OF_pytest": status}
 
     line = refused(tree.dev("test"))
 
-    assert (
-        line == "these tests failed: unit, dev, the domain user's, the local user's; see the messages above"
-    )
+    assert line == f"these tests failed: {failed}; see the messages above"
+    layers = ("tests/dev", "tests/bench tests/contracts tests/sandbox tests/e2e", "tests/sandbox tests/e2e")
+    assert [call.endswith(layer) for call, layer in zip(tree.calls("pytest"), layers)] == [True] * 3
 
 
 @pytest.mark.parametrize(("status", "expected"), [("0", 0), ("1", 1), ("5", 1)])
@@ -100,17 +93,12 @@ def test_a_layers_status_is_that_of_its_tests_and_both_users_run(
 @pytest.mark.parametrize("failing", CHECKS)
 def test_every_check_is_made_whichever_fails(tree: Tree, failing: str) -> None:
     tree.stand_in(failing, "exit 1")
+    tree.extra = {"STATUS_OF_limits": str(int(failing == "limits"))}
 
     line = refused(tree.dev("lint"))
 
     assert line == f"lint: not clean: {failing.replace('-', '_')}"
     assert {call.split()[0] for call in tree.calls(*CHECKS)} == set(CHECKS)
-
-
-def test_a_tree_with_a_file_that_is_too_large_is_not_clean(tree: Tree) -> None:
-    tree.extra = {"STATUS_OF_limits": "1"}
-
-    assert refused(tree.dev("lint")) == "lint: not clean: limits"
 
 
 def test_a_clean_tree_is_clean(tree: Tree) -> None:
@@ -137,7 +125,6 @@ def test_a_drawing_does_not_name_the_program_that_drew_it(tree: Tree) -> None:
 
 def test_a_folder_may_have_any_name(tmp_path: Path) -> None:
     tree = Tree(tmp_path / "pä th" / "vel ks")
-    have_all_packages(tree)
 
     for command in ("demo", "test", "lint", "diagrams"):
         ended = tree.dev(command)
