@@ -73,6 +73,7 @@ def test_stranger_is_ignored_whether_the_daemon_is_there_or_not(
     ("path", "interface"),
     [
         ("/com/norix/velk/other", daemon.INTERFACE),
+        (f"{daemon.PATH}/below", daemon.INTERFACE),
         ("/", daemon.INTERFACE),
         (daemon.PATH, "com.norix.velk.pryg"),
         (daemon.PATH, "com.norix.velk.velkg.other"),
@@ -101,17 +102,25 @@ def test_signals_that_the_agent_does_not_use_do_nothing(session: Terminal) -> No
     next_status(session, mark)
 
 
-def test_stranger_in_the_queue_is_obeyed_once_it_owns_the_name_and_not_before(
-    session: Terminal, on_system: Stranger
+@straight_or_not
+def test_stranger_in_the_queue_is_obeyed_while_it_owns_the_name_and_not_before_or_after(
+    session: Terminal, on_system: Stranger, straight: bool
 ) -> None:
+    agent = receivers(session, session.system_bus, straight)
     assert on_system.own(daemon.INTERFACE, queue=True) == 2
     mark = session.events.mark()
-    send(on_system, [policy('{"type":1301}')])
+    send(on_system, [policy('{"type":1301}')], agent)
     assert settled(session, mark) == []
 
     session.daemon.leave()
-    send(on_system, [policy('{"type":1300}')])
+    send(on_system, [policy('{"type":1300}')], agent)
     assert next_notification(session, mark).body == SHUTDOWN_NOTICE
+
+    on_system.release(daemon.INTERFACE)
+    mark = session.events.mark()
+    send(on_system, [policy('{"type":1301}')], agent)
+    session.daemon.appear()
+    assert settled(session, mark) == []
 
 
 @straight_or_not
