@@ -16,12 +16,8 @@ from sandbox.policies import POLICIES
 
 NOT_COPIED = shutil.ignore_patterns("build", ".*", "__pycache__")
 PAGE_TESTS = ("tests/contracts/test_docs.py", "tests/contracts/test_examples.py")
-# The action that has a text of its own, its test, and the picture.
-SHOWING_ITS_OWN = {
-    "src/velk/velks/handleevent.cpp",
-    "tests/unit/handleevent_notification_test.cpp",
-    "docs/demo.svg",
-}
+# The action that has a text of its own, and the picture.
+SHOWING_ITS_OWN = {"src/velk/velks/handleevent.cpp", "docs/demo.svg"}
 # What people at the prompt, the tests, the soak and the fuzzer make of the code.
 USES = """
 from sandbox.events import Event

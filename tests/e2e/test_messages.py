@@ -11,7 +11,7 @@ from sandbox.periods import BEFORE_ANY_POLL, SURELY_FIRST_POLL, SURELY_NEXT_POLL
 from sandbox.platform.server import HttpFault
 from sandbox.terminal import Terminal
 from tests.e2e.messages import USER, answer_always, as_reply, begin_poll, message, poll, requests, titles
-from tests.e2e.wire import log_lines, next_notification
+from tests.e2e.wire import Notification, log_lines, next_notification
 
 
 def test_message_is_shown_with_its_action_and_marked_read(polling: Terminal) -> None:
@@ -19,16 +19,17 @@ def test_message_is_shown_with_its_action_and_marked_read(polling: Terminal) -> 
     mark = poll(polling)
 
     sent = polling.platform.messages()[0]
-    notification = next_notification(polling, mark)
-    assert (notification.application, notification.summary, notification.body) == (
+    action = f"/usr/bin/velkm,升级,今晚, 22:00,admin,{sent['created_at']}"
+    assert next_notification(polling, mark) == Notification(
         "升级",
+        0,
+        "velkw",
         "升级",
         "今晚, 22:00",
+        ["_open", "查看"],
+        {"x-norix-action-_open": action},
+        0,
     )
-    assert notification.actions == ["_open", "查看"]
-    action = f"/usr/bin/velkm,升级,今晚, 22:00,admin,{sent['created_at']}"
-    assert notification.hints == {"x-norix-action-_open": action}
-    assert notification.timeout == 0
 
     receipt = requests(polling, "read", mark)
     assert [json.loads(event.args[1]) for event in receipt] == [{"uuid": uuid}]

@@ -46,7 +46,7 @@ def test_password_that_does_not_expire_is_logged_twice_and_not_shown(terminal: T
     assert log_lines(terminal, mark).count(NOTICE) == 2
 
 
-@pytest.mark.parametrize("body", [b"", b"garbage"], ids=repr)
+@pytest.mark.parametrize("body", [b"", b"garbage", b'{"code":0,"data":{"result":true'], ids=repr)
 def test_reply_that_is_no_json_is_ignored(terminal: Terminal, body: bytes) -> None:
     terminal.platform.faults["tips"] = HttpFault.reply(200, body)
     mark = start_agent(terminal)

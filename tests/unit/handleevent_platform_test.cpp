@@ -78,41 +78,21 @@ private Q_SLOTS:
         QCOMPARE(m_server->nextRequest()[handshake], first);
     }
 
-    void messageRequestIsGetWithoutContent()
-    {
-        HandleEvent::GetInstance()->getPlatformMsg(m_server->url("demanding", "/plain?uid=a"));
-        const QJsonObject request = m_server->nextRequest();
-        QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain?uid=a HTTP/1.1"));
-        QCOMPARE(request[QStringLiteral("body")].toString(), QString());
-        QVERIFY(!request[QStringLiteral("client")].toString().isEmpty());
-    }
-
-    void replyIsReportedBeforeTheRequestReturns()
-    {
-        QSignalSpy replies(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg);
-        HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 404, QStringLiteral("[]")));
-        QCOMPARE(replies.count(), 1);
-        QCOMPARE(replies.at(0).at(0), QVariant(404));
-        QCOMPARE(replies.at(0).at(1), QVariant(QStringLiteral("[]")));
-        QVERIFY(replies.at(0).at(2).value<Headers>().contains({"X-Said", "yes"}));
-    }
-
-    void replyIsLoggedWithStatusBodyAndHeaderCount()
-    {
-        QTest::ignoreMessage(QtInfoMsg, R"(getPlatformMsg ----nCode: 404 : "[]" : 2)");
-        HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 404, QStringLiteral("[]")));
-    }
-
-    void replyIsLoggedBeforeItIsReported()
+    void replyIsLoggedAndThenReportedBeforeTheRequestReturns()
     {
         const LogRecorder log;
         QStringList linesWhenReported;
         const QObject receiver;
         connect(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg, &receiver,
                 [&linesWhenReported, &log] { linesWhenReported = log.lines(); });
-        HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 200, QStringLiteral("[]")));
+        QSignalSpy replies(HandleEvent::GetInstance(), &HandleEvent::recvPlatformMsg);
+        HandleEvent::GetInstance()->getPlatformMsg(said(*m_server, 404, QStringLiteral("[]")));
         QCOMPARE(linesWhenReported,
-                 QStringList{QStringLiteral(R"(info: getPlatformMsg ----nCode: 200 : "[]" : 2)")});
+                 QStringList{QStringLiteral(R"(info: getPlatformMsg ----nCode: 404 : "[]" : 2)")});
+        QCOMPARE(replies.count(), 1);
+        QCOMPARE(replies.at(0).at(0), QVariant(404));
+        QCOMPARE(replies.at(0).at(1), QVariant(QStringLiteral("[]")));
+        QVERIFY(replies.at(0).at(2).value<Headers>().contains({"X-Said", "yes"}));
     }
 
     void requestWithoutResponseIsReportedAsStatusZero()
@@ -163,22 +143,6 @@ private Q_SLOTS:
         QCOMPARE(replies.at(0).at(0), QVariant(500));
     }
 
-    void passwordReplyThatIsNoJsonStopsTheCheck_data()
-    {
-        QTest::addColumn<QString>("body");
-        QTest::newRow("empty") << QString();
-        QTest::newRow("text") << QStringLiteral("out of order");
-        QTest::newRow("cut off") << QStringLiteral(R"({"code":0,"data":{"result":true)");
-    }
-
-    void passwordReplyThatIsNoJsonStopsTheCheck()
-    {
-        QFETCH(QString, body);
-        const LogRecorder log;
-        HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 200, body), QString());
-        QCOMPARE(notices(log), 0);
-    }
-
     void passwordThatDoesNotExpireIsLoggedTwiceAndNotShown_data()
     {
         QTest::addColumn<int>("status");
@@ -210,27 +174,6 @@ private Q_SLOTS:
         QCoreApplication::processEvents();
         QCOMPARE(notices(log), 2);
         QVERIFY(m_notifications->calls().isEmpty());
-    }
-
-    void expiringPasswordIsShownAfterAMinute()
-    {
-        const LogRecorder log;
-        const QString reply = tips(QStringLiteral("0"), QStringLiteral("true"));
-        HandleEvent::GetInstance()->getPasswdExpiredTime(said(*m_server, 200, reply), QString());
-        QCOMPARE(notices(log), 2);
-
-        // The notice's timer is coarse: half a second more or less.
-        setClockAhead(m_ahead += 59);
-        QCoreApplication::processEvents();
-        QVERIFY(m_notifications->calls().isEmpty());
-
-        setClockAhead(m_ahead += 2);
-        QTRY_COMPARE(m_notifications->calls().size(), 1);
-        const QVariantList arguments = m_notifications->calls().constFirst().arguments();
-        QCOMPARE(arguments.value(3), QVariant(QStringLiteral("提醒")));
-        QCOMPARE(arguments.value(4), QVariant(QStringLiteral("您的密码还有3天过期")));
-        QCOMPARE(arguments.value(7), QVariant(-1));
-        QCOMPARE(notices(log), 3);
     }
 
     void passwordReplyIsReadAsUtf8InAnyLocale()

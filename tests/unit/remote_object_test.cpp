@@ -39,11 +39,19 @@ private Q_SLOTS:
         QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
     }
 
-    void presentServiceThatDoesNotAnswerReadsAsInvalid()
+    void presentServiceThatDoesNotAnswerProperlyReadsAsInvalid_data()
     {
-        const RecordedService service(
-            QDBusConnection::SessionBus, serviceName(),
-            answerError(QDBusError::errorString(QDBusError::Failed), QStringLiteral("refused")));
+        QTest::addColumn<RecordedService::Answer>("answer");
+        const QString unknown = QDBusError::errorString(QDBusError::UnknownProperty);
+        QTest::newRow("error") << answerError(unknown, QStringLiteral("no such property"));
+        QTest::newRow("reply of another type") << answerWith(QStringLiteral("bare"));
+    }
+
+    void presentServiceThatDoesNotAnswerProperlyReadsAsInvalid()
+    {
+        QFETCH(RecordedService::Answer, answer);
+        const RecordedService service(QDBusConnection::SessionBus, serviceName(), answer);
+        QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
         QCOMPARE(testObject().propertyIfPresent(QStringLiteral("Any")), std::optional(QVariant()));
     }
 
@@ -66,21 +74,6 @@ private Q_SLOTS:
         const RecordedService service(QDBusConnection::SessionBus, serviceName(), answerWithNameOfProperty);
         const QStringList names{QStringLiteral("b"), QStringLiteral("a"), QStringLiteral("c")};
         QCOMPARE(testObject().properties(names), QVariantList({names.at(0), names.at(1), names.at(2)}));
-    }
-
-    void failedReadIsInvalid()
-    {
-        const RecordedService service(QDBusConnection::SessionBus, serviceName(),
-                                      answerError(QDBusError::errorString(QDBusError::UnknownProperty),
-                                                  QStringLiteral("no such property")));
-        QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
-    }
-
-    void replyOfAnotherTypeIsInvalid()
-    {
-        const RecordedService service(QDBusConnection::SessionBus, serviceName(),
-                                      answerWith(QStringLiteral("bare")));
-        QVERIFY(!testObject().property(QStringLiteral("Any")).isValid());
     }
 
     void valueOfAnotherTypeIsHandedOn()

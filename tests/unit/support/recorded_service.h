@@ -40,6 +40,7 @@ private:
     QThread m_thread;
     std::unique_ptr<Object> m_object;
 };
+Q_DECLARE_METATYPE(RecordedService::Answer)
 
 /// Answers every call without values.
 QDBusMessage answerNothing(const QDBusMessage& call);
