@@ -56,7 +56,7 @@ AREAS = (
     _area(
         "session_user.cpp",
         "state report",
-        unit="message_transfer_test",
+        unit="message_platform_test",
         e2e="daemon_life session_state messages",
         local="local_user",
     ),

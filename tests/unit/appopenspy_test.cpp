@@ -6,7 +6,6 @@
 #include "appopenspy.h"
 #include "at_log_line.h"
 #include "log_recorder.h"
-#include "meta_order.h"
 #include "property_service.h"
 
 using velk::module::software::AppOpenSpy;
@@ -24,14 +23,6 @@ class AppOpenSpyTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void signalsAndSlotsStandInTheirOrder()
-    {
-        QCOMPARE(methodsInOrder(AppOpenSpy::staticMetaObject),
-                 (QStringList{QStringLiteral("appStateChange(int,QString)"),
-                              QStringLiteral("onEntryAdded(QDBusObjectPath)"),
-                              QStringLiteral("onEntryRemoved(QString)")}));
-    }
-
     void openApplicationsAreSignalledOnceAndBeforeLaterChanges()
     {
         qDBusRegisterMetaType<QMap<uint, QString>>();

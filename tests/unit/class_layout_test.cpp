@@ -89,6 +89,16 @@ template <typename Class, typename... Parts> void row(const char* name, const ch
                         << quint64(sizeWith<Parts...>());
 }
 
+template <typename Class> void methodRow(const char* methods)
+{
+    const QMetaObject& meta = Class::staticMetaObject;
+    QStringList found;
+    for (int i = meta.methodOffset(); i < meta.methodCount(); ++i) {
+        found << QString::fromLatin1(meta.method(i).methodSignature());
+    }
+    QTest::newRow(meta.className()) << found << QString::fromLatin1(methods).split(QStringLiteral("; "));
+}
+
 void messageRows()
 {
     row<NotifyMessageOption, QString, bool, int, int, QString, QString>(
@@ -127,8 +137,8 @@ void desktopRows()
 
 } // namespace
 
-/// Other code is compiled against these classes: base and members are those listed here, of these types and
-/// names, in this order, and no others. What is private counts too.
+/// Other code is compiled against these classes: base, members, signals and slots are those listed here, of
+/// these types and names, in this order, and no others. What is private counts too.
 class ClassLayoutTest : public QObject
 {
     Q_OBJECT
@@ -154,6 +164,26 @@ private Q_SLOTS:
         QFETCH(quint64, size);
         QTEST(partsOf(QString::fromLatin1(QTest::currentDataTag())), "parts");
         QTEST(size, "sizeOfParts");
+    }
+
+    void signalsAndSlotsStandInTheirOrder_data()
+    {
+        QTest::addColumn<QStringList>("found");
+        QTest::addColumn<QStringList>("methods");
+        methodRow<MessageTransfer>("onPolicyMsg(QString,QString); onSoftwareChanged(QString,QStringList); "
+                                   "onTimeout(); getUserState()");
+        methodRow<AppOpenSpy>("appStateChange(int,QString); onEntryAdded(QDBusObjectPath); "
+                              "onEntryRemoved(QString)");
+        methodRow<EntryInfo>("windowSizeChanged(int,QString); onWinInfoChanged(QMap<uint,WindowInfo>); "
+                             "onNameChanged(QString)");
+        methodRow<LauncherGuard>("softwareChanged(QString,QStringList); softwareInited(); "
+                                 "onItemChanged(QString,LauncherItemInfo,qlonglong)");
+    }
+
+    void signalsAndSlotsStandInTheirOrder()
+    {
+        QFETCH(QStringList, found);
+        QTEST(found, "methods");
     }
 
     void screenStatesAreExactlyThese()

@@ -5,7 +5,6 @@
 
 #include "entryinfo.h"
 #include "log_recorder.h"
-#include "meta_order.h"
 #include "property_service.h"
 
 using velk::module::software::EntryInfo;
@@ -44,14 +43,6 @@ private Q_SLOTS:
     }
 
     void cleanup() { m_dock.reset(); }
-
-    void signalsAndSlotsStandInTheirOrder()
-    {
-        QCOMPARE(methodsInOrder(EntryInfo::staticMetaObject),
-                 (QStringList{QStringLiteral("windowSizeChanged(int,QString)"),
-                              QStringLiteral("onWinInfoChanged(QMap<uint,WindowInfo>)"),
-                              QStringLiteral("onNameChanged(QString)")}));
-    }
 
     void entryIsKnownAsItWasFound()
     {
@@ -108,14 +99,6 @@ private Q_SLOTS:
 
         QTEST(static_cast<QList<QVariantList>>(changed), "signals");
         QCOMPARE(entry.winSize(), count);
-    }
-
-    void emptyNameIsIgnored()
-    {
-        EntryInfo entry{QDBusObjectPath(path)};
-        entry.onNameChanged(QStringLiteral("Post"));
-        entry.onNameChanged(QString());
-        QCOMPARE(entry.appName(), QStringLiteral("Post"));
     }
 
 private:

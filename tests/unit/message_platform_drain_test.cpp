@@ -59,12 +59,6 @@ private Q_SLOTS:
             QLatin1String("/notification/v2/list?uid=zhang.wei&is_not_read=1&limit=1&offset=0&")));
     }
 
-    void replyOfOneMessageAsksForNoOther()
-    {
-        m_platform->OnRecvMsg(200, QString(), {{"X-Total-Count", "1"}});
-        QCOMPARE(m_replies, 0);
-    }
-
     void fiftyFollowUpsAreAskedForBeforeTheListReturns()
     {
         m_countingReplies = 120;

@@ -9,7 +9,7 @@
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "platform_files.h"
-#include "pretended_time.h"
+#include "pretended.h"
 #include "recorded_service.h"
 
 namespace {

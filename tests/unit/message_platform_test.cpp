@@ -1,29 +1,12 @@
 #include <QTextCodec>
 #include <QtTest>
 
-#include <unistd.h>
-
-#include <optional>
-
 #include "handleevent.h"
 #include "log_recorder.h"
 #include "message_platform.h"
 #include "message_transfer.h"
 #include "platform_files.h"
-#include "pretended_time.h"
-
-namespace {
-
-/// What getuid() answers instead of the program's own uid.
-std::optional<uid_t> pretendedUid;
-
-} // namespace
-
-/// Replaces the C library's.
-uid_t getuid() noexcept
-{
-    return pretendedUid.value_or(geteuid());
-}
+#include "pretended.h"
 
 /// The message client on its own, as a domain user, with a platform that has no messages.
 class MessagePlatformTest : public QObject
@@ -35,7 +18,7 @@ private Q_SLOTS:
 
     void cleanup()
     {
-        pretendedUid.reset();
+        pretendedUid().reset();
         pretendedTime().reset();
     }
 
@@ -52,8 +35,9 @@ private Q_SLOTS:
     void userAboveTheLocalRangeIsDomainUser()
     {
         QFETCH(uint, uid);
-        pretendedUid = uid;
+        pretendedUid() = uid;
         QTEST(m_platform.isLdapUser(), "expected");
+        QTEST(m_transfer.isLdapUser(), "expected");
     }
 
     void startIsLogged()

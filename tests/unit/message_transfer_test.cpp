@@ -1,58 +1,56 @@
+#include <QJsonDocument>
 #include <QtTest>
-
-#include <unistd.h>
 
 #include <algorithm>
 #include <memory>
-#include <optional>
 
+#include "constants.h"
 #include "message_transfer.h"
-#include "meta_order.h"
+#include "pretended.h"
 #include "recorded_service.h"
 
 namespace {
 
-/// What getuid() answers instead of the program's own uid.
-std::optional<uid_t> pretendedUid;
-
-} // namespace
-
-/// Replaces the C library's: the box has one user above and one below the limit, and none at it.
-uid_t getuid() noexcept
+/// The forced actions that the login manager was asked for.
+QStringList forcedActions(const RecordedService& logind)
 {
-    return pretendedUid.value_or(geteuid());
-}
-
-namespace {
-
-QStringList forcedActions(const RecordedService& service)
-{
-    QStringList actions;
-    const auto calls = service.calls();
+    QStringList members;
+    const auto calls = logind.calls();
     for (const QDBusMessage& call : calls) {
-        if (call.interface() != QLatin1String("org.freedesktop.DBus.Properties")) {
-            actions.append(call.path() + QLatin1Char(' ') + call.interface() + QLatin1Char('.')
-                           + call.member());
-        }
+        members << call.member();
     }
-    return actions;
+    return members.filter(QRegularExpression(QStringLiteral("Reboot|Terminate")));
 }
 
-QTimer* timerOf(const MessageTransfer& transfer, bool (*wanted)(const QTimer*))
+/// Whether a countdown of exactly a minute runs: by default Qt lets a timer of this length fire half a second
+/// early.
+bool isCountingDown(const MessageTransfer& transfer)
 {
     const auto timers = transfer.findChildren<QTimer*>();
-    const auto found = std::find_if(timers.begin(), timers.end(), wanted);
-    return found == timers.end() ? nullptr : *found;
+    return std::any_of(timers.begin(), timers.end(), [](const QTimer* timer) {
+        return timer->isActive() && timer->interval() == 60000 && timer->timerType() == Qt::PreciseTimer;
+    });
 }
 
-bool isCountdown(const QTimer* timer)
+/// What the reports of single changes say that the daemon was handed.
+QList<QJsonObject> changesAt(const RecordedService& daemon)
 {
-    return timer->isActive() && timer->interval() == 60000;
+    QList<QJsonObject> changes;
+    const auto calls = daemon.calls();
+    for (const QDBusMessage& call : calls) {
+        const QVariantList arguments = call.arguments();
+        if (arguments.value(0) == velk::kUploadInfoLogUrl) {
+            const auto report = QJsonDocument::fromJson(arguments.value(1).toString().toUtf8());
+            changes.append(report.object().value(QLatin1String("payload")).toObject());
+        }
+    }
+    return changes;
 }
 
 } // namespace
 
-/// Runs as a domain user with a login manager and a notification service that only record.
+/// What callers may ask for that no policy and no launcher leads to. Runs as a domain user with a daemon, a
+/// login manager and a notification service that only record.
 class MessageTransferTest : public QObject
 {
     Q_OBJECT
@@ -60,6 +58,8 @@ class MessageTransferTest : public QObject
 private Q_SLOTS:
     void init()
     {
+        m_daemon = std::make_unique<RecordedService>(QDBusConnection::SystemBus,
+                                                     QStringLiteral("com.norix.velk.velkg"), answerNothing);
         m_logind = std::make_unique<RecordedService>(QDBusConnection::SystemBus,
                                                      QStringLiteral("org.freedesktop.login1"), answerNothing);
         m_notifications = std::make_unique<RecordedService>(
@@ -68,175 +68,47 @@ private Q_SLOTS:
 
     void cleanup()
     {
-        pretendedUid.reset();
+        pretendedUid().reset();
         m_notifications.reset();
         m_logind.reset();
+        m_daemon.reset();
     }
 
-    void slotsStandInTheirOrder()
+    void missingUidNamesRootAndMissingPayloadNobody()
     {
-        const QStringList expected{QStringLiteral("onPolicyMsg(QString,QString)"),
-                                   QStringLiteral("onSoftwareChanged(QString,QStringList)"),
-                                   QStringLiteral("onTimeout()"), QStringLiteral("getUserState()")};
-        QCOMPARE(methodsInOrder(MessageTransfer::staticMetaObject), expected);
-    }
-
-    void userAboveTheLocalRangeIsDomainUser_data()
-    {
-        QTest::addColumn<uint>("uid");
-        QTest::addColumn<bool>("isDomainUser");
-
-        QTest::newRow("root") << 0U << false;
-        QTest::newRow("last local") << 10000U << false;
-        QTest::newRow("first of the domain") << 10001U << true;
-        QTest::newRow("beyond the signed range") << 3000000000U << true;
-    }
-
-    void userAboveTheLocalRangeIsDomainUser()
-    {
-        QFETCH(uint, uid);
+        QJsonObject withoutUid{{QStringLiteral("payload"), QJsonObject()}};
+        QJsonObject withoutPayload;
         MessageTransfer transfer;
-        pretendedUid = uid;
-        QTEST(transfer.isLdapUser(), "isDomainUser");
-    }
-
-    void accountPolicyNamesUserByUid_data()
-    {
-        QTest::addColumn<QJsonObject>("message");
-        QTest::addColumn<bool>("named");
-
-        const QString payload = QStringLiteral("payload");
-        const QString uid = QStringLiteral("uid");
-        const auto own = static_cast<qint32>(getuid());
-        QTest::newRow("own uid") << QJsonObject{{payload, QJsonObject{{uid, own}}}} << true;
-        QTest::newRow("another uid") << QJsonObject{{payload, QJsonObject{{uid, own + 1}}}} << false;
-        QTest::newRow("uid as text") << QJsonObject{{payload, QJsonObject{{uid, QString::number(own)}}}}
-                                     << false;
-        QTest::newRow("fraction") << QJsonObject{{payload, QJsonObject{{uid, own + 0.5}}}} << false;
-        QTest::newRow("no uid") << QJsonObject{{payload, QJsonObject()}} << false;
-        QTest::newRow("payload is no object") << QJsonObject{{payload, own}} << false;
-        QTest::newRow("no payload") << QJsonObject{{uid, own}} << false;
-    }
-
-    void accountPolicyNamesUserByUid()
-    {
-        QFETCH(QJsonObject, message);
-        QTEST(MessageTransfer().isExecPolicyByUID(message), "named");
-    }
-
-    void accountPolicyCheckIsLogged()
-    {
-        const auto own = static_cast<qint32>(getuid());
-        QJsonObject message{{QStringLiteral("payload"), QJsonObject{{QStringLiteral("uid"), 7}}}};
-        const QString line = QStringLiteral("sendUID : 7 , localUID: %1 ,flag : false").arg(own);
-        QTest::ignoreMessage(QtDebugMsg, qUtf8Printable(line));
-        MessageTransfer().isExecPolicyByUID(message);
-    }
-
-    void messageWithoutPayloadNamesNoUserNotEvenRoot()
-    {
-        // A payload without a uid would be read as uid 0.
-        QJsonObject message;
-        MessageTransfer transfer;
-        pretendedUid = 0;
-        QVERIFY(!transfer.isExecPolicyByUID(message));
-    }
-
-    void messageWithoutUidNamesRoot()
-    {
-        QJsonObject message{{QStringLiteral("payload"), QJsonObject()}};
-        MessageTransfer transfer;
-        pretendedUid = 0;
-        QVERIFY(transfer.isExecPolicyByUID(message));
-        for (const uid_t other : {1U, static_cast<uid_t>(-1)}) {
-            pretendedUid = other;
-            QVERIFY(!transfer.isExecPolicyByUID(message));
+        for (const uid_t uid : {0U, 1U, static_cast<uid_t>(-1)}) {
+            pretendedUid() = uid;
+            QCOMPARE(transfer.isExecPolicyByUID(withoutUid), uid == 0);
+            QVERIFY(!transfer.isExecPolicyByUID(withoutPayload));
         }
     }
 
-    void countdownTakesAMinute()
-    {
-        MessageTransfer transfer;
-        QVERIFY(timerOf(transfer, isCountdown) == nullptr);
-        transfer.startTime(QString(), 1201);
-        QVERIFY(timerOf(transfer, isCountdown) != nullptr);
-    }
-
-    void countdownIsNotRounded()
-    {
-        // By default Qt lets a timer of this length fire half a second early.
-        MessageTransfer transfer;
-        transfer.startTime(QString(), 1201);
-        QCOMPARE(timerOf(transfer, isCountdown)->timerType(), Qt::PreciseTimer);
-    }
-
-    void expiredCountdownStops_data()
+    void countdownEndsWithTheActionOfItsCode_data()
     {
         QTest::addColumn<int>("code");
-        for (const int code : {1200, 1201, 0}) {
-            QTest::addRow("%d", code) << code;
+        QTest::addColumn<QStringList>("actions");
+        QTest::newRow("domain exit") << 1200 << QStringList{QStringLiteral("Reboot")};
+        for (const int code : {1201, 1202, 1203}) {
+            QTest::addRow("log-out %d", code) << code << QStringList{QStringLiteral("Terminate")};
         }
-    }
-
-    void expiredCountdownStops()
-    {
-        QFETCH(int, code);
-        MessageTransfer transfer;
-        transfer.startTime(QString(), code);
-        transfer.onTimeout();
-        QVERIFY(timerOf(transfer, isCountdown) == nullptr);
-    }
-
-    void expiredCountdownForcesActionOfItsCode_data()
-    {
-        QTest::addColumn<int>("code");
-        QTest::addColumn<QString>("action");
-
-        const QString terminate =
-            QStringLiteral("/org/freedesktop/login1/session/auto org.freedesktop.login1.Session.Terminate");
-        QTest::newRow("domain exit") << 1200
-                                     << QStringLiteral(
-                                            "/org/freedesktop/login1 org.freedesktop.login1.Manager.Reboot");
-        QTest::newRow("terminal disabled") << 1201 << terminate;
-        QTest::newRow("account deleted") << 1202 << terminate;
-        QTest::newRow("account disabled") << 1203 << terminate;
-    }
-
-    void expiredCountdownForcesActionOfItsCode()
-    {
-        QFETCH(int, code);
-        QFETCH(QString, action);
-        MessageTransfer transfer;
-        transfer.startTime(QString(), code);
-        transfer.onTimeout();
-        QCOMPARE(forcedActions(*m_logind), QStringList{action});
-    }
-
-    void expiredCountdownWithoutForcedActionDoesNothing_data()
-    {
-        QTest::addColumn<int>("code");
         for (const int code : {0, 1100, 1300, 1304}) {
-            QTest::addRow("%d", code) << code;
+            QTest::addRow("no forced action %d", code) << code << QStringList();
         }
     }
 
-    void expiredCountdownWithoutForcedActionDoesNothing()
+    void countdownEndsWithTheActionOfItsCode()
     {
         QFETCH(int, code);
         MessageTransfer transfer;
+        QVERIFY(!isCountingDown(transfer));
         transfer.startTime(QString(), code);
+        QVERIFY(isCountingDown(transfer));
         transfer.onTimeout();
-        QCOMPARE(forcedActions(*m_logind), QStringList());
-    }
-
-    void laterCodeReplacesPendingOne()
-    {
-        MessageTransfer transfer;
-        transfer.rebootTime(QString(), 1200);
-        transfer.startTime(QString(), 1201);
-        transfer.onTimeout();
-        QCOMPARE(forcedActions(*m_logind).size(), 1);
-        QVERIFY(forcedActions(*m_logind).constFirst().endsWith(QLatin1String("Session.Terminate")));
+        QVERIFY(!isCountingDown(transfer));
+        QTEST(forcedActions(*m_logind), "actions");
     }
 
     void expiryKeepsThePendingCode()
@@ -248,17 +120,40 @@ private Q_SLOTS:
         QCOMPARE(forcedActions(*m_logind).size(), 2);
     }
 
-    void stateIsReportedEveryFiveMinutes()
+    void changeReportsWhatItIsGiven_data()
     {
+        QTest::addColumn<QStringList>("info");
+        QTest::addColumn<QString>("name");
+        QTest::addColumn<QString>("version");
+
+        const QString editor = QStringLiteral("Editor");
+        const QString version = QStringLiteral("2.1");
+        QTest::newRow("nothing") << QStringList() << QString() << QString();
+        QTest::newRow("name") << QStringList{editor} << editor << QString();
+        QTest::newRow("name and version") << QStringList{editor, version} << editor << version;
+        QTest::newRow("more") << QStringList{editor, version, QStringLiteral("more")} << editor << version;
+    }
+
+    void changeReportsWhatItIsGiven()
+    {
+        QFETCH(QStringList, info);
         MessageTransfer transfer;
-        QVERIFY(timerOf(transfer,
-                        [](const QTimer* timer) {
-                            return timer->isActive() && timer->interval() == 300000 && !timer->isSingleShot();
-                        })
-                != nullptr);
+
+        transfer.uploadSoftware(QStringLiteral("created"), info);
+        transfer.onSoftwareChanged(QStringLiteral("update"), info);
+
+        QTRY_COMPARE(changesAt(*m_daemon).size(), 2);
+        const auto changes = changesAt(*m_daemon);
+        for (const QJsonObject& change : changes) {
+            QTEST(change.value(QLatin1String("software_name")).toString(), "name");
+            QTEST(change.value(QLatin1String("software_version")).toString(), "version");
+        }
+        QCOMPARE(changes.at(0).value(QLatin1String("type")).toInt(), 1);
+        QCOMPARE(changes.at(1).value(QLatin1String("type")).toInt(), 2);
     }
 
 private:
+    std::unique_ptr<RecordedService> m_daemon;
     std::unique_ptr<RecordedService> m_logind;
     std::unique_ptr<RecordedService> m_notifications;
 };

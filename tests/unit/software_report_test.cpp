@@ -1,23 +1,6 @@
 #include <QTest>
 
-#include "launcher_guard.h"
 #include "software_report.h"
-
-namespace {
-
-SoftwareInfo software()
-{
-    SoftwareInfo info;
-    info.packageName = QStringLiteral("editor");
-    info.name = QStringLiteral("文本 \"编辑器\"");
-    info.id = -1;
-    info.version = QStringLiteral("1.2-3");
-    info.architecture = QStringLiteral("amd64");
-    info.installedType = 2;
-    return info;
-}
-
-} // namespace
 
 /// The texts that the platform is sent about software, byte by byte.
 class SoftwareReportTest : public QObject
@@ -25,24 +8,6 @@ class SoftwareReportTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void onlyTwoActionsAreChanges_data()
-    {
-        QTest::addColumn<QString>("action");
-        QTest::addColumn<int>("code");
-        QTest::newRow("created") << QStringLiteral("created") << 1;
-        QTest::newRow("update") << QStringLiteral("update") << 2;
-        QTest::newRow("deleted") << QStringLiteral("deleted") << 0;
-        QTest::newRow("another case") << QStringLiteral("Created") << 0;
-        QTest::newRow("longer") << QStringLiteral("updated") << 0;
-        QTest::newRow("none") << QString() << 0;
-    }
-
-    void onlyTwoActionsAreChanges()
-    {
-        QFETCH(QString, action);
-        QTEST(softwareChange(action), "code");
-    }
-
     void changeIsReportedToTheLetter()
     {
         SoftwareChange change;
@@ -71,16 +36,6 @@ private Q_SLOTS:
                               R"("pc_ip":"","pc_name":"","software_name":"","software_version":"","type":2},)"
                               R"("type":2002})");
         QCOMPARE(softwareChangeReport(change), expected);
-    }
-
-    void inventoryIsReportedToTheLetter()
-    {
-        const QString expected = QString::fromUtf8(
-            R"({"payload":{"list":[{"arch":"amd64","installed_type":2,)"
-            "\"name\":\"文本 \\\"编辑器\\\"\",\"package_name\":\"editor\",\"software_id\":-1,"
-            R"("version":"1.2-3"},{"arch":"","installed_type":0,"name":"","package_name":"",)"
-            R"("software_id":0,"version":""}],"machine_id":"m-2"},"type":1103})");
-        QCOMPARE(inventoryReport(QStringLiteral("m-2"), {software(), {}}), expected);
     }
 };
 

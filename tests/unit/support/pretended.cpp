@@ -1,6 +1,7 @@
-#include "pretended_time.h"
+#include "pretended.h"
 
 #include <sys/time.h>
+#include <unistd.h>
 
 std::optional<time_t>& pretendedTime()
 {
@@ -8,7 +9,14 @@ std::optional<time_t>& pretendedTime()
     return time;
 }
 
-/// Replaces the C library's.
+std::optional<uid_t>& pretendedUid()
+{
+    static std::optional<uid_t> uid;
+    return uid;
+}
+
+// These replace the C library's.
+
 // The header's names of the parameters are reserved.
 // NOLINTNEXTLINE(readability-inconsistent-declaration-parameter-name)
 int gettimeofday(timeval* now, void* /*zone*/) noexcept
@@ -17,4 +25,9 @@ int gettimeofday(timeval* now, void* /*zone*/) noexcept
     static_cast<void>(clock_gettime(CLOCK_REALTIME, &clock)); // this clock always exists
     *now = {pretendedTime().value_or(clock.tv_sec), clock.tv_nsec / 1000};
     return 0;
+}
+
+uid_t getuid() noexcept
+{
+    return pretendedUid().value_or(geteuid());
 }
