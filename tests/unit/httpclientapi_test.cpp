@@ -6,6 +6,19 @@
 #include "https_server.h"
 
 using Headers = QList<QPair<QByteArray, QByteArray>>;
+Q_DECLARE_METATYPE(HttpRequest)
+
+namespace {
+
+const QString kNoHeader = QStringLiteral("no such header");
+
+QString headerIn(const QJsonObject& request, const char* name)
+{
+    const QString value = headerOf(request, name);
+    return value.isNull() ? kNoHeader : value;
+}
+
+} // namespace
 
 /// What a request sends, and what its caller gets of the response.
 class HttpClientApiTest : public QObject
@@ -20,65 +33,51 @@ private Q_SLOTS:
         m_client->setSSLConfig(m_server.file("ca"), {}, {});
     }
 
-    void getWithoutBodyHasNoContent()
+    void requestHasItsContentAndItsLengthAndType_data()
     {
-        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).status, 200);
+        QTest::addColumn<HttpRequest>("request");
+        QTest::addColumn<QString>("body");
+        QTest::addColumn<bool>("isJson");
+        QTest::addColumn<QString>("line");
+        QTest::addColumn<QString>("length");
+        QTest::addColumn<QString>("type");
 
-        const QJsonObject request = m_server.nextRequest();
-        QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
-        QVERIFY(headerOf(request, "Content-Length").isNull());
-        QVERIFY(headerOf(request, "Content-Type").isNull());
+        const HttpRequest get = &HttpClientApi::getRequest;
+        const HttpRequest put = &HttpClientApi::putRequest;
+        const QString getLine = QStringLiteral("GET /plain HTTP/1.1");
+        const QString putLine = QStringLiteral("PUT /plain HTTP/1.1");
+        const QString object = QStringLiteral("{\"name\": \"张\"}");
+        const QString json = QStringLiteral("application/json");
+        QTest::newRow("GET") << get << object << true << getLine << QStringLiteral("15") << json;
+        QTest::newRow("GET of nothing") << get << QString() << true << getLine << kNoHeader << kNoHeader;
+        QTest::newRow("PUT") << put << object << true << putLine << QStringLiteral("15") << json;
+        QTest::newRow("PUT of nothing")
+            << put << QString() << true << putLine << QStringLiteral("0") << kNoHeader;
+        QTest::newRow("not JSON") << put << object << false << putLine << QStringLiteral("15") << kNoHeader;
     }
 
-    void getCarriesItsBody()
+    void requestHasItsContentAndItsLengthAndType()
     {
-        const QString body = QStringLiteral("{\"username\": \"张伟\"}");
-        QCOMPARE(get(*m_client, m_server.url("proper", "/plain"), body).status, 200);
+        QFETCH(HttpRequest, request);
+        QFETCH(QString, body);
+        QFETCH(bool, isJson);
+        QCOMPARE(outcomeOf(request, *m_client, at("/plain"), body, isJson).status, 200);
 
-        const QJsonObject request = m_server.nextRequest();
-        QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("GET /plain HTTP/1.1"));
-        QCOMPARE(request[QStringLiteral("body")].toString(), body);
-        QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
-    }
-
-    void putCarriesItsBody()
-    {
-        const QString body = QStringLiteral("{\"uuid\":\"一\"}");
-        QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), body).status, 200);
-
-        const QJsonObject request = m_server.nextRequest();
-        QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("PUT /plain HTTP/1.1"));
-        QCOMPARE(request[QStringLiteral("body")].toString(), body);
-        QCOMPARE(headerOf(request, "Content-Type"), QStringLiteral("application/json"));
-    }
-
-    void putWithoutBodyDeclaresEmptyContent()
-    {
-        QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), {}).status, 200);
-
-        const QJsonObject request = m_server.nextRequest();
-        QCOMPARE(request[QStringLiteral("line")].toString(), QStringLiteral("PUT /plain HTTP/1.1"));
-        QCOMPARE(headerOf(request, "Content-Length"), QStringLiteral("0"));
-        QVERIFY(headerOf(request, "Content-Type").isNull());
-    }
-
-    void contentThatIsNotJsonHasNoContentType()
-    {
-        QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), QStringLiteral("text"), false).status, 200);
-
-        const QJsonObject request = m_server.nextRequest();
-        QCOMPARE(request[QStringLiteral("body")].toString(), QStringLiteral("text"));
-        QVERIFY(headerOf(request, "Content-Type").isNull());
+        const QJsonObject sent = m_server.nextRequest();
+        QTEST(sent[QStringLiteral("line")].toString(), "line");
+        QCOMPARE(sent[QStringLiteral("body")].toString(), body);
+        QTEST(headerIn(sent, "Content-Length"), "length");
+        QTEST(headerIn(sent, "Content-Type"), "type");
     }
 
     void largeContentIsSentWithoutAskingFirst()
     {
         const QString body(2 * 1024 * 1024, QLatin1Char('x'));
-        QCOMPARE(put(*m_client, m_server.url("proper", "/plain"), body).status, 200);
+        QCOMPARE(outcomeOf(&HttpClientApi::putRequest, *m_client, at("/plain"), body).status, 200);
 
-        const QJsonObject request = m_server.nextRequest();
-        QVERIFY(headerOf(request, "Expect").isNull());
-        QCOMPARE(headerOf(request, "Content-Length"), QString::number(body.size()));
+        const QJsonObject sent = m_server.nextRequest();
+        QCOMPARE(headerIn(sent, "Expect"), kNoHeader);
+        QCOMPARE(headerIn(sent, "Content-Length"), QString::number(body.size()));
     }
 
     void urlGoesOutAsGivenButForCharactersThatARequestLineCannotCarry_data()
@@ -110,7 +109,7 @@ private Q_SLOTS:
         QFETCH(QString, path);
         QFETCH(QString, sent);
 
-        QCOMPARE(get(*m_client, m_server.url("proper", qUtf8Printable(path))).status, 200);
+        QCOMPARE(get(*m_client, at(qUtf8Printable(path))).status, 200);
         QCOMPARE(m_server.nextRequest()[QStringLiteral("line")].toString(),
                  QStringLiteral("GET %1 HTTP/1.1").arg(sent));
     }
@@ -127,6 +126,8 @@ private Q_SLOTS:
         QTest::newRow("/not-found") << 404 << QStringLiteral("no such thing");
         QTest::newRow("/broken") << 500 << QStringLiteral("out of order");
         QTest::newRow("/until-close") << 200 << QStringLiteral("all of it");
+        QTest::newRow("/interim") << 200 << QStringLiteral("final");
+        QTest::newRow("/trailers") << 200 << QStringLiteral("first second");
     }
 
     void statusAndBodyAreReturned()
@@ -134,7 +135,7 @@ private Q_SLOTS:
         QFETCH(int, status);
         QFETCH(QString, reply);
 
-        const HttpOutcome outcome = get(*m_client, m_server.url("proper", QTest::currentDataTag()));
+        const HttpOutcome outcome = get(*m_client, at(QTest::currentDataTag()));
         QCOMPARE(outcome.status, status);
         QCOMPARE(outcome.reply, reply);
         QCOMPARE(outcome.warnings, QStringList());
@@ -142,51 +143,46 @@ private Q_SLOTS:
 
     void bodyOf8MibIsAccepted()
     {
-        const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/body-at-cap"));
+        const HttpOutcome outcome = get(*m_client, at("/body-at-cap"));
         QCOMPARE(outcome.status, 200);
         QCOMPARE(outcome.reply.size(), 8 * 1024 * 1024);
     }
 
-    void headersKeepTheirOrderCaseAndDuplicates()
+    void headersAreThoseOfTheFinalResponseAsItSentThem_data()
     {
-        const Headers sent = {{"X-Total-Count", "5"}, {"x-lower", "a"},       {"X-UPPER", "b \t c"},
-                              {"x-twice", "1"},       {"X-Twice", "2"},       {"x-twice", "1"},
-                              {"X-Empty", ""},        {"Content-Length", "2"}};
-        QCOMPARE(get(*m_client, m_server.url("proper", "/headers")).headers, sent);
+        QTest::addColumn<QString>("path");
+        QTest::addColumn<Headers>("headers");
+
+        QTest::newRow("order, case and duplicates")
+            << QStringLiteral("/headers")
+            << Headers{{"X-Total-Count", "5"}, {"x-lower", "a"},       {"X-UPPER", "b \t c"},
+                       {"x-twice", "1"},       {"X-Twice", "2"},       {"x-twice", "1"},
+                       {"X-Empty", ""},        {"Content-Length", "2"}};
+        QTest::newRow("one header in two lines")
+            << QStringLiteral("/folded") << Headers{{"X-Folded", "one two"}, {"Content-Length", "2"}};
+        QTest::newRow("interim responses before it")
+            << QStringLiteral("/interim") << Headers{{"X-Final", "yes"}, {"Content-Length", "5"}};
+        QTest::newRow("trailers after it")
+            << QStringLiteral("/trailers") << Headers{{"Transfer-Encoding", "chunked"}};
     }
 
-    void foldedHeaderIsOneHeader()
+    void headersAreThoseOfTheFinalResponseAsItSentThem()
     {
-        const Headers joined = {{"X-Folded", "one two"}, {"Content-Length", "2"}};
-        QCOMPARE(get(*m_client, m_server.url("proper", "/folded")).headers, joined);
-    }
-
-    void interimResponsesHaveNoPartInTheHeaders()
-    {
-        const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/interim"));
-        QCOMPARE(outcome.status, 200);
-        QCOMPARE(outcome.headers, Headers({{"X-Final", "yes"}, {"Content-Length", "5"}}));
-    }
-
-    void trailersHaveNoPartInTheHeaders()
-    {
-        const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/trailers"));
-        QCOMPARE(outcome.reply, QStringLiteral("first second"));
-        QCOMPARE(outcome.headers, Headers({{"Transfer-Encoding", "chunked"}}));
+        QFETCH(QString, path);
+        QTEST(get(*m_client, at(qUtf8Printable(path))).headers, "headers");
     }
 
     void headersOf250KibAreAccepted()
     {
-        const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/headers-within-cap"));
+        const HttpOutcome outcome = get(*m_client, at("/headers-within-cap"));
         QCOMPARE(outcome.status, 200);
         QCOMPARE(outcome.headers.size(), 251);
     }
 
     void headersAreThoseOfTheLastRequest()
     {
-        QCOMPARE(get(*m_client, m_server.url("proper", "/headers")).headers.size(), 8);
-        QCOMPARE(get(*m_client, m_server.url("proper", "/plain")).headers,
-                 Headers({{"Content-Length", "2"}}));
+        QCOMPARE(get(*m_client, at("/headers")).headers.size(), 8);
+        QCOMPARE(get(*m_client, at("/plain")).headers, Headers({{"Content-Length", "2"}}));
         QCOMPARE(get(*m_client, m_server.url("refusing", "/plain")).headers, Headers());
     }
 
@@ -198,19 +194,17 @@ private Q_SLOTS:
         const auto row = [](const char* name, const QString& url, const char* cause) {
             QTest::newRow(name) << url << QString::fromUtf8(cause);
         };
-        const auto path = [this](const char* name) { return m_server.url("proper", name); };
-        const QString withoutTls = path("/plain").replace(QStringLiteral("https:"), QStringLiteral("http:"));
+        const QString withoutTls = at("/plain").replace(QStringLiteral("https:"), QStringLiteral("http:"));
 
         row("connection refused", m_server.url("refusing", "/plain"), "onnect");
-        row("body shorter than its length", path("/cut-length"), "97 bytes (remaining|missing)");
-        row("last chunk cut", path("/cut-chunk"), "outstanding read data remaining");
-        row("connection broken off in the body", path("/cut-connection"),
-            "97 bytes remaining|unexpected eof");
-        row("connection reset in the header", path("/reset-header"), "reset by peer");
-        row("connection reset in the body", path("/reset-body"), "reset by peer");
-        row("body over 8 MiB", path("/body-over-cap"), "8 MiB");
-        row("body over 8 MiB, length unknown", path("/chunks-over-cap"), "8 MiB");
-        row("headers over 256 KiB", path("/headers-over-cap"), "256 KiB");
+        row("body shorter than its length", at("/cut-length"), "97 bytes (remaining|missing)");
+        row("last chunk cut", at("/cut-chunk"), "outstanding read data remaining");
+        row("connection broken off in the body", at("/cut-connection"), "97 bytes remaining|unexpected eof");
+        row("connection reset in the header", at("/reset-header"), "reset by peer");
+        row("connection reset in the body", at("/reset-body"), "reset by peer");
+        row("body over 8 MiB", at("/body-over-cap"), "8 MiB");
+        row("body over 8 MiB, length unknown", at("/chunks-over-cap"), "8 MiB");
+        row("headers over 256 KiB", at("/headers-over-cap"), "256 KiB");
         row("address without TLS", withoutTls, "\"http\"");
         row("local file", QStringLiteral("file:///etc/passwd"), "\"file\"");
         row("empty address", QString(), "URL");
@@ -229,7 +223,7 @@ private Q_SLOTS:
 
     void replyWithoutLengthThatBreaksOffIsNoneWhereTheLibraryCanTell()
     {
-        const HttpOutcome outcome = get(*m_client, m_server.url("proper", "/until-break"));
+        const HttpOutcome outcome = get(*m_client, at("/until-break"));
 #if LIBCURL_VERSION_NUM >= 0x080000
         QCOMPARE(summary(outcome), kNoResponse);
 #else
@@ -240,6 +234,11 @@ private Q_SLOTS:
     }
 
 private:
+    QString at(const char* path) const
+    {
+        return m_server.url("proper", path);
+    }
+
     HttpsServer m_server;
     std::unique_ptr<HttpClientApi> m_client;
 };

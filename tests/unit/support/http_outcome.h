@@ -12,25 +12,22 @@ struct HttpOutcome
     QStringList warnings;
 };
 
-inline HttpOutcome get(HttpClientApi& client, const QString& url, const QString& body = {},
-                       bool isJson = true)
+using HttpRequest = int (HttpClientApi::*)(QString&, const QString&, const QString&, bool);
+
+inline HttpOutcome outcomeOf(HttpRequest request, HttpClientApi& client, const QString& url,
+                             const QString& body = {}, bool isJson = true)
 {
     const LogRecorder recorder;
     HttpOutcome outcome;
-    outcome.status = client.getRequest(outcome.reply, url, body, isJson);
+    outcome.status = (client.*request)(outcome.reply, url, body, isJson);
     outcome.headers = client.getRawHeader();
     outcome.warnings = recorder.warnings();
     return outcome;
 }
 
-inline HttpOutcome put(HttpClientApi& client, const QString& url, const QString& body, bool isJson = true)
+inline HttpOutcome get(HttpClientApi& client, const QString& url)
 {
-    const LogRecorder recorder;
-    HttpOutcome outcome;
-    outcome.status = client.putRequest(outcome.reply, url, body, isJson);
-    outcome.headers = client.getRawHeader();
-    outcome.warnings = recorder.warnings();
-    return outcome;
+    return outcomeOf(&HttpClientApi::getRequest, client, url);
 }
 
 /// The outcome in a line, to be compared with kNoResponse.
