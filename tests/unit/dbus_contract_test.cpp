@@ -41,14 +41,6 @@ template <typename Adapter, typename Proxy> void addRow(const char* name)
                                     [](QObject* parent) { new Adapter(parent); }};
 }
 
-void addRows()
-{
-    QTest::addColumn<Contract>("contract");
-    addRow<velkgAdapter, velkgInterface>("velkg");
-    addRow<prygAdapter, prygInterface>("pryg");
-    addRow<prysAdapter, prysInterface>("prys");
-}
-
 /// One member as a line to compare and to read, such as "method onDomainConfig in[s type] out[i]".
 QString memberLine(const QString& kind, const QString& name, const QStringList& ins, const QStringList& outs)
 {
@@ -216,36 +208,41 @@ class DBusContractTest : public QObject
     Q_OBJECT
 
 private Q_SLOTS:
-    void fileDeclaresThisInterfaceAlone_data() { addRows(); }
+    /// Every test is made for each of the three.
+    void initTestCase_data()
+    {
+        QTest::addColumn<Contract>("contract");
+        addRow<velkgAdapter, velkgInterface>("velkg");
+        addRow<prygAdapter, prygInterface>("pryg");
+        addRow<prysAdapter, prysInterface>("prys");
+    }
+
     void fileDeclaresThisInterfaceAlone()
     {
-        QFETCH(const Contract, contract);
+        QFETCH_GLOBAL(const Contract, contract);
         QCOMPARE(topElementsOf(documentOf(contract.interface)),
                  QStringList({QStringLiteral("node"), QStringLiteral("interface ") + contract.interface}));
     }
 
-    void classesNameTheInterface_data() { addRows(); }
     void classesNameTheInterface()
     {
-        QFETCH(const Contract, contract);
+        QFETCH_GLOBAL(const Contract, contract);
         QCOMPARE(contract.adapterName, contract.interface);
         QCOMPARE(contract.proxyName, contract.interface);
         QCOMPARE(classInformation(*contract.adapter, "D-Bus Interface"), contract.interface.toLatin1());
         QCOMPARE(classInformation(*contract.proxy, "D-Bus Interface"), contract.interface.toLatin1());
     }
 
-    void proxyCarriesTheIntrospectionText_data() { addRows(); }
     void proxyCarriesTheIntrospectionText()
     {
-        QFETCH(const Contract, contract);
+        QFETCH_GLOBAL(const Contract, contract);
         compareMembers(membersOfClassInformation(*contract.proxy, contract.interface),
                        membersOfFile(contract.interface));
     }
 
-    void exportedAdapterIntrospectsAsTheFile_data() { addRows(); }
     void exportedAdapterIntrospectsAsTheFile()
     {
-        QFETCH(const Contract, contract);
+        QFETCH_GLOBAL(const Contract, contract);
         BusClient exporter;
         QObject object;
         contract.exportFrom(&object);
@@ -262,17 +259,15 @@ private Q_SLOTS:
                        membersOfFile(contract.interface));
     }
 
-    void adapterDeclaresTheMembers_data() { addRows(); }
     void adapterDeclaresTheMembers()
     {
-        QFETCH(const Contract, contract);
+        QFETCH_GLOBAL(const Contract, contract);
         compareMembers(membersOf(*contract.adapter), inClassOrder(membersOfFile(contract.interface)));
     }
 
-    void proxyDeclaresTheMembers_data() { addRows(); }
     void proxyDeclaresTheMembers()
     {
-        QFETCH(const Contract, contract);
+        QFETCH_GLOBAL(const Contract, contract);
         compareMembers(membersOf(*contract.proxy), inClassOrder(membersOfFile(contract.interface)));
     }
 };

@@ -211,15 +211,6 @@ private Q_SLOTS:
         QCOMPARE(m_names->size() + m_windows->size(), 0);
     }
 
-    void changeFromAnotherSenderIsDropped()
-    {
-        const RecordedService stranger(QDBusConnection::SessionBus, QStringLiteral("com.norix.Stranger"),
-                                       answerNothing);
-        stranger.emitSignal(propertiesChanged({{name, QStringLiteral("n")}}), m_agent->bus());
-        stranger.emitSignal(signalOf(path, interface, "NameChanged", {QStringLiteral("n")}), m_agent->bus());
-        QCOMPARE(m_names->size(), 0);
-    }
-
     void propertyDeclaredInvalidIsRead()
     {
         m_dock->set(path, name, QStringLiteral("新"));

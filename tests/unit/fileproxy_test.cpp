@@ -6,6 +6,7 @@
 
 #include "fileproxy.h"
 #include "files.h"
+#include "information_files.h"
 #include "log_recorder.h"
 
 using velk::base::FileProxy;
@@ -37,22 +38,16 @@ private Q_SLOTS:
         QTest::addColumn<std::optional<QFile::Permissions>>("permissions");
         QTest::addColumn<QIODevice::OpenMode>("mode");
         QTest::addColumn<QString>("shownMode");
-        QTest::addColumn<QString>("exists");
 
-        const std::optional<QFile::Permissions> missing;
-        const std::optional<QFile::Permissions> locked{kNoAccess};
-        const QString readOnly = QStringLiteral(R"(OpenMode( "ReadOnly" ))");
-        const QString no = QStringLiteral("false");
-        const QString yes = QStringLiteral("true");
-
-        QTest::newRow("read missing")
-            << missing << QIODevice::OpenMode(QIODevice::ReadOnly) << readOnly << no;
-        QTest::newRow("read unreadable")
-            << locked << QIODevice::OpenMode(QIODevice::ReadOnly) << readOnly << yes;
-        QTest::newRow("write unwritable") << locked << QIODevice::OpenMode(QIODevice::WriteOnly)
-                                          << QStringLiteral(R"(OpenMode( "WriteOnly" ))") << yes;
-        QTest::newRow("several flags") << locked << (QIODevice::WriteOnly | QIODevice::Truncate)
-                                       << QStringLiteral(R"(OpenMode( "Truncate|WriteOnly" ))") << yes;
+        const auto row = [](const char* name, std::optional<QFile::Permissions> permissions,
+                            QIODevice::OpenMode mode, const QString& shownMode) {
+            QTest::newRow(name) << permissions << mode << shownMode;
+        };
+        row("read missing", {}, QIODevice::ReadOnly, kReadMode);
+        row("read unreadable", kNoAccess, QIODevice::ReadOnly, kReadMode);
+        row("write unwritable", kNoAccess, QIODevice::WriteOnly, kWriteMode);
+        row("several flags", kNoAccess, QIODevice::WriteOnly | QIODevice::Truncate,
+            QStringLiteral("Truncate|WriteOnly"));
     }
 
     void failedOpenIsLoggedWithItsCause()
@@ -60,7 +55,6 @@ private Q_SLOTS:
         QFETCH(std::optional<QFile::Permissions>, permissions);
         QFETCH(QIODevice::OpenMode, mode);
         QFETCH(QString, shownMode);
-        QFETCH(QString, exists);
         if (permissions) {
             writeBytes(m_path, "kept");
             setPermissions(m_path, *permissions);
@@ -69,8 +63,7 @@ private Q_SLOTS:
         const LogRecorder log;
         FileProxy proxy;
         QVERIFY(!proxy.open(m_path, mode));
-        const QString line = QStringLiteral("warning: open file failed, file: \"%1\" , mode: %2 , exist: %3");
-        QCOMPARE(log.lines(), QStringList(line.arg(m_path, shownMode, exists)));
+        QCOMPARE(log.lines(), QStringList(openFailure(m_path, shownMode, permissions.has_value())));
         QCOMPARE(readBytes(m_path), permissions ? QByteArray("kept") : QByteArray());
     }
 

@@ -78,7 +78,8 @@ int kill(pid_t process, int signal) noexcept
     return endsWhenKilled ? static_cast<int>(syscall(SYS_kill, process, signal)) : 0;
 }
 
-/// Programs that end, and programs that do not; time runs fast while they are waited for.
+/// Programs that end, and programs that do not; time runs fast while they are waited for. End-to-end tests
+/// show what counts of their output.
 class PackageToolTest : public QObject
 {
     Q_OBJECT
@@ -113,15 +114,6 @@ private Q_SLOTS:
         QCOMPARE(endedProcess, 0);
     }
 
-    void programThatFailsHasEnded()
-    {
-        for (const char* script : {"echo x; exit 1", "echo x; kill -SEGV $$"}) {
-            const PackageToolRun run = runScript(script);
-            QVERIFY(run.ended);
-            QCOMPARE(run.output, QStringLiteral("x\n"));
-        }
-    }
-
     void argumentsArriveAsTheyStand()
     {
         const QStringList arguments{QStringLiteral("[%s]"), QStringLiteral("two words"), QString(),
@@ -138,17 +130,6 @@ private Q_SLOTS:
                  QStringLiteral("ONLY=this\n"));
     }
 
-    void environmentIsTheAgentsOwnUnlessGiven()
-    {
-        qputenv("VELK_TEST_VALUE", "own");
-        QCOMPARE(runScript("echo $VELK_TEST_VALUE").output, QStringLiteral("own\n"));
-    }
-
-    void complaintsAreNotRead()
-    {
-        QCOMPARE(runScript("echo complaint >&2; echo answer").output, QStringLiteral("answer\n"));
-    }
-
     void inputStaysOpen()
     {
         // A program that reads it hangs until its limit.
@@ -163,17 +144,6 @@ private Q_SLOTS:
         QCOMPARE(waited, 0L);
     }
 
-    void hungProgramIsWaitedForUntilTheLimit()
-    {
-        QVERIFY(!runScript("exec sleep 1000").ended);
-        QVERIFY(waitedOneLimit());
-    }
-
-    void hungProgramsOutputUpToThereCounts()
-    {
-        QCOMPARE(runScript("echo first; exec sleep 1000").output, QStringLiteral("first\n"));
-    }
-
     void hungProgramIsEndedAndNothingOfItIsLeft() const
     {
         runScript("trap '' TERM; while :; do sleep 0.1; done");
@@ -182,7 +152,7 @@ private Q_SLOTS:
         QTRY_COMPARE(openFiles(), m_openFiles);
     }
 
-    void programThatCannotBeEndedCostsNoFurtherWaiting()
+    void programThatCannotBeEndedIsWaitedForUntilTheLimitAndNoLonger()
     {
         endsWhenKilled = false;
         QVERIFY(!runScript("exec sleep 1000").ended);
