@@ -14,7 +14,7 @@ from xml.etree import ElementTree
 import dbus
 import dbus.bus
 
-from sandbox.bus.mainloop import MainLoop
+from sandbox.bus.mainloop import MainLoop, on_main_loop
 from sandbox.machine import layout
 from sandbox.machine.users import User
 
@@ -41,7 +41,7 @@ _CONFIG = """<!DOCTYPE busconfig PUBLIC "-//freedesktop//DTD D-Bus Bus Configura
   {limits}
 </busconfig>
 """
-_SERVICE = ("org.freedesktop.DBus", "/org/freedesktop/DBus", "org.freedesktop.DBus")
+BUS, BUS_PATH = "org.freedesktop.DBus", "/org/freedesktop/DBus"
 _STOP_SECONDS = 10
 _PING_SECONDS = 60.0
 
@@ -152,9 +152,13 @@ class Bus:
         self._listeners.append(listener)
         listener()
 
+    @on_main_loop
     def connect(self) -> Any:
         """A new private connection; use it on the main loop's thread only."""
-        return MainLoop.call(self._connect)
+        connection = dbus.bus.BusConnection(self.address, mainloop=MainLoop.bus_loop)
+        connection.set_exit_on_disconnect(False)
+        _every_connection.append(connection)
+        return connection
 
     def owner(self, name: str) -> str | None:
         """Unique name of the connection that owns `name`."""
@@ -181,15 +185,18 @@ class Bus:
         """Return once everything that a process has sent so far has reached the bus."""
         await_pings(self._control, self.names_of(pid))
 
+    @on_main_loop
     def ask(self, member: str, signature: str, *args: Any) -> Any:
         """Call a method of the bus itself."""
-        return MainLoop.call(self._ask, member, signature, args)
+        if self._control is None:
+            self._control = self.connect()
+        return self._control.call_blocking(BUS, BUS_PATH, BUS, member, signature, args)
 
     def _ask_for_process(self, unique_name: str) -> int | None:
         # Another thread may have asked meanwhile, and the connection may have ended since.
         if unique_name not in self._processes:
             try:
-                process = int(self._ask("GetConnectionUnixProcessID", "s", (unique_name,)))
+                process = int(self.ask("GetConnectionUnixProcessID", "s", unique_name))
             except dbus.DBusException:
                 return None
             self._processes[unique_name] = process
@@ -202,16 +209,13 @@ class Bus:
         self._control = None
         self._processes.clear()
 
-    def _ask(self, member: str, signature: str, args: tuple[Any, ...]) -> Any:
-        if self._control is None:
-            self._control = self._connect()
-        return self._control.call_blocking(*_SERVICE, member, signature, args)
 
-    def _connect(self) -> Any:
-        connection = dbus.bus.BusConnection(self.address, mainloop=MainLoop.bus_loop)
-        connection.set_exit_on_disconnect(False)
-        _every_connection.append(connection)
-        return connection
+@on_main_loop
+def reply_to(connection: Any, *call: Any) -> Future[tuple[Any, ...]]:
+    """The values of the reply to a call, which begins at once."""
+    reply: Future[tuple[Any, ...]] = Future()
+    connection.call_async(*call, lambda *values: reply.set_result(values), reply.set_exception)
+    return reply
 
 
 def await_pings(connection: Any, unique_names: Iterable[str]) -> None:
@@ -221,16 +225,9 @@ def await_pings(connection: Any, unique_names: Iterable[str]) -> None:
     Their reply to a ping follows on the same connection; D-Bus libraries send it even while their program is
     busy.
     """
-    pings = [MainLoop.call(_ping, connection, name) for name in unique_names]
-    for ping in pings:
-        ping.result(_PING_SECONDS)
-
-
-def _ping(connection: Any, unique_name: str) -> Future[None]:
-    answered: Future[None] = Future()
-    ping = (unique_name, "/", "org.freedesktop.DBus.Peer", "Ping", "", ())
-    connection.call_async(*ping, lambda: answered.set_result(None), answered.set_exception)
-    return answered
+    ping = ("/", "org.freedesktop.DBus.Peer", "Ping", "", ())
+    for answered in [reply_to(connection, name, *ping) for name in unique_names]:
+        answered.result(_PING_SECONDS)
 
 
 def _end(pid: int) -> None:

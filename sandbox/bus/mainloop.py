@@ -4,11 +4,13 @@ from __future__ import annotations
 
 import threading
 from concurrent.futures import Future
-from typing import Any, Callable, TypeVar
+from functools import partial, wraps
+from typing import Any, Callable, ParamSpec, TypeVar
 
 import dbus.mainloop.glib
 from gi.repository import GLib
 
+P = ParamSpec("P")
 T = TypeVar("T")
 
 _CALL_SECONDS = 60.0
@@ -17,7 +19,8 @@ _CALL_SECONDS = 60.0
 class MainLoop:
     """A GLib loop in its own background thread, started on first use.
 
-    All D-Bus objects are created and used on that thread; `call` runs work there for any other thread.
+    All D-Bus objects are created and used on that thread; `call` runs work there for any other thread, and
+    `on_main_loop` makes a function do so.
     """
 
     _lock = threading.Lock()
@@ -35,15 +38,10 @@ class MainLoop:
         return result.result(_CALL_SECONDS)
 
     @classmethod
-    def later(cls, seconds: float, function: Callable[[], object]) -> None:
+    def later(cls, seconds: float, function: Callable[[], None]) -> None:
         """Run `function` once on the loop's thread, after `seconds`."""
         cls._start()
-
-        def once() -> bool:
-            function()
-            return bool(GLib.SOURCE_REMOVE)
-
-        GLib.timeout_add(int(seconds * 1000), once)
+        GLib.timeout_add(int(seconds * 1000), function)
 
     @classmethod
     def _start(cls) -> None:
@@ -56,9 +54,18 @@ class MainLoop:
             cls._thread.start()
 
 
-def _settle(result: Future[T], function: Callable[..., T], args: tuple[Any, ...]) -> bool:
+def on_main_loop(function: Callable[P, T]) -> Callable[P, T]:
+    """Run a function on the loop's thread, whichever thread calls it."""
+
+    @wraps(function)
+    def run(*args: P.args, **kwargs: P.kwargs) -> T:
+        return MainLoop.call(partial(function, *args, **kwargs))
+
+    return run
+
+
+def _settle(result: Future[T], function: Callable[..., T], args: tuple[Any, ...]) -> None:
     try:
         result.set_result(function(*args))
     except BaseException as error:  # raised in the caller's thread instead
         result.set_exception(error)
-    return bool(GLib.SOURCE_REMOVE)

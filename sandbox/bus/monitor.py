@@ -11,15 +11,14 @@ from typing import Any, Collection
 import dbus
 from gi.repository import Gio, GLib
 
-from sandbox.bus.bareconnection import BUS, BareConnection, call_of_bus
-from sandbox.bus.buses import Bus
+from sandbox.bus.buses import BUS, BUS_PATH, Bus
 from sandbox.bus.senders import Senders
 from sandbox.events import PATIENCE
 
 # Calls only: signals and replies, the bulk of a flood, are not needed.
 _RULES = ["type='method_call'"]
 _MONITORING = f"{BUS}.Monitoring"
-_SERIAL = 2
+_CLIENT = Gio.DBusConnectionFlags.AUTHENTICATION_CLIENT | Gio.DBusConnectionFlags.MESSAGE_BUS_CONNECTION
 
 
 @dataclass(frozen=True, slots=True)
@@ -46,7 +45,7 @@ class BusMonitor:
         self._known = {BUS, *served}
         self._tokens = (f"com.norix.box.seen{number}" for number in count(1))
         self._awaited: dict[str, threading.Event] = {}
-        self._connection: BareConnection | None = None
+        self._connection: Any = None
         bus.when_started(self._listen)
 
     def receive_all(self) -> None:
@@ -60,34 +59,31 @@ class BusMonitor:
         """Read what was sent so far, then stop."""
         with contextlib.suppress(dbus.DBusException):  # the bus may be gone
             self.receive_all()
-        if self._connection:
-            self._connection.end()
+        with contextlib.suppress(GLib.Error):  # the bus may have closed the connection
+            self._connection.close_sync()
 
     def _listen(self) -> None:
-        self._connection = connection = BareConnection(self._bus)
-        rules = GLib.Variant("(asu)", (_RULES, 0))
-        connection.send(call_of_bus(_MONITORING, "BecomeMonitor", rules, _SERIAL))
-        ready = threading.Event()
-        arguments = (connection, self._bus.run, ready)
-        threading.Thread(target=self._read, args=arguments, name="bus-monitor", daemon=True).start()
-        assert ready.wait(PATIENCE), f"the {self._bus.kind} bus allows no monitor"
+        self._connection = Gio.DBusConnection.new_for_address_sync(self._bus.address, _CLIENT)
+        self._connection.add_filter(self._take, self._bus.run, {})
+        call = (BUS, BUS_PATH, _MONITORING, "BecomeMonitor", GLib.Variant("(asu)", (_RULES, 0)))
+        self._connection.call_sync(*call, None, Gio.DBusCallFlags.NONE, int(PATIENCE * 1000), None)
 
-    def _read(self, connection: BareConnection, run: int, ready: threading.Event) -> None:
-        labels: dict[str, str | None] = {}
+    def _take(
+        self, _connection: Any, message: Any, incoming: bool, run: int, labels: dict[str, str | None]
+    ) -> Any:
+        """Runs on a thread of the library, which would answer a call that it got back."""
+        if not incoming or message.get_message_type() != Gio.DBusMessageType.METHOD_CALL:
+            return message
         try:
-            for message in connection.messages():
-                if message.get_message_type() == Gio.DBusMessageType.METHOD_CALL:
-                    self._look_at(message, run, labels)
-                elif message.get_reply_serial() == _SERIAL:
-                    message.to_gerror()  # raises if the bus refused
-                    ready.set()
+            self._look_at(message, run, labels)
         except Exception as error:  # a bug in this thread must fail the test
             self.violations.append(f"the monitor of the {self._bus.kind} bus broke: {error!r}")
-        connection.close()
+        return None
 
     def _look_at(self, message: Gio.DBusMessage, run: int, labels: dict[str, str | None]) -> None:
         sender, destination, member = message.get_sender(), message.get_destination(), message.get_member()
-        args = _arguments(message) if destination == BUS else ()
+        body = message.get_body() if destination == BUS else None
+        args = tuple(body.unpack()) if body else ()
         if member == "NameHasOwner" and args and args[0] in self._awaited:
             self._awaited.pop(args[0]).set()
         if sender not in labels:
@@ -104,8 +100,3 @@ class BusMonitor:
         """The sender's name; None after a restart of the bus, which gives the unique names out again."""
         label = self._senders.label(self._bus, sender)
         return label if self._bus.run == run else None
-
-
-def _arguments(message: Gio.DBusMessage) -> tuple[Any, ...]:
-    body = message.get_body()
-    return tuple(body.unpack()) if body else ()

@@ -2,14 +2,13 @@
 
 from __future__ import annotations
 
-from concurrent.futures import Future
 from typing import Any
 
 import dbus.bus
 import dbus.lowlevel
 
-from sandbox.bus.buses import Bus
-from sandbox.bus.mainloop import MainLoop
+from sandbox.bus.buses import Bus, reply_to
+from sandbox.bus.mainloop import MainLoop, on_main_loop
 from sandbox.bus.values import plain
 
 _CALL_SECONDS = 30.0
@@ -27,6 +26,7 @@ class Stranger:
         """Unique name of the stranger's connection."""
         return str(self._connection.get_unique_name())
 
+    @on_main_loop
     def emit(
         self,
         path: str,
@@ -41,19 +41,15 @@ class Stranger:
         if destination:
             message.set_destination(destination)
         message.append(*args, signature=signature)
-        MainLoop.call(self._send, message)
+        self._connection.send_message(message)
+        self._connection.flush()
 
     def call(self, name: str, path: str, interface: str, member: str, *args: Any, signature: str = "") -> Any:
         """Call a method and return its reply; raises dbus.DBusException. Must not run on the main loop's
         thread, because the fakes answer there."""
-        result: Future[Any] = Future()
-
-        def succeed(*values: Any) -> None:
-            result.set_result(plain(values[0]) if len(values) == 1 else plain(list(values)))
-
-        request = (name, path, interface, member, signature, args, succeed, result.set_exception)
-        MainLoop.call(self._connection.call_async, *request)
-        return result.result(_CALL_SECONDS)
+        reply = reply_to(self._connection, name, path, interface, member, signature, args)
+        values = reply.result(_CALL_SECONDS)
+        return plain(values[0]) if len(values) == 1 else plain(list(values))
 
     def own(self, name: str, queue: bool = False) -> int:
         """Request a bus name; returns the bus's answer (1 owner, 2 in the queue, 3 taken)."""
@@ -71,7 +67,3 @@ class Stranger:
         for name in list(self._names):
             self.release(name)
         MainLoop.call(self._connection.close)
-
-    def _send(self, message: Any) -> None:
-        self._connection.send_message(message)
-        self._connection.flush()

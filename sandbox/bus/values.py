@@ -2,56 +2,28 @@
 
 from __future__ import annotations
 
-from typing import Any, Callable
+from typing import Any
 
 import dbus
-
-_BASIC: dict[str, Callable[[Any], Any]] = {
-    "y": dbus.Byte,
-    "b": dbus.Boolean,
-    "n": dbus.Int16,
-    "q": dbus.UInt16,
-    "i": dbus.Int32,
-    "u": dbus.UInt32,
-    "x": dbus.Int64,
-    "t": dbus.UInt64,
-    "d": dbus.Double,
-    "s": dbus.String,
-    "o": dbus.ObjectPath,
-    "g": dbus.Signature,
-}
+from dbus.lowlevel import SignalMessage
 
 
 def typed(signature: str, value: Any) -> Any:
     """`value` as the D-Bus type of `signature`, a single complete type."""
-    if signature in _BASIC:
-        return _BASIC[signature](value)
-    if signature.startswith("a{"):
-        return dbus.Dictionary(value, signature=signature[2:-1])
-    if signature.startswith("a"):
-        return dbus.Array(value, signature=signature[1:])
-    if signature.startswith("("):
-        return dbus.Struct(value, signature=signature[1:-1])
-    return value
+    message = SignalMessage("/", "com.norix.box", "Value")
+    message.append(value, signature=signature)
+    return message.get_args_list()[0]
+
+
+def signature_of(value: Any) -> str:
+    """The type of a D-Bus value."""
+    return str(SignalMessage.guess_signature(value))
 
 
 def signature_in_variant(value: Any) -> str:
     """The type of a received variant's content."""
-    return "v" if getattr(value, "variant_level", 0) > 1 else _signature(value)
-
-
-def _signature(value: Any) -> str:
-    if isinstance(value, dbus.Struct):
-        return f"({''.join(_signature_of_item(item) for item in value)})"
-    if isinstance(value, dbus.Dictionary):
-        return f"a{{{value.signature}}}"
-    if isinstance(value, dbus.Array):
-        return f"a{value.signature}"
-    return next(signature for signature, kind in _BASIC.items() if kind is type(value))
-
-
-def _signature_of_item(item: Any) -> str:
-    return "v" if getattr(item, "variant_level", 0) > 0 else _signature(item)
+    inner = {"signature": value.signature} if hasattr(value, "signature") else {}
+    return signature_of(type(value)(value, variant_level=value.variant_level - 1, **inner))
 
 
 def plain(value: Any) -> Any:

@@ -2,77 +2,28 @@
 
 from __future__ import annotations
 
-from dataclasses import dataclass
 from functools import cache
-from pathlib import Path
-from xml.etree import ElementTree
+from typing import Any, Iterable
+
+from gi.repository import Gio
 
 from sandbox import REPOSITORY
 
-
-FOLDERS = (REPOSITORY / "contracts" / "dbus", REPOSITORY / "src" / "velk" / "dbus")
-
-
-@dataclass(frozen=True)
-class Method:
-    """The signatures of a method's arguments and reply."""
-
-    arguments: str
-    reply: str
-
-
-@dataclass(frozen=True)
-class Property:
-    """A property's type and access ("read", "write", "readwrite")."""
-
-    signature: str
-    access: str
-
-
-@dataclass(frozen=True)
-class Contract:
-    """One interface; `xml` is its <interface> element."""
-
-    name: str
-    methods: dict[str, Method]
-    signals: dict[str, str]
-    properties: dict[str, Property]
-    xml: str
+_FOLDERS = (REPOSITORY / "contracts" / "dbus", REPOSITORY / "src" / "velk" / "dbus")
 
 
 @cache
-def load(interface: str) -> Contract:
+def load(interface: str) -> Gio.DBusInterfaceInfo:
     """Read the contract of an interface from the file named after it."""
-    element = ElementTree.parse(_file(interface)).getroot().find(f"interface[@name='{interface}']")
-    assert element is not None, f"{interface}.xml describes another interface"
-    return Contract(
-        interface,
-        {
-            _name(method): Method(_signature(method, "in"), _signature(method, "out"))
-            for method in element.iter("method")
-        },
-        {_name(signal): _signature(signal, "out") for signal in element.iter("signal")},
-        {
-            _name(prop): Property(prop.attrib["type"], prop.attrib["access"])
-            for prop in element.iter("property")
-        },
-        ElementTree.tostring(element, encoding="unicode"),
-    )
+    for folder in _FOLDERS:
+        file = folder / f"{interface}.xml"
+        if file.exists():
+            known = Gio.DBusNodeInfo.new_for_xml(file.read_text()).lookup_interface(interface)
+            assert known, f"{file} describes another interface"
+            return known
+    raise FileNotFoundError(f"no contract {interface}.xml in {', '.join(map(str, _FOLDERS))}")
 
 
-def _file(interface: str) -> Path:
-    for folder in FOLDERS:
-        path = folder / f"{interface}.xml"
-        if path.exists():
-            return path
-    raise FileNotFoundError(f"no contract {interface}.xml in {', '.join(map(str, FOLDERS))}")
-
-
-def _name(element: ElementTree.Element) -> str:
-    return element.attrib["name"]
-
-
-def _signature(element: ElementTree.Element, direction: str) -> str:
-    default = "out" if element.tag == "signal" else "in"
-    args = element.iter("arg")
-    return "".join(arg.attrib["type"] for arg in args if arg.attrib.get("direction", default) == direction)
+def signature(arguments: Iterable[Any]) -> str:
+    """The type of these arguments of a method or a signal."""
+    return "".join(argument.signature for argument in arguments)

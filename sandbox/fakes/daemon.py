@@ -7,7 +7,6 @@ from typing import Any, Mapping
 
 from sandbox import contracts
 from sandbox.fakes.base import Fake
-from sandbox.fakes.exported import ExportedObject
 from sandbox.machine import layout
 from sandbox.platform.server import Platform
 from sandbox.platform.uploader import Uploader
@@ -23,22 +22,15 @@ class Daemon(Fake):
     name = "daemon"
     bus_name = INTERFACE
     bus_kind = "system"
-
-    def exports(self) -> list[ExportedObject]:
-        """The service's only object."""
-        exported = ExportedObject(PATH, INTERFACE)
-        answers: dict[str, Any] = {
-            "GetDomainStatus": 1,
-            "GetMachineID": MACHINE_ID,
-            "GetNetStatus": 1,
-            "GetPolicyPullTime": 60,
-            "GetServerIP": layout.PLATFORM_HOST,
-            "GetServerPort": str(layout.PLATFORM_PORT),
-            "onDomainConfig": 0,
-        }
-        for member, value in answers.items():
-            exported.handlers[member] = lambda *_args, value=value: value
-        return [exported]
+    replies = {
+        "GetDomainStatus": 1,
+        "GetMachineID": MACHINE_ID,
+        "GetNetStatus": 1,
+        "GetPolicyPullTime": 60,
+        "GetServerIP": layout.PLATFORM_HOST,
+        "GetServerPort": str(layout.PLATFORM_PORT),
+        "onDomainConfig": 0,
+    }
 
     def appear(self, announce: bool = False) -> None:
         """Appear on the bus; with `announce`, push the online signal as a freshly started daemon does."""

@@ -5,12 +5,8 @@ from __future__ import annotations
 from itertools import count
 from typing import Any, Callable, Literal
 
-from dbus.lowlevel import SignalMessage
-
-from sandbox.bus.buses import Bus
-from sandbox.bus.mainloop import MainLoop
-from sandbox.bus.senders import Senders
-from sandbox.events import Events
+from sandbox.bus.mainloop import on_main_loop
+from sandbox.bus.values import signature_of
 from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
@@ -41,19 +37,14 @@ class Dock(Fake):
 
     name = "dock"
     bus_name = INTERFACE
+    properties = {"Entries": []}
 
-    def __init__(self, bus: Bus, events: Events, senders: Senders) -> None:
-        super().__init__(bus, events, senders)
+    def __init__(self, *surroundings: Any) -> None:
+        super().__init__(*surroundings)
         self.announces: tuple[Announcement, ...] = ("values",)
         self.window_type = "a{uv}"
         self._paths = (f"{ENTRIES}/e{number}" for number in count(1))
         self._window_ids = count(1)
-
-    def exports(self) -> list[ExportedObject]:
-        """The dock itself; its entries are added and removed later."""
-        exported = ExportedObject(PATH, INTERFACE)
-        exported.set("Entries", [])
-        return [exported]
 
     @property
     def apps(self) -> dict[str, str]:
@@ -61,13 +52,28 @@ class Dock(Fake):
         newer one."""
         return {self.value("Id", path): path for path in self.value("Entries")}
 
+    @on_main_loop
     def open_app(self, app: str, name: str, docked: bool = False, windows: int = 1) -> str:
         """Add and announce an entry for an application; returns its object path."""
-        return MainLoop.call(self._open_app, app, name, docked, windows)
+        entry = ExportedObject(next(self._paths), ENTRY)
+        entry.set("Id", app)
+        entry.set("Name", name)
+        entry.set("IsDocked", docked)
+        entry.set("WindowInfos", self._new_windows(windows), self.window_type)
+        self.objects[entry.path] = entry
+        paths = self._change_entries(lambda known: [*known, entry.path])
+        if self.present:
+            self.emit(INTERFACE, "EntryAdded", entry.path, len(paths) - 1)
+        return entry.path
 
+    @on_main_loop
     def close_app(self, app: str) -> None:
         """Remove an application's entry, with any windows that it has, and announce that."""
-        MainLoop.call(self._close_app, app)
+        gone = self.apps[app]
+        self._change_entries(lambda known: [path for path in known if path != gone])
+        self.withdrawn.add(gone)
+        if self.present:
+            self.emit(INTERFACE, "EntryRemoved", app)
 
     def set_windows(self, app: str, number: int) -> None:
         """Replace an application's windows by this many new ones."""
@@ -89,25 +95,6 @@ class Dock(Fake):
         """Whether an application is pinned to the dock."""
         return bool(self.value("IsDocked", self.apps[app]))
 
-    def _open_app(self, app: str, name: str, docked: bool, windows: int) -> str:
-        entry = ExportedObject(next(self._paths), ENTRY)
-        entry.set("Id", app)
-        entry.set("Name", name)
-        entry.set("IsDocked", docked)
-        entry.set("WindowInfos", self._new_windows(windows), self.window_type)
-        self.objects[entry.path] = entry
-        paths = self._change_entries(lambda known: [*known, entry.path])
-        if self.present:
-            self.emit(INTERFACE, "EntryAdded", entry.path, len(paths) - 1)
-        return entry.path
-
-    def _close_app(self, app: str) -> None:
-        gone = self.apps[app]
-        self._change_entries(lambda known: [path for path in known if path != gone])
-        self.withdrawn.add(gone)
-        if self.present:
-            self.emit(INTERFACE, "EntryRemoved", app)
-
     def _change_entries(self, change: Callable[[list[str]], list[str]]) -> list[str]:
         main = self.objects[PATH]
         paths = change(main.value("Entries"))
@@ -122,10 +109,9 @@ class Dock(Fake):
     def _announce(self, known: ExportedObject, name: str) -> None:
         for way in self.announces:
             if way == "values":
-                self._announce_properties(known, name, {name: known.typed_value(name)}, [])
+                self._announce_properties(known, {name: known.typed_value(name)}, [])
             elif way == "invalidated":
-                self._announce_properties(known, name, {}, [name])
+                self._announce_properties(known, {}, [name])
             elif name in _CHANGE_SIGNALS:
                 value = known.typed_value(name)
-                signature = SignalMessage.guess_signature(value)
-                self._emit(known.path, ENTRY, _CHANGE_SIGNALS[name], signature, (value,))
+                self._emit(known.path, ENTRY, _CHANGE_SIGNALS[name], signature_of(value), (value,))

@@ -6,6 +6,8 @@ from dataclasses import dataclass
 from typing import Any, Callable, Sequence
 from xml.sax.saxutils import quoteattr
 
+from gi.repository import Gio, GLib
+
 from sandbox.bus.values import plain, signature_in_variant, typed
 from sandbox.fakes import contract
 
@@ -67,10 +69,10 @@ class ExportedObject:
         """Raise CallRefused if a call breaks the contract; `args` are its D-Bus values."""
         expected = _STANDARD_METHODS.get((interface, member))
         if expected is None:
-            methods = self.contract.methods if interface == self.contract.name else {}
-            if member not in methods:
+            method = self.contract.lookup_method(member) if interface == self.contract.name else None
+            if method is None:
                 raise CallRefused("UnknownMethod", f"{self.path} has no method {interface}.{member}")
-            expected = methods[member].arguments
+            expected = contract.signature(method.in_args)
         if signature != expected:
             raise CallRefused(
                 "InvalidArgs", f"{interface}.{member} takes ({expected}), called with ({signature})"
@@ -81,10 +83,12 @@ class ExportedObject:
     def call(self, interface: str, member: str, args: tuple[Any, ...]) -> Reply:
         """Carry out a call that keeps to the contract."""
         if interface == INTROSPECTABLE:
-            return Reply("s", (f"<node name={quoteattr(self.path)}>{self.contract.xml}</node>",))
+            xml = GLib.String.new("")
+            self.contract.generate_xml(0, xml)
+            return Reply("s", (f"<node name={quoteattr(self.path)}>{xml.str}</node>",))
         if interface == PROPERTIES:
             return self._property_call(member, args)
-        signature = self.contract.methods[member].reply
+        signature = contract.signature(self.contract.lookup_method(member).out_args)
         result = self.handlers[member](*args) if member in self.handlers else None
         return Reply(signature, (result,) if signature else ())
 
@@ -103,16 +107,18 @@ class ExportedObject:
         if name is None:
             return
         known = self._property(name)
-        if values:
-            self._check_change(f"{interface}.{name}", known, signature_in_variant(values[0]))
-
-    def _check_change(self, name: str, known: contract.Property, signature: str) -> None:
-        if "write" not in known.access:
-            raise CallRefused("PropertyReadOnly", f"{name} is read-only")
+        if not values:
+            return
+        if not known.flags & Gio.DBusPropertyInfoFlags.WRITABLE:
+            raise CallRefused("PropertyReadOnly", f"{interface}.{name} is read-only")
+        signature = signature_in_variant(values[0])
         if signature != known.signature:
-            raise CallRefused("InvalidArgs", f"{name} is ({known.signature}), set to ({signature})")
+            raise CallRefused(
+                "InvalidArgs", f"{interface}.{name} is ({known.signature}), set to ({signature})"
+            )
 
-    def _property(self, name: str) -> contract.Property:
-        if name not in self.contract.properties:
+    def _property(self, name: str) -> Any:
+        known = self.contract.lookup_property(name)
+        if known is None:
             raise CallRefused("UnknownProperty", f"{self.path} has no property {self.contract.name}.{name}")
-        return self.contract.properties[name]
+        return known

@@ -4,13 +4,11 @@ from __future__ import annotations
 
 from sandbox.fakes.base import Fake
 
-INTERFACE = "com.norix.velk.iam"
-
 
 class IdentityService(Fake):
     """Owns com.norix.velk.iam on the system bus."""
 
     name = "identity"
-    bus_name = INTERFACE
+    bus_name = "com.norix.velk.iam"
     bus_kind = "system"
     properties = {"Enable": True}

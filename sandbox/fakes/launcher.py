@@ -3,10 +3,8 @@
 from __future__ import annotations
 
 from dataclasses import astuple, dataclass
+from typing import Any
 
-from sandbox.bus.buses import Bus
-from sandbox.bus.senders import Senders
-from sandbox.events import Events
 from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
@@ -33,8 +31,8 @@ class Launcher(Fake):
     name = "launcher"
     bus_name = INTERFACE
 
-    def __init__(self, bus: Bus, events: Events, senders: Senders) -> None:
-        super().__init__(bus, events, senders)
+    def __init__(self, *surroundings: Any) -> None:
+        super().__init__(*surroundings)
         self.items: list[LauncherItem] = []
 
     def exports(self) -> list[ExportedObject]:

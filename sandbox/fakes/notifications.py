@@ -7,14 +7,12 @@ from itertools import count
 from sandbox.fakes.base import Fake
 from sandbox.fakes.exported import ExportedObject
 
-INTERFACE = "com.norix.kpx.Notification"
-
 
 class Notifications(Fake):
     """Owns com.norix.kpx.Notification on the session bus; numbers the notifications from 1."""
 
     name = "notifications"
-    bus_name = INTERFACE
+    bus_name = "com.norix.kpx.Notification"
 
     def exports(self) -> list[ExportedObject]:
         """The service's only object."""

@@ -4,11 +4,9 @@ from __future__ import annotations
 
 from sandbox.fakes.base import Fake
 
-INTERFACE = "com.norix.velk.prys"
-
 
 class PolicyService(Fake):
     """Owns com.norix.velk.prys on the session bus."""
 
     name = "policy_service"
-    bus_name = INTERFACE
+    bus_name = "com.norix.velk.prys"

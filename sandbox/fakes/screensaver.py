@@ -4,14 +4,12 @@ from __future__ import annotations
 
 from sandbox.fakes.base import Fake
 
-INTERFACE = "com.norix.ScreenSaver"
-
 
 class ScreenSaver(Fake):
     """Owns com.norix.ScreenSaver on the session bus; not running at first."""
 
     name = "screensaver"
-    bus_name = INTERFACE
+    bus_name = "com.norix.ScreenSaver"
     properties = {"isRunning": False}
 
     def run(self, running: bool = True) -> None:

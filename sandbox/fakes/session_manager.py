@@ -4,14 +4,12 @@ from __future__ import annotations
 
 from sandbox.fakes.base import Fake
 
-INTERFACE = "com.norix.SessionManager"
-
 
 class SessionManager(Fake):
     """Owns com.norix.SessionManager on the session bus; unlocked at first."""
 
     name = "session_manager"
-    bus_name = INTERFACE
+    bus_name = "com.norix.SessionManager"
     properties = {"Locked": False}
 
     def lock(self, locked: bool = True) -> None:

@@ -34,7 +34,7 @@ def changes_come(terminal: Terminal) -> None:
 
 def lie(fake: Fake) -> None:
     """Answer every call with values of another type than the contract's."""
-    methods = [name for known in fake.objects.values() for name in known.contract.methods]
+    methods = [method.name for known in fake.objects.values() for method in known.contract.methods]
     fake.answers = {name: NONSENSE for name in [*methods, "Get", "Set"]}
 
 

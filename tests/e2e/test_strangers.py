@@ -128,7 +128,7 @@ def test_forged_new_owner_does_not_replace_the_daemon(
     session: Terminal, on_system: Stranger, straight: bool
 ) -> None:
     mark = session.events.mark()
-    forged = new_owner(on_system, daemon.INTERFACE, str(session.daemon.unique_name))
+    forged = new_owner(on_system, daemon.INTERFACE, str(session.system_bus.owner(daemon.INTERFACE)))
     send(on_system, [forged], receivers(session, session.system_bus, straight))
     send(on_system, [policy('{"type":1201}')])
     assert settled(session, mark) == []

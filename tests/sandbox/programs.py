@@ -13,9 +13,11 @@ import pytest
 
 from sandbox.agent import default_binary
 from sandbox.fakes.daemon import INTERFACE as VELKG
-from sandbox.fakes.policy_service import INTERFACE as PRYS
+from sandbox.fakes.policy_service import PolicyService
 from sandbox.machine import layout
 from sandbox.terminal import Terminal
+
+PRYS = PolicyService.bus_name
 
 _TALK = f"""
 import dbus, ssl
