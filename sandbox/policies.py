@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 import json
-from typing import Any, Iterator, NamedTuple
+from typing import Iterator, NamedTuple
 
 from sandbox import contracts
 
@@ -27,12 +27,8 @@ def _own_policies() -> Iterator[Policy]:
     for group in groups["ownCode"]["anyOf"]:
         audience = group["$ref"].rpartition("/")[2]
         for entry in groups[audience]["anyOf"]:
-            yield _policy(audience, entry)
-
-
-def _policy(audience: str, entry: dict[str, Any]) -> Policy:
-    notice = entry["x-notice"]
-    return Policy(entry["const"], entry["title"], audience, entry["x-action"], notice["zh"], notice["en"])
+            code, meaning, notice = entry["const"], entry["title"], entry["x-notice"]
+            yield Policy(code, meaning, audience, entry["x-action"], notice["zh"], notice["en"])
 
 
 POLICIES = {policy.code: policy for policy in sorted(_own_policies())}

@@ -57,4 +57,4 @@ def summary(outcomes: Sequence[Outcome]) -> Text:
 def _seen(outcome: Outcome, time: AgentTime) -> str:
     if outcome.seen is None:
         return "nothing" if outcome.verdict != "not played" else "-"
-    return f"{minutes(time.of(outcome.seen))}, {max(0.0, outcome.delay):.0f} s after the cue"
+    return f"{minutes(time.at(outcome.seen.time))}, {max(0.0, outcome.delay):.0f} s after the cue"

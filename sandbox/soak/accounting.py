@@ -110,20 +110,13 @@ def _piece_of(event: Event) -> tuple[str, Piece] | None:
             return RECEIPTS, (json.loads(body)["uuid"],)
         case "log", _, _, (text,) if text.startswith(_LIST_READ):
             return LISTS, ()
-        case "call", "daemon", member, args:
-            return _piece_for_daemon(member, args)
-    return None
-
-
-def _piece_for_daemon(member: str, args: tuple[Any, ...]) -> tuple[str, Piece] | None:
-    match member, args:
-        case "sendAppOpenState", _:
+        case "call", "daemon", "sendAppOpenState", args:
             return APPLICATIONS, args
-        case "SendUserStatus", _:
+        case "call", "daemon", "SendUserStatus", args:
             return STATUSES, args
-        case "UpdateUserInfo", _:
+        case "call", "daemon", "UpdateUserInfo", args:
             return USERS, args
-        case "onUploadFinished", (_, text):
+        case "call", "daemon", "onUploadFinished", (_, text):
             payload = json.loads(text)["payload"]
             if "list" in payload:
                 return INVENTORIES, tuple((known["name"], known["version"]) for known in payload["list"])

@@ -25,16 +25,12 @@ class AgentTime:
         """Add seconds from now on."""
         self._moves.append((time.monotonic(), seconds))
 
-    def of(self, event: Event) -> float:
-        """The agent time of an event, 0 before the agent's start."""
-        return self.at(event.time)
-
     def now(self) -> float:
         """The current agent time."""
         return self.at(time.monotonic())
 
     def at(self, moment: float) -> float:
-        """The agent time of a moment on the host's monotonic clock."""
+        """The agent time of a moment on the host's monotonic clock, 0 before the agent's start."""
         if self._start is None:
             return 0.0
         moved = sum(seconds for when, seconds in self._moves if when <= moment)

@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 import re
-from typing import Iterator
+from itertools import chain
 
 from rich.cells import cell_len
 
@@ -21,16 +21,10 @@ def _broken(word: str, width: int) -> str:
     if cell_len(word) <= width:
         return word
     lines = [""]
-    for piece in _pieces(word, width):
+    pieces = _PIECE.findall(word)
+    # A part that is too wide itself is taken character by character.
+    for piece in chain.from_iterable([piece] if cell_len(piece) <= width else piece for piece in pieces):
         if lines[-1] and cell_len(lines[-1] + piece) > width:
             lines.append("")
         lines[-1] += piece
     return "\n".join(lines)
-
-
-def _pieces(word: str, width: int) -> Iterator[str]:
-    for piece in _PIECE.findall(word):
-        if cell_len(piece) <= width:
-            yield piece
-        else:
-            yield from piece  # character by character

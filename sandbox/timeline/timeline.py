@@ -121,7 +121,7 @@ class Timeline:
         line.add_column(width=_TIME)
         line.add_column(width=_ROUTE)
         rest = width - _TIME - _ROUTE - 2 * _GAP
-        cells = [Text(minutes(self.time.of(event)), "dim"), _route(event)]
+        cells = [Text(minutes(self.time.at(event.time)), "dim"), _route(event)]
         if width < _WIDE or event.kind in _LOG_KINDS:
             line.add_column(max_width=rest, overflow="fold")
             cells.append(_stacked(event, rest))
