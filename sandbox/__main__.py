@@ -9,7 +9,8 @@ import signal
 import sys
 
 from sandbox.box import bubblewrap
-from sandbox.machine.users import USERS, User
+from sandbox.ending import CannotRun
+from sandbox.machine.users import USERS
 
 _NO_BOX = 125
 _INTERRUPTED = 130
@@ -20,8 +21,6 @@ def _parser() -> argparse.ArgumentParser:
     parser.add_argument(
         "--user", choices=sorted(USERS), default="domain", help="kind of user (default: domain)"
     )
-    parser.add_argument("--name", help="login name instead of the kind's own")
-    parser.add_argument("--uid", type=int, help="user id instead of the kind's own")
     parser.add_argument("--env", action="append", default=[], metavar="NAME", help="pass this variable on")
     parser.add_argument("command", nargs="+", metavar="COMMAND")
     return parser
@@ -29,20 +28,17 @@ def _parser() -> argparse.ArgumentParser:
 
 def _enter(arguments: list[str]) -> None:
     options = _parser().parse_args(arguments)
-    default = USERS[options.user]
-    user = User(options.name or default.name, default.uid if options.uid is None else options.uid)
     env = {name: os.environ[name] for name in options.env if name in os.environ}
     try:
         bubblewrap.require()
-    except bubblewrap.BoxUnavailable as error:
+    except CannotRun as error:
         print(f"in-box: {error}", file=sys.stderr)
         sys.exit(_NO_BOX)
-    argv = bubblewrap.command(user, options.command, env)
+    argv = bubblewrap.command(USERS[options.user], options.command, env)
     os.execvp(argv[0], argv)
 
 
 def _run_for_user(verb: str, arguments: list[str]) -> int:
-    from sandbox.box import host
     from sandbox.demo import main as demo
     from sandbox.prompt import main as prompt
     from sandbox.soak import main as soak
@@ -51,7 +47,7 @@ def _run_for_user(verb: str, arguments: list[str]) -> int:
     signal.signal(signal.SIGINT, signal.default_int_handler)
     try:
         return {"demo": demo.run, "box": prompt.run, "soak": soak.run}[verb](arguments)
-    except host.CannotRun as error:
+    except CannotRun as error:
         print(f"{verb}: {error}", file=sys.stderr)
         return 1
     except KeyboardInterrupt:

@@ -2,20 +2,19 @@
 
 from __future__ import annotations
 
-import codecs
 import contextlib
 import os
 import signal
 import subprocess
 import threading
+from io import TextIOWrapper
 from pathlib import Path
 from typing import IO, Callable, Mapping, Sequence
 
 from sandbox import REPOSITORY
-from sandbox.bus.buses import Bus
 from sandbox.bus.senders import Senders
 from sandbox.events import PATIENCE, Events
-from sandbox.machine.clock import Clock, RealTime
+from sandbox.machine.clock import Clock
 
 # For instrumented agents: the preloaded clock may come before the sanitizer's library (if both were
 # preloaded, the agent's child processes would hang), and the leak check is off because it fails with a
@@ -54,13 +53,13 @@ class Agent:
 
     def start(
         self,
-        clock: Clock | None = None,
+        clock: Clock = Clock(),
         extra_env: Mapping[str, str] | None = None,
         extra_argv: Sequence[str] = (),
     ) -> None:
         """Start the process and return at once."""
         assert not self.alive, "the agent runs already"
-        env = {**os.environ, "QT_MESSAGE_PATTERN": _PATTERN, **(clock or RealTime()).environment()}
+        env = {**os.environ, "QT_MESSAGE_PATTERN": _PATTERN, **clock.environment()}
         if "LD_PRELOAD" in env:
             env["ASAN_OPTIONS"] = ":".join(filter(None, (os.environ.get("ASAN_OPTIONS"), _ASAN_WITH_PRELOAD)))
         self._ending_wanted = False
@@ -75,7 +74,7 @@ class Agent:
             )
             self._senders.register(self._process.pid, "velks")
         assert self._process.stderr
-        self._log = LogReader("velks", self._process.stderr, self._events)
+        self._log = LogReader(self._process.stderr, self._events)
         self._events.record("box", "velks", "life", "starts", (self._process.pid,))
 
     @property
@@ -112,28 +111,21 @@ class Agent:
         """Send SIGKILL, and wait for the end of the process and its log."""
         self._end(lambda process: process.kill())
 
-    def wait(self, timeout: float = PATIENCE) -> int:
+    def wait(self) -> int:
         """Wait until the agent ends by itself, as expected; returns its exit status."""
         assert self._process and self._log, _NEVER_STARTED
         self._ending_wanted = True
-        status = self._process.wait(timeout)
-        self._end_children()
-        self._log.finish()
+        status = self._process.wait(PATIENCE)
+        with contextlib.suppress(ProcessLookupError):
+            # Children of the agent's scripts are left; the end of a session kills them, too.
+            os.killpg(self.pid, signal.SIGKILL)
+        self._log.join()
         return status
 
     def resident_bytes(self) -> int:
         """The process's resident memory."""
         pages = int(Path(f"/proc/{self.pid}/statm").read_text().split()[1])
         return pages * os.sysconf("SC_PAGE_SIZE")
-
-    def bus_names(self, bus: Bus) -> list[str]:
-        """Unique names of the agent's connections on a bus."""
-        return bus.names_of(self.pid)
-
-    def _end_children(self) -> None:
-        """Kill processes left behind by the agent's scripts, as the end of a session does."""
-        with contextlib.suppress(ProcessLookupError):
-            os.killpg(self.pid, signal.SIGKILL)
 
     def _end(self, how: Callable[[subprocess.Popen[bytes]], None]) -> None:
         if self._process is None or not self.alive:
@@ -148,56 +140,44 @@ class Agent:
             raise StillRunning("the agent did not end on SIGTERM") from None
 
 
-class LogReader:
+class LogReader(threading.Thread):
     """Turns an agent's log into events while it is written, until the writer ends.
 
     A message becomes an event of kind "log" with the level as member, the message as its only argument, and
     file, line and function as detail; any other line becomes an event of kind "output".
     """
 
-    def __init__(self, source: str, stream: IO[bytes], events: Events) -> None:
-        self._source = source
+    def __init__(self, stream: IO[bytes], events: Events) -> None:
+        super().__init__(name="log of velks", daemon=True)
         self._stream = stream
         self._events = events
-        self._decoder = codecs.getincrementaldecoder("utf-8")(errors="backslashreplace")
-        self._rest = ""
         self._lines: list[str] = []
-        self._thread = threading.Thread(target=self._read, name=f"log of {source}", daemon=True)
-        self._thread.start()
+        self.start()
 
     @property
     def text(self) -> str:
         """The log so far, in a readable form."""
         return "\n".join(self._lines)
 
-    def finish(self) -> None:
-        """Wait for the end of the log."""
-        self._thread.join()
-
-    def _read(self) -> None:
-        while chunk := os.read(self._stream.fileno(), 65536):
-            self._feed(self._decoder.decode(chunk))
-        self._feed(self._decoder.decode(b"", final=True) + "\n")
-        self._stream.close()
-
-    def _feed(self, text: str) -> None:
-        self._rest += text
-        while True:
-            end = _END + "\n" if self._rest.startswith(_START) else "\n"
-            piece, found, rest = self._rest.partition(end)
-            if not found:
-                return
-            self._rest = rest
-            self._take(piece)
+    def run(self) -> None:
+        """Read to the end."""
+        piece = ""
+        with TextIOWrapper(self._stream, "utf-8", "backslashreplace", newline="\n") as lines:
+            for line in lines:
+                piece += line
+                # A message may have several lines.
+                if not piece.startswith(_START) or piece.endswith(_END + "\n"):
+                    self._take(piece.removesuffix("\n"))
+                    piece = ""
 
     def _take(self, piece: str) -> None:
-        fields = piece.removeprefix(_START).split(_FIELD, _FIELDS - 1)
+        fields = piece.removeprefix(_START).removesuffix(_END).split(_FIELD, _FIELDS - 1)
         if not piece.startswith(_START) or len(fields) < _FIELDS:
             if piece:
                 self._lines.append(piece)
-                self._events.record(self._source, "log", "output", "", (piece,))
+                self._events.record("velks", "log", "output", "", (piece,))
             return
         level, file, line, function, message = fields
         self._lines.append(f"{level:8} {file}:{line} {function}: {message}")
         detail = {"file": file, "line": int(line), "function": function}
-        self._events.record(self._source, "log", "log", level, (message,), detail)
+        self._events.record("velks", "log", "log", level, (message,), detail)

@@ -3,7 +3,6 @@
 from __future__ import annotations
 
 from functools import cached_property
-from types import TracebackType
 from typing import Callable, Collection, Mapping, get_type_hints
 from uuid import uuid4
 
@@ -62,9 +61,8 @@ class Terminal:
         for bus in (self.system_bus, self.session_bus):
             bus.restart()
         commands.install_defaults()
-        self.commands = commands.Commands(self.events)
+        self.commands = self.tools = Tools(self.events)
         self.packages = Packages()
-        self.tools = Tools(self.commands)
         self.senders = Senders()
         self._add_fakes()
         self.system_monitor = self._monitor(self.system_bus)
@@ -91,10 +89,8 @@ class Terminal:
     def __enter__(self) -> Terminal:
         return self
 
-    def __exit__(
-        self, kind: type[BaseException] | None, error: BaseException | None, trace: TracebackType | None
-    ) -> None:
-        if error:
+    def __exit__(self, kind: type[BaseException] | None, *_details: object) -> None:
+        if kind:
             self.shut_down()
         else:
             self.close()

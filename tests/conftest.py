@@ -18,7 +18,7 @@ import pytest
 
 from sandbox.bus.stranger import Stranger
 from sandbox.machine import layout
-from sandbox.machine.clock import ManualClock, RealTime
+from sandbox.machine.clock import Clock, ManualClock
 from sandbox.terminal import Terminal
 
 
@@ -30,7 +30,7 @@ def terminal(request: pytest.FixtureRequest) -> Iterator[Terminal]:
     the agent has died or broken the contract of an interface.
     """
     real_time = request.node.get_closest_marker("real_time") is not None
-    opened = Terminal(clock=RealTime() if real_time else ManualClock())
+    opened = Terminal(clock=Clock() if real_time else ManualClock())
     yield opened
     opened.close()
 

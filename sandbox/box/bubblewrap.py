@@ -13,6 +13,7 @@ from pathlib import Path
 from typing import Collection, Iterator, Mapping, Sequence
 
 from sandbox import REPOSITORY
+from sandbox.ending import CannotRun
 from sandbox.machine import layout
 from sandbox.machine.users import USERS, User
 
@@ -36,10 +37,6 @@ _CAPABILITIES = ("CAP_SYS_ADMIN", "CAP_NET_ADMIN")
 _OWN_NETWORK = ("/usr/bin/unshare", "--net")
 # Tries these capabilities and the namespace; prints the cause if the host refuses them.
 _CAN_BOX = REPOSITORY / "sandbox" / "can-box"
-
-
-class BoxUnavailable(Exception):
-    """This host cannot run a box; the message says what to do."""
 
 
 def command(
@@ -72,18 +69,18 @@ def command(
 
 
 def require() -> None:
-    """Raise BoxUnavailable if bubblewrap is missing, the kernel forbids user namespaces, or the agent would
+    """Raise CannotRun if bubblewrap is missing, the kernel forbids user namespaces, or the agent would
     not be visible in the box."""
     if not shutil.which("bwrap"):
-        raise BoxUnavailable("bubblewrap is missing; install it with: apt-get install bubblewrap")
+        raise CannotRun("bubblewrap is missing; install it with: apt-get install bubblewrap")
     attempt = subprocess.run([_CAN_BOX], stdin=subprocess.DEVNULL, capture_output=True, text=True)
     if attempt.returncode:
-        raise BoxUnavailable(attempt.stdout.strip())
+        raise CannotRun(attempt.stdout.strip())
     agent = os.environ.get("VELK_AGENT")
     if agent and not os.access(agent, os.X_OK):
-        raise BoxUnavailable(f"VELK_AGENT names no program: {agent}")
+        raise CannotRun(f"VELK_AGENT names no program: {agent}")
     if agent and str(Path(agent).resolve().parent) in ("/", *_WRITABLE):
-        raise BoxUnavailable(f"the box has its own {Path(agent).parent}; put the agent into another folder")
+        raise CannotRun(f"the box has its own {Path(agent).parent}; put the agent into another folder")
 
 
 def _file_system() -> Iterator[str]:
@@ -153,7 +150,7 @@ def _environment(user: User, extra: Mapping[str, str]) -> Iterator[str]:
         "PYTHONPATH": str(REPOSITORY),
         "PYTHONDONTWRITEBYTECODE": "1",
         "QT_FORCE_STDERR_LOGGING": "1",
-        "VELK_BOX_USER": next((kind for kind, known in USERS.items() if known == user), user.name),
+        "VELK_BOX_USER": next(kind for kind, known in USERS.items() if known == user),
     }
     passed_on = {name: os.environ[name] for name in _PASSED_ON if name in os.environ}
     yield "--clearenv"

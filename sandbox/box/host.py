@@ -19,10 +19,6 @@ _PYTHON = ("/usr/bin/python3", "-P", "-m", "sandbox")
 Consumer = Callable[[IO[bytes]], object]
 
 
-class CannotRun(Exception):
-    """The command cannot run; the message is one line that says what to do."""
-
-
 def positive(text: str) -> int:
     """Parse a command-line argument that is a whole number from 1 upwards."""
     if not text.isdecimal() or int(text) < 1:
@@ -42,10 +38,7 @@ def enter(
     With a `consumer`, the program has a result stream (see `result_stream`), which the consumer reads to its
     end. Without one, the box replaces this process and the function does not return.
     """
-    try:
-        bubblewrap.require()
-    except bubblewrap.BoxUnavailable as error:
-        raise CannotRun(str(error)) from error
+    bubblewrap.require()
     # Ctrl+C is for the program in the box; it would kill bubblewrap and so the box.
     signal.signal(signal.SIGINT, signal.SIG_IGN)
     sys.stdout.flush()

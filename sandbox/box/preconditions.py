@@ -3,7 +3,7 @@
 from __future__ import annotations
 
 from sandbox import REPOSITORY, agent
-from sandbox.box.host import CannotRun
+from sandbox.ending import CannotRun
 from sandbox.machine.clock import Accelerated, ManualClock, MovableClock
 
 
@@ -21,8 +21,5 @@ def clock(speed: int) -> MovableClock:
     """A clock that runs `speed` times as fast as the real one, or stands still if `speed` is 0; raises
     CannotRun if the host lacks the library for it."""
     chosen = Accelerated(speed) if speed else ManualClock()
-    try:
-        chosen.environment()
-    except RuntimeError as error:
-        raise CannotRun(str(error)) from error
+    chosen.environment()  # raises
     return chosen

@@ -7,7 +7,6 @@ from pathlib import Path
 from typing import Sequence
 
 from sandbox.box import host
-from sandbox.demo.picture import PictureFile
 from sandbox.machine import layout
 from sandbox.machine.users import DOMAIN_USER
 
@@ -22,10 +21,11 @@ def run(arguments: Sequence[str]) -> int:
         from sandbox.demo import play  # needs D-Bus, which the host may lack
 
         return play.play(options)
-    picture = PictureFile(options.svg) if options.svg else None
-    status = host.enter(DOMAIN_USER, ["demo", *arguments], picture.receive if picture else None)
-    if picture and status == 0:
-        picture.keep()
+    drawn: list[bytes] = []
+    receive = (lambda stream: drawn.append(stream.read())) if options.svg else None
+    status = host.enter(DOMAIN_USER, ["demo", *arguments], receive)
+    if status == 0 and any(drawn):
+        options.svg.write_bytes(*drawn)
     return status
 
 

@@ -2,6 +2,7 @@
 
 from __future__ import annotations
 
+import re
 from argparse import Namespace
 from typing import Sequence
 
@@ -9,12 +10,12 @@ from rich.console import Console
 from rich.text import Text
 
 from sandbox.box import host
-from sandbox.box.host import CannotRun
 from sandbox.box.preconditions import clock, require_agent
-from sandbox.demo import picture, result
+from sandbox.demo import result
 from sandbox.demo.scene import Scene
 from sandbox.demo.scenes import SCENES
 from sandbox.demo.tour import Outcome, Tour
+from sandbox.ending import CannotRun
 from sandbox.terminal import Terminal
 from sandbox.timeline.agent_time import AgentTime
 from sandbox.timeline.timeline import Timeline, picture_console, screen_console
@@ -23,6 +24,8 @@ _WHAT_NEXT = (
     "Try it yourself: ./dev box. Everything expected and seen: ./dev demo --table. "
     "How it works: docs/architecture.md."
 )
+_WEB_FONT = re.compile(r"\s*@font-face \{.*?\}", re.DOTALL)
+_FONTS = '"DejaVu Sans Mono", Menlo, Consolas, "Noto Sans Mono CJK SC", monospace'
 
 
 def play(options: Namespace) -> int:
@@ -35,12 +38,18 @@ def play(options: Namespace) -> int:
     consoles = [screen, recorder] if recorder else [screen]
     outcomes, problems = _tour(options, scenes, consoles)
     if recorder:
-        drawn = picture.svg(recorder).encode()
+        drawn = _svg(recorder).encode()
         if result_stream:
             result_stream.write(drawn)
         else:
             options.svg.write_bytes(drawn)
     return int(bool(problems) or any(outcome.verdict != "as expected" for outcome in outcomes))
+
+
+def _svg(recorded: Console) -> str:
+    """The console's recording as a self-contained SVG picture, without web fonts."""
+    drawn = recorded.export_svg(title="./dev demo", unique_id="demo")
+    return _WEB_FONT.sub("", drawn).replace("Fira Code, monospace", _FONTS)
 
 
 def _chosen(numbers: set[int] | None) -> dict[int, Scene]:

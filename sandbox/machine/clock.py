@@ -5,32 +5,25 @@ from __future__ import annotations
 import os
 from datetime import datetime, timedelta
 from pathlib import Path
-from typing import Protocol
 
+from sandbox.ending import CannotRun
 from sandbox.machine import layout
 
 
-class Clock(Protocol):
-    """The time that a program sees."""
+class Clock:
+    """The time that a program sees: the host's, unchanged."""
 
     def environment(self) -> dict[str, str]:
         """Environment variables that make a program use this clock."""
-
-
-class RealTime:
-    """The host's time, unchanged."""
-
-    def environment(self) -> dict[str, str]:
-        """No variables."""
         return {}
 
 
-class MovableClock:
+class MovableClock(Clock):
     """Time that can be moved ahead. A sleeping program notices that only when it wakes up; see
     Terminal.advance."""
 
     def environment(self) -> dict[str, str]:
-        """Preload libfaketime, which reads the time from a file at each call."""
+        """Preload libfaketime, which reads the time from a file at each call; raises CannotRun without it."""
         return {
             "LD_PRELOAD": _library(),
             "FAKETIME_TIMESTAMP_FILE": str(layout.CLOCK),
@@ -80,5 +73,5 @@ class ManualClock(MovableClock):
 def _library() -> str:
     found = sorted(Path("/usr/lib").glob("*/faketime/libfaketimeMT.so.1"))
     if not found:
-        raise RuntimeError("libfaketime is missing; install it with: apt-get install libfaketime")
+        raise CannotRun("libfaketime is missing; install it with: apt-get install libfaketime")
     return str(found[0])

@@ -28,20 +28,20 @@ class Answer:
     program: str = ""
 
 
-def install(name: str) -> None:
-    """Replace command `name` by a recorder."""
-    link = layout.COMMANDS / name
-    if not link.is_symlink():
-        link.symlink_to(RECORDER)
-
-
 def install_defaults() -> None:
     """Install the recorders of a fresh box and remove all others."""
     layout.COMMANDS.mkdir(parents=True, exist_ok=True)
     for left_over in layout.COMMANDS.iterdir():
         left_over.unlink()
     for name in DEFAULT_COMMANDS:
-        install(name)
+        _install(name)
+
+
+def _install(name: str) -> None:
+    """Replace command `name` by a recorder."""
+    link = layout.COMMANDS / name
+    if not link.is_symlink():
+        link.symlink_to(RECORDER)
 
 
 class Commands:
@@ -52,7 +52,6 @@ class Commands:
         self._events = events
         self._answers: dict[str, Answer] = {}
         self._gates: dict[str, threading.Event] = {}
-        self._delegated: dict[str, tuple[str, Answer]] = {}
         self._held: dict[str, list[_Call]] = {}
         layout.COMMAND_SOCKET.unlink(missing_ok=True)
         self._server = _Server(str(layout.COMMAND_SOCKET), _Call)
@@ -63,12 +62,12 @@ class Commands:
 
     def answer(self, name: str, answer: Answer) -> None:
         """Replace command `name`; its calls end with `answer` from now on."""
-        install(name)
+        self._replace(name)
         self._answers[name] = answer
 
     def hold(self, name: str) -> None:
-        """Replace command `name`; its calls hang until `release`."""
-        install(name)
+        """Replace command `name`; its calls hang until `release`, then end as set by `answer`."""
+        self._replace(name)
         self._gates[name] = threading.Event()
 
     def release(self, name: str) -> None:
@@ -84,10 +83,6 @@ class Commands:
         self._held[name] = [call for call in self._held.pop(name, []) if call.nudge(printed)]
         return len(self._held[name])
 
-    def delegate(self, name: str, unless: str, program: str) -> None:
-        """Let calls of command `name` without the argument `unless` run `program`; they are not recorded."""
-        self._delegated[name] = (unless, Answer(program=program))
-
     def close(self) -> None:
         """Release all held calls and stop listening."""
         for name in list(self._gates):
@@ -98,9 +93,6 @@ class Commands:
 
     def handle_call(self, name: str, args: tuple[str, ...], detail: Mapping[str, Any], call: _Call) -> Answer:
         """Record one call; returns once the command may end."""
-        wanted, delegate = self._delegated.get(name, ("", None))
-        if delegate and wanted not in args:
-            return delegate
         gate = self._gates.get(name)
         if gate:
             self._held.setdefault(name, []).append(call)
@@ -108,6 +100,9 @@ class Commands:
         if gate:
             gate.wait()
         return self._answers.get(name, Answer())
+
+    def _replace(self, name: str) -> None:
+        _install(name)
 
 
 class _Server(socketserver.ThreadingUnixStreamServer):

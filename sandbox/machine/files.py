@@ -18,7 +18,8 @@ DEFAULT_USERINFO: dict[str, Any] = {
     "domain_port": "636",
     "terminal_name": "box-terminal",
 }
-DEFAULT_CONTROL_CENTER = ("network", "display", "sound")
+# The control center's modules from before the terminal joined the domain.
+_BACKUP_CONFIG = "[config]\nControlCenterList=network, display, sound\n"
 DEFAULT_RESTORE_SCRIPT = '#!/bin/bash\nexec restore_config "$@"\n'
 
 _ETC = {
@@ -55,7 +56,7 @@ class FileView:
         self.write_userinfo()
         self.write_machine_id(MACHINE_ID)
         self.write_restore_script()
-        self.write_control_center_list(DEFAULT_CONTROL_CENTER)
+        self.write(layout.BACKUP_CONFIG, _BACKUP_CONFIG)
         for path in (layout.SOFTWARE_LIST, layout.PRYG_SOFTWARE_LIST):
             self.write_software_list(path, [])
 
@@ -66,10 +67,6 @@ class FileView:
         fresh = target.with_name(target.name + ".new")
         fresh.write_bytes(content.encode() if isinstance(content, str) else content)
         fresh.replace(target)
-
-    def remove(self, path: Path | str) -> None:
-        """Remove a file if it exists."""
-        Path(path).unlink(missing_ok=True)
 
     def write_accounts(self, *users: User) -> None:
         """Write /etc/passwd with the system's accounts and these users."""
@@ -96,10 +93,6 @@ class FileView:
         """Write the restore script; the default one runs the command `restore_config`, which records its
         calls."""
         self.write(layout.RESTORE_SCRIPT, body)
-
-    def write_control_center_list(self, modules: Sequence[str]) -> None:
-        """Write the list of control-center modules from before the terminal joined the domain."""
-        self.write(layout.BACKUP_CONFIG, f"[config]\nControlCenterList={', '.join(modules)}\n")
 
     def write_software_list(self, path: Path, records: Sequence[Mapping[str, Any]]) -> None:
         """Write one of the daemon's two inventory files."""

@@ -7,7 +7,9 @@ import filecmp
 import shutil
 import time
 from pathlib import Path
+from typing import Any
 
+from sandbox.events import Events
 from sandbox.machine import layout
 from sandbox.machine.commands import RECORDER, Answer, Commands
 
@@ -17,15 +19,15 @@ _AGENTS_ARGUMENT = {"dpkg": "-S", "dpkg-query": "-W", "dpkg-architecture": "-q"}
 _BUSY_SECONDS = 5.0
 
 
-class Tools:
+class Tools(Commands):
     """Replaces /usr/bin/dpkg and the like; a new terminal begins with the real ones.
 
     Each call of a tool replaced by any method but `write` becomes an event of kind "command", with the call's
     "environment" and "pid" as detail.
     """
 
-    def __init__(self, commands: Commands) -> None:
-        self._commands = commands
+    def __init__(self, events: Events) -> None:
+        super().__init__(events)
         layout.REAL_TOOLS.mkdir(parents=True, exist_ok=True)
         for name in _PATHS:
             self.restore(name)
@@ -33,25 +35,6 @@ class Tools:
     def record(self, name: str) -> None:
         """Let a tool work normally, but record its calls."""
         self.answer(name, Answer(program=str(_real(name))))
-
-    def answer(self, name: str, answer: Answer) -> None:
-        """Replace a tool; its calls end with `answer` from now on."""
-        self._replace(name)
-        self._commands.answer(name, answer)
-
-    def hold(self, name: str) -> None:
-        """Replace a tool; its calls hang until `release`, then end as set by `answer`, by default without
-        output."""
-        self._replace(name)
-        self._commands.hold(name)
-
-    def release(self, name: str) -> None:
-        """Let the held calls of a tool end, and hold no more."""
-        self._commands.release(name)
-
-    def nudge(self, name: str, printed: bytes = b"") -> int:
-        """Wake up the callers of a tool's held calls by output; returns the number of calls still alive."""
-        return self._commands.nudge(name, printed)
 
     def write(self, name: str, script: str) -> None:
         """Replace a tool by a script."""
@@ -70,9 +53,17 @@ class Tools:
         elif not filecmp.cmp(real, path, shallow=False):
             _overwrite(path, real.read_bytes())
 
+    def handle_call(self, name: str, args: tuple[str, ...], *more: Any) -> Answer:
+        """Run the real tool unless the agent calls."""
+        if name in _PATHS and _AGENTS_ARGUMENT[name] not in args:
+            return Answer(program=str(_real(name)))
+        return super().handle_call(name, args, *more)
+
     def _replace(self, name: str) -> None:
-        self._commands.delegate(name, unless=_AGENTS_ARGUMENT[name], program=str(_real(name)))
-        _overwrite(_PATHS[name], RECORDER.read_bytes())
+        if name in _PATHS:
+            _overwrite(_PATHS[name], RECORDER.read_bytes())
+        else:
+            super()._replace(name)
 
 
 def _real(name: str) -> Path:

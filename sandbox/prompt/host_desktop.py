@@ -5,11 +5,11 @@ from __future__ import annotations
 import html
 import json
 import sys
-from typing import IO, Any
+from typing import IO
 
 import dbus
 
-from sandbox.box.host import CannotRun
+from sandbox.ending import CannotRun
 
 _NAME = "org.freedesktop.Notifications"
 _PATH = "/org/freedesktop/Notifications"
@@ -20,7 +20,8 @@ class HostDesktop:
 
     def __init__(self) -> None:
         try:
-            self._service = self._find(dbus.SessionBus(private=True))
+            found = dbus.SessionBus(private=True).get_object(_NAME, _PATH)
+            self._service = dbus.Interface(found, _NAME)
             self._reads_markup = "body-markup" in self._service.GetCapabilities()
         except dbus.DBusException as error:
             raise CannotRun(
@@ -46,7 +47,3 @@ class HostDesktop:
         self._service.Notify(
             app_name, dbus.UInt32(0), "", summary, text, dbus.Array(signature="s"), no_hints, timeout
         )
-
-    @staticmethod
-    def _find(bus: Any) -> Any:
-        return dbus.Interface(bus.get_object(_NAME, _PATH), _NAME)

@@ -9,7 +9,8 @@ from pathlib import Path
 from typing import Sequence
 
 from sandbox.box import host
-from sandbox.box.host import Consumer, CannotRun
+from sandbox.box.host import Consumer
+from sandbox.ending import CannotRun
 from sandbox.machine import layout
 from sandbox.machine.users import DOMAIN_USER, LOCAL_USER
 

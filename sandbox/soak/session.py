@@ -9,7 +9,7 @@ from hypothesis import settings
 from hypothesis.stateful import RuleBasedStateMachine, initialize, invariant
 
 from sandbox import policies
-from sandbox.box.host import CannotRun
+from sandbox.ending import CannotRun
 from sandbox.fakes.launcher import LauncherItem
 from sandbox.machine.clock import ManualClock
 from sandbox.machine.packages import desktop_file

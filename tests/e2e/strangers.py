@@ -30,7 +30,7 @@ straight_or_not = pytest.mark.parametrize("straight", [False, True], ids=["broad
 
 def receivers(terminal: Terminal, bus: Bus, straight: bool) -> list[str | None]:
     """The receivers that a signal names: none in a broadcast, else each connection of the agent."""
-    return [*terminal.agent.bus_names(bus)] if straight else [None]
+    return [*bus.names_of(terminal.agent.pid)] if straight else [None]
 
 
 def send(stranger: Stranger, signals: Iterable[Spoken], to: Iterable[str | None] = (None,)) -> None:

@@ -15,7 +15,7 @@ import pytest
 
 from sandbox.bus.mainloop import MainLoop
 from sandbox.policies import POLICIES
-from sandbox.prompt.mirror import Mirror
+from sandbox.prompt.session import mirror
 from sandbox.terminal import Terminal
 
 _NAME = "org.freedesktop.Notifications"
@@ -69,7 +69,7 @@ def _relay(address: str, body: str) -> subprocess.CompletedProcess[str]:
 
 def test_a_notification_leaves_the_box_as_a_line(terminal: Terminal) -> None:
     stream = io.BytesIO()
-    Mirror(terminal.events, stream)
+    mirror(terminal, stream)
     terminal.start_agent()
 
     terminal.daemon.push_policy({"type": 1300})

@@ -7,9 +7,10 @@ from prompt_toolkit.completion import CompleteEvent
 from prompt_toolkit.document import Document
 
 from sandbox.policies import POLICIES
-from sandbox.prompt import help_page, session_end
+from sandbox.prompt import help_page
 from sandbox.prompt.completion import CommandCompleter
 from sandbox.prompt.registry import COMMANDS
+from sandbox.prompt.session import show_ends
 from tests.sandbox.recorded_context import RecordedContext
 
 _SHOW_SOMETHING_ELSE = {"apps", "messages", "software", "state", "help", "wait", "quit"}
@@ -58,7 +59,7 @@ def test_no_command_is_left_without_an_answer() -> None:
 
 
 def test_time_passes_at_once_and_the_end_of_the_session_is_shown(context: RecordedContext) -> None:
-    session_end.watch(context)
+    show_ends(context)
     context.terminal.start_agent()
     context.run("policy 1201")
     context.terminal.sync()

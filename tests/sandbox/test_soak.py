@@ -12,7 +12,7 @@ import pytest
 from hypothesis.stateful import RuleBasedStateMachine
 
 from sandbox.agent import default_binary
-from sandbox.box.host import CannotRun
+from sandbox.ending import CannotRun
 from sandbox.soak.accounting import FORWARDED, KINDS, MESSAGES, RECEIPTS, Accounting
 from sandbox.soak.activity import activity
 from sandbox.soak.search import shortest_history

@@ -2,11 +2,14 @@
 
 from __future__ import annotations
 
+from configparser import ConfigParser
+from pathlib import Path
+
 from sandbox.demo.scene import NO_LOGOUT, NOT_REALLY, REBOOT, Expectation, Scene, Step, from_agent, notice
-from sandbox.demo.switches import FILE, look_at_switches
 from sandbox.policies import POLICIES
 from sandbox.terminal import Terminal
 
+_SWITCHES_FILE = Path(".config/norix/desktop-control.ini")
 # Reads its standard input: if the agent left it open, the script would hang and delay the reboot.
 _RESTORE_SCRIPT = """#!/bin/bash
 read -r line && exec restore_config "read: $line"
@@ -17,6 +20,15 @@ exec restore_config "(standard input is at its end)"
 def _remove_from_domain(terminal: Terminal) -> None:
     terminal.files.write_restore_script(_RESTORE_SCRIPT)
     terminal.daemon.push_policy({"type": 1200})
+
+
+def _look_at_switches(terminal: Terminal) -> None:
+    """Record each restriction switch of the desktop in the user's file as an event of kind "file"."""
+    parser = ConfigParser(interpolation=None)
+    parser.optionxform = str  # type: ignore[assignment]  # keys are case-sensitive
+    parser.read(Path(terminal.user.home, _SWITCHES_FILE), encoding="utf-8")
+    for name, value in parser["restrictions"].items() if parser.has_section("restrictions") else ():
+        terminal.events.record("velks", "switches", "file", name, (value,))
 
 
 def _switch(name: str, value: str) -> Expectation:
@@ -49,8 +61,8 @@ DOMAIN_EXIT = Scene(
     # The reboot comes last: the timeline ends with it.
     (
         Step(_remove_from_domain, _UNDONE),
-        Step(look_at_switches, _SWITCHES),
+        Step(_look_at_switches, _SWITCHES),
         Step(None, (REBOOT, NO_LOGOUT)),
     ),
-    f"The desktop's switches are in the user's file ~/{FILE}. {NOT_REALLY}",
+    f"The desktop's switches are in the user's file ~/{_SWITCHES_FILE}. {NOT_REALLY}",
 )
