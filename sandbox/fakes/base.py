@@ -41,7 +41,7 @@ class Fake:
 
     def __init__(self, bus: Bus, events: Events, senders: Senders) -> None:
         self.bus = bus
-        self.fault = Fault.none()
+        self.fault = Fault()
         self.faults: dict[str, Fault] = {}
         self.answers: dict[str, Reply] = {}
         self.violations: list[str] = []
@@ -100,7 +100,7 @@ class Fake:
     @on_main_loop
     def release(self) -> None:
         """Answer the calls held so far, in order, and hold no more."""
-        self.fault = Fault.none()
+        self.fault = Fault()
         self.faults = {member: fault for member, fault in self.faults.items() if fault.kind != "hold"}
         held, self._held = self._held, []
         for message in held:

@@ -10,36 +10,15 @@ Kind = Literal["none", "hang", "fail", "slow", "hold"]
 
 @dataclass(frozen=True)
 class Fault:
-    """How a service treats the calls that reach it."""
+    """How a service treats the calls that reach it: by default it answers at once.
 
-    kind: Kind
-    error_name: str = ""
+    "hang" never answers; "fail" answers with an error and does nothing; "slow" answers after so many real
+    seconds; "hold" keeps the calls until `Fake.release`.
+    """
+
+    kind: Kind = "none"
+    error_name: str = "org.freedesktop.DBus.Error.Failed"
     seconds: float = 0.0
-
-    @staticmethod
-    def none() -> Fault:
-        """Answer at once."""
-        return Fault("none")
-
-    @staticmethod
-    def hang() -> Fault:
-        """Never answer."""
-        return Fault("hang")
-
-    @staticmethod
-    def fail(error_name: str = "org.freedesktop.DBus.Error.Failed") -> Fault:
-        """Answer with an error and do nothing."""
-        return Fault("fail", error_name=error_name)
-
-    @staticmethod
-    def slow(seconds: float) -> Fault:
-        """Answer after so many real seconds."""
-        return Fault("slow", seconds=seconds)
-
-    @staticmethod
-    def hold() -> Fault:
-        """Keep the calls until `Fake.release`."""
-        return Fault("hold")
 
 
 class FirstCalls(dict[str, Fault]):

@@ -7,7 +7,7 @@ from dataclasses import dataclass, field
 from functools import cache
 from pathlib import Path
 from tempfile import mkdtemp
-from typing import Any, Literal, Mapping
+from typing import Literal, Mapping
 
 from sandbox.events import Events
 from sandbox.machine import layout
@@ -19,36 +19,21 @@ _ADMINISTRATOR = "administrator"
 
 # What the box's daemon calls itself; any other client is taken for the agent.
 DAEMON_AGENT = "daemon"
+_HALF = b'[{"uuid":'  # of a list of messages
 
 
 @dataclass(frozen=True)
 class HttpFault:
-    """What the platform does with a request instead of serving it; by default it does serve it."""
+    """What the platform does with a request instead of serving it; by default it does serve it.
+
+    "reply" answers with this, whatever was asked; "hang" sends nothing until `Platform.release` or the end;
+    "close" closes the connection without a reply; "cut" announces a body and closes half-way through it.
+    """
 
     kind: Literal["none", "reply", "hang", "close", "cut"] = "none"
     status: int = 200
     body: bytes = b""
     headers: Mapping[str, str] = field(default_factory=dict)
-
-    @staticmethod
-    def reply(status: int = 200, body: bytes = b"", headers: Mapping[str, str] | None = None) -> HttpFault:
-        """Answer with this, whatever was asked."""
-        return HttpFault("reply", status, body, headers or {})
-
-    @staticmethod
-    def hang() -> HttpFault:
-        """Send nothing until `Platform.release` or the end."""
-        return HttpFault("hang")
-
-    @staticmethod
-    def close() -> HttpFault:
-        """Close the connection without a reply."""
-        return HttpFault("close")
-
-    @staticmethod
-    def cut() -> HttpFault:
-        """Announce a body and close the connection half-way through it."""
-        return HttpFault("cut", body=b'[{"uuid":')
 
 
 @dataclass(frozen=True)
@@ -67,7 +52,7 @@ def trust() -> Trust:
     return Trust(authority, authority.issue_server(layout.PLATFORM_HOST), authority.issue_client("terminal"))
 
 
-class Platform:
+class Platform(Store):
     """HTTPS server that demands a certificate of its own authority from the client.
 
     Every request is an event of kind "http", its source the agent or the daemon: member the route; args the
@@ -80,8 +65,8 @@ class Platform:
     def __init__(
         self, events: Events, port: int = layout.PLATFORM_PORT, server: CertificateFiles | None = None
     ) -> None:
+        super().__init__()
         self.port = port
-        self.store = Store()
         self.fault = HttpFault()
         self.faults: dict[Route, HttpFault] = {}
         self.events = events
@@ -110,24 +95,12 @@ class Platform:
     def post_message(self, uid: str, title: str, content: str, sender: str = "admin") -> str:
         """Leave a message for a user; the result is its uuid."""
         self.events.record(_ADMINISTRATOR, "platform", "post", "message", (uid, title, content, sender))
-        return self.store.post(uid, title, content, sender)
-
-    def messages(self, uid: str | None = None) -> list[dict[str, str]]:
-        """The messages of a user, or all; those that were read have a `read_at`."""
-        return self.store.messages(uid)
+        return self.post(uid, title, content, sender)
 
     def password_tip(self, user: str, message: str | None) -> None:
         """Warn a user of the end of the password's life; None takes the warning back."""
         self.events.record(_ADMINISTRATOR, "platform", "post", "tip", (user, message))
-        self.store.set_tip(user, message)
-
-    def software_changes(self) -> list[dict[str, Any]]:
-        """The terminal's reports of single changes, oldest first."""
-        return self.store.software_changes()
-
-    def inventory(self) -> list[dict[str, Any]] | None:
-        """The terminal's software as it was reported last, None before the first report."""
-        return self.store.inventory()
+        self.set_tip(user, message)
 
     def release(self, then: HttpFault = HttpFault()) -> None:
         """Let hanging requests go on; they and later ones get `then`, or are served."""
@@ -145,7 +118,7 @@ class Platform:
         self.events.record("velks", "platform", "http", "tls", (str(error),))
 
     def _answer(self, conversation: Conversation, request: Request) -> None:
-        route = self.store.route(request.method, request.path)
+        route = self.route(request.method, request.path)
         if not self.present:
             conversation.break_off()
         fault, released = self._fault_for(route), self._released
@@ -158,9 +131,9 @@ class Platform:
             fault = self._fault_for(route)
         if fault.kind == "close":
             conversation.break_off()
-        answer = HttpReply(fault.status, fault.body, fault.headers)
+        answer = HttpReply(fault.status, _HALF if fault.kind == "cut" else fault.body, fault.headers)
         if fault.kind == "none":
-            answer = self.store.serve(route, request.query, request.body)
+            answer = self.serve(route, request.query, request.body)
         self._record_reply(client, route, answer, own=fault.kind == "none")
         conversation.send(_on_the_wire(answer, missing=1000 if fault.kind == "cut" else 0))
         if fault.kind == "cut":

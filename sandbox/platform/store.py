@@ -33,15 +33,19 @@ class HttpReply:
 
 class Store:
     """Messages of all users with their read state, the password warnings, and what terminals report of their
-    software; thread-safe."""
+    software; thread-safe.
+
+    `software_changes` are the terminal's reports of single changes, oldest first; `inventory` is its software
+    as it was reported last, None before the first report.
+    """
 
     def __init__(self) -> None:
+        self.software_changes: list[dict[str, Any]] = []
+        self.inventory: list[dict[str, Any]] | None = None
         self._lock = threading.Lock()
         self._messages: dict[str, dict[str, str]] = {}
         self._unread: dict[str, dict[str, dict[str, str]]] = {}  # by user, then by uuid
         self._tips: dict[str, str] = {}
-        self._software_changes: list[dict[str, Any]] = []
-        self._inventory: list[dict[str, Any]] | None = None
 
     @staticmethod
     def route(method: str, path: str) -> Route:
@@ -65,7 +69,7 @@ class Store:
         return message["uuid"]
 
     def messages(self, uid: str | None = None) -> list[dict[str, str]]:
-        """Copies of the messages, oldest first."""
+        """Copies of a user's messages or of all, oldest first; those that were read have a `read_at`."""
         with self._lock:
             return [dict(message) for message in self._messages.values() if uid in (None, message["uid"])]
 
@@ -75,16 +79,6 @@ class Store:
             self._tips.pop(user, None)
             if message is not None:
                 self._tips[user] = message
-
-    def software_changes(self) -> list[dict[str, Any]]:
-        """What was reported as installed or updated, oldest first."""
-        with self._lock:
-            return list(self._software_changes)
-
-    def inventory(self) -> list[dict[str, Any]] | None:
-        """The list of software that was reported last, None before the first report."""
-        with self._lock:
-            return self._inventory
 
     def serve(self, route: Route, query: Mapping[str, str], body: bytes) -> HttpReply:
         """Answer a request."""
@@ -102,11 +96,10 @@ class Store:
         payload = report.get("payload")
         if report.get("type") != _REPORT_TYPES[route] or not isinstance(payload, dict):
             return HttpReply(400, _json({"code": 1}))
-        with self._lock:
-            if route == "inventory":
-                self._inventory = payload.get("list")
-            else:
-                self._software_changes.append(payload)
+        if route == "inventory":
+            self.inventory = payload.get("list")
+        else:
+            self.software_changes.append(payload)
         return HttpReply(200, _json({"code": 0}))
 
     def _list(self, query: Mapping[str, str]) -> HttpReply:

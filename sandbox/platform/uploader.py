@@ -4,6 +4,7 @@ from __future__ import annotations
 
 import ssl
 from concurrent.futures import ThreadPoolExecutor
+from contextlib import closing
 from http.client import HTTPException, HTTPSConnection
 from urllib.parse import urlsplit
 
@@ -33,17 +34,12 @@ class Uploader:
 
     def _post(self, address: str, text: str) -> None:
         try:
-            self._send(address, text.encode())
+            parts = urlsplit(address)
+            context = ssl.create_default_context(cafile=str(layout.SERVER_CERTIFICATE))
+            context.load_cert_chain(layout.CLIENT_CERTIFICATE, layout.CLIENT_KEY)
+            connection = HTTPSConnection(parts.hostname or "", parts.port, context=context, timeout=PATIENCE)
+            with closing(connection):
+                connection.request("POST", parts.path, text.encode(), _HEADERS)
+                connection.getresponse().read()
         except (OSError, HTTPException, ValueError) as error:
             self._events.record("daemon", "platform", "upload", "failed", (address, str(error)))
-
-    def _send(self, address: str, body: bytes) -> None:
-        parts = urlsplit(address)
-        context = ssl.create_default_context(cafile=str(layout.SERVER_CERTIFICATE))
-        context.load_cert_chain(layout.CLIENT_CERTIFICATE, layout.CLIENT_KEY)
-        connection = HTTPSConnection(parts.hostname or "", parts.port, context=context, timeout=PATIENCE)
-        try:
-            connection.request("POST", parts.path, body, _HEADERS)
-            connection.getresponse().read()
-        finally:
-            connection.close()

@@ -116,28 +116,28 @@ def restart(context: Context, name: str) -> str:
 @command("hang", "SERVICE", "a service no longer answers", _services)
 def hang(context: Context, name: str) -> str:
     """It stays so until `recover`."""
-    context.fake(name).fault = Fault.hang()
+    context.fake(name).fault = Fault("hang")
     return f"{name} no longer answers; it does again with: recover {name}"
 
 
 @command("slow", "SERVICE SECONDS", "a service answers late", _services)
 def slow(context: Context, name: str, seconds: str) -> str:
     """The seconds are real time, not agent time."""
-    context.fake(name).fault = Fault.slow(number(seconds, float))
+    context.fake(name).fault = Fault("slow", seconds=number(seconds, float))
     return f"{name} answers {seconds} s late; it answers normally again with: recover {name}"
 
 
 @command("fail", "SERVICE", "a service answers every call with an error", _services)
 def fail(context: Context, name: str) -> str:
     """It stays so until `recover`."""
-    context.fake(name).fault = Fault.fail()
+    context.fake(name).fault = Fault("fail")
     return f"{name} answers with errors; it answers normally again with: recover {name}"
 
 
 @command("recover", "SERVICE", "a service works normally again", _services)
 def recover(context: Context, name: str) -> str:
     """Calls that hung before remain unanswered."""
-    context.fake(name).fault = Fault.none()
+    context.fake(name).fault = Fault()
     return f"{name} works normally."
 
 

@@ -10,7 +10,7 @@ from sandbox.prompt.context import Context, CommandRefused
 from sandbox.prompt.registry import COMMANDS, command, number
 
 _FIRST_ERROR, _LAST_ERROR = 400, 599
-_FAULTS = {"hang": HttpFault.hang(), "garbage": HttpFault.reply(body=b"garbage"), "cut": HttpFault.cut()}
+_FAULTS = {"hang": HttpFault("hang"), "garbage": HttpFault("reply", body=b"garbage"), "cut": HttpFault("cut")}
 
 
 _BEHAVIOURS = {
@@ -71,7 +71,7 @@ def platform(context: Context, manner: str, status: str | None = None) -> str:
         known.leave()
         return result
     if status is not None:
-        known.fault = HttpFault.reply(_error(status))
+        known.fault = HttpFault("reply", _error(status))
     elif manner != "up":
         known.fault = _FAULTS[manner]
     else:

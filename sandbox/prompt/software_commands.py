@@ -45,7 +45,7 @@ def uninstall(context: Context, package: str) -> str:
 def software(context: Context) -> None:
     """The table shows the last inventory."""
     table = Table("Application", "Package", "Version", "Architecture")
-    for known in context.terminal.platform.inventory() or ():
+    for known in context.terminal.platform.inventory or ():
         table.add_row(*(Text(known[key]) for key in ("name", "package_name", "version", "arch")))
     context.show(table)
 

@@ -43,7 +43,7 @@ def answer_always(
     terminal: Terminal, body: bytes, headers: dict[str, str] | None = None, status: int = 200
 ) -> None:
     """Let the platform give this reply to every list request from now on."""
-    terminal.platform.faults["list"] = HttpFault.reply(status, body, headers or {})
+    terminal.platform.faults["list"] = HttpFault("reply", status, body, headers or {})
 
 
 def message(**fields: Any) -> dict[str, Any]:

@@ -184,7 +184,7 @@ def test_a_local_users_applications_are_reported_too(terminal: Terminal) -> None
 def test_what_an_application_did_before_it_was_read_is_no_change(session: Terminal, known: bool) -> None:
     if known:
         let_happen(session, opens("editor", docked=True, windows=0))
-    mark = wait_on_notification(session, Fault.hold())
+    mark = wait_on_notification(session, Fault("hold"))
     session.dock.open_app("mail", "Mail", docked=True, windows=0)
     for number in (1, 2, 3):
         session.dock.set_windows("mail", number)

@@ -70,14 +70,14 @@ def wait_by_limits(terminal: Terminal, awake: str, after: int, predicate: Predic
 
 def let_the_name_be_asked_for(terminal: Terminal) -> None:
     """The agent waits for a service on the system bus that never answers."""
-    terminal.logind.fault = Fault.hang()
+    terminal.logind.fault = Fault("hang")
     mark = push_online(terminal)
     terminal.events.wait_for(target="logind", member="Get", after=mark)
 
 
 def let_a_notice_be_shown(terminal: Terminal) -> None:
     """The agent waits for a service on the session bus that never answers."""
-    wait_on_notification(terminal, Fault.hang())
+    wait_on_notification(terminal, Fault("hang"))
 
 
 @both_buses

@@ -18,7 +18,7 @@ from sandbox.machine.commands import Answer
 from sandbox.terminal import Terminal
 from tests.e2e.checkreport import Line, findings
 
-DENIED = Fault.fail("org.freedesktop.DBus.Error.AccessDenied")
+DENIED = Fault("fail", "org.freedesktop.DBus.Error.AccessDenied")
 
 
 @pytest.mark.parametrize(
@@ -99,7 +99,7 @@ def test_without_a_service_manager_the_unit_is_a_warning(terminal: Terminal) -> 
 @pytest.mark.parametrize(
     ("fault", "text"),
     [
-        (Fault.hang(), " does not answer (Did not receive a reply."),
+        (Fault("hang"), " does not answer (Did not receive a reply."),
         (DENIED, " may not be called by this user; the bus lacks"),
     ],
 )

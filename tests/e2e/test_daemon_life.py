@@ -93,7 +93,7 @@ def test_online_signal_is_logged_with_name_and_uid(session: Terminal) -> None:
 
 
 def test_daemon_that_never_answers_still_gets_reports_and_is_obeyed(terminal: Terminal) -> None:
-    terminal.daemon.fault = Fault.hang()
+    terminal.daemon.fault = Fault("hang")
     mark = start_agent(terminal)
     carries_out_policies(terminal)
     terminal.advance(FIVE_MINUTES)
@@ -102,7 +102,7 @@ def test_daemon_that_never_answers_still_gets_reports_and_is_obeyed(terminal: Te
 
 def test_daemon_that_refuses_every_call_changes_nothing(terminal: Terminal) -> None:
     assert terminal.platform, "a missing one would be warned of"
-    terminal.daemon.fault = Fault.fail()
+    terminal.daemon.fault = Fault("fail")
     mark = start_agent(terminal)
     terminal.advance(FIVE_MINUTES)
     next_status(terminal, mark, count=2)
@@ -117,7 +117,7 @@ def test_name_known_at_start_is_announced_even_if_it_changed_since(session: Term
 
 
 def test_signals_during_a_slow_start_are_handled_after_it_in_their_order(terminal: Terminal) -> None:
-    terminal.logind.fault = Fault.hold()
+    terminal.logind.fault = Fault("hold")
     mark = terminal.events.mark()
 
     def signals_come_while_the_name_is_read() -> None:

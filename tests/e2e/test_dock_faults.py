@@ -30,7 +30,7 @@ from tests.e2e.wire import carries_out_policies
 
 
 @pytest.mark.parametrize(
-    ("fault", "seconds"), [(Fault.fail(), 0), (Fault.hang(), DBUS_LIMIT)], ids=["fails", "hangs"]
+    ("fault", "seconds"), [(Fault("fail"), 0), (Fault("hang"), DBUS_LIMIT)], ids=["fails", "hangs"]
 )
 def test_a_dock_that_does_not_answer_at_start_counts_as_empty_and_is_followed_when_it_is_well(
     terminal: Terminal, fault: Fault, seconds: int
@@ -43,14 +43,14 @@ def test_a_dock_that_does_not_answer_at_start_counts_as_empty_and_is_followed_wh
 
     terminal.events.wait_for(kind="log", member="info", args=("dock entry size: 0",))
     carries_out_policies(terminal)
-    terminal.dock.fault = Fault.none()
+    terminal.dock.fault = Fault()
     assert (reported(terminal), scans(terminal)) == ([], ["dock entry size: 0"])
     assert follows(terminal, opens("b")) == [(OPENED, "B")]
 
 
 def test_a_dock_that_does_not_introspect_is_read_all_the_same(terminal: Terminal) -> None:
     terminal.dock.open_app("a", "A")
-    terminal.dock.faults["Introspect"] = Fault.hang()
+    terminal.dock.faults["Introspect"] = Fault("hang")
 
     start(terminal)
 
@@ -61,7 +61,7 @@ def test_a_dock_that_hangs_later_holds_the_agent_up_by_the_limit_for_each_questi
     terminal: Terminal,
 ) -> None:
     start(terminal)
-    terminal.dock.fault = Fault.hang()
+    terminal.dock.fault = Fault("hang")
     mark = terminal.events.mark()
     terminal.dock.open_app("a", "A")
 
@@ -71,14 +71,14 @@ def test_a_dock_that_hangs_later_holds_the_agent_up_by_the_limit_for_each_questi
         terminal.jump(DBUS_LIMIT)
 
     carries_out_policies(terminal)
-    terminal.dock.fault = Fault.none()
+    terminal.dock.fault = Fault()
     settle(terminal)
     assert dock_warnings(terminal, mark) == []
     assert reported(terminal, mark) == [(OPENED, "")]
 
 
 @pytest.mark.parametrize("name", ["Id", "IsDocked"])
-@pytest.mark.parametrize("fault", [Fault.hang(), Fault.fail()], ids=lambda fault: fault.kind)
+@pytest.mark.parametrize("fault", [Fault("hang"), Fault("fail")], ids=lambda fault: fault.kind)
 def test_an_entry_that_once_fails_to_answer_keeps_its_windows_and_signals(
     terminal: Terminal, fault: Fault, name: str
 ) -> None:
@@ -96,7 +96,7 @@ def test_an_entry_that_once_fails_to_answer_keeps_its_windows_and_signals(
 
 
 def test_an_entry_whose_identifier_cannot_be_read_is_followed_all_the_same(terminal: Terminal) -> None:
-    terminal.dock.faults["Id"] = Fault.fail()
+    terminal.dock.faults["Id"] = Fault("fail")
     terminal.dock.open_app("a", "A", windows=2)
     start(terminal)
 
@@ -108,7 +108,7 @@ def test_a_slow_answer_about_an_invalidated_property_blocks_nothing(terminal: Te
     terminal.dock.open_app("a", "A", docked=True, windows=0)
     start(terminal)
     terminal.dock.announces = ("invalidated",)
-    terminal.dock.fault = Fault.hold()
+    terminal.dock.fault = Fault("hold")
     mark = terminal.events.mark()
 
     terminal.dock.set_windows("a", 1)
@@ -125,7 +125,7 @@ def test_an_invalidated_property_that_cannot_be_read_changes_nothing(terminal: T
     terminal.dock.open_app("a", "A", docked=True, windows=1)
     start(terminal)
     terminal.dock.announces = ("invalidated",)
-    terminal.dock.faults["Get"] = Fault.fail()
+    terminal.dock.faults["Get"] = Fault("fail")
 
     assert follows(terminal, has_windows(0, "a"), is_called("B", "a")) == []
 

@@ -32,11 +32,11 @@ def block(terminal: Terminal, pace: Pace) -> None:
     """Keep the agent waiting until `unblock`, in the manner of a pace."""
     mark = terminal.events.mark()
     if pace == "during a notification":
-        terminal.notifications.fault = Fault.hold()
+        terminal.notifications.fault = Fault("hold")
         terminal.daemon.push_policy({"type": 1300})
         terminal.events.wait_for(target="notifications", member="Notify", after=mark)
     elif pace == "during an inventory":
-        terminal.launcher.fault = Fault.hold()
+        terminal.launcher.fault = Fault("hold")
         terminal.launcher.announce("other", LauncherItem("/none.desktop", "None"))
         terminal.events.wait_for(target="launcher", member="GetAllItemInfos", after=mark)
 
@@ -107,7 +107,7 @@ def test_any_history_during_a_slow_log_in_is_reported_change_by_change(terminal:
         for act in before:
             model.do(act)
         mark = terminal.events.mark()
-        terminal.platform.faults["tips"] = HttpFault.hang()
+        terminal.platform.faults["tips"] = HttpFault("hang")
         terminal.start_agent(ready=lambda: terminal.events.wait_for(kind="http", member="tips", after=mark))
         expected = model.start()
         for act in meanwhile:

@@ -137,7 +137,7 @@ def test_exit_without_a_sound_backup_file_restores_an_empty_list(
 
 def answer_nothing(fake: Fake) -> None:
     """Answer nothing."""
-    fake.fault = Fault.hang()
+    fake.fault = Fault("hang")
 
 
 HINDRANCES: dict[str, Callable[[Terminal], object]] = {
@@ -192,7 +192,7 @@ def test_command_that_takes_longer_than_the_minute_delays_all_that_follows(
     assert steps_seen(session, mark) == [*EXIT_STEPS, ("logind", "Reboot")]
 
 
-@pytest.mark.parametrize("fault", [Fault.fail(), Fault.hang()], ids=lambda fault: fault.kind)
+@pytest.mark.parametrize("fault", [Fault("fail"), Fault("hang")], ids=lambda fault: fault.kind)
 def test_identity_service_that_does_not_introspect_is_switched_off(session: Terminal, fault: Fault) -> None:
     session.identity.faults["Introspect"] = fault
     leave_domain(session)

@@ -50,7 +50,7 @@ def let_limits_pass(terminal: Terminal, limit: int, kind: str, name: str) -> Non
 
 def hang(terminal: Terminal, fake: Fake) -> None:
     """Take every call from now on and answer none."""
-    fake.fault = Fault.hang()
+    fake.fault = Fault("hang")
     let_limits_pass(terminal, DBUS_LIMIT, "call", fake.name)
 
 
@@ -167,13 +167,13 @@ def test_applications_and_software_are_watched_without_a_daemon(terminal: Termin
 
 def platform_hangs(terminal: Terminal) -> None:
     """The platform takes every request from now on and answers none."""
-    terminal.platform.fault = HttpFault.hang()
+    terminal.platform.fault = HttpFault("hang")
     let_limits_pass(terminal, TRANSFER_LIMIT, "http", "platform")
 
 
 def platform_lies(terminal: Terminal) -> None:
     """The platform answers every request with what is no list."""
-    terminal.platform.fault = HttpFault.reply(200, b'\xff{"data": [', {"X-Total-Count": "many"})
+    terminal.platform.fault = HttpFault("reply", 200, b'\xff{"data": [', {"X-Total-Count": "many"})
 
 
 def platform_leaves(terminal: Terminal) -> None:

@@ -49,7 +49,7 @@ def push_all(terminal: Terminal, texts: list[str]) -> None:
 
 
 def test_flood_of_policies_reaches_a_hung_policy_service_whole_and_in_order(terminal: Terminal) -> None:
-    terminal.policy_service.fault = Fault.hang()
+    terminal.policy_service.fault = Fault("hang")
     terminal.start_agent()
     before = terminal.agent.resident_bytes()
     texts = policies_of_a_flood(4000)
@@ -79,7 +79,7 @@ def test_flood_of_policies_for_an_absent_policy_service_is_lost_and_nothing_else
 
 
 def test_flood_that_comes_while_a_notification_is_waited_for_is_handled_after_it(session: Terminal) -> None:
-    wait_on_notification(session, Fault.hold())
+    wait_on_notification(session, Fault("hold"))
     texts = policies_of_a_flood(2000)
     for text in texts:
         session.daemon.push_policy(text)
@@ -91,7 +91,7 @@ def test_flood_that_comes_while_a_notification_is_waited_for_is_handled_after_it
 
 
 def test_long_policies_to_a_hung_policy_service_are_not_kept(terminal: Terminal) -> None:
-    terminal.policy_service.fault = Fault.hang()
+    terminal.policy_service.fault = Fault("hang")
     terminal.start_agent()
     long = [json.dumps({"type": 5, "number": i, "text": "x" * MIB}) for i in range(40)]
     push_all(terminal, long[:4])

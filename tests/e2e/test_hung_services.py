@@ -20,7 +20,7 @@ from tests.e2e.wire import (
 
 
 def test_hung_login_manager_at_start_gives_an_empty_name(terminal: Terminal) -> None:
-    terminal.logind.fault = Fault.hang()
+    terminal.logind.fault = Fault("hang")
     mark = terminal.events.mark()
     terminal.start_agent(
         ready=lambda: terminal.events.wait_for(target="logind", member="Get", count=2, after=mark)
@@ -33,7 +33,7 @@ def test_hung_login_manager_at_start_gives_an_empty_name(terminal: Terminal) -> 
 
 def start_with_slow_login_manager(terminal: Terminal) -> None:
     """Start the agent; it gets the user's name and uid just before the limit."""
-    terminal.logind.fault = Fault.hold()
+    terminal.logind.fault = Fault("hold")
     mark = terminal.events.mark()
 
     def answer_late() -> None:
@@ -61,7 +61,7 @@ def test_five_minutes_begin_when_the_name_is_known(terminal: Terminal) -> None:
 
 
 def test_slow_notifications_are_no_failure(session: Terminal) -> None:
-    mark = wait_on_notification(session, Fault.hold())
+    mark = wait_on_notification(session, Fault("hold"))
     session.jump(DBUS_LIMIT - 5)
     session.notifications.release()
     session.sync()
@@ -75,7 +75,7 @@ def test_hung_service_reads_as_no_and_the_report_comes(terminal: Terminal, hung:
     terminal.screensaver.run()
     terminal.session_manager.set("Locked", True)
     terminal.start_agent()
-    terminal.fakes[hung].fault = Fault.hang()
+    terminal.fakes[hung].fault = Fault("hang")
     mark = terminal.events.mark()
 
     terminal.daemon.push_online()
@@ -88,7 +88,7 @@ def test_hung_service_reads_as_no_and_the_report_comes(terminal: Terminal, hung:
 def test_minute_before_a_forced_action_begins_when_its_warning_has_been_tried(
     session: Terminal, code: int, action: str
 ) -> None:
-    mark = wait_on_notification(session, Fault.hang(), code)
+    mark = wait_on_notification(session, Fault("hang"), code)
     session.daemon.push_policy({"type": 5})
     session.jump(DBUS_LIMIT)
     session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark)
@@ -97,13 +97,13 @@ def test_minute_before_a_forced_action_begins_when_its_warning_has_been_tried(
 
 
 def test_hung_policy_service_does_not_hold_up_the_agent(session: Terminal) -> None:
-    session.policy_service.fault = Fault.hang()
+    session.policy_service.fault = Fault("hang")
     session.daemon.push_policy({"type": 5})
     carries_out_policies(session)
 
 
 def test_no_signal_is_handled_while_a_notification_is_waited_for(session: Terminal) -> None:
-    mark = wait_on_notification(session, Fault.hang())
+    mark = wait_on_notification(session, Fault("hang"))
     session.daemon.push_policy({"type": 5})
     session.jump(DBUS_LIMIT)
     session.sync()
@@ -115,7 +115,7 @@ def test_no_signal_is_handled_while_a_notification_is_waited_for(session: Termin
 
 
 def test_failed_warning_is_logged(session: Terminal) -> None:
-    session.notifications.fault = Fault.fail("com.norix.Error")
+    session.notifications.fault = Fault("fail", "com.norix.Error")
     mark = push(session, {"type": 1201})
     session.sync()
     assert warnings(session, mark) == ['--@@@@-- QDBusError("com.norix.Error", "simulated failure")']
@@ -123,7 +123,7 @@ def test_failed_warning_is_logged(session: Terminal) -> None:
 
 def test_hung_login_manager_at_the_forced_action_does_not_stop_later_policies(session: Terminal) -> None:
     mark = begin_countdown(session)
-    session.logind.fault = Fault.hang()
+    session.logind.fault = Fault("hang")
     session.jump(60)
     session.events.wait_for(target="logind", member="Terminate", after=mark)
     session.daemon.push_policy({"type": 5})
@@ -133,7 +133,7 @@ def test_hung_login_manager_at_the_forced_action_does_not_stop_later_policies(se
 
 @pytest.mark.real_time
 def test_limit_holds_by_the_clock_on_the_wall(session: Terminal) -> None:
-    session.notifications.fault = Fault.hang()
+    session.notifications.fault = Fault("hang")
     mark = push(session, {"type": 1300})
     session.daemon.push_policy({"type": 5})
     session.events.wait_for(target="policy_service", member="onPolicyMsg", after=mark, timeout=120)

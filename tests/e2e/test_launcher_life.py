@@ -84,7 +84,7 @@ def test_inventory_is_reported_before_the_session_is_announced(stocked: Terminal
 
 def test_machine_is_read_before_the_launcher_is_asked(terminal: Terminal) -> None:
     """And the list is on its way before the user's name is asked for."""
-    mark = start_asking(terminal, Fault.hold())
+    mark = start_asking(terminal, Fault("hold"))
     terminal.files.write_machine_id("too-late")
     assert terminal.events.all(target="logind", member="Get", after=mark) == []
 
@@ -137,9 +137,9 @@ def test_restart_of_the_launcher_is_not_noticed(stocked: Terminal, late: bool) -
 @pytest.mark.parametrize(
     ("fault", "then", "error"),
     [
-        (Fault.hang(), lambda terminal: terminal.launcher.leave(), '"org.freedesktop.DBus.Error.'),
-        (Fault.hang(), lambda terminal: terminal.jump(DBUS_LIMIT), '"org.freedesktop.DBus.Error.NoReply"'),
-        (Fault.fail("com.norix.Error"), lambda _: None, '"com.norix.Error", "simulated failure")'),
+        (Fault("hang"), lambda terminal: terminal.launcher.leave(), '"org.freedesktop.DBus.Error.'),
+        (Fault("hang"), lambda terminal: terminal.jump(DBUS_LIMIT), '"org.freedesktop.DBus.Error.NoReply"'),
+        (Fault("fail", "com.norix.Error"), lambda _: None, '"com.norix.Error", "simulated failure")'),
     ],
     ids=["goes", "hangs for the limit", "refuses"],
 )
@@ -156,7 +156,7 @@ def test_launcher_that_does_not_answer_lists_nothing(
 
 
 def test_slow_launcher_is_waited_for(terminal: Terminal) -> None:
-    mark = start_asking(terminal, Fault.hold())
+    mark = start_asking(terminal, Fault("hold"))
 
     terminal.jump(DBUS_LIMIT - 5)
     terminal.launcher.release()

@@ -39,7 +39,7 @@ def test_count_that_never_falls_does_not_keep_a_log_out_waiting(polling: Termina
     polling.sync()
 
 
-COUNT_NEVER_FALLS = HttpFault.reply(200, b"[]", {"X-Total-Count": "1000"})
+COUNT_NEVER_FALLS = HttpFault("reply", 200, b"[]", {"X-Total-Count": "1000"})
 
 
 def policy_goes_before_the_51st_message(terminal: Terminal) -> None:
@@ -51,7 +51,7 @@ def policy_goes_before_the_51st_message(terminal: Terminal) -> None:
 
     def hold_the_51st(event: Event) -> None:
         if event.member == "list" and len(requests(terminal, "list", mark)) == 50:
-            terminal.platform.fault = HttpFault.hang()
+            terminal.platform.fault = HttpFault("hang")
 
     terminal.events.subscribe(hold_the_51st)
     terminal.platform.release(then=COUNT_NEVER_FALLS)
@@ -64,7 +64,7 @@ def policy_goes_before_the_51st_message(terminal: Terminal) -> None:
 @pytest.fixture
 def held(polling: Terminal) -> Iterator[Terminal]:
     """A terminal whose agent waits for the reply to its first list request."""
-    polling.platform.fault = HttpFault.hang()
+    polling.platform.fault = HttpFault("hang")
     begin_poll(polling)
     yield polling
     polling.platform.release()
@@ -102,7 +102,7 @@ def test_long_drain_needs_no_more_stack_than_a_short_one(polling: Terminal) -> N
 
 def test_policy_that_waits_during_a_drain_is_carried_out_after_it(polling: Terminal) -> None:
     polling.platform.post_message(USER, "T", "C")
-    polling.platform.faults["list"] = HttpFault.hang()
+    polling.platform.faults["list"] = HttpFault("hang")
     mark = begin_poll(polling)
     polling.daemon.push_policy({"type": 1201})
     polling.platform.release()

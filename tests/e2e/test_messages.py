@@ -119,7 +119,7 @@ def test_nothing_is_polled_while_the_screen_is_locked_or_saved(
 def test_drain_goes_on_although_the_screen_is_locked_meanwhile(polling: Terminal) -> None:
     for number in range(3):
         polling.platform.post_message(USER, f"message {number}", "text")
-    polling.platform.faults["list"] = HttpFault.hang()
+    polling.platform.faults["list"] = HttpFault("hang")
     mark = begin_poll(polling)
     polling.session_manager.set("Locked", True)
     polling.platform.release()

@@ -48,7 +48,7 @@ def test_password_that_does_not_expire_is_logged_twice_and_not_shown(terminal: T
 
 @pytest.mark.parametrize("body", [b"", b"garbage", b'{"code":0,"data":{"result":true'], ids=repr)
 def test_reply_that_is_no_json_is_ignored(terminal: Terminal, body: bytes) -> None:
-    terminal.platform.faults["tips"] = HttpFault.reply(200, body)
+    terminal.platform.faults["tips"] = HttpFault("reply", 200, body)
     mark = start_agent(terminal)
     terminal.advance(LATE)
     assert NOTICE not in log_lines(terminal, mark)
@@ -56,7 +56,7 @@ def test_reply_that_is_no_json_is_ignored(terminal: Terminal, body: bytes) -> No
 
 
 def test_hanging_check_delays_the_start_by_the_transfer_limit(terminal: Terminal) -> None:
-    terminal.platform.faults["tips"] = HttpFault.hang()
+    terminal.platform.faults["tips"] = HttpFault("hang")
     mark = terminal.events.mark()
     terminal.start_agent(ready=lambda: terminal.events.wait_for(kind="http", member="tips", after=mark))
     terminal.daemon.push_policy({"type": 1300})
@@ -67,7 +67,7 @@ def test_hanging_check_delays_the_start_by_the_transfer_limit(terminal: Terminal
 def test_tips_that_carry_a_count_ask_for_messages_at_once_and_mark_them_read(terminal: Terminal) -> None:
     terminal.platform.post_message(USER, "T", "C")
     body = json.dumps({"code": 0, "data": {"result": False, "msg": ""}}).encode()
-    terminal.platform.faults["tips"] = HttpFault.reply(200, body, {"X-Total-Count": "2"})
+    terminal.platform.faults["tips"] = HttpFault("reply", 200, body, {"X-Total-Count": "2"})
     mark = start_agent(terminal)
     assert next_notification(terminal, mark).summary == "T"
     assert [message["read_at"] != "" for message in terminal.platform.messages()] == [True]

@@ -24,7 +24,7 @@ def next_poll_is_well(terminal: Terminal) -> None:
     assert next_notification(terminal, poll(terminal)).summary == "later"
 
 
-@pytest.mark.parametrize("fault", [HttpFault.close(), HttpFault.cut()], ids=lambda fault: fault.kind)
+@pytest.mark.parametrize("fault", [HttpFault("close"), HttpFault("cut")], ids=lambda fault: fault.kind)
 def test_broken_reply_is_one_warning_and_shows_nothing(polling: Terminal, fault: HttpFault) -> None:
     polling.platform.post_message(USER, "T", "C")
     polling.platform.fault = fault
@@ -51,7 +51,7 @@ def test_platform_that_is_down_is_asked_again_with_every_poll(terminal: Terminal
 
 def test_hanging_platform_costs_the_transfer_limit_and_no_more(polling: Terminal) -> None:
     polling.platform.post_message(USER, "T", "C")
-    polling.platform.fault = HttpFault.hang()
+    polling.platform.fault = HttpFault("hang")
     mark = begin_poll(polling)
     polling.daemon.push_policy({"type": 5})
     polling.jump(TRANSFER_LIMIT)
@@ -65,7 +65,7 @@ def test_hanging_platform_costs_the_transfer_limit_and_no_more(polling: Terminal
 
 def test_hanging_receipt_does_not_keep_the_message_from_being_shown(polling: Terminal) -> None:
     polling.platform.post_message(USER, "T", "C")
-    polling.platform.faults["read"] = HttpFault.hang()
+    polling.platform.faults["read"] = HttpFault("hang")
     mark = begin_poll(polling, "read")
     polling.jump(TRANSFER_LIMIT)
     assert next_notification(polling, mark).summary == "T"
@@ -73,11 +73,11 @@ def test_hanging_receipt_does_not_keep_the_message_from_being_shown(polling: Ter
 
 def test_reply_left_over_counts_are_not_read_again(polling: Terminal) -> None:
     """A reply that counted five is followed by none at all: the chain ends there."""
-    polling.platform.faults["list"] = HttpFault.reply(200, b"[]", {"X-Total-Count": "5"})
+    polling.platform.faults["list"] = HttpFault("reply", 200, b"[]", {"X-Total-Count": "5"})
 
     def break_platform(event: object) -> None:
         if getattr(event, "member", "") == "list":
-            polling.platform.faults["list"] = HttpFault.close()
+            polling.platform.faults["list"] = HttpFault("close")
 
     polling.events.subscribe(break_platform)
     mark = poll(polling)

@@ -63,7 +63,7 @@ def test_what_the_policy_service_replies_is_not_looked_at(terminal: Terminal, re
     terminal.start_agent()
     mark = terminal.events.mark()
     forward(terminal, "first")
-    terminal.policy_service.fault = Fault.fail()
+    terminal.policy_service.fault = Fault("fail")
     forward(terminal, "second")
     assert (forwarded(terminal), warnings(terminal, mark)) == (["first", "second"], [])
 

@@ -198,13 +198,13 @@ def test_service_that_fails_or_replies_in_another_form_reads_as_no(
     if reply:
         terminal.fakes[service].answers["Get"] = reply
     else:
-        terminal.fakes[service].fault = Fault.fail()
+        terminal.fakes[service].fault = Fault("fail")
     assert five_minute_report(terminal) == (status, name)
 
 
 @pytest.mark.parametrize("service", ["logind", "screensaver", "session_manager"])
 def test_service_that_does_not_introspect_is_read_all_the_same(terminal: Terminal, service: str) -> None:
     show(terminal, running=True, locked=True)
-    terminal.fakes[service].faults["Introspect"] = Fault.hang()
+    terminal.fakes[service].faults["Introspect"] = Fault("hang")
     terminal.start_agent()
     assert five_minute_report(terminal) == (SCREEN_SAVER, "zhang.wei")

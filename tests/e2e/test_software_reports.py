@@ -167,7 +167,7 @@ def test_machine_of_a_wrong_type_is_reported_as_empty(
 
 
 def test_machine_that_the_daemon_refuses_is_reported_as_empty(session: Terminal) -> None:
-    session.daemon.faults["GetMachineID"] = Fault.fail("com.norix.Error")
+    session.daemon.faults["GetMachineID"] = Fault("fail", "com.norix.Error")
 
     session.launcher.announce("created", EDITOR)
 
@@ -176,7 +176,7 @@ def test_machine_that_the_daemon_refuses_is_reported_as_empty(session: Terminal)
 
 @pytest.mark.parametrize(
     ("fault", "seconds", "machine"),
-    [(Fault.hang(), DBUS_LIMIT, ""), (Fault.hold(), DBUS_LIMIT - 5, "box-machine-0001")],
+    [(Fault("hang"), DBUS_LIMIT, ""), (Fault("hold"), DBUS_LIMIT - 5, "box-machine-0001")],
     ids=["hung", "slow"],
 )
 def test_machine_is_waited_for_until_the_limit(
@@ -206,7 +206,7 @@ def test_without_a_daemon_the_report_is_made_with_an_empty_machine(session: Term
 
 
 def test_replies_to_the_uploads_are_not_waited_for(stocked: Terminal) -> None:
-    stocked.daemon.faults["onUploadFinished"] = Fault.hang()
+    stocked.daemon.faults["onUploadFinished"] = Fault("hang")
     stocked.start_agent()
 
     mark = announce(stocked, "created", EDITOR)

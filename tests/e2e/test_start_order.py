@@ -12,7 +12,7 @@ from tests.e2e.wire import SHUTDOWN_NOTICE, log_lines, next_notification
 
 def start_until(terminal: Terminal, target: str, member: str) -> int:
     """Start the agent, which now waits for a service's answer; the mark before it."""
-    terminal.fakes[target].faults[member] = Fault.hold()
+    terminal.fakes[target].faults[member] = Fault("hold")
     mark = terminal.events.mark()
     terminal.start_agent(ready=lambda: terminal.events.wait_for(target=target, member=member, after=mark))
     return mark
@@ -54,7 +54,7 @@ def test_what_the_dock_says_while_it_is_read_is_heard(terminal: Terminal) -> Non
 def test_windows_that_change_while_a_slow_dock_is_read_are_known_afterwards(terminal: Terminal) -> None:
     terminal.dock.open_app("editor", "Editor", docked=True, windows=0)
     terminal.dock.open_app("mail", "Mail", docked=True, windows=0)
-    terminal.dock.faults["Id"] = Fault.hold()
+    terminal.dock.faults["Id"] = Fault("hold")
     mark = terminal.events.mark()
     terminal.start_agent(
         ready=lambda: terminal.events.wait_for(target="dock", member="Get", after=mark, count=2)

@@ -126,6 +126,6 @@ def test_a_platform_that_breaks_a_contract_by_itself_fails_the_test(tmp_path: Pa
 
 
 def test_a_platform_with_a_fault_may_break_a_contract(terminal: Terminal, tmp_path: Path) -> None:
-    terminal.platform.faults["tips"] = HttpFault.reply(200, b'{"code": "0"}')
+    terminal.platform.faults["tips"] = HttpFault("reply", 200, b'{"code": "0"}')
 
     play_with_policies(terminal, tmp_path, request("GET", TIPS, '{"username": "zhang"}'))

@@ -112,7 +112,7 @@ def test_a_property_may_be_read_and_set_as_its_contract_says(terminal: Terminal)
 
 
 def test_a_failing_service_answers_with_its_error(terminal: Terminal, on_system: Stranger) -> None:
-    terminal.daemon.fault = Fault.fail("com.norix.Error.Broken")
+    terminal.daemon.fault = Fault("fail", "com.norix.Error.Broken")
 
     with pytest.raises(dbus.DBusException) as raised:
         on_system.call(*DAEMON, "GetMachineID")
@@ -121,13 +121,13 @@ def test_a_failing_service_answers_with_its_error(terminal: Terminal, on_system:
 
 
 def test_a_fault_of_one_member_spares_the_others(terminal: Terminal, on_system: Stranger) -> None:
-    terminal.daemon.faults["GetServerIP"] = Fault.fail()
+    terminal.daemon.faults["GetServerIP"] = Fault("fail")
 
     assert on_system.call(*DAEMON, "GetMachineID") == "box-machine-0001"
 
 
 def test_a_held_call_is_answered_on_release(terminal: Terminal, on_system: Stranger) -> None:
-    terminal.daemon.fault = Fault.hold()
+    terminal.daemon.fault = Fault("hold")
     with ThreadPoolExecutor() as pool:
         answer = pool.submit(on_system.call, *DAEMON, "GetMachineID")
         terminal.events.wait_for(target="daemon", member="GetMachineID")
@@ -138,7 +138,7 @@ def test_a_held_call_is_answered_on_release(terminal: Terminal, on_system: Stran
 
 
 def test_a_hanging_call_ends_with_the_service(terminal: Terminal, on_system: Stranger) -> None:
-    terminal.daemon.fault = Fault.hang()
+    terminal.daemon.fault = Fault("hang")
     with ThreadPoolExecutor() as pool:
         answer = pool.submit(on_system.call, *DAEMON, "GetMachineID")
         terminal.events.wait_for(target="daemon", member="GetMachineID")

@@ -77,7 +77,7 @@ def test_a_client_without_certificate_is_refused(terminal: Terminal) -> None:
 
 
 def test_a_fault_of_one_route_spares_the_others(terminal: Terminal) -> None:
-    terminal.platform.faults["list"] = HttpFault.reply(500, b'"broken"')
+    terminal.platform.faults["list"] = HttpFault("reply", 500, b'"broken"')
 
     assert (request("GET", LIST)[0], request("GET", TIPS, {"username": "li"})[0]["code"]) == ("broken", 0)
 

@@ -50,7 +50,7 @@ def test_an_installation_reaches_the_platform(context: RecordedContext) -> None:
     context.terminal.events.wait_for(kind="reply", target="daemon", after=mark, count=2)
     context.run("software")
 
-    (change,) = context.terminal.platform.software_changes()
+    (change,) = context.terminal.platform.software_changes
     assert (change["software_name"], change["software_version"]) == ("editor", "2.1")
     (row,) = [line for line in context.lines_with("editor") if line.startswith("│")]
     assert "2.1" in row

@@ -66,7 +66,7 @@ def test_the_platform_keeps_every_change_and_the_last_inventory(
     terminal: Terminal, on_system: Stranger
 ) -> None:
     terminal.daemon.uploads_to(terminal.platform)
-    before = (terminal.platform.software_changes(), terminal.platform.inventory())
+    before = (list(terminal.platform.software_changes), terminal.platform.inventory)
     for report in (change("Editor"), change("Mail")):
         hand_over(on_system, CHANGES, report)
     for report in (inventory("Editor"), inventory("Editor", "Mail")):
@@ -74,8 +74,8 @@ def test_the_platform_keeps_every_change_and_the_last_inventory(
     terminal.events.wait_for(kind="reply", target="daemon", count=4)
 
     assert before == ([], None)
-    assert [known["software_name"] for known in terminal.platform.software_changes()] == ["Editor", "Mail"]
-    assert terminal.platform.inventory() == [{"name": "Editor"}, {"name": "Mail"}]
+    assert [known["software_name"] for known in terminal.platform.software_changes] == ["Editor", "Mail"]
+    assert terminal.platform.inventory == [{"name": "Editor"}, {"name": "Mail"}]
 
 
 @pytest.mark.parametrize(
@@ -88,11 +88,11 @@ def test_the_platform_refuses_what_is_no_inventory(
     hand_over(on_system, INVENTORY, report)
 
     assert terminal.events.wait_for(kind="reply", target="daemon").args[1] == 400
-    assert terminal.platform.inventory() is None
+    assert terminal.platform.inventory is None
 
 
 def test_a_platform_that_hangs_does_not_hold_up_the_daemon(terminal: Terminal, on_system: Stranger) -> None:
-    terminal.platform.fault = HttpFault.hang()
+    terminal.platform.fault = HttpFault("hang")
     terminal.daemon.uploads_to(terminal.platform)
 
     hand_over(on_system, INVENTORY, inventory())

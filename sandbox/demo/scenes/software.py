@@ -53,7 +53,7 @@ def _update_editor(terminal: Terminal) -> None:
 
 
 def _look_at_platform(terminal: Terminal) -> None:
-    known = tuple(f"{record['name']} {record['version']}" for record in terminal.platform.inventory() or ())
+    known = tuple(f"{record['name']} {record['version']}" for record in terminal.platform.inventory or ())
     terminal.events.record("platform", "inbox", "inbox", "software", known)
 
 
