@@ -96,7 +96,10 @@ def test_platform_that_rejects_the_terminals_certificate_is_bad(working: Termina
 @pytest.mark.parametrize(
     ("fault", "text"),
     [
-        *((HttpFault("reply", status), f"{NOT_ACCEPTED} (HTTP status {status})") for status in (400, 401, 403)),
+        *(
+            (HttpFault("reply", status), f"{NOT_ACCEPTED} (HTTP status {status})")
+            for status in (400, 401, 403)
+        ),
         (HttpFault("reply", 500, b"[]"), "answers with HTTP status 500 instead of messages"),
         (HttpFault("reply", 200, b"{}"), "answers with something other than messages"),
         (HttpFault("reply", 200, b"<html>"), "answers with something other than messages"),
