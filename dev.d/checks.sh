@@ -66,8 +66,11 @@ check_xmllint() {
     git ls-files -z --cached --others --exclude-standard '*.xml' | xargs -0 xmllint --noout --nonet
 }
 
+# Of GCC's options, clang refuses one that the tests need.
 check_clang_tidy() {
-    printf '%s\n' "${sources[@]}" | grep '\.cpp$' | xargs -P "$(nproc)" -n 4 "$PARTS/tidy" "build/$PRESET"
+    mkdir -p build/tidy
+    sed 's/ -femit-class-debug-always//' "build/$PRESET/compile_commands.json" >build/tidy/compile_commands.json
+    printf '%s\n' "${sources[@]}" | grep '\.cpp$' | xargs -P "$(nproc)" -n 4 "$PARTS/tidy" build/tidy
 }
 
 run_format() {
