@@ -15,12 +15,12 @@ from sandbox.machine import layout
 from sandbox.machine.packages import Packages
 
 _ITEMS = (10, 100, 300)
-_UPGRADED, _UPGRADED_ITEMS = 30, 50  # packages of an upgrade, items of the launcher meanwhile
+_UPGRADED, _UPGRADED_ITEMS = 30, 10  # packages of an upgrade, items of the launcher meanwhile
 _LOG_OUT = 1201
 _BEHIND = 0.5  # seconds until the agent has all changes in its queue
 _MINUTE = 60
 _SECONDS_PER_CHILD = 0.5
-_ASKED = 1_000  # records of the file that the tools are asked about
+_ASKED = 300  # records of the file that the tools are asked about
 _MEGABYTES = 10
 _CHILDREN = Goal("at most", 1.05)
 _FORKS = Goal(
