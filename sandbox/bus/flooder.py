@@ -36,9 +36,14 @@ class Flooder:
         for _ in range(times):
             self._socket.sendall(block)
 
+    def is_expelled(self) -> bool:
+        """Whether the bus ends the connection by itself, as after a message that nobody may send."""
+        return self._has_ended.wait(PATIENCE)
+
     def close(self) -> None:
         """Leave the bus once it has accepted everything that was sent."""
-        self._socket.shutdown(socket.SHUT_WR)
+        with contextlib.suppress(OSError):  # it has been expelled
+            self._socket.shutdown(socket.SHUT_WR)
         assert self._has_ended.wait(PATIENCE), "the bus did not accept everything"
         self._socket.close()
 

@@ -51,7 +51,6 @@ class Tree:
             self.write(f"{name}.py", MODULE.format(name=name.split("/")[0]))
         self.write("tests/lint/limits.py", MODULE.format(name="limits"))
         self.write("source.cpp", "")
-        self.write("build/release/compile_commands.json", "[]")
 
     def copy(self, name: str) -> None:
         """Put one more part of the repository into the copy."""
