@@ -166,8 +166,8 @@ def test_a_hung_system_bus_costs_the_limit_and_is_no_loss(session: Terminal) -> 
 
 
 def forge_the_loss(bus: Bus, destination: str | None) -> None:
-    """Send the signal by which the D-Bus library reports a lost bus, which no library sends. The bus expels its
-    sender."""
+    """Send the signal by which the D-Bus library reports a lost bus, and which no library sends. The bus
+    expels its sender."""
     lie = flooder.signal(
         "/org/freedesktop/DBus/Lokal", "org.freedesktop.DBus.Lokal", "Disconnected", destination=destination
     )
