@@ -24,9 +24,9 @@ from sandbox.events import Event
 from sandbox.policies import FORWARDED_CODES, with_action
 from sandbox.timeline import phrases
 from tests.fuzz.run import dictionary
-print(phrases.meaning(Event(0, "daemon", "*", "signal", "pushPolicyMsg", ("", '{"type": 1305}'))))
-print(any(policy.code == 1305 for policy in with_action("Notify")), 1305 in FORWARDED_CODES)
-print('"1305"' in dictionary("policy"))
+print(phrases.meaning(Event(0, "daemon", "*", "signal", "pushPolicyMsg", ("", '{"type": 1399}'))))
+print(any(policy.code == 1399 for policy in with_action("Notify")), 1399 in FORWARDED_CODES)
+print('"1399"' in dictionary("policy"))
 """
 
 
@@ -46,7 +46,7 @@ def snippet(language: str) -> str:
 @pytest.fixture
 def tree(tmp_path: Path) -> Path:
     """A copy of the sources, in which the recipe's code is not taken yet."""
-    assert 1305 not in POLICIES, "1305 is a policy now: give CONTRIBUTING.md and this test another example"
+    assert 1399 not in POLICIES, "1399 is a policy now: give CONTRIBUTING.md and this test another example"
     copy = tmp_path / "tree"
     shutil.copytree(REPOSITORY, copy, ignore=NOT_COPIED)
     return copy
@@ -111,7 +111,7 @@ def test_code_is_added_by_the_recipe_and_nothing_is_left_behind(tree: Path) -> N
     said = run(tree, unit_test)
     assert said.returncode == 0, said.stdout
 
-    row = re.search(r"'(\| 1305 .*\|)'", page_tests(tree).stdout)
+    row = re.search(r"'(\| 1399 .*\|)'", page_tests(tree).stdout)
     assert row, "the row for the page is printed"
     add(tree / "docs/policy-messages.md", "| any other", row[1] + "\n")
     said = page_tests(tree)
@@ -121,7 +121,7 @@ def test_code_is_added_by_the_recipe_and_nothing_is_left_behind(tree: Path) -> N
     assert used.stdout == "the network will change\nTrue False\nTrue\n"
     lists = [(name, text) for name, text in texts(tree) if all(str(code) in text for code in POLICIES)]
     assert len(lists) >= 3
-    assert [name for name, text in lists if "1305" not in text] == []
+    assert [name for name, text in lists if "1399" not in text] == []
 
 
 def test_text_of_a_notice_stands_where_the_recipe_says_and_nowhere_else(tree: Path) -> None:
